@@ -1,0 +1,25 @@
+# One static library per folder, from all its sources. LINKS are the folders and libraries it may use: only
+# their headers and symbols reach it, so a dependency that is not declared does not build.
+#   tvr_library(<name> [LINKS target...])
+function(tvr_library name)
+  cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "LINKS")
+  file(GLOB sources CONFIGURE_DEPENDS ${CMAKE_CURRENT_SOURCE_DIR}/*.cpp)
+  add_library(${name} STATIC ${sources})
+  target_include_directories(${name} PUBLIC ${PROJECT_SOURCE_DIR})
+  target_link_libraries(${name} PUBLIC ${arg_LINKS})
+endfunction()
+
+# A GoogleTest program of all sources below a folder, registered with ctest case by case.
+#   tvr_test(<name> FOLDER <dir> [LINKS target...] [LABELS label...] [ENVIRONMENT var=value...] [PROPERTIES ...])
+function(tvr_test name)
+  cmake_parse_arguments(PARSE_ARGV 1 arg "" "FOLDER" "LINKS;LABELS;ENVIRONMENT;DEPENDS;PROPERTIES")
+  file(GLOB sources CONFIGURE_DEPENDS ${CMAKE_CURRENT_SOURCE_DIR}/${arg_FOLDER}/*.cpp)
+  add_executable(${name} ${sources})
+  target_include_directories(${name} PRIVATE ${PROJECT_SOURCE_DIR})
+  target_link_libraries(${name} PRIVATE ${arg_LINKS} GTest::gmock_main)
+  if(arg_DEPENDS)
+    add_dependencies(${name} ${arg_DEPENDS})
+  endif()
+  gtest_discover_tests(${name} TEST_PREFIX "${name}." DISCOVERY_TIMEOUT 60
+    PROPERTIES LABELS "${arg_LABELS}" ENVIRONMENT "${arg_ENVIRONMENT}" TIMEOUT 120 ${arg_PROPERTIES})
+endfunction()

@@ -1,0 +1,53 @@
+// CIM datetime: a timestamp or an interval with microseconds.
+#pragma once
+
+#include "runtime/String.h"
+
+#include <cstdint>
+
+namespace cimple
+{
+
+/// A pointer to a counted representation; copies share, mutation copies. The default is the zero interval.
+class Datetime
+{
+public:
+    static constexpr std::uint64_t second = 1'000'000;
+    static constexpr std::uint64_t minute = 60 * second;
+    static constexpr std::uint64_t hour = 60 * minute;
+    static constexpr std::uint64_t day = 24 * hour;
+
+    Datetime() noexcept;
+    Datetime(const Datetime& other) noexcept;
+    ~Datetime();
+    Datetime& operator=(const Datetime& other) noexcept;
+
+    static Datetime interval(std::uint64_t usec);
+    /// `usec` since the epoch, `utc` in minutes.
+    static Datetime timestamp(std::uint64_t usec, std::int32_t utc);
+    /// Current time with the local offset; the zero interval if the clock cannot be read.
+    static Datetime now();
+
+    std::uint64_t usec() const;
+    std::int32_t utc() const; ///< minutes; stored, never applied to usec()
+    bool is_timestamp() const;
+    void set(std::uint64_t usec, std::int32_t utc, bool timestamp);
+    void clear(); ///< back to the zero interval
+
+    /// Reads the 25-character CIM text. Returns false and keeps the value for anything else.
+    bool parse(const char* text);
+    /// The 25-character CIM text; timestamps are printed in local time.
+    String text() const;
+    /// "2026/11/21 12:00:00.000000+060" or "00000001 02 03 04.000005:000".
+    String pretty() const;
+
+    struct Rep;
+
+private:
+    Rep* _rep;
+};
+
+/// Equal usec, utc and kind.
+bool operator==(const Datetime& a, const Datetime& b);
+
+} // namespace cimple
