@@ -4,6 +4,10 @@
 function(tvr_library name)
   cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "LINKS")
   file(GLOB sources CONFIGURE_DEPENDS ${CMAKE_CURRENT_SOURCE_DIR}/*.cpp)
+  if(NOT sources) # TEMPORARY while the folders are being filled
+    add_library(${name} INTERFACE)
+    return()
+  endif()
   add_library(${name} STATIC ${sources})
   target_include_directories(${name} PUBLIC ${PROJECT_SOURCE_DIR})
   target_link_libraries(${name} PUBLIC ${arg_LINKS})
