@@ -2,6 +2,10 @@
 // The simulator builds its stand-in from the same declarations.
 //
 // Every function has an LRM_ form (local library) and an RM_ form (fallback library) of one signature.
+//
+// A port is named by its WWPN, a virtual port by the WWPN of its physical port and its own. A list record begins
+// with a count: the room in entries on the way in, the number available on the way out. A call whose list has
+// too little room returns RM_ERROR_MORE_DATA with the number available, and may have filled what fits.
 #pragma once
 
 #include <time.h> // hbaapi.h uses struct tm
@@ -10,6 +14,116 @@
 
 #include <cstddef>
 #include <cstdint>
+
+/// Results that the program tells apart by number. RM_StatusString gives the text of any of them.
+enum RM_StatusCode : std::int32_t
+{
+    RM_OK = 0,
+    RM_ERROR = 1, ///< generic failure; also what a binding returns for a function that is absent
+    RM_ERROR_NOT_SUPPORTED = 2,
+    RM_ERROR_INVALID_WWN = 5, ///< also RM_ValidateWwn's refusal
+    RM_ERROR_MORE_DATA = 7,
+    RM_ERROR_NO_MEMORY = 8,
+    RM_ERROR_CHECK_CONDITION = 9, ///< a SCSI command ended with sense data, as in the HBA API
+    RM_ERROR_WWN_NOT_SUPPORTED = 89,
+    RM_ERROR_DUPLICATE_WWN = 91,
+    RM_ERROR_WWN_NOT_AVAILABLE = 92,
+    RM_ERROR_BUSY = 97, ///< the same call must be repeated
+    RM_ERROR_MAILBOX_FAILED = 148,
+    RM_ERROR_MAILBOX_TIMEOUT = 149,
+    RM_ERROR_MAILBOX_BUSY = 150,
+};
+
+/// Room that the program offers for each kind of attributes, in bytes.
+enum RM_BufferSize : std::uint32_t
+{
+    RM_HBA_ATTRIBUTES_SIZE = 2864,
+    RM_PORT_ATTRIBUTES_SIZE = 2048,
+    RM_PORT_STATISTICS_SIZE = 512,
+    RM_SERVER_ATTRIBUTES_SIZE = 784,
+};
+
+/// Numbers of the attributes. The comment gives the form of the value: number is 4 bytes and counter 8 bytes,
+/// both in native order; text is at most 255 bytes, with or without a terminator.
+enum RM_Attribute : std::uint32_t
+{
+    // RM_GetServerAttributes
+    RM_SA_OPERATING_SYSTEM = 0x108, // text
+
+    // RM_GetHBAAttributes
+    RM_HA_NODE_SYMBOLIC_NAME = 0x207,   // text
+    RM_HA_OPTION_ROM_VERSION = 0x209,   // text
+    RM_HA_DEVICE_ID = 0x20e,            // number
+    RM_HA_MODEL_ID = 0x20f,             // number
+    RM_HA_OPERATIONAL_FIRMWARE = 0x210, // text
+    RM_HA_SLI1_FIRMWARE_NAME = 0x211,   // text
+    RM_HA_SLI2_FIRMWARE_NAME = 0x212,   // text
+    RM_HA_IEEE_ADDRESS = 0x213,         // 6 bytes, first byte first
+    RM_HA_BOOT_CODE_ENABLED = 0x214,    // number, 0 or 1
+    RM_HA_BOOT_BIOS_VERSION = 0x216,    // text
+    RM_HA_DIAG_VERSION = 0x220,         // number
+    RM_HA_INITIAL_FIRMWARE = 0x221,     // text
+    RM_HA_KERNEL_VERSION = 0x222,       // text
+    RM_HA_SLI3_FIRMWARE_NAME = 0x224,   // text
+    RM_HA_SLI_MODE = 0x225,             // number
+    RM_HA_BOARD_TEMPERATURE = 0x227,    // number: degrees in bits 0-7, threshold in 8-15, state in 16-23
+    RM_HA_PORT_NUMBER = 0x229,          // number
+    RM_HA_PCI_BUS_NUMBER = 0x22b,       // number
+    RM_HA_FUNCTION_TYPE = 0x22c,        // number: 1, 2 and 3 are no Fibre Channel functions
+    RM_HA_PCI_FUNCTION_NUMBER = 0x230,  // number
+    RM_HA_SP_FIRMWARE_VERSION = 0x233,  // text
+    RM_HA_SP_FIRMWARE_NAME = 0x234,     // text
+    RM_HA_ULP_FIRMWARE_VERSION = 0x235, // text
+    RM_HA_ULP_FIRMWARE_NAME = 0x236,    // text
+    RM_HA_SUBADAPTER_ID = 0x24a,        // text
+    RM_HA_FC_UNIVERSAL_VERSION = 0x24b, // text
+    RM_HA_FC_X86_BIOS_VERSION = 0x24c,  // text
+    RM_HA_FC_EFI_VERSION = 0x24d,       // text
+    RM_HA_FC_FCODE_VERSION = 0x24e,     // text
+    RM_HA_FIRMWARE_ON_FLASH = 0x24f,    // text
+
+    // RM_GetPortAttributes
+    RM_PA_PORT_TYPE = 0x305,   // number, the HBA API's port type
+    RM_PA_LINK_STATE = 0x306,  // number; 22 is a disabled port
+    RM_PA_FABRIC_NAME = 0x30f, // 8 bytes, all zero without a fabric
+    RM_PA_PORT_STATE = 0x322,  // number, physical port state
+    RM_PA_FEC_STATE = 0x360,   // number
+
+    // RM_GetPortStatistics, all counters. All ones means that the library does not count this.
+    RM_PS_SECONDS_SINCE_LAST_RESET = 0x401,
+    RM_PS_TX_BYTES = 0x402,
+    RM_PS_RX_BYTES = 0x403,
+    RM_PS_TX_SEQUENCES = 0x404,
+    RM_PS_RX_SEQUENCES = 0x405,
+    RM_PS_TX_FRAMES = 0x406,
+    RM_PS_RX_FRAMES = 0x407,
+    RM_PS_TX_WORDS = 0x408,
+    RM_PS_RX_WORDS = 0x409,
+    RM_PS_LIP_COUNT = 0x40c,
+    RM_PS_NOS_COUNT = 0x40d,
+    RM_PS_ERROR_FRAMES = 0x40e,
+    RM_PS_DUMPED_FRAMES = 0x40f,
+    RM_PS_LINK_FAILURES = 0x410,
+    RM_PS_LOSS_OF_SYNC = 0x411,
+    RM_PS_LOSS_OF_SIGNAL = 0x412,
+    RM_PS_PRIMITIVE_SEQUENCE_ERRORS = 0x413,
+    RM_PS_INVALID_TX_WORDS = 0x414,
+    RM_PS_INVALID_CRCS = 0x415,
+    RM_PS_ADDRESS_ERRORS = 0x416,
+    RM_PS_PORT_BUSY_FRAMES = 0x417,
+    RM_PS_FABRIC_BUSY_FRAMES = 0x418,
+    RM_PS_LINK_RESETS_RECEIVED = 0x421,
+    RM_PS_LINK_RESETS_TRANSMITTED = 0x422,
+    RM_PS_DELIMITER_ERRORS = 0x423,
+};
+
+/// Tags of RM_GetHBAFeature. A feature is there when its value is 1.
+enum RM_FeatureTag : std::uint32_t
+{
+    RM_FEATURE_DPORT = 200,
+    RM_FEATURE_KESTOR_CNA = 201,
+    RM_FEATURE_CORE_DUMP = 430,
+};
 
 extern "C"
 {
@@ -29,12 +143,41 @@ extern "C"
 
     typedef RM_STATUS RM_InitLib_t();
     typedef RM_STATUS RM_ExitLib_t();
+    typedef RM_STATUS RM_SetDebugTraces_t(std::uint32_t level);
+    /// Text functions fill `buffer` of `size` bytes and end the text with a zero byte.
     typedef RM_STATUS RM_StatusString_t(RM_STATUS status, char* buffer, std::uint32_t size);
     typedef RM_STATUS RM_GetVersion_t(char* buffer, std::uint32_t size);
     typedef RM_STATUS RM_MiliVersion_t(char* buffer, std::uint32_t size);
     typedef RM_STATUS RM_IsLocalHBA_t(HBA_WWN wwpn, std::uint32_t* isLocal);
     typedef RM_STATUS RM_GetDriverType_t(HBA_WWN wwpn, std::uint32_t* driverType);
     typedef RM_STATUS RM_GetHBAFeature_t(HBA_WWN wwpn, std::uint32_t tag, std::uint32_t* value);
+
+    struct RM_Feature
+    {
+        std::uint32_t tag;
+        std::uint32_t value;
+    };
+
+    struct RM_FeatureList
+    {
+        std::uint32_t count;
+        RM_Feature entry[1];
+    };
+    static_assert(sizeof(RM_Feature) == 8 && offsetof(RM_FeatureList, entry) == 4);
+
+    typedef RM_STATUS RM_GetHBAFeatureList_t(HBA_WWN wwpn, RM_FeatureList* list);
+
+    /// Quality of service of an adapter port.
+    struct RM_QosInfo
+    {
+        std::uint32_t supported; ///< 0 or 1
+        std::uint32_t enabled;   ///< 0 or 1
+        std::uint32_t priority;  ///< of the port's frames, 0 is the lowest
+        std::uint32_t bandwidth; ///< share of the link in percent
+    };
+    static_assert(sizeof(RM_QosInfo) == 16);
+
+    typedef RM_STATUS RM_GetQoS_t(HBA_WWN wwpn, RM_QosInfo* info);
 
     /// PCI configuration space and chip-dependent registers of a function, little-endian as in the bus.
     struct RM_PciRegisters
@@ -49,5 +192,102 @@ extern "C"
     static_assert(offsetof(RM_PciRegisters, pciType) == 316);
 
     typedef RM_STATUS RM_DiagReadPCIRegistersV2_t(HBA_WWN wwpn, RM_PciRegisters* registers);
+
+    // Virtual ports.
+
+    struct RM_VPortEntry
+    {
+        HBA_WWN wwpn;
+        HBA_WWN wwnn;
+        std::uint32_t fcId;
+        std::uint32_t state; ///< the HBA API's port state
+    };
+
+    struct RM_VPortList
+    {
+        std::uint32_t count;
+        RM_VPortEntry entry[1];
+    };
+    static_assert(sizeof(RM_VPortEntry) == 24 && offsetof(RM_VPortList, entry) == 4);
+
+    /// Virtual ports of the physical port `wwpn`.
+    typedef RM_STATUS RM_VPList_t(HBA_WWN wwpn, RM_VPortList* list);
+
+    struct RM_VPortAttributes
+    {
+        HBA_WWN wwpn;
+        HBA_WWN wwnn;
+        HBA_WWN fabricName; ///< zero without a fabric
+        std::uint32_t fcId;
+        std::uint32_t state;       ///< the HBA API's port state
+        std::uint32_t targetCount; ///< targets that the virtual port sees
+        std::uint32_t reserved;
+        char symbolicName[256];
+    };
+    static_assert(sizeof(RM_VPortAttributes) == 296);
+    static_assert(offsetof(RM_VPortAttributes, fcId) == 24 && offsetof(RM_VPortAttributes, symbolicName) == 40);
+
+    typedef RM_STATUS RM_VPGetAttributes_t(HBA_WWN wwpn, HBA_WWN vport, RM_VPortAttributes* attributes);
+
+    struct RM_VPortTarget
+    {
+        HBA_WWN wwpn;
+        HBA_WWN wwnn;
+        std::uint32_t fcId;
+        std::uint32_t scsiBusNumber;
+        std::uint32_t scsiTargetNumber;
+    };
+
+    struct RM_VPortTargetList
+    {
+        std::uint32_t count;
+        RM_VPortTarget entry[1];
+    };
+    static_assert(sizeof(RM_VPortTarget) == 28 && offsetof(RM_VPortTargetList, entry) == 4);
+
+    typedef RM_STATUS RM_VPListTargets_t(HBA_WWN wwpn, HBA_WWN vport, RM_VPortTargetList* list);
+
+    // SCSI commands follow the HBA API: the response is that of the SCSI standard, cut at `responseSize`; a status
+    // of RM_ERROR_CHECK_CONDITION fills `sense`. `lun` is the 8-byte LUN field as HBA_FCPID carries it.
+    typedef RM_STATUS RM_VpScsiReportLUNs_t(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, void* response,
+                                            std::uint32_t responseSize, void* sense, std::uint32_t senseSize);
+    typedef RM_STATUS RM_VpScsiInquiry_t(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, HBA_UINT64 lun, std::uint8_t evpd,
+                                         std::uint32_t page, void* response, std::uint32_t responseSize, void* sense,
+                                         std::uint32_t senseSize);
+    typedef RM_STATUS RM_VpScsiReadCapacity_t(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, HBA_UINT64 lun,
+                                              void* response, std::uint32_t responseSize, void* sense,
+                                              std::uint32_t senseSize);
+    typedef RM_STATUS RM_ScsiInquiry_t(HBA_WWN wwpn, HBA_WWN target, HBA_UINT64 lun, std::uint8_t evpd,
+                                       std::uint32_t page, void* response, std::uint32_t responseSize, void* sense,
+                                       std::uint32_t senseSize);
+
+    /// The virtual machine that a virtual port is given to.
+    struct RM_VirtualMachine
+    {
+        char name[256];
+        char uuid[40];
+    };
+    static_assert(sizeof(RM_VirtualMachine) == 296 && offsetof(RM_VirtualMachine, uuid) == 256);
+
+    typedef RM_STATUS RM_GetVMFromVPort_t(HBA_WWN wwpn, HBA_WWN vport, RM_VirtualMachine* machine);
+
+    // Logical units of a target behind a physical port.
+
+    struct RM_Lun
+    {
+        HBA_UINT64 fcpLun;
+        std::uint32_t osLun;
+        std::uint32_t blockLength; ///< bytes; 0 if unknown
+    };
+
+    struct RM_LunList
+    {
+        std::uint32_t count;
+        std::uint32_t reserved;
+        RM_Lun entry[1];
+    };
+    static_assert(sizeof(RM_Lun) == 16 && offsetof(RM_LunList, entry) == 8);
+
+    typedef RM_STATUS RM_GetLunList_t(HBA_WWN wwpn, HBA_WWN target, RM_LunList* list);
 
 } // extern "C"
