@@ -1,0 +1,45 @@
+// What the class providers share: joining the agent, and the fixed forms of enumeration.
+#pragma once
+
+#include "agent/ProviderAgent.h"
+#include "runtime/Provider.h"
+
+namespace cimple
+{
+
+/// Makes the agent on first call. Takes a reference and returns 0, or LOAD_FAILED and no reference.
+int loadProvider();
+/// Gives the reference back; returns 0.
+int unloadProvider(const char* providerName);
+
+/// Copies the map under the locks, then hands a clone of each instance to the handler. Every failure leaves a log
+/// line and ends the enumeration with what was sent; the status is always 0.
+int enumeratePlain(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client);
+
+/// The same for SAN classes, whose maps are built when one of them is asked for.
+int enumerateSan(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client);
+
+/// Updates a map from the hardware; the caller holds all locks of the refresh.
+using LiveRefresh = void (*)(ProviderAgent& agent);
+
+/// The same after a live refresh, serialised by the class's own mutex.
+int enumerateActive(Instance_Map InstanceCache::*map, const char* providerName, Mutex& classMutex, LiveRefresh refresh,
+                    Instance_Handler handler, void* client);
+
+/// What every extrinsic method stands on: asks for a refresh if one is due, waits for the adapter data and maps, and
+/// holds m_DataMutex for the method's length.
+class MethodGuard
+{
+public:
+    explicit MethodGuard(ProviderAgent& agent);
+
+private:
+    struct Ready
+    {
+        explicit Ready(ProviderAgent& agent);
+    };
+    Ready _ready;
+    Auto_Mutex _dataLock;
+};
+
+} // namespace cimple

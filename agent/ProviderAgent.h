@@ -1,0 +1,139 @@
+// The object behind all class providers: device data, settings, log sinks and the instance cache.
+#pragma once
+
+#include "agent/InstanceCache.h"
+#include "device/Data.h"
+#include "device/TVR_MethodWrapper.h"
+#include "foundation/TVR_CIMLogger.h"
+#include "foundation/TVR_FileLogger.h"
+#include "foundation/TVR_SysLogger.h"
+#include "foundation/TvrConfigFile.h"
+#include "runtime/Datetime.h"
+#include "runtime/Thread.h"
+
+#include <atomic>
+#include <cstdint>
+#include <memory>
+
+namespace cimple
+{
+
+/// The version that the module reports.
+inline constexpr int providerVersion[4] = {10, 2, 261, 13};
+
+/// A stage of the refresh that readers wait for: the flags are written under the mutex.
+struct RefreshStage
+{
+    Mutex& mutex;
+    Condition& cond;
+    std::atomic<bool>& ready;
+    std::atomic<bool>& building;
+
+    /// Waits once, with no timeout, if the stage is not ready; the mutex is held. A spurious wake-up goes on:
+    /// what the caller reads next is safe whatever the flag says.
+    void waitIfNotReady() const;
+    /// Marks the stage complete and wakes its readers; the mutex is held.
+    void complete() const;
+};
+
+/// Exists while at least one class provider is loaded. Broker threads never build anything: they ask for a refresh,
+/// wait for the stage they need and copy out of the cache; one DataFetch_Handler thread at a time rebuilds it.
+///
+/// Locks are taken in this order: singleton mutex, m_ThreadMutex, m_AdapterDataReadyMutex,
+/// m_AdapterMapsReadyMutex, m_SANMapsReadyMutex, m_DataMutex.
+class ProviderAgent : public InstanceCache
+{
+public:
+    /// The agent, made on first call under the singleton mutex.
+    static ProviderAgent* instance();
+    static void addRef();
+    /// Deletes the agent when the count reaches 0.
+    static void releaseRef();
+
+    /// Starts a refresh if one is due; returns 0 at once.
+    int BuildCimpleInfo();
+    /// True when the cache is older than m_cacheTimeout.
+    bool isTimeOut();
+    std::uint32_t updateAdapterMaps();
+    std::uint32_t updateSANMaps();
+    /// Clears all maps, each group under its mutex.
+    void ClearMaps();
+    /// The caller holds the mutex of the group.
+    void clearAdapterMaps();
+    void clearSANMaps();
+
+    // --- refresh requests and settings
+    std::atomic<bool> m_bAdapterRefreshPending{true};
+    std::atomic<bool> m_bAdapterRefresh{false};
+    std::atomic<bool> m_bSANRefreshPending{false};
+    std::atomic<bool> m_bSANRefresh{false};
+    std::atomic<std::uint32_t> m_cacheTimeout{0}; ///< minutes
+
+    // --- parts
+    std::atomic<bool> m_bLoaded{false}; ///< fully built, and the libraries are usable
+    std::unique_ptr<Data> m_pData;
+    std::unique_ptr<TVR_MethodWrapper> m_pMethodWrapper;
+    TVR_FileLogger m_fileLogger;
+    TVR_CIMLogger m_cimLogger;
+    TVR_SysLogger m_sysLogger;
+    TvrConfigFile m_config;
+
+    // --- stages of the refresh
+    Mutex m_DataMutex; ///< device data and the contents of the maps
+    std::atomic<bool> m_bIsAdapterDataReady{false};
+    std::atomic<bool> m_bAdapterDataBuilding{false};
+    Mutex m_AdapterDataReadyMutex;
+    Condition m_AdapterDataReadyCond;
+    std::atomic<bool> m_bAdapterMapsReady{false};
+    std::atomic<bool> m_bAdapterMapsBuilding{false};
+    Mutex m_AdapterMapsReadyMutex;
+    Condition m_AdapterMapsReadyCond;
+    std::atomic<bool> m_bSANMapsReady{false};
+    std::atomic<bool> m_bSANMapsBuilding{false};
+    Mutex m_SANMapsReadyMutex;
+    Condition m_SANMapsReadyCond;
+    RefreshStage adapterData();
+    RefreshStage adapterMaps();
+    RefreshStage sanMaps();
+    std::atomic<bool> m_bDiagnosticsRunning{false};
+
+    // --- the host
+    String m_osName;
+    String m_osExtendedInfo;
+    String m_hostName;
+    String m_ipAddress;
+    bool m_bOwnComputerSystem = false; ///< the computer system was generated here
+
+    // --- status thread of the D-Port test
+    Thread m_dportThread;
+    std::atomic<bool> m_bDportThreadRunning{false};
+    std::atomic<bool> m_bDportThreadEnd{false};
+
+private:
+    friend class AgentEnd;
+
+    ProviderAgent();
+    ~ProviderAgent();
+
+    void start();
+    void startLogging();
+    void readSettings();
+    /// Stops the threads and gives back all that is not memory, once; the agent stays and answers empty.
+    void finish();
+    void joinThreads();
+    void deleteData();
+
+    static void* DataFetch_Handler(void* agent);
+    void refresh();
+    void adapterStage();
+    void sanStage();
+
+    Datetime m_lastLoadTime; ///< end of the last run; the zero interval before any
+    Thread m_dataFetchThread;
+    Mutex m_ThreadMutex; ///< m_bThreadRunning, m_lastLoadTime and the decision to start
+    bool m_bThreadRunning = false;  ///< started and not finished
+    bool m_bThreadJoinable = false; ///< started and not joined
+    std::atomic<bool> m_bFinished{false};
+};
+
+} // namespace cimple
