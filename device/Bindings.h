@@ -1,0 +1,83 @@
+// The entry points that the program calls, each as a function object of the entry point's own name and signature.
+//
+//     RM_STATUS status = LRM_GetHBAAttributes(wwpn, buffer, &size);
+//
+// They are objects, not functions, so that they stand beside the declarations of <hbaapi.h>. A call whose entry
+// point is absent returns the value that device/EntryPoints.h gives it.
+#pragma once
+
+#include "device/EntryPoints.h"
+#include "device/Libraries.h"
+#include "device/RmApi.h"
+
+#include <type_traits>
+
+namespace cimple
+{
+
+template <std::size_t Row, class Signature> class Binding;
+
+template <std::size_t Row, class Result, class... Args> class Binding<Row, Result(Args...)>
+{
+    static constexpr Absent absent = entryPoints[Row].absent;
+    static_assert(std::is_void_v<Result> == (absent == absentNothing));
+    static_assert(!std::is_pointer_v<Result> || absent == absentZero);
+
+public:
+    Result operator()(Args... args) const
+    {
+        if (void* entry = resolveEntry(Row))
+            return reinterpret_cast<Result (*)(Args...)>(entry)(args...);
+        if constexpr (std::is_pointer_v<Result>)
+            return nullptr;
+        else if constexpr (!std::is_void_v<Result>)
+            return static_cast<Result>(absent);
+    }
+};
+
+inline constexpr Binding<entryRow("HBA_CloseAdapter"), decltype(::HBA_CloseAdapter)> HBA_CloseAdapter;
+inline constexpr Binding<entryRow("HBA_FreeLibrary"), decltype(::HBA_FreeLibrary)> HBA_FreeLibrary;
+inline constexpr Binding<entryRow("HBA_GetAdapterAttributes"), decltype(::HBA_GetAdapterAttributes)>
+    HBA_GetAdapterAttributes;
+inline constexpr Binding<entryRow("HBA_GetAdapterName"), decltype(::HBA_GetAdapterName)> HBA_GetAdapterName;
+inline constexpr Binding<entryRow("HBA_GetAdapterPortAttributes"), decltype(::HBA_GetAdapterPortAttributes)>
+    HBA_GetAdapterPortAttributes;
+inline constexpr Binding<entryRow("HBA_GetFcpTargetMapping"), decltype(::HBA_GetFcpTargetMapping)>
+    HBA_GetFcpTargetMapping;
+inline constexpr Binding<entryRow("HBA_GetNumberOfAdapters"), decltype(::HBA_GetNumberOfAdapters)>
+    HBA_GetNumberOfAdapters;
+inline constexpr Binding<entryRow("HBA_LoadLibrary"), decltype(::HBA_LoadLibrary)> HBA_LoadLibrary;
+inline constexpr Binding<entryRow("HBA_OpenAdapter"), decltype(::HBA_OpenAdapter)> HBA_OpenAdapter;
+inline constexpr Binding<entryRow("HBA_RefreshInformation"), decltype(::HBA_RefreshInformation)> HBA_RefreshInformation;
+inline constexpr Binding<entryRow("HBA_SendReadCapacity"), decltype(::HBA_SendReadCapacity)> HBA_SendReadCapacity;
+inline constexpr Binding<entryRow("HBA_SendScsiInquiry"), decltype(::HBA_SendScsiInquiry)> HBA_SendScsiInquiry;
+
+inline constexpr Binding<entryRow("LRM_DiagReadPCIRegistersV2"), RM_DiagReadPCIRegistersV2_t>
+    LRM_DiagReadPCIRegistersV2;
+inline constexpr Binding<entryRow("LRM_GetDriverType"), RM_GetDriverType_t> LRM_GetDriverType;
+inline constexpr Binding<entryRow("LRM_GetHBAAttributes"), RM_GetHBAAttributes_t> LRM_GetHBAAttributes;
+inline constexpr Binding<entryRow("LRM_GetHBAFeature"), RM_GetHBAFeature_t> LRM_GetHBAFeature;
+inline constexpr Binding<entryRow("LRM_GetHBAFeatureList"), RM_GetHBAFeatureList_t> LRM_GetHBAFeatureList;
+inline constexpr Binding<entryRow("LRM_GetLunList"), RM_GetLunList_t> LRM_GetLunList;
+inline constexpr Binding<entryRow("LRM_GetPortAttributes"), RM_GetPortAttributes_t> LRM_GetPortAttributes;
+inline constexpr Binding<entryRow("LRM_GetPortStatistics"), RM_GetPortStatistics_t> LRM_GetPortStatistics;
+inline constexpr Binding<entryRow("LRM_GetQoS"), RM_GetQoS_t> LRM_GetQoS;
+inline constexpr Binding<entryRow("LRM_GetServerAttributes"), RM_GetServerAttributes_t> LRM_GetServerAttributes;
+inline constexpr Binding<entryRow("LRM_GetVMFromVPort"), RM_GetVMFromVPort_t> LRM_GetVMFromVPort;
+inline constexpr Binding<entryRow("LRM_InitLib"), RM_InitLib_t> LRM_InitLib;
+inline constexpr Binding<entryRow("LRM_ScsiInquiry"), RM_ScsiInquiry_t> LRM_ScsiInquiry;
+inline constexpr Binding<entryRow("LRM_SetDebugTraces"), RM_SetDebugTraces_t> LRM_SetDebugTraces;
+inline constexpr Binding<entryRow("LRM_VPGetAttributes"), RM_VPGetAttributes_t> LRM_VPGetAttributes;
+inline constexpr Binding<entryRow("LRM_VPList"), RM_VPList_t> LRM_VPList;
+inline constexpr Binding<entryRow("LRM_VPListTargets"), RM_VPListTargets_t> LRM_VPListTargets;
+inline constexpr Binding<entryRow("LRM_VpScsiInquiry"), RM_VpScsiInquiry_t> LRM_VpScsiInquiry;
+inline constexpr Binding<entryRow("LRM_VpScsiReadCapacity"), RM_VpScsiReadCapacity_t> LRM_VpScsiReadCapacity;
+inline constexpr Binding<entryRow("LRM_VpScsiReportLUNs"), RM_VpScsiReportLUNs_t> LRM_VpScsiReportLUNs;
+
+inline constexpr Binding<entryRow("RM_GetAttributeValue"), RM_GetAttributeValue_t> RM_GetAttributeValue;
+inline constexpr Binding<entryRow("RM_GetVersion"), RM_GetVersion_t> RM_GetVersion;
+inline constexpr Binding<entryRow("RM_IsLocalHBA"), RM_IsLocalHBA_t> RM_IsLocalHBA;
+inline constexpr Binding<entryRow("RM_MiliVersion"), RM_MiliVersion_t> RM_MiliVersion;
+inline constexpr Binding<entryRow("RM_StatusString"), RM_StatusString_t> RM_StatusString;
+
+} // namespace cimple
