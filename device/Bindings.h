@@ -7,7 +7,7 @@
 #pragma once
 
 #include "device/EntryPoints.h"
-#include "device/Libraries.h"
+#include "device/Loader.h"
 #include "device/RmApi.h"
 
 #include <type_traits>

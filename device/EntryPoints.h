@@ -9,7 +9,7 @@
 namespace cimple
 {
 
-/// How the name of an entry point is looked up; libraries in device/Libraries.h.
+/// How the name of an entry point is looked up; libraries in device/Loader.h.
 enum class Family : std::uint8_t
 {
     rmDual,    ///< LRM_ name in the local RM library; LRM_ then RM_ name in the fallback library

@@ -1,4 +1,4 @@
-#include "device/Libraries.h"
+#include "device/Loader.h"
 
 #include "device/EntryPoints.h"
 #include "foundation/Log.h"
