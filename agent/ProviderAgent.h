@@ -130,7 +130,7 @@ private:
 
     Datetime m_lastLoadTime; ///< end of the last run; the zero interval before any
     Thread m_dataFetchThread;
-    Mutex m_ThreadMutex; ///< m_bThreadRunning, m_lastLoadTime and the decision to start
+    Mutex m_ThreadMutex;            ///< m_bThreadRunning, m_lastLoadTime and the decision to start
     bool m_bThreadRunning = false;  ///< started and not finished
     bool m_bThreadJoinable = false; ///< started and not joined
     std::atomic<bool> m_bFinished{false};

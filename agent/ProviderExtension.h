@@ -18,8 +18,7 @@ namespace cimple
 {
 
 template <class Record, class Form> struct Extended : Form
-{
-};
+{};
 
 /// An extrinsic method with a body. `call` gets the reference and the parameter record, writes the out parameters
 /// and "return_value", and returns a Provider_Status.

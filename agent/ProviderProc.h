@@ -4,7 +4,6 @@
 #include "agent/ProviderExtension.h"
 #include "runtime/Provider.h"
 
-
 namespace cimple
 {
 

@@ -39,15 +39,14 @@ template <class Class> struct ActiveForm : ProviderBase<Class>
     int enum_instances(const Instance*, Instance_Handler handler, void* client)
     {
         static Mutex classMutex(true);
-        return enumerateActive(Class::map, Class::providerName, classMutex, &liveRefresh<typename Class::Record>, handler,
-                               client);
+        return enumerateActive(Class::map, Class::providerName, classMutex, &liveRefresh<typename Class::Record>,
+                               handler, client);
     }
 };
 
 /// Classes that build their instances at each enumeration serve their map until their provider is written.
 template <class Class> struct OwnForm : PlainForm<Class>
-{
-};
+{};
 
 /// What the forms know of a class, and its provider.
 #define TVR_CLASS(name, form, group)                                                                                   \
@@ -57,9 +56,8 @@ template <class Class> struct OwnForm : PlainForm<Class>
         static constexpr const char* providerName = "TVRHBA_" #name "_Provider";                                       \
         static constexpr Instance_Map InstanceCache::*map = &InstanceCache::m_TVRHBA_##name##_map;                     \
     };                                                                                                                 \
-    class TVRHBA_##name##_Provider : public Extended<TVRHBA_##name, form##Form<TVRHBA_##name##_Row>>                                            \
-    {                                                                                                                  \
-    };
+    class TVRHBA_##name##_Provider : public Extended<TVRHBA_##name, form##Form<TVRHBA_##name##_Row>>                   \
+    {};
 #define TVR_ASSOCIATION(name, form, group) TVR_CLASS(name, form, group)
 #include "agent/ClassCatalog.def"
 
