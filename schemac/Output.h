@@ -1,0 +1,37 @@
+// Generated files.
+#pragma once
+
+#include "schemac/Model.h"
+
+#include <cstddef>
+#include <filesystem>
+#include <string>
+#include <vector>
+
+namespace schemac
+{
+
+struct OutputFile
+{
+    std::string name; ///< below the output folder
+    std::string text;
+};
+using OutputFiles = std::vector<OutputFile>;
+
+/// The record types: one header per class, and one with those of the classes that the module serves.
+OutputFiles write_records(const Schema& schema);
+
+/// The meta tables in `chunks` source files, and the repository.
+OutputFiles write_tables(const Schema& schema, std::size_t chunks);
+
+/// What CIM servers read: class declarations and provider registrations.
+OutputFiles write_server_files(const Schema& schema);
+
+/// True for the classes that the module serves.
+bool is_served(const Class& c);
+
+/// Writes the files whose content differs from what is there, so that unchanged ones keep their time. Throws
+/// std::runtime_error.
+void save(const OutputFiles& files, const std::filesystem::path& folder);
+
+} // namespace schemac

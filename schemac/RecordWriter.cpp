@@ -1,0 +1,109 @@
+// Record types: a class per CIM class and per method, with a slot per own property, reference and parameter.
+#include "schemac/CppNames.h"
+#include "schemac/Output.h"
+#include "schemac/Types.h"
+
+#include <set>
+
+namespace schemac
+{
+
+namespace
+{
+
+std::string slot_type(const Feature& feature)
+{
+    if (feature.kind == FeatureKind::Reference)
+    {
+        const std::string target = feature.embedded == Embedded::Object ? "Instance" : feature.class_name;
+        return feature.subscript == 0 ? target + "*" : "Property<Array<Instance*>>";
+    }
+    const std::string value = find_type(feature.type)->cpp;
+    return feature.subscript == 0 ? "Property<" + value + ">" : "Property<Array<" + value + ">>";
+}
+
+std::string slot(const Feature& feature)
+{
+    return "    " + slot_type(feature) + " " + feature.name + ";\n";
+}
+
+/// Classes that slots point to; they are declared ahead, so that headers do not include each other.
+void collect_targets(const std::vector<Feature>& features, std::set<std::string>& targets)
+{
+    for (const Feature& feature : features)
+    {
+        if (feature.kind == FeatureKind::Reference && feature.subscript == 0 && feature.embedded != Embedded::Object)
+        {
+            targets.insert(feature.class_name);
+        }
+        collect_targets(feature.parameters, targets);
+    }
+}
+
+std::string class_record(const Class& c)
+{
+    std::string text =
+        "class " + c.name + " : public " + (c.superclass ? c.superclass->name : "Instance") + "\n{\npublic:\n";
+    for (const Feature& feature : c.features)
+    {
+        if (feature.kind != FeatureKind::Method && !find(feature.qualifiers, "Override"))
+        {
+            text += slot(feature);
+        }
+    }
+    return text + "\n    static const Meta_Class static_meta_class;\n};\n";
+}
+
+std::string method_record(const Class& c, const Feature& method)
+{
+    std::string text = "\nclass " + method_record_name(c, method) + " : public Instance\n{\npublic:\n";
+    for (const Feature& parameter : method.parameters)
+    {
+        text += slot(parameter);
+    }
+    text += slot(return_value_of(method));
+    return text + "\n    static const Meta_Method static_meta_method;\n};\n";
+}
+
+OutputFile class_header(const Class& c)
+{
+    std::string text = banner(c.place.file) + "#pragma once\n\n#include \"" +
+                       (c.superclass ? header_name(*c.superclass) : "runtime/Instance.h") +
+                       "\"\n\nnamespace cimple\n{\n\n";
+    std::set<std::string> targets;
+    collect_targets(c.features, targets);
+    targets.erase(c.name);
+    for (const std::string& target : targets)
+    {
+        text += "class " + target + ";\n";
+    }
+    text += (targets.empty() ? "" : "\n") + class_record(c);
+    for (const Feature& feature : c.features)
+    {
+        if (feature.kind == FeatureKind::Method)
+        {
+            text += method_record(c, feature);
+        }
+    }
+    return {header_name(c), text + "\n} // namespace cimple\n"};
+}
+
+} // namespace
+
+OutputFiles write_records(const Schema& schema)
+{
+    OutputFiles files;
+    std::string all = banner("the schema") + "#pragma once\n\n";
+    for (const Class& c : schema.classes)
+    {
+        files.push_back(class_header(c));
+        if (is_served(c))
+        {
+            all += "#include \"" + header_name(c) + "\"\n";
+        }
+    }
+    files.push_back({"schema/AllClasses.h", all});
+    return files;
+}
+
+} // namespace schemac
