@@ -24,8 +24,10 @@ OutputFiles write_records(const Schema& schema);
 /// The meta tables in `chunks` source files, and the repository.
 OutputFiles write_tables(const Schema& schema, std::size_t chunks);
 
-/// What CIM servers read: class declarations and provider registrations.
-OutputFiles write_server_files(const Schema& schema);
+/// What CIM servers read: qualifiers.mof, cim_classes.mof and tavrin_classes.mof, to be compiled in this order into
+/// each namespace, with a class after those it names; the registration of the providers as stanzas (.reg, the
+/// small-footprint broker) and as instances (_registration.mof, the Open Group's server).
+OutputFiles write_server_files(const Schema& schema, const std::string& version);
 
 /// True for the classes that the module serves.
 bool is_served(const Class& c);

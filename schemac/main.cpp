@@ -3,7 +3,6 @@
 #include "schemac/Output.h"
 #include "schemac/Parser.h"
 
-#include <cstdlib>
 #include <exception>
 #include <fstream>
 #include <iostream>
@@ -16,7 +15,7 @@ namespace
 {
 
 constexpr const char* usage = "usage: schemac --cpp FOLDER CHUNKS FILE.mof...   record types and meta tables\n"
-                              "       schemac --mof FOLDER FILE.mof...          files for CIM servers\n"
+                              "       schemac --mof FOLDER VERSION FILE.mof...  files for CIM servers\n"
                               "       schemac --check FILE.mof...               refusals only\n";
 
 void read_source(const std::string& path, schemac::Schema& schema)
@@ -44,36 +43,38 @@ bool read_schema(const std::vector<std::string>& paths, schemac::Schema& schema)
     return refusals.empty();
 }
 
-int run(std::vector<std::string> arguments)
+/// Writes what `mode` asks for; `option` is the number of chunks or the module's version.
+void write(const schemac::Schema& schema, const std::string& mode, const std::string& folder, const std::string& option)
 {
-    const auto take = [&]
+    if (mode == "--cpp")
     {
-        std::string first = arguments.empty() ? "" : arguments.front();
-        arguments.erase(arguments.begin(), arguments.begin() + !arguments.empty());
-        return first;
-    };
-    const std::string mode = take();
-    const std::string folder = mode == "--check" ? "" : take();
-    const long chunks = mode == "--cpp" ? std::strtol(take().c_str(), nullptr, 10) : 1;
-    const bool known = mode == "--cpp" || mode == "--mof" || mode == "--check";
-    if (!known || chunks < 1 || arguments.empty())
+        schemac::save(schemac::write_records(schema), folder);
+        schemac::save(schemac::write_tables(schema, std::stoul(option)), folder);
+    }
+    else
+    {
+        schemac::save(schemac::write_server_files(schema, option), folder);
+    }
+}
+
+int run(const std::vector<std::string>& arguments)
+{
+    const std::string mode = arguments.empty() ? "" : arguments.front();
+    const bool writes = mode == "--cpp" || mode == "--mof";
+    const std::size_t num_options = writes ? 3 : 1;
+    if ((!writes && mode != "--check") || arguments.size() <= num_options)
     {
         std::cerr << usage;
         return 2;
     }
     schemac::Schema schema;
-    if (!read_schema(arguments, schema))
+    if (!read_schema({arguments.begin() + num_options, arguments.end()}, schema))
     {
         return 1;
     }
-    if (mode == "--cpp")
+    if (writes)
     {
-        schemac::save(schemac::write_records(schema), folder);
-        schemac::save(schemac::write_tables(schema, static_cast<std::size_t>(chunks)), folder);
-    }
-    else if (mode == "--mof")
-    {
-        schemac::save(schemac::write_server_files(schema), folder);
+        write(schema, mode, arguments[1], arguments[2]);
     }
     return 0;
 }
