@@ -1,0 +1,31 @@
+// Text out of records that a library fills.
+#pragma once
+
+#include "device/RmApi.h"
+
+#include <cstring>
+#include <string>
+
+namespace cimple
+{
+
+/// A library need not end a full field with a zero byte.
+template <std::size_t Size> std::string fieldText(const char (&field)[Size])
+{
+    return std::string(field, strnlen(field, Size));
+}
+
+/// At most `size` bytes at `bytes`, up to the first zero byte.
+inline std::string fieldText(const std::uint8_t* bytes, std::size_t size)
+{
+    const auto* text = reinterpret_cast<const char*>(bytes);
+    return std::string(text, strnlen(text, size));
+}
+
+/// 16 upper-case hexadecimal digits.
+std::string wwnText(const HBA_WWN& wwn);
+
+/// The name behind wwnText(). Logs a text of another form and throws std::exception.
+HBA_WWN wwnOf(const std::string& text);
+
+} // namespace cimple

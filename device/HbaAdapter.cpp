@@ -1,0 +1,21 @@
+#include "device/HbaAdapter.h"
+
+#include "foundation/Log.h"
+
+#include <exception>
+
+namespace cimple
+{
+
+HbaAdapter::HbaAdapter(const std::string& name)
+    // The API takes char* and only reads.
+    : _handle(HBA_OpenAdapter(const_cast<char*>(name.c_str())))
+{
+    if (_handle == 0)
+    {
+        TVR_LOG(TVR_ERR, "HBA_OpenAdapter failed, skipping Adapter %s", name.c_str());
+        throw std::exception();
+    }
+}
+
+} // namespace cimple

@@ -1,0 +1,105 @@
+// The one class through which the rest of the program uses the RM library.
+#pragma once
+
+#include "device/RmApi.h"
+#include "device/ScsiCommand.h"
+
+#include <atomic>
+#include <semaphore.h>
+#include <string>
+#include <sys/types.h>
+#include <vector>
+
+namespace cimple
+{
+
+/// A logical unit of a target, as the unit's Inquiry describes it.
+struct TargetLun
+{
+    RM_Lun lun;
+    StandardInquiry inquiry;
+};
+
+struct VPortLunAttributes
+{
+    StandardInquiry inquiry;
+    ReadCapacity capacity;
+};
+
+/// The agent owns one object of it, whose life spans the use of the RM library; the functions are static. They
+/// report failures by their result and never throw. A plain name is 16 hexadecimal digits, as in a DeviceID.
+///
+/// The functions that take a plain name return 1 if it is none, and otherwise the library's status. A null output
+/// is a failure of 1. An output is changed on success only.
+class TVR_MethodWrapper
+{
+public:
+    /// Initialises the RM library once in the process; a second object waits until that is done. Throws
+    /// std::exception if the library refuses.
+    TVR_MethodWrapper();
+    ~TVR_MethodWrapper();
+    TVR_MethodWrapper(const TVR_MethodWrapper&) = delete;
+    TVR_MethodWrapper& operator=(const TVR_MethodWrapper&) = delete;
+
+    // Names.
+
+    static constexpr std::size_t hbaNameLength = 23;
+
+    /// From a plain name, with or without an opening quote, to pairs with colons between. `out` has room for 24
+    /// bytes; a shorter input ends in zeros. The characters are not checked. 0 or 1.
+    static int Id2HBAName(char* out, const char* deviceId);
+    /// From pairs of digits with a colon or a blank between. 0 or 1.
+    static int str2HBAName(HBA_WWN* out, const char* text);
+    /// From a plain name. True on success.
+    static bool string2HBAName(HBA_WWN* out, const std::string& text);
+    /// Both steps from a plain name, with the log line of the one that failed. 0 or 1.
+    static int idToWwn(HBA_WWN* out, const char* deviceId);
+    /// Pairs of upper-case digits with colons between.
+    static std::string hbaNameToString(const HBA_WWN& wwn);
+
+    // Status and checks.
+
+    static void logStatus(const RM_STATUS& status);
+    /// 0 if the port is one of this host, else 1. Precedes every command that changes an adapter.
+    static int Validatewwpn(const HBA_WWN& wwpn);
+    static bool IsKestorCNA(const HBA_WWN& wwpn);
+
+    // Queries.
+
+    static RM_STATUS GetMILILibVersion(std::string* version);
+    static RM_STATUS GetLibraryVersion(std::string* version);
+    static RM_STATUS SetMILITraceLevel(std::uint32_t level);
+    static RM_STATUS GetHBAFeatureList(const HBA_WWN& wwpn, std::vector<RM_Feature>* features);
+    static RM_STATUS GetQosInfo(const HBA_WWN& wwpn, RM_QosInfo* info);
+    /// Name of the host's operating system: at most 40 characters and a zero byte. 8 if there is no memory.
+    static RM_STATUS getTargetOS_info(const char* deviceId, char* out);
+    /// Logical units of a target behind a port.
+    static RM_STATUS tvrcimGetTargetMapping(const char* deviceId, const char* targetId, std::vector<TargetLun>* luns);
+
+    // Virtual ports.
+
+    static RM_STATUS ListVPorts(const char* deviceId, std::vector<RM_VPortEntry>* vports);
+    static RM_STATUS ListVPortAttributes(const char* deviceId, const char* vportId, RM_VPortAttributes* attributes);
+    static RM_STATUS ListVPortTargets(const char* deviceId, const char* vportId, std::vector<RM_VPortTarget>* targets);
+    /// LUN fields as RM_VpScsiInquiry takes them.
+    static RM_STATUS ListVPortLuns(const char* deviceId, const char* vportId, const char* targetId,
+                                   std::vector<HBA_UINT64>* luns);
+    static RM_STATUS VPortLunAttr(const char* deviceId, const char* vportId, const char* targetId, HBA_UINT64 lun,
+                                  VPortLunAttributes* attributes);
+    static RM_STATUS ListVMfromVPort(const char* deviceId, const char* vportId, RM_VirtualMachine* machine);
+
+    /// 1 once an object of this process has run the library's initialisation.
+    static std::atomic<int> initOwner;
+
+private:
+    void initialiseLibrary();
+    void closeSemaphores();
+
+    const pid_t pid;
+    const std::string initSemName;
+    const std::string doneSemName;
+    sem_t* initSem = nullptr;
+    sem_t* doneSem = nullptr; ///< a mark that this object ran the initialisation; nothing waits on it
+};
+
+} // namespace cimple
