@@ -231,7 +231,7 @@ inline constexpr auto entryPoints = std::to_array<EntryPoint>({
 consteval std::size_t entryRow(std::string_view name)
 {
     for (std::size_t row = 0; row < entryPoints.size(); ++row)
-        if (entryPoints[row].name == name)
+        if (name.compare(entryPoints[row].name) == 0)
             return row;
     throw "no such entry point";
 }

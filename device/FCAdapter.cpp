@@ -96,15 +96,15 @@ constexpr AttributeRow attributeRows[] = {
 
 void copyFields(Attributes& to, const HBA_ADAPTERATTRIBUTES& from)
 {
-    to.manufacturer = fieldText(from.Manufacturer);
-    to.serialNumber = fieldText(from.SerialNumber);
-    to.model = fieldText(from.Model);
-    to.modelDescription = fieldText(from.ModelDescription);
-    to.nodeSymbolicName = fieldText(from.NodeSymbolicName);
-    to.hardwareVersion = fieldText(from.HardwareVersion);
-    to.driverVersion = fieldText(from.DriverVersion);
-    to.firmwareVersion = fieldText(from.FirmwareVersion);
-    to.driverName = fieldText(from.DriverName);
+    to.manufacturer = foreignText(from.Manufacturer);
+    to.serialNumber = foreignText(from.SerialNumber);
+    to.model = foreignText(from.Model);
+    to.modelDescription = foreignText(from.ModelDescription);
+    to.nodeSymbolicName = foreignText(from.NodeSymbolicName);
+    to.hardwareVersion = foreignText(from.HardwareVersion);
+    to.driverVersion = foreignText(from.DriverVersion);
+    to.firmwareVersion = foreignText(from.FirmwareVersion);
+    to.driverName = foreignText(from.DriverName);
     to.nodeWWN = wwnText(from.NodeWWN);
     to.vendorSpecificID = from.VendorSpecificID;
     to.numberOfPorts = from.NumberOfPorts;

@@ -90,8 +90,8 @@ void FCPortAttributes::copyFields(const HBA_PORTATTRIBUTES& record)
     supportedClassOfService = record.PortSupportedClassofService;
     supportedFc4Types = bytesOf(record.PortSupportedFc4Types.bits);
     activeFc4Types = bytesOf(record.PortActiveFc4Types.bits);
-    symbolicName = fieldText(record.PortSymbolicName);
-    osDeviceName = fieldText(record.OSDeviceName);
+    symbolicName = foreignText(record.PortSymbolicName);
+    osDeviceName = foreignText(record.OSDeviceName);
     supportedSpeed = record.PortSupportedSpeed;
     speed = record.PortSpeed;
     maxFrameSize = record.PortMaxFrameSize;

@@ -10,13 +10,13 @@ namespace cimple
 {
 
 /// A library need not end a full field with a zero byte.
-template <std::size_t Size> std::string fieldText(const char (&field)[Size])
+template <std::size_t Size> std::string foreignText(const char (&field)[Size])
 {
     return std::string(field, strnlen(field, Size));
 }
 
 /// At most `size` bytes at `bytes`, up to the first zero byte.
-inline std::string fieldText(const std::uint8_t* bytes, std::size_t size)
+inline std::string foreignText(const std::uint8_t* bytes, std::size_t size)
 {
     const auto* text = reinterpret_cast<const char*>(bytes);
     return std::string(text, strnlen(text, size));

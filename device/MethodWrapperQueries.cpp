@@ -87,7 +87,7 @@ template <class Function> RM_STATUS readVersion(std::string& version, const Func
     char text[versionSize] = {};
     const RM_STATUS status = function(text, versionSize);
     if (status == RM_OK)
-        version = fieldText(text);
+        version = foreignText(text);
     return status;
 }
 

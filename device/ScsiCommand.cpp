@@ -22,9 +22,9 @@ StandardInquiry decodeInquiry(const std::array<std::uint8_t, inquirySize>& respo
 {
     const std::uint8_t* bytes = response.data();
     return {.deviceType = bytes[0] & 0x1Fu,
-            .vendor = fieldText(bytes + 8, 8),
-            .product = fieldText(bytes + 16, 16),
-            .revision = fieldText(bytes + 32, 4)};
+            .vendor = foreignText(bytes + 8, 8),
+            .product = foreignText(bytes + 16, 16),
+            .revision = foreignText(bytes + 32, 4)};
 }
 
 ReadCapacity decodeCapacity(const std::array<std::uint8_t, capacitySize>& response)

@@ -65,7 +65,7 @@ void Target::copyFields(const HBA_FCPSCSIENTRY& entry)
     nodeWWN = wwnText(entry.FcpId.NodeWWN);
     portWWN = wwnText(entry.FcpId.PortWWN);
     fcpLun = static_cast<std::uint64_t>(entry.FcpId.FcpLun);
-    osDeviceName = fieldText(entry.ScsiId.OSDeviceName);
+    osDeviceName = foreignText(entry.ScsiId.OSDeviceName);
     scsiBusNumber = entry.ScsiId.ScsiBusNumber;
     scsiTargetNumber = entry.ScsiId.ScsiTargetNumber;
     scsiOSLun = entry.ScsiId.ScsiOSLun;
@@ -89,7 +89,7 @@ void Target::readSerialNumber(const HbaAdapter& adapter, const HBA_FCPID& unit)
 {
     TVR_LOG(TVR_DBG, "SCSI Inquiry with 1, 0x80");
     const auto answer = sendInquiry(adapter, unit, 1, serialNumberPage);
-    serialNumber = succeeded(answer) ? fieldText(answer.response.data() + 4, inquirySize - 4) : "Unknown";
+    serialNumber = succeeded(answer) ? foreignText(answer.response.data() + 4, inquirySize - 4) : "Unknown";
 }
 
 void Target::readDesignator(const HbaAdapter& adapter, const HBA_FCPID& unit)
