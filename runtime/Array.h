@@ -1,12 +1,16 @@
 // Untyped array core with a thin typed front. Arrays are deep-copied when assigned; they are not shared.
 #pragma once
 
+#include "runtime/Datetime.h"
 #include "runtime/Meta.h"
+#include "runtime/String.h"
 
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
-#include <new>
-#include <utility>
+#include <initializer_list>
+#include <memory>
+#include <type_traits>
 
 namespace cimple
 {
@@ -20,8 +24,9 @@ struct Array_Traits
     bool (*equal)(const void* a, const void* b);
 };
 
-/// A single pointer to `traits`, `size`, `cap` and the elements. A fresh array has room for 8 elements.
-/// A reservation above `cap` reallocates to exactly the requested count, not to a doubled one.
+/// A single pointer to `traits`, `size`, `cap` and the elements. A fresh array has room for 8 elements; that of
+/// a CIM type takes the memory with the first element. A reservation above `cap` reallocates to exactly the
+/// requested count, not to a doubled one. Positions and counts outside the array are asserted.
 class Array_Base
 {
 public:
@@ -30,6 +35,7 @@ public:
     Array_Base(Array_Base&& other) noexcept; // leaves `other` without a representation: destroy or assign only
     ~Array_Base();
     Array_Base& operator=(const Array_Base& other);
+    Array_Base& operator=(Array_Base&& other) noexcept;
 
     const Array_Traits* traits() const;
     std::size_t size() const;
@@ -58,6 +64,12 @@ public:
     struct Rep;
 
 private:
+    bool owns_memory() const;
+    bool holds(const void* element) const;
+    void take_memory(std::size_t capacity);
+    void ensure(std::size_t capacity);
+    void destruct(std::size_t pos, std::size_t count);
+
     Rep* _rep;
 };
 
@@ -67,8 +79,69 @@ class Instance;
 const Array_Traits* array_traits(std::uint32_t type);
 const Array_Traits* instance_array_traits();
 
-/// Traits of T; specialised for the CIM types and Instance pointers, generic otherwise.
-template <class T> const Array_Traits* array_traits_of();
+namespace detail
+{
+
+template <class T> void construct_element(void* element, const void* from)
+{
+    std::construct_at(static_cast<T*>(element), *static_cast<const T*>(from));
+}
+
+template <class T> void destruct_element(void* element)
+{
+    std::destroy_at(static_cast<T*>(element));
+}
+
+template <class T> bool equal_elements(const void* a, const void* b)
+{
+    return *static_cast<const T*>(a) == *static_cast<const T*>(b);
+}
+
+/// Functions only where bytes are not enough.
+template <class T> constexpr Array_Traits make_array_traits()
+{
+    static_assert(alignof(T) <= alignof(std::max_align_t), "elements lie in memory of malloc");
+    Array_Traits traits{sizeof(T), nullptr, nullptr, nullptr};
+    if constexpr (!std::is_trivially_copyable_v<T>)
+    {
+        traits.construct = construct_element<T>;
+        traits.destruct = destruct_element<T>;
+        if constexpr (std::equality_comparable<T>)
+            traits.equal = equal_elements<T>;
+    }
+    return traits;
+}
+
+template <class T> inline constexpr Array_Traits generic_array_traits = make_array_traits<T>();
+
+/// Code of the CIM type that T holds (char16 is held as UINT16); -1 for other types.
+template <class T> inline constexpr int cim_type_of = -1;
+template <> inline constexpr int cim_type_of<bool> = BOOLEAN;
+template <> inline constexpr int cim_type_of<std::uint8_t> = UINT8;
+template <> inline constexpr int cim_type_of<std::int8_t> = SINT8;
+template <> inline constexpr int cim_type_of<std::uint16_t> = UINT16;
+template <> inline constexpr int cim_type_of<std::int16_t> = SINT16;
+template <> inline constexpr int cim_type_of<std::uint32_t> = UINT32;
+template <> inline constexpr int cim_type_of<std::int32_t> = SINT32;
+template <> inline constexpr int cim_type_of<std::uint64_t> = UINT64;
+template <> inline constexpr int cim_type_of<std::int64_t> = SINT64;
+template <> inline constexpr int cim_type_of<float> = REAL32;
+template <> inline constexpr int cim_type_of<double> = REAL64;
+template <> inline constexpr int cim_type_of<String> = STRING;
+template <> inline constexpr int cim_type_of<Datetime> = DATETIME;
+
+} // namespace detail
+
+/// Traits of T: those of the CIM type or of Instance pointers where T is one, generic ones otherwise.
+template <class T> const Array_Traits* array_traits_of()
+{
+    if constexpr (detail::cim_type_of<T> >= 0)
+        return array_traits(detail::cim_type_of<T>);
+    else if constexpr (std::is_same_v<T, Instance*>)
+        return instance_array_traits();
+    else
+        return &detail::generic_array_traits<T>;
+}
 
 template <class T> class Array : public Array_Base
 {
@@ -86,6 +159,13 @@ public:
     const T* end() const { return data() + size(); }
 
     void append(const T& element) { Array_Base::append(&element); }
+    /// New elements are value-initialised, or copies of `fill`.
+    void resize(std::size_t size)
+    {
+        const T fill{};
+        Array_Base::resize(size, &fill);
+    }
+    void resize(std::size_t size, const T* fill) { Array_Base::resize(size, fill); }
     void append(const T* elements, std::size_t count) { Array_Base::append(elements, count); }
     void prepend(const T& element) { Array_Base::prepend(&element); }
     void insert(std::size_t pos, const T& element) { Array_Base::insert(pos, &element, 1); }

@@ -3,6 +3,7 @@
 
 #include "runtime/String.h"
 
+#include <atomic>
 #include <cstdint>
 
 namespace cimple
@@ -36,7 +37,8 @@ public:
 
     /// Reads the 25-character CIM text. Returns false and keeps the value for anything else.
     bool parse(const char* text);
-    /// The 25-character CIM text; timestamps are printed in local time.
+    /// The 25-character CIM text; timestamps are printed in local time. Before 1970 `usec` counts below 0 in
+    /// two's complement.
     String text() const;
     /// "2026/11/21 12:00:00.000000+060" or "00000001 02 03 04.000005:000".
     String pretty() const;
@@ -44,8 +46,42 @@ public:
     struct Rep;
 
 private:
+    static Rep _zero; // shared by all fresh values; never counted, written or freed
+
+    static Rep* share(Rep* rep) noexcept;
+    static void release(Rep* rep) noexcept;
+    static void free(Rep* rep) noexcept;
+
     Rep* _rep;
 };
+
+struct Datetime::Rep
+{
+    std::atomic<std::uint32_t> refs;
+    std::uint64_t usec;
+    std::int32_t utc;
+    std::uint32_t timestamp; ///< 1 timestamp, 0 interval
+};
+
+inline Datetime::Rep* Datetime::share(Rep* rep) noexcept
+{
+    if (rep != &_zero)
+        rep->refs.fetch_add(1, std::memory_order_relaxed);
+    return rep;
+}
+
+inline void Datetime::release(Rep* rep) noexcept
+{
+    if (rep != &_zero && rep->refs.fetch_sub(1, std::memory_order_acq_rel) == 1)
+        free(rep);
+}
+
+inline Datetime::Datetime() noexcept : _rep(&_zero) {}
+inline Datetime::Datetime(const Datetime& other) noexcept : _rep(share(other._rep)) {}
+inline Datetime::~Datetime()
+{
+    release(_rep);
+}
 
 /// Equal usec, utc and kind.
 bool operator==(const Datetime& a, const Datetime& b);

@@ -31,8 +31,15 @@ enum Type : std::uint16_t
 };
 inline constexpr std::size_t num_types = 14;
 
+/// Bytes of a scalar slot by type code; a string or datetime is one handle.
+inline constexpr std::uint8_t type_widths[num_types] = {
+    1, 1, 1, 2, 2, 4, 4, 8, 8, 4, 8, 2, sizeof(void*), sizeof(void*)};
+
 /// Bytes of a scalar slot of this type, without its null byte; 0 for an unknown code.
-std::size_t type_width(std::uint32_t type);
+constexpr std::size_t type_width(std::uint32_t type)
+{
+    return type < num_types ? type_widths[type] : 0;
+}
 
 /// "boolean", "uint8", ... as in MOF; null for an unknown code.
 const char* type_name(std::uint32_t type);

@@ -1,11 +1,13 @@
 // Shared text with copy on write: the string type of every CIM slot.
 #pragma once
 
+#include <atomic>
 #include <compare>
 #include <cstddef>
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <utility>
 
 namespace cimple
 {
@@ -53,15 +55,85 @@ public:
     struct Rep;
 
 private:
+    struct Empty_Rep;
+    static Empty_Rep _empty; // shared by all empty strings; never counted, written or freed
+
+    static Rep* share(Rep* rep) noexcept;
+    static void release(Rep* rep) noexcept;
+    static void free(Rep* rep) noexcept;
+    static Rep* make(std::size_t capacity);
+    bool has_room(std::size_t capacity) const;
+    Rep* copy_of_text(std::size_t capacity) const;
+    void make_room(std::size_t capacity);
+
     Rep* _rep;
 };
+
+/// Head of a representation; the text lies directly behind it.
+struct String::Rep
+{
+    std::atomic<std::uint32_t> refs;
+    std::size_t size;
+    std::size_t cap;
+
+    char* text() { return reinterpret_cast<char*>(this + 1); }
+};
+
+struct String::Empty_Rep
+{
+    Rep rep;
+    char nul;
+};
+
+inline String::Rep* String::share(Rep* rep) noexcept
+{
+    if (rep != &_empty.rep)
+        rep->refs.fetch_add(1, std::memory_order_relaxed);
+    return rep;
+}
+
+inline void String::release(Rep* rep) noexcept
+{
+    if (rep != &_empty.rep && rep->refs.fetch_sub(1, std::memory_order_acq_rel) == 1)
+        free(rep);
+}
+
+inline String::String() noexcept : _rep(&_empty.rep) {}
+inline String::String(const String& other) noexcept : _rep(share(other._rep)) {}
+inline String::String(String&& other) noexcept : _rep(std::exchange(other._rep, &_empty.rep)) {}
+inline String::~String()
+{
+    release(_rep);
+}
+
+inline const char* String::c_str() const
+{
+    return _rep->text();
+}
+inline std::size_t String::size() const
+{
+    return _rep->size;
+}
+inline bool String::empty() const
+{
+    return _rep->size == 0;
+}
+inline std::string_view String::view() const
+{
+    return {_rep->text(), _rep->size};
+}
+inline bool String::shares(const String& other) const
+{
+    return _rep == other._rep;
+}
 
 /// Exact, byte for byte, with length.
 bool operator==(const String& a, const String& b);
 bool operator==(const String& a, const char* b);
 std::strong_ordering operator<=>(const String& a, const String& b);
 
-/// Case-insensitive compare.
+/// Case-insensitive compare; a null text reads as empty.
 bool eqi(const String& a, const String& b);
+bool eqi(const String& a, const char* b);
 
 } // namespace cimple

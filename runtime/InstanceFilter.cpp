@@ -1,0 +1,168 @@
+// Which features of an instance are null, and copying by that.
+#include "runtime/Instance.h"
+#include "runtime/InstanceSlots.h"
+
+#include <cstring>
+#include <utility>
+
+namespace cimple
+{
+namespace
+{
+
+void copy_scalar(Instance* dest, const Instance* src, const Meta_Property* mp)
+{
+    if (mp->type == STRING)
+        slot<String>(dest, mp->offset) = slot<String>(src, mp->offset);
+    else if (mp->type == DATETIME)
+        slot<Datetime>(dest, mp->offset) = slot<Datetime>(src, mp->offset);
+    else
+        std::memcpy(&slot<char>(dest, mp->offset), &slot<char>(src, mp->offset), type_width(mp->type));
+    null_byte(dest, mp) = null_byte(src, mp);
+}
+
+void copy_references(Instance* dest, const Instance* src, const Meta_Reference* mr)
+{
+    auto& into = slot<Array<Instance*>>(dest, mr->offset);
+    Array<Instance*> former;
+    former.swap(into);
+    for (const Instance* element : references_in(src, mr))
+        into.append(clone(element));
+    for (const Instance* element : former)
+        unref(element);
+    null_byte(dest, mr) = null_byte(src, mr);
+}
+
+void copy_feature(Instance* dest, const Instance* src, const Meta_Feature* mf)
+{
+    switch (slot_kind(mf))
+    {
+    case Slot_Kind::scalar:
+        copy_scalar(dest, src, static_cast<const Meta_Property*>(mf));
+        break;
+    case Slot_Kind::array:
+    {
+        const auto* mp = static_cast<const Meta_Property*>(mf);
+        array_slot(dest, mp->offset) = array_slot(src, mp->offset);
+        null_byte(dest, mp) = null_byte(src, mp);
+        break;
+    }
+    case Slot_Kind::reference:
+    {
+        const auto* mr = static_cast<const Meta_Reference*>(mf);
+        unref(std::exchange(reference_slot(dest, mr), clone(reference_slot(src, mr))));
+        break;
+    }
+    case Slot_Kind::reference_array:
+        copy_references(dest, src, static_cast<const Meta_Reference*>(mf));
+        break;
+    case Slot_Kind::none:
+        break;
+    }
+}
+
+bool is_null(const Instance* instance, const Meta_Feature* mf)
+{
+    switch (slot_kind(mf))
+    {
+    case Slot_Kind::scalar:
+    case Slot_Kind::array:
+        return null_byte(instance, static_cast<const Meta_Property*>(mf)) != 0;
+    case Slot_Kind::reference:
+        return reference_slot(instance, static_cast<const Meta_Reference*>(mf)) == nullptr;
+    case Slot_Kind::reference_array:
+        return null_byte(instance, static_cast<const Meta_Reference*>(mf)) != 0;
+    case Slot_Kind::none:
+        return true;
+    }
+    return true;
+}
+
+/// Gives a null single reference an empty instance of its class.
+void fill_reference(Instance* instance, const Meta_Reference* mr)
+{
+    Instance*& referent = reference_slot(instance, mr);
+    if (!referent)
+        referent = create(mr->meta_class, false);
+}
+
+/// Makes a feature readable again. False for a method.
+bool make_non_null(Instance* instance, const Meta_Feature* mf)
+{
+    switch (slot_kind(mf))
+    {
+    case Slot_Kind::scalar:
+    case Slot_Kind::array:
+        null_byte(instance, static_cast<const Meta_Property*>(mf)) = 0;
+        return true;
+    case Slot_Kind::reference:
+        fill_reference(instance, static_cast<const Meta_Reference*>(mf));
+        return true;
+    case Slot_Kind::reference_array:
+        null_byte(instance, static_cast<const Meta_Reference*>(mf)) = 0;
+        return true;
+    case Slot_Kind::none:
+        return false;
+    }
+    return false;
+}
+
+} // namespace
+
+void nullify(Instance* instance, bool keys, bool non_keys, std::uint8_t value)
+{
+    for (const Meta_Feature* mf : features_of(instance))
+    {
+        if ((mf->flags & META_PROPERTY) && (mf->flags & META_KEY ? keys : non_keys))
+            null_byte(instance, static_cast<const Meta_Property*>(mf)) = value;
+    }
+}
+
+bool keys_non_null(const Instance* instance)
+{
+    for (const Meta_Feature* mf : features_of(instance))
+    {
+        if ((mf->flags & META_KEY) && slot_kind(mf) != Slot_Kind::reference_array && is_null(instance, mf))
+            return false;
+    }
+    return true;
+}
+
+int filter_properties(Instance* instance, const char* const* names, bool keep_keys)
+{
+    if (!names)
+    {
+        nullify(instance, true, true, 0);
+        return 0;
+    }
+    nullify(instance, !keep_keys, true, 1);
+    for (; *names; ++names)
+    {
+        const Meta_Feature* mf = find_feature(instance->__meta_class, *names, any_feature);
+        if (mf && !(mf->flags & META_KEY) && !make_non_null(instance, mf))
+            return -1;
+    }
+    return 0;
+}
+
+void copy(Instance* dest, const Instance* src, const Instance* model, bool keys_only)
+{
+    if (dest == src || dest->__meta_class != src->__meta_class || (model && model->__meta_class != dest->__meta_class))
+        return;
+    for (const Meta_Feature* mf : features_of(dest))
+    {
+        if ((!keys_only || (mf->flags & META_KEY)) && (!model || !is_null(model, mf)))
+            copy_feature(dest, src, mf);
+    }
+}
+
+void create_ref_children(Instance* instance)
+{
+    for (const Meta_Feature* mf : features_of(instance))
+    {
+        if (slot_kind(mf) == Slot_Kind::reference)
+            fill_reference(instance, static_cast<const Meta_Reference*>(mf));
+    }
+}
+
+} // namespace cimple

@@ -1,0 +1,121 @@
+// Following references: the depth-first walk, and the ends of associations.
+#include "runtime/Instance.h"
+#include "runtime/InstanceSlots.h"
+
+namespace cimple
+{
+namespace
+{
+
+struct Name_Space_Setter
+{
+    const char* name_space;
+    bool force;
+};
+
+void set_one_name_space(Instance* instance, void* client)
+{
+    const auto* setter = static_cast<const Name_Space_Setter*>(client);
+    if (setter->force || instance->__name_space.empty())
+        instance->__name_space = setter->name_space;
+}
+
+bool is_given(const char* filter)
+{
+    return filter && *filter;
+}
+
+bool fits_role(const Meta_Reference* mr, const char* role)
+{
+    return !is_given(role) || eqi(mr->name, role);
+}
+
+bool fits_class(const Instance* instance, const char* class_name)
+{
+    return !is_given(class_name) || is_or_derives_from(instance->__meta_class, class_name);
+}
+
+/// True if the reference may hold `instance` and holds one with its keys.
+bool points_at(const Meta_Reference* mr, const Instance* referent, const Instance* instance)
+{
+    return referent && is_subclass(mr->meta_class, instance->__meta_class) && key_eq(instance, referent);
+}
+
+/// The single reference that a feature is; null for all others.
+const Meta_Reference* single_reference(const Meta_Feature* mf)
+{
+    return slot_kind(mf) == Slot_Kind::reference ? static_cast<const Meta_Reference*>(mf) : nullptr;
+}
+
+} // namespace
+
+void visit(Instance* instance, void (*proc)(Instance*, void* client), void* client)
+{
+    proc(instance, client);
+    for (const Meta_Feature* mf : features_of(instance))
+    {
+        const Slot_Kind kind = slot_kind(mf);
+        if (kind == Slot_Kind::reference)
+        {
+            if (Instance* referent = reference_slot(instance, static_cast<const Meta_Reference*>(mf)))
+                visit(referent, proc, client);
+        }
+        else if (kind == Slot_Kind::reference_array)
+        {
+            for (Instance* referent : references_in(instance, static_cast<const Meta_Reference*>(mf)))
+            {
+                if (referent)
+                    visit(referent, proc, client);
+            }
+        }
+    }
+}
+
+void set_name_space(Instance* instance, const char* name_space, bool force)
+{
+    Name_Space_Setter setter{name_space, force};
+    visit(instance, set_one_name_space, &setter);
+}
+
+bool references_match(const Instance* instance, const Instance* assoc, const char* role)
+{
+    for (const Meta_Feature* mf : features_of(assoc))
+    {
+        const Meta_Reference* mr = single_reference(mf);
+        if (mr && fits_role(mr, role) && points_at(mr, reference_slot(assoc, mr), instance))
+            return true;
+    }
+    return false;
+}
+
+std::ptrdiff_t get_associators(const Instance* instance, const Instance* assoc, const char* assoc_class,
+                               const char* result_class, const char* role, const char* result_role,
+                               const Instance** out, std::size_t room)
+{
+    const bool fits_association = fits_class(assoc, assoc_class);
+    bool relevant = false;
+    std::size_t count = 0;
+    for (const Meta_Feature* mf : features_of(assoc))
+    {
+        const Meta_Reference* mr = single_reference(mf);
+        if (!mr)
+            continue;
+        const Instance* referent = reference_slot(assoc, mr);
+        if (fits_role(mr, role) && points_at(mr, referent, instance))
+        {
+            relevant = true;
+            continue;
+        }
+        const bool wanted = referent && (fits_association || fits_class(referent, assoc_class)) &&
+                            fits_class(referent, result_class) && fits_role(mr, result_role);
+        if (wanted && count < room)
+            out[count++] = referent;
+    }
+    if (!relevant)
+        return -1;
+    for (std::size_t i = 0; i < count; ++i)
+        ref(out[i]);
+    return static_cast<std::ptrdiff_t>(count);
+}
+
+} // namespace cimple
