@@ -1,13 +1,25 @@
 #include "foundation/HbaAttributes.h"
 
 #include "foundation/CommonHelpers.h"
-#include "foundation/Text.h"
 
 #include <algorithm>
 #include <cstdio>
+#include <cstring>
 
 namespace cimple
 {
+
+namespace
+{
+
+template <std::size_t N> void copyField(char (&out)[N], const char (&in)[N])
+{
+    const std::size_t size = strnlen(in, N - 1);
+    std::memcpy(out, in, size);
+    out[size] = '\0';
+}
+
+} // namespace
 
 void copyAdapterAttributes(HBA_ADAPTERATTRIBUTES& out, const HBA_ADAPTERATTRIBUTES& in)
 {
@@ -50,24 +62,24 @@ void formatNodeAttributes(const HBA_ADAPTERATTRIBUTES* attributes, std::span<cha
     out[0] = '\0';
     if (!attributes)
         return;
+    HBA_ADAPTERATTRIBUTES ended;
+    copyAdapterAttributes(ended, *attributes);
+    char nodeWWN[17];
+    wwnToUpperHex(ended.NodeWWN.wwn, nodeWWN);
     const struct
     {
         const char* label;
-        String value;
+        const char* value;
     } lines[] = {
-        {"Manufacturer: ", fieldText(attributes->Manufacturer)},
-        {"NodeWWN: ", wwnToUpperHex(attributes->NodeWWN.wwn)},
-        {"ModelDescription: ", fieldText(attributes->ModelDescription)},
-        {"NodeSymbolicName: ", fieldText(attributes->NodeSymbolicName)},
-        {"HardwareVersion: ", fieldText(attributes->HardwareVersion)},
-        {"DriverVersion: ", fieldText(attributes->DriverVersion)},
-        {"FirmwareVersion: ", fieldText(attributes->FirmwareVersion)},
-        {"DriverName: ", fieldText(attributes->DriverName)},
+        {"Manufacturer: ", ended.Manufacturer},         {"NodeWWN: ", nodeWWN},
+        {"ModelDescription: ", ended.ModelDescription}, {"NodeSymbolicName: ", ended.NodeSymbolicName},
+        {"HardwareVersion: ", ended.HardwareVersion},   {"DriverVersion: ", ended.DriverVersion},
+        {"FirmwareVersion: ", ended.FirmwareVersion},   {"DriverName: ", ended.DriverName},
     };
     std::size_t used = 0;
     for (const auto& line : lines)
     {
-        const int size = std::snprintf(&out[used], out.size() - used, "%s%s\n", line.label, line.value.c_str());
+        const int size = std::snprintf(&out[used], out.size() - used, "%s%s\n", line.label, line.value);
         used = std::min(used + static_cast<std::size_t>(size), out.size() - 1);
     }
 }
