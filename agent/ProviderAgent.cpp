@@ -2,9 +2,10 @@
 
 #include "agent/ModelStages.h"
 #include "agent/SignalTrace.h"
+#include "device/Bindings.h"
 #include "device/Loader.h"
-#include "foundation/CommonHelpers.h"
 #include "foundation/FilePaths.h"
+#include "foundation/HostInformation.h"
 #include "foundation/Log.h"
 
 #include <csignal>
@@ -133,7 +134,7 @@ void ProviderAgent::finish()
         TVR_LOG(TVR_DBG, "Entering dtor ~ProviderAgent()");
         joinThreads();
         deleteData();
-        freeHbaLibrary();
+        HBA_FreeLibrary();
         ClearMaps();
         if (!TVR_Logger::instance().isFfdcMode())
             m_fileLogger.stop();

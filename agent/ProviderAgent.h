@@ -116,7 +116,6 @@ private:
     ~ProviderAgent();
 
     void start();
-    void startLogging();
     void readSettings();
     /// Stops the threads and gives back all that is not memory, once; the agent stays and answers empty.
     void finish();
