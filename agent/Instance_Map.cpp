@@ -1,5 +1,7 @@
 #include "agent/Instance_Map.h"
 
+#include "runtime/InstanceSlots.h"
+
 #include <algorithm>
 #include <cstring>
 
@@ -30,36 +32,30 @@ std::uint64_t hashBytes(std::uint64_t hash, const void* data, std::size_t size)
     return mix(hash, tail ^ (static_cast<std::uint64_t>(size) << 56));
 }
 
-const char* slotOf(const Instance* instance, std::uint32_t offset)
-{
-    return reinterpret_cast<const char*>(instance) + offset;
-}
-
 std::vector<const Meta_Feature*> keysOf(const Meta_Class* mc)
 {
     std::vector<const Meta_Feature*> keys;
-    for (std::size_t i = 0; i < mc->num_meta_features; i++)
-        if (mc->meta_features[i]->flags & META_KEY)
-            keys.push_back(mc->meta_features[i]);
+    for (const Meta_Feature* feature : features_of(mc))
+        if (feature->flags & META_KEY)
+            keys.push_back(feature);
     return keys;
 }
 
-/// Adds a scalar property to the hash. Reals add nothing: their equality is not that of their bytes.
+/// Adds a property to the hash. Reals add nothing: their equality is not that of their bytes.
 std::uint64_t hashProperty(std::uint64_t hash, const Instance* instance, const Meta_Property* property)
 {
-    const char* slot = slotOf(instance, property->offset);
     if (property->subscript != 0 || property->type == REAL32 || property->type == REAL64)
         return hash;
-    if (slot[type_width(property->type)])
+    if (null_byte(instance, property))
         return mix(hash, 1);
     if (property->type == STRING)
     {
-        const auto& text = *reinterpret_cast<const String*>(slot);
+        const auto& text = slot<String>(instance, property->offset);
         return hashBytes(hash, text.c_str(), text.size());
     }
     if (property->type == DATETIME)
-        return mix(hash, reinterpret_cast<const Datetime*>(slot)->usec());
-    return hashBytes(hash, slot, type_width(property->type));
+        return mix(hash, slot<Datetime>(instance, property->offset).usec());
+    return hashBytes(hash, &slot<char>(instance, property->offset), type_width(property->type));
 }
 
 /// Adds the keys of `as`, which is the instance's class or one of its superclasses.
@@ -72,10 +68,10 @@ bool hashKey(std::uint64_t& hash, const Instance* instance, const Meta_Feature* 
         hash = hashProperty(hash, instance, property);
         return true;
     }
-    const Meta_Reference* reference = as_reference(key);
-    if (!reference || reference->subscript != 0)
-        return true; // arrays take no part in key equality
-    const auto* end = *reinterpret_cast<const Instance* const*>(slotOf(instance, reference->offset));
+    if (slot_kind(key) != Slot_Kind::reference)
+        return true; // arrays of references take no part in key equality
+    const auto* reference = static_cast<const Meta_Reference*>(key);
+    const Instance* end = reference_slot(instance, reference);
     if (!end)
     {
         hash = mix(hash, 2);
@@ -87,12 +83,9 @@ bool hashKey(std::uint64_t& hash, const Instance* instance, const Meta_Feature* 
 
 bool hashKeys(std::uint64_t& hash, const Instance* instance, const Meta_Class* as)
 {
-    for (std::size_t i = 0; i < as->num_meta_features; i++)
-    {
-        const Meta_Feature* feature = as->meta_features[i];
+    for (const Meta_Feature* feature : features_of(as))
         if ((feature->flags & META_KEY) && !hashKey(hash, instance, feature))
             return false;
-    }
     return true;
 }
 
