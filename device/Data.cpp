@@ -31,8 +31,7 @@ bool isOtherFunction(std::uint32_t type)
 /// Network functions of converged cards, which the API lists beside the others.
 bool isNetworkName(std::string_view name)
 {
-    const std::string_view prefix = name.substr(0, 8);
-    return prefix == "Tavrin-O" || prefix == "Tavrin-N";
+    return name.starts_with("Tavrin-O") || name.starts_with("Tavrin-N");
 }
 
 } // namespace

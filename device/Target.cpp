@@ -97,7 +97,7 @@ void Target::readDesignator(const HbaAdapter& adapter, const HBA_FCPID& unit)
     TVR_LOG(TVR_DBG, "SCSI Inquiry with 1, 0x83");
     const auto answer = sendInquiry(adapter, unit, 1, identificationPage);
     if (succeeded(answer))
-        designatorToRecord(&designator, answer.response.data());
+        designatorToRecord(&designator, answer.response);
     else if (answer.status == RM_ERROR_CHECK_CONDITION)
         for (std::size_t i = 0; i < loggedSense; ++i)
             TVR_LOG(TVR_DBG, "%02x ", answer.sense[i]);
