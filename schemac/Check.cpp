@@ -3,7 +3,6 @@
 #include "schemac/Types.h"
 
 #include <algorithm>
-#include <array>
 
 namespace schemac
 {
@@ -11,113 +10,22 @@ namespace schemac
 namespace
 {
 
-/// Names that cannot be members of a record type: words of C++, and names that the records themselves use.
-constexpr std::string_view reserved_names[] = {"alignas",
-                                               "alignof",
-                                               "and",
-                                               "and_eq",
-                                               "asm",
-                                               "auto",
-                                               "bitand",
-                                               "bitor",
-                                               "bool",
-                                               "break",
-                                               "case",
-                                               "catch",
-                                               "char",
-                                               "char16_t",
-                                               "char32_t",
-                                               "char8_t",
-                                               "class",
-                                               "co_await",
-                                               "co_return",
-                                               "co_yield",
-                                               "compl",
-                                               "concept",
-                                               "const",
-                                               "const_cast",
-                                               "consteval",
-                                               "constexpr",
-                                               "constinit",
-                                               "continue",
-                                               "decltype",
-                                               "default",
-                                               "delete",
-                                               "do",
-                                               "double",
-                                               "dynamic_cast",
-                                               "else",
-                                               "enum",
-                                               "explicit",
-                                               "export",
-                                               "extern",
-                                               "false",
-                                               "float",
-                                               "for",
-                                               "friend",
-                                               "goto",
-                                               "if",
-                                               "inline",
-                                               "int",
-                                               "long",
-                                               "mutable",
-                                               "namespace",
-                                               "new",
-                                               "noexcept",
-                                               "not",
-                                               "not_eq",
-                                               "nullptr",
-                                               "operator",
-                                               "or",
-                                               "or_eq",
-                                               "private",
-                                               "protected",
-                                               "public",
-                                               "register",
-                                               "reinterpret_cast",
-                                               "requires",
-                                               "return",
-                                               "short",
-                                               "signed",
-                                               "sizeof",
-                                               "static",
-                                               "static_assert",
-                                               "static_cast",
-                                               "struct",
-                                               "switch",
-                                               "template",
-                                               "this",
-                                               "thread_local",
-                                               "throw",
-                                               "true",
-                                               "try",
-                                               "typedef",
-                                               "typeid",
-                                               "typename",
-                                               "union",
-                                               "unsigned",
-                                               "using",
-                                               "virtual",
-                                               "void",
-                                               "volatile",
-                                               "wchar_t",
-                                               "while",
-                                               "xor",
-                                               "xor_eq",
-                                               "Array",
-                                               "Datetime",
-                                               "Instance",
-                                               "Property",
-                                               "String",
-                                               "magic",
-                                               "std",
-                                               "static_meta_class",
-                                               "static_meta_method"};
+/// Names that cannot be members of a record type, each between blanks: words of C++, and names that the records
+/// themselves use.
+constexpr std::string_view reserved_names =
+    " alignas alignof and and_eq asm auto bitand bitor bool break case catch char char16_t char32_t char8_t class "
+    "co_await co_return co_yield compl concept const const_cast consteval constexpr constinit continue decltype "
+    "default "
+    "delete do double dynamic_cast else enum explicit export extern false float for friend goto if inline int long "
+    "mutable namespace new noexcept not not_eq nullptr operator or or_eq private protected public register "
+    "reinterpret_cast requires return short signed sizeof static static_assert static_cast struct switch template this "
+    "thread_local throw true try typedef typeid typename union unsigned using virtual void volatile wchar_t while xor "
+    "xor_eq Array Datetime Instance Meta_Class Meta_Method Property String magic std static_meta_class "
+    "static_meta_method ";
 
 bool is_reserved(const std::string& name)
 {
-    return name.starts_with("__") ||
-           std::find(std::begin(reserved_names), std::end(reserved_names), name) != std::end(reserved_names);
+    return name.starts_with("__") || reserved_names.find(" " + name + " ") != std::string_view::npos;
 }
 
 std::string in_quotes(const std::string& name)
@@ -228,11 +136,11 @@ private:
         }
         else if (*overridden != feature.name || base.name != feature.name)
         {
-            refuse(feature.place, what + " overrides another name: " + in_quotes(base.name));
+            refuse(feature.place, what + " must override " + in_quotes(base.name) + ", in this spelling");
         }
         if (feature.kind != base.kind || feature.embedded != base.embedded)
         {
-            refuse(feature.place, what + " overrides a " + kind_name(base) + " with a " + kind_name(feature));
+            refuse(feature.place, what + " changes its kind from " + kind_name(base) + " to " + kind_name(feature));
         }
         else if (!same_name(feature.type, base.type) || feature.subscript != base.subscript)
         {
@@ -319,11 +227,10 @@ private:
     /// A subclass keeps the keys of its superclass: more of them would change what identifies an instance.
     void check_new_keys(const Class& c)
     {
-        if (!c.superclass || c.superclass->num_keys == 0 || c.superclass->num_keys == c.num_keys)
+        if (c.superclass && c.superclass->num_keys > 0 && c.num_keys > c.superclass->num_keys)
         {
-            return;
+            refuse(c.place, "class " + in_quotes(c.name) + " adds keys to those of its superclass");
         }
-        refuse(c.place, "class " + in_quotes(c.name) + " adds keys to those of its superclass");
     }
 
     // --- features ---
@@ -392,7 +299,7 @@ private:
         {
             refuse(feature.place, what + " is not declared as a string");
         }
-        if (feature.embedded != Embedded::Object && !_schema.find_class(feature.class_name))
+        if (feature.embedded != Embedded::Object && !is_known(feature.class_name))
         {
             refuse(feature.place, what + " is of the unknown class " + in_quotes(feature.class_name));
         }
@@ -400,6 +307,13 @@ private:
         {
             refuse(feature.place, what + " has a default");
         }
+    }
+
+    /// The generated code uses the name as it is written.
+    bool is_known(const std::string& class_name) const
+    {
+        const Class* c = _schema.find_class(class_name);
+        return c && c->name == class_name;
     }
 
     void check_association_end(const Class& c, const Feature& feature)

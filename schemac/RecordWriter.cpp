@@ -40,29 +40,34 @@ void collect_targets(const std::vector<Feature>& features, std::set<std::string>
     }
 }
 
+std::string record(const std::string& name, const std::string& base, const std::string& slots, const std::string& meta)
+{
+    return "class " + name + " : public " + base + "\n{\npublic:\n" + slots + (slots.empty() ? "" : "\n") +
+           "    static const " + meta + ";\n};\n";
+}
+
 std::string class_record(const Class& c)
 {
-    std::string text =
-        "class " + c.name + " : public " + (c.superclass ? c.superclass->name : "Instance") + "\n{\npublic:\n";
+    std::string slots;
     for (const Feature& feature : c.features)
     {
         if (feature.kind != FeatureKind::Method && !find(feature.qualifiers, "Override"))
         {
-            text += slot(feature);
+            slots += slot(feature);
         }
     }
-    return text + "\n    static const Meta_Class static_meta_class;\n};\n";
+    return record(c.name, c.superclass ? c.superclass->name : "Instance", slots, "Meta_Class static_meta_class");
 }
 
 std::string method_record(const Class& c, const Feature& method)
 {
-    std::string text = "\nclass " + method_record_name(c, method) + " : public Instance\n{\npublic:\n";
+    std::string slots;
     for (const Feature& parameter : method.parameters)
     {
-        text += slot(parameter);
+        slots += slot(parameter);
     }
-    text += slot(return_value_of(method));
-    return text + "\n    static const Meta_Method static_meta_method;\n};\n";
+    slots += slot(return_value_of(method));
+    return "\n" + record(method_record_name(c, method), "Instance", slots, "Meta_Method static_meta_method");
 }
 
 OutputFile class_header(const Class& c)
