@@ -14,7 +14,7 @@ namespace
 constexpr const char* namespace_begin = "\nnamespace cimple\n{\n\n";
 constexpr const char* namespace_end = "\n} // namespace cimple\n";
 
-/// Items of a braced list, eight to a line at most.
+/// A braced list with so many items to a line.
 std::string braced(const std::vector<std::string>& items, std::size_t per_line)
 {
     std::string text = "{";
