@@ -15,15 +15,13 @@ constexpr std::uint32_t room = 512;
 class AttributeBlockTest : public testing::Test
 {
 protected:
-    AttributeBlockTest() { loadAllLibraries(); }
-
     void fill(std::map<std::uint32_t, std::string> attributes)
     {
         host.addAdapter(1).attributes = std::move(attributes);
         ASSERT_EQ(block.fetch(LRM_GetHBAAttributes, host.adapters.back().ports[0].hba.PortWWN), RM_OK);
     }
 
-    FakeHost host;
+    LoadedHost host;
     LogCapture log;
     AttributeBlock block{room};
 };
@@ -81,13 +79,8 @@ TEST_F(AttributeBlockTest, HostileAnswersAreFailures)
         RM_STATUS expected;
     };
     const Case cases[] = {
-        {0, 4, RM_OK},
-        {room - 4, 4, RM_OK},
-        {room - 3, 4, RM_ERROR},
-        {room, 4, RM_ERROR},
-        {-1, 4, RM_ERROR},
-        {0, 0xFFFFFFFF, RM_ERROR},
-        {room + 4096, 4, RM_ERROR},
+        {0, 4, RM_OK},     {room - 4, 4, RM_OK},      {room - 3, 4, RM_ERROR},    {room, 4, RM_ERROR},
+        {-1, 4, RM_ERROR}, {0, 0xFFFFFFFF, RM_ERROR}, {room + 4096, 4, RM_ERROR},
     };
     for (const Case& c : cases)
     {
@@ -126,13 +119,12 @@ TEST_F(AttributeBlockTest, ReadersLogTheValueOrTheFailure)
     readText(block, 2, "_ULPFirmwareName", text);
     readText(block, 9, "_ULPFirmwareName", text);
     readMacAddress(block, 3, "_IEEE_ADDRESS", text);
-    EXPECT_THAT(log.lines, testing::ElementsAre("5 _DeviceID: [ 42 ]",
-                                                "5 ERROR: RM_GetHBAAttributeValue HA__DeviceID call failed (2)",
-                                                "5 _PortState: [ 42 ]",
-                                                "5 ERROR: RM_GetPortAttributes HA__PortState call failed (2)",
-                                                "5 _ULPFirmwareName : [ text ]",
-                                                "5 ERROR: _ULPFirmwareName: RM_GetHBAAttributes call failed (2)",
-                                                "5 _IEEE_ADDRESS : [ 00:90:fa:01:02:ff ]"));
+    EXPECT_THAT(log.lines,
+                testing::ElementsAre(
+                    "5 _DeviceID: [ 42 ]", "5 ERROR: RM_GetHBAAttributeValue HA__DeviceID call failed (2)",
+                    "5 _PortState: [ 42 ]", "5 ERROR: RM_GetPortAttributes HA__PortState call failed (2)",
+                    "5 _ULPFirmwareName : [ text ]", "5 ERROR: _ULPFirmwareName: RM_GetHBAAttributes call failed (2)",
+                    "5 _IEEE_ADDRESS : [ 00:90:fa:01:02:ff ]"));
 }
 
 TEST_F(AttributeBlockTest, ABlockThatCannotHoldTheAnswerReportsTheLibrary)

@@ -64,24 +64,22 @@ RM_STATUS LRM_GetHBAAttributes(HBA_WWN wwpn, void* buffer, std::uint32_t* size)
 {
     if (int status = host->enter("LRM_GetHBAAttributes"))
         return status;
-    return withPort(wwpn, [&](FakeAdapter& adapter, FakePort&)
-                    { return writeAttributes(adapter.attributes, buffer, size); });
+    return withPort(wwpn,
+                    [&](FakeAdapter& adapter, FakePort&) { return writeAttributes(adapter.attributes, buffer, size); });
 }
 
 RM_STATUS LRM_GetPortAttributes(HBA_WWN wwpn, void* buffer, std::uint32_t* size)
 {
     if (int status = host->enter("LRM_GetPortAttributes"))
         return status;
-    return withPort(wwpn,
-                    [&](FakeAdapter&, FakePort& port) { return writeAttributes(port.attributes, buffer, size); });
+    return withPort(wwpn, [&](FakeAdapter&, FakePort& port) { return writeAttributes(port.attributes, buffer, size); });
 }
 
 RM_STATUS LRM_GetPortStatistics(HBA_WWN wwpn, void* buffer, std::uint32_t* size)
 {
     if (int status = host->enter("LRM_GetPortStatistics"))
         return status;
-    return withPort(wwpn,
-                    [&](FakeAdapter&, FakePort& port) { return writeAttributes(port.statistics, buffer, size); });
+    return withPort(wwpn, [&](FakeAdapter&, FakePort& port) { return writeAttributes(port.statistics, buffer, size); });
 }
 
 RM_STATUS LRM_GetServerAttributes(HBA_WWN, void* buffer, std::uint32_t* size)
@@ -222,8 +220,8 @@ RM_STATUS LRM_VpScsiInquiry(HBA_WWN, HBA_WWN, HBA_WWN, HBA_UINT64, std::uint8_t,
         writeScsi("LRM_VpScsiInquiry", host->inquiry[page], response, size, sense, senseSize));
 }
 
-RM_STATUS LRM_VpScsiReadCapacity(HBA_WWN, HBA_WWN, HBA_WWN, HBA_UINT64, void* response, std::uint32_t size,
-                                 void* sense, std::uint32_t senseSize)
+RM_STATUS LRM_VpScsiReadCapacity(HBA_WWN, HBA_WWN, HBA_WWN, HBA_UINT64, void* response, std::uint32_t size, void* sense,
+                                 std::uint32_t senseSize)
 {
     return static_cast<RM_STATUS>(
         writeScsi("LRM_VpScsiReadCapacity", host->capacity, response, size, sense, senseSize));

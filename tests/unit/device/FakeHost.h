@@ -58,7 +58,8 @@ public:
     std::string sense;
 
     /// Replaces RM_GetAttributeValue's answer.
-    std::function<const void*(const void* buffer, std::uint32_t id, std::uint32_t* length, RM_STATUS* status)> attribute;
+    std::function<const void*(const void* buffer, std::uint32_t id, std::uint32_t* length, RM_STATUS* status)>
+        attribute;
     /// Replaces HBA_GetFcpTargetMapping.
     std::function<HBA_STATUS(HBA_FCPTARGETMAPPING*)> mapping;
 
@@ -76,6 +77,12 @@ public:
 
 private:
     cimple::DynamicLoader _previous;
+};
+
+/// One whose libraries are loaded.
+struct LoadedHost : FakeHost
+{
+    LoadedHost() { cimple::loadAllLibraries(); }
 };
 
 /// The log's lines while it lives.

@@ -193,8 +193,9 @@ TEST(Loader, LocalLibraryIsAskedOnceAndTheFallbackNever)
     host.absentSymbols = {"LRM_SetDebugTraces"};
     EXPECT_EQ(LRM_SetDebugTraces(1), 1);
     EXPECT_EQ(LRM_SetDebugTraces(1), 1); // what was not found is looked up again
-    EXPECT_THAT(host.loaderCalls, ElementsAre("symbol liblrmapi.so LRM_InitLib", "symbol liblrmapi.so LRM_SetDebugTraces",
-                                              "symbol liblrmapi.so LRM_SetDebugTraces"));
+    EXPECT_THAT(host.loaderCalls,
+                ElementsAre("symbol liblrmapi.so LRM_InitLib", "symbol liblrmapi.so LRM_SetDebugTraces",
+                            "symbol liblrmapi.so LRM_SetDebugTraces"));
 }
 
 TEST(Loader, FallbackIsAskedOnEveryCallUnderBothNames)
@@ -205,9 +206,8 @@ TEST(Loader, FallbackIsAskedOnEveryCallUnderBothNames)
     host.loaderCalls.clear();
     EXPECT_EQ(LRM_InitLib(), 0);
     EXPECT_EQ(LRM_InitLib(), 0);
-    EXPECT_THAT(host.loaderCalls,
-                ElementsAre("symbol librmapi.so LRM_InitLib", "symbol librmapi.so RM_InitLib",
-                            "symbol librmapi.so LRM_InitLib", "symbol librmapi.so RM_InitLib"));
+    EXPECT_THAT(host.loaderCalls, ElementsAre("symbol librmapi.so LRM_InitLib", "symbol librmapi.so RM_InitLib",
+                                              "symbol librmapi.so LRM_InitLib", "symbol librmapi.so RM_InitLib"));
 
     // A function of one name is found under it at once, or missed twice.
     host.loaderCalls.clear();
@@ -215,9 +215,8 @@ TEST(Loader, FallbackIsAskedOnEveryCallUnderBothNames)
     char text[8];
     EXPECT_EQ(RM_GetVersion(text, sizeof text), 0);
     EXPECT_EQ(RM_MiliVersion(text, sizeof text), 1);
-    EXPECT_THAT(host.loaderCalls,
-                ElementsAre("symbol librmapi.so RM_GetVersion", "symbol librmapi.so RM_MiliVersion",
-                            "symbol librmapi.so RM_MiliVersion"));
+    EXPECT_THAT(host.loaderCalls, ElementsAre("symbol librmapi.so RM_GetVersion", "symbol librmapi.so RM_MiliVersion",
+                                              "symbol librmapi.so RM_MiliVersion"));
 }
 
 TEST(Loader, FallbackServesTheHbaApi)
@@ -262,7 +261,8 @@ TEST(Loader, AFailedCloseIsLoggedAndKeepsTheLibrary)
     host.closeFails = true;
     EXPECT_EQ(unloadAllLibraries(), 0);
     ASSERT_EQ(log.notable().size(), 2u);
-    EXPECT_THAT(log.notable(), testing::Each(testing::MatchesRegex("3 dlclose for lib 0x[0-9a-f]+ failed with fake error\n")));
+    EXPECT_THAT(log.notable(),
+                testing::Each(testing::MatchesRegex("3 dlclose for lib 0x[0-9a-f]+ failed with fake error\n")));
     EXPECT_EQ(LRM_InitLib(), 0);
 }
 
