@@ -1,7 +1,7 @@
 // Attribute records of the HBA API.
 #pragma once
 
-#include <time.h> // hbaapi.h uses time_t without declaring it
+#include <time.h> // hbaapi.h uses struct tm
 
 #include <hbaapi.h>
 

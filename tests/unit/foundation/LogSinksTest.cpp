@@ -1,0 +1,274 @@
+// The file sink, the ring sink and the system log's sink.
+#include "tests/unit/foundation/LogFixture.h"
+
+#include "foundation/TVR_CIMLogger.h"
+#include "foundation/TVR_FileLogger.h"
+#include "foundation/TVR_SysLogger.h"
+
+#include <sys/stat.h>
+#include <syslog.h>
+
+#include <cstdarg>
+#include <cstdio>
+#include <fstream>
+
+namespace
+{
+
+struct SysLogCall
+{
+    int priority;
+    std::string text;
+};
+std::vector<SysLogCall> sysLogCalls;
+
+} // namespace
+
+/// Takes the place of the C library's for this program.
+extern "C" void syslog(int priority, const char* format, ...)
+{
+    char text[4096];
+    va_list args;
+    va_start(args, format);
+    std::vsnprintf(text, sizeof text, format, args);
+    va_end(args);
+    sysLogCalls.push_back({priority, text});
+}
+
+namespace cimple
+{
+namespace
+{
+
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::MatchesRegex;
+using testing::Not;
+
+// --- file ----------------------------------------------------------------------------------------------
+
+class FileSink : public LogTest
+{
+protected:
+    FileSink() { logger.setMode(2); }
+
+    TVR_FileLogger file;
+    const std::string path = root / "provider.log";
+};
+
+TEST_F(FileSink, WritesALinePerMessage)
+{
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+    TVR_LOG(TVR_INFO, "port %d is up", 3);
+    EXPECT_THAT(fileText(path),
+                MatchesRegex("\\[threadid =[0-9]+l\\] \\[[0-9]{4}/[0-9]{2}/[0-9]{2} [0-9:.]+[+-][0-9]+\\] "
+                             "\\[LogSinksTest.cpp:[0-9]+\\]\\[TVR_INFO\\] port 3 is up\n"));
+}
+
+TEST_F(FileSink, NamesEveryLevelAndDropsThoseAbove)
+{
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+    const char* names[] = {"TVR_INVALID", "TVR_CRIT", "TVR_WARN", "TVR_ERR", "TVR_INFO", "TVR_DBG"};
+    for (int level = 0; level <= 5; ++level)
+        TVR_LOG(level, "level");
+    TVR_LOG(6, "six");
+    TVR_LOG(-1, "below");
+    std::ifstream lines(path);
+    std::string line;
+    for (const char* name : names)
+    {
+        ASSERT_TRUE(std::getline(lines, line));
+        EXPECT_THAT(line, HasSubstr("][" + std::string(name) + "] level"));
+    }
+    ASSERT_TRUE(std::getline(lines, line));
+    EXPECT_THAT(line, HasSubstr("][TVR_INVALID] below"));
+    EXPECT_FALSE(std::getline(lines, line));
+}
+
+TEST_F(FileSink, KeepsCriticalMessagesAndErrorsWhenErrorsOnly)
+{
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), true), 0);
+    for (int level = 1; level <= 5; ++level)
+        TVR_LOG(level, "level %d", level);
+    EXPECT_THAT(fileText(path), testing::AllOf(HasSubstr("level 1"), HasSubstr("level 3"), Not(HasSubstr("level 2")),
+                                               Not(HasSubstr("level 4")), Not(HasSubstr("level 5"))));
+}
+
+TEST_F(FileSink, RefusesAPathAndStaysWithTheOldOne)
+{
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+    const std::string readOnly = root / "read-only";
+    writeFile(readOnly, "kept\n");
+    chmod(readOnly.c_str(), 0444);
+    const std::string belowFile = path + "/below";
+    const std::string folder = root / "etc";
+    for (const char* refused : {static_cast<const char*>(nullptr), "", readOnly.c_str(), belowFile.c_str(),
+                                folder.c_str(), "/nonexistent/folder/log"})
+        EXPECT_EQ(file.validateAndSetPath(refused, true), -1) << (refused ? refused : "null");
+    EXPECT_EQ(file.getPath(), path.c_str());
+    TVR_LOG(TVR_DBG, "still here");
+    EXPECT_THAT(fileText(path), HasSubstr("still here"));
+    EXPECT_EQ(fileText(readOnly), "kept\n");
+}
+
+TEST_F(FileSink, CreatesAFileThatOnlyTheOwnerWrites)
+{
+    const mode_t before = umask(0);
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+    umask(before);
+    struct stat status;
+    ASSERT_EQ(stat(path.c_str(), &status), 0);
+    EXPECT_EQ(status.st_mode & 07777, 0644u);
+}
+
+TEST_F(FileSink, FollowsNoLinkWhereAnybodyMayWrite)
+{
+    const std::string target = root / "target";
+    const std::string link = root / "etc/link";
+    writeFile(target, "");
+    std::filesystem::create_symlink(target, link);
+    EXPECT_EQ(file.validateAndSetPath(link.c_str(), false), 0) << "an administrator's link";
+    chmod((root / "etc").c_str(), 01777);
+    EXPECT_EQ(file.validateAndSetPath(link.c_str(), false), -1);
+}
+
+TEST_F(FileSink, AppendsAndGoesOnAfterAClear)
+{
+    writeFile(path, "from before\n");
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+    TVR_LOG(TVR_ERR, "one");
+    EXPECT_THAT(fileText(path), testing::AllOf(testing::StartsWith("from before\n"), HasSubstr("one")));
+    logger.clearAll();
+    EXPECT_EQ(fileText(path), "");
+    TVR_LOG(TVR_ERR, "two");
+    TVR_LOG(TVR_ERR, "three");
+    EXPECT_THAT(fileText(path), testing::AllOf(HasSubstr("two"), HasSubstr("three")));
+}
+
+TEST_F(FileSink, ForgetsThePathWhenStoppedWhileOpen)
+{
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+    logger.setMode(0);
+    EXPECT_TRUE(file.getPath().empty());
+    logger.setMode(2);
+    TVR_LOG(TVR_ERR, "lost");
+    EXPECT_EQ(fileText(path), "");
+}
+
+TEST_F(FileSink, OpensAFileThatWentAwayAgainWhenStarted)
+{
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+    std::filesystem::remove(path);
+    logger.setMode(1);
+    EXPECT_FALSE(std::filesystem::exists(path)) << "not in a mode without a file";
+    logger.setMode(4);
+    TVR_LOG(TVR_ERR, "back");
+    EXPECT_THAT(fileText(path), HasSubstr("back"));
+}
+
+// --- ring ----------------------------------------------------------------------------------------------
+
+class RingSink : public LogTest
+{
+protected:
+    RingSink() { logger.setMode(1); }
+    TVR_CIMLogger ring;
+};
+
+TEST_F(RingSink, StoresTheThreeErrorLevelsInBrackets)
+{
+    for (int level = 1; level <= 5; ++level)
+        TVR_LOG(level, "level %d", level);
+    const auto entries = ring.entries();
+    ASSERT_EQ(entries.size(), 3u);
+    for (int i = 0; i < 3; ++i)
+    {
+        EXPECT_EQ(entries[i].level, i + 1);
+        EXPECT_EQ(entries[i].text, "[level " + std::to_string(i + 1) + "]");
+        EXPECT_TRUE(entries[i].timestamp.is_timestamp());
+    }
+}
+
+TEST_F(RingSink, OverwritesTheOldestRecordWhenFull)
+{
+    for (int i = 0; i < 1025; ++i)
+        TVR_LOG(TVR_ERR, "%d", i);
+    auto entries = ring.entries();
+    ASSERT_EQ(entries.size(), 1024u);
+    EXPECT_STREQ(entries[0].text, "[1024]");
+    EXPECT_STREQ(entries[1].text, "[1]");
+    EXPECT_STREQ(entries[1023].text, "[1023]");
+
+    logger.clearAll();
+    EXPECT_TRUE(ring.entries().empty());
+    TVR_LOG(TVR_ERR, "first");
+    TVR_LOG(TVR_ERR, "second");
+    entries = ring.entries();
+    ASSERT_EQ(entries.size(), 2u);
+    EXPECT_STREQ(entries[1].text, "[second]");
+}
+
+TEST_F(RingSink, CutsLongTextsBetweenCharacters)
+{
+    const std::string letters(196, 'a');
+    TVR_LOG(TVR_ERR, "%s", (letters + "b").c_str());
+    TVR_LOG(TVR_ERR, "%s", (letters + "bc").c_str());
+    TVR_LOG(TVR_ERR, "%s", (letters + "\u20ac and more").c_str());
+    TVR_LOG(TVR_ERR, "%s", std::string(300, '\x80').c_str());
+    const auto entries = ring.entries();
+    ASSERT_EQ(entries.size(), 4u);
+    EXPECT_EQ(entries[0].text, "[" + letters + "b]");
+    EXPECT_EQ(entries[1].text, "[" + letters + "bc");
+    EXPECT_EQ(entries[2].text, "[" + letters);
+    EXPECT_GT(std::string(entries[3].text).size(), 190u) << "not UTF-8 in the first place";
+}
+
+// --- system log ----------------------------------------------------------------------------------------
+
+class SystemLogSink : public LogTest
+{
+protected:
+    SystemLogSink() { sysLogCalls.clear(); }
+};
+
+TEST_F(SystemLogSink, IsSilentForTheLevelsInUse)
+{
+    const TVR_SysLogger sink;
+    for (int level = 1; level <= 5; ++level)
+        TVR_LOG(level, "quiet");
+    EXPECT_TRUE(sysLogCalls.empty());
+}
+
+TEST_F(SystemLogSink, PassesTheRestOnAsPlainBoundedText)
+{
+    const TVR_SysLogger sink;
+    TVR_LOG(0, "%s", "100% %n %s");
+    TVR_LOG(-5, "%s", std::string(5000, 'x').c_str());
+    ASSERT_EQ(sysLogCalls.size(), 2u);
+    EXPECT_EQ(sysLogCalls[0].priority, -1);
+    EXPECT_EQ(sysLogCalls[0].text, "[100% %n %s]\n");
+    EXPECT_EQ(sysLogCalls[1].text.size(), 2047u);
+}
+
+TEST_F(SystemLogSink, IsTheOnlyOneToHearWhileLoggingIsDisabled)
+{
+    CapturingSink other;
+    {
+        const TVR_SysLogger sink;
+        TVR_LOG(0, "disabled");
+        EXPECT_TRUE(other.lines.empty());
+        EXPECT_EQ(sysLogCalls.size(), 1u);
+
+        logger.enable();
+        TVR_LOG(0, "enabled");
+        EXPECT_EQ(other.lines.size(), 1u);
+        EXPECT_EQ(sysLogCalls.size(), 2u);
+        logger.disable();
+    }
+    TVR_LOG(0, "disabled, and the sink is gone");
+    EXPECT_EQ(other.lines.size(), 2u);
+    EXPECT_EQ(sysLogCalls.size(), 2u);
+}
+
+} // namespace
+} // namespace cimple
