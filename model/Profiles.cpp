@@ -11,9 +11,6 @@ namespace cimple
 namespace
 {
 
-constexpr std::uint16_t DMTF = 2; // CIM_RegisteredProfile.RegisteredOrganization
-constexpr std::uint16_t SNIA = 11;
-
 struct ProfileRow
 {
     const char* name;

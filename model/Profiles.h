@@ -7,6 +7,10 @@
 namespace cimple
 {
 
+/// CIM_RegisteredProfile.RegisteredOrganization.
+inline constexpr std::uint16_t DMTF = 2;
+inline constexpr std::uint16_t SNIA = 11;
+
 /// The profile in the map, new or existing; null when it was refused.
 TVRHBA_RegisteredProfile* createRegisteredProfile(ProviderAgent& agent, const char* name, std::uint16_t organization,
                                                   const char* version);

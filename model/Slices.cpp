@@ -88,11 +88,6 @@ std::uint32_t updateFRUInstances(ProviderAgent&)
     return BUILD_DONE;
 }
 
-std::uint32_t createProviderRecordLog(ProviderAgent&)
-{
-    return BUILD_DONE;
-}
-
 void clearDriverLogMaps(ProviderAgent& agent)
 {
     agent.m_TVRHBA_FCDriverLogEntry_map.clear();
