@@ -1,0 +1,125 @@
+#include "simulator/EntryPoints.h"
+
+#include <algorithm>
+
+namespace tvrsim
+{
+
+namespace
+{
+
+/// Where a function of the table is found, and under which name.
+enum class Family : std::uint8_t
+{
+    dual,   ///< LRM_ and the name in the local library, RM_ and the name in the fallback library
+    rmOnly, ///< RM_ and the name in both
+    hba,    ///< HBA_ and the name in the HBA API library and the fallback library
+};
+
+struct Row
+{
+    const char* name;
+    Family family;
+    unsigned effects;
+};
+
+constexpr unsigned statusOnly = 0;
+constexpr unsigned numberOut = bit(Hostile::allOnes);
+constexpr unsigned textOut = bit(Hostile::unterminatedText) | truncatable;
+constexpr unsigned recordOut = bit(Hostile::allOnes) | truncatable;
+constexpr unsigned textRecordOut = recordOut | bit(Hostile::unterminatedText);
+constexpr unsigned countedRecordOut = textRecordOut | bit(Hostile::hugeCount);
+constexpr unsigned listOut = bit(Hostile::hugeCount) | bit(Hostile::allOnes) | truncatable;
+constexpr unsigned scsiOut = bit(Hostile::hugeLength) | bit(Hostile::allOnes) | truncatable;
+constexpr unsigned attributesOut =
+    bit(Hostile::hugeLength) | bit(Hostile::unterminatedText) | bit(Hostile::allOnes) | truncatable;
+
+using enum Family;
+
+constexpr Row rows[] = {
+    {"DiagReadPCIRegistersV2", dual, recordOut},
+    {"ExitLib", dual, statusOnly},
+    {"GetDriverType", dual, numberOut},
+    {"GetHBAAttributes", dual, attributesOut},
+    {"GetHBAFeature", dual, numberOut},
+    {"GetHBAFeatureList", dual, listOut},
+    {"GetLunList", dual, listOut},
+    {"GetPortAttributes", dual, attributesOut},
+    {"GetPortStatistics", dual, attributesOut},
+    {"GetQoS", dual, recordOut},
+    {"GetServerAttributes", dual, attributesOut},
+    {"GetVMFromVPort", dual, textRecordOut},
+    {"InitLib", dual, statusOnly},
+    {"ScsiInquiry", dual, scsiOut},
+    {"SetDebugTraces", dual, statusOnly},
+    {"VPGetAttributes", dual, textRecordOut},
+    {"VPList", dual, listOut},
+    {"VPListTargets", dual, listOut},
+    {"VpScsiInquiry", dual, scsiOut},
+    {"VpScsiReadCapacity", dual, scsiOut},
+    {"VpScsiReportLUNs", dual, scsiOut},
+
+    {"GetAttributeValue", rmOnly, bit(Hostile::hugeLength)},
+    {"GetVersion", rmOnly, textOut},
+    {"IsLocalHBA", rmOnly, numberOut},
+    {"MiliVersion", rmOnly, textOut},
+    {"StatusString", rmOnly, textOut},
+
+    {"CloseAdapter", hba, statusOnly},
+    {"FreeLibrary", hba, statusOnly},
+    {"GetAdapterAttributes", hba, countedRecordOut},
+    {"GetAdapterName", hba, textOut},
+    {"GetAdapterPortAttributes", hba, countedRecordOut},
+    {"GetFcpTargetMapping", hba, listOut | bit(Hostile::unterminatedText)},
+    {"GetNumberOfAdapters", hba, bit(Hostile::hugeCount)},
+    {"GetVersion", hba, statusOnly},
+    {"LoadLibrary", hba, statusOnly},
+    {"OpenAdapter", hba, bit(Hostile::zeroHandle)},
+    {"RefreshInformation", hba, statusOnly},
+    {"SendReadCapacity", hba, scsiOut},
+    {"SendScsiInquiry", hba, scsiOut},
+};
+
+/// Prefix of the family's names in a library; null where the library does not export them.
+const char* prefixIn(Family family, Library library)
+{
+    switch (family)
+    {
+    case dual:
+        return library == Library::local ? "LRM_" : library == Library::fallback ? "RM_" : nullptr;
+    case rmOnly:
+        return library == Library::hbaApi ? nullptr : "RM_";
+    case hba:
+        return library == Library::local ? nullptr : "HBA_";
+    }
+    return nullptr;
+}
+
+constexpr Library libraries[] = {Library::local, Library::fallback, Library::hbaApi};
+
+} // namespace
+
+std::vector<std::string> exportedNames(Library library)
+{
+    std::vector<std::string> names;
+    for (const Row& row : rows)
+        if (const char* prefix = prefixIn(row.family, library))
+            names.push_back(std::string(prefix) + row.name);
+    std::ranges::sort(names);
+    return names;
+}
+
+bool findEntryPoint(std::string_view function, unsigned& effects)
+{
+    for (const Row& row : rows)
+        for (Library library : libraries)
+            if (const char* prefix = prefixIn(row.family, library);
+                prefix && std::string(prefix) + row.name == function)
+            {
+                effects = row.effects;
+                return true;
+            }
+    return false;
+}
+
+} // namespace tvrsim

@@ -1,0 +1,78 @@
+// How each kind of record looks when it is hostile.
+#pragma once
+
+#include "simulator/EntryPoints.h"
+
+#include "device/RmApi.h"
+
+#include <cstring>
+
+namespace tvrsim
+{
+
+/// Fills a text field to the brim, without a zero byte.
+template <std::size_t Size> void fillText(char (&field)[Size])
+{
+    std::memset(field, 'X', Size);
+}
+
+inline void fillTexts(HBA_ADAPTERATTRIBUTES& record)
+{
+    fillText(record.Manufacturer);
+    fillText(record.SerialNumber);
+    fillText(record.Model);
+    fillText(record.ModelDescription);
+    fillText(record.NodeSymbolicName);
+    fillText(record.HardwareVersion);
+    fillText(record.DriverVersion);
+    fillText(record.OptionROMVersion);
+    fillText(record.FirmwareVersion);
+    fillText(record.DriverName);
+}
+
+inline void fillTexts(HBA_PORTATTRIBUTES& record)
+{
+    fillText(record.PortSymbolicName);
+    fillText(record.OSDeviceName);
+}
+
+inline void fillTexts(HBA_FCPSCSIENTRY& record)
+{
+    fillText(record.ScsiId.OSDeviceName);
+}
+
+inline void fillTexts(RM_VPortAttributes& record)
+{
+    fillText(record.symbolicName);
+}
+
+inline void fillTexts(RM_VirtualMachine& record)
+{
+    fillText(record.name);
+    fillText(record.uuid);
+}
+
+inline void fillCount(HBA_ADAPTERATTRIBUTES& record)
+{
+    record.NumberOfPorts = 0xFFFF'FFFF;
+}
+
+inline void fillCount(HBA_PORTATTRIBUTES& record)
+{
+    record.NumberofDiscoveredPorts = 0xFFFF'FFFF;
+}
+
+/// Makes a record hostile in its way; the kinds that it cannot show leave it alone.
+template <class Record> void deform(Record& record, Hostile kind)
+{
+    if (kind == Hostile::allOnes)
+        std::memset(&record, 0xFF, sizeof record);
+    if constexpr (requires { fillTexts(record); })
+        if (kind == Hostile::unterminatedText)
+            fillTexts(record);
+    if constexpr (requires { fillCount(record); })
+        if (kind == Hostile::hugeCount)
+            fillCount(record);
+}
+
+} // namespace tvrsim

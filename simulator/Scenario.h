@@ -1,0 +1,126 @@
+// A simulated host as a scenario describes it. docs/scenarios.md explains the members in words.
+#pragma once
+
+#include "simulator/Attributes.h"
+#include "simulator/Faults.h"
+#include "simulator/Wwn.h"
+
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace tvrsim
+{
+
+enum class ScsiOperation : std::uint8_t
+{
+    any,
+    inquiry,
+    vitalProductData,
+    readCapacity,
+    reportLuns,
+};
+
+/// A command that ends with sense data instead of its result.
+struct CheckCondition
+{
+    ScsiOperation operation = ScsiOperation::any;
+    std::optional<std::uint8_t> page;     ///< of vital product data; every page if not given
+    std::uint32_t times = 0xFFFF'FFFF;    ///< commands that still end this way; all ones for ever
+    std::uint8_t key = 5;                 ///< ILLEGAL REQUEST
+    std::uint8_t code = 0, qualifier = 0; ///< additional sense code and its qualifier
+};
+
+/// One designator of the device identification page (SPC-4, 7.8.6.1).
+struct Designator
+{
+    std::uint8_t type = 3;    ///< 3 is NAA
+    std::uint8_t codeSet = 1; ///< 1 binary, 2 ASCII
+    std::uint8_t association = 0;
+    std::vector<std::uint8_t> value; ///< at most 251 bytes
+};
+
+struct LogicalUnit
+{
+    std::uint32_t number = 0; ///< below 16384
+    std::uint8_t deviceType = 0;
+    std::uint8_t deviceQualifier = 0;
+    std::string vendor = "TAVRIN";
+    std::string product = "SIMULATED UNIT";
+    std::string revision = "0001";
+    std::optional<std::string> serialNumber; ///< page 0x80
+    std::vector<Designator> designators;     ///< page 0x83; none means that the unit has no such page
+    std::uint64_t blocks = 0;                ///< 0 means that the unit refuses Read Capacity
+    std::uint32_t blockLength = 512;
+    std::vector<CheckCondition> checkConditions;
+};
+
+/// A port in the fabric with logical units behind it.
+struct Target
+{
+    std::string name; ///< by which ports refer to it
+    Wwn wwpn = 0, wwnn = 0;
+    std::uint32_t fcId = 0;
+    std::vector<LogicalUnit> units; ///< in ascending order of number
+};
+
+struct VirtualPort
+{
+    Wwn wwpn = 0, wwnn = 0, fabricName = 0;
+    std::uint32_t fcId = 0;
+    std::uint32_t state = HBA_PORTSTATE_ONLINE;
+    std::string symbolicName;
+    std::vector<std::size_t> targets; ///< indexes in Scenario::targets
+    std::optional<RM_VirtualMachine> machine;
+};
+
+struct Port
+{
+    Wwn wwpn = 0, wwnn = 0, fabricName = 0;
+    std::uint32_t fcId = 0;
+    std::uint32_t type = HBA_PORTTYPE_NPORT;
+    std::uint32_t state = HBA_PORTSTATE_ONLINE;
+    std::uint32_t supportedClasses = 0x08;
+    std::array<std::uint8_t, 32> supportedFc4Types{}, activeFc4Types{};
+    std::string symbolicName, osDeviceName;
+    std::uint32_t supportedSpeed = 0, speed = 0; ///< speed codes, one bit each
+    std::uint32_t maxFrameSize = 2048;
+    std::uint32_t discoveredPorts = 0;
+    std::uint32_t scsiBus = 0;
+    AttributeList attributes; ///< stand above those that follow from the members
+    AttributeList statistics;
+    std::optional<RM_PciRegisters> pci;
+    std::optional<RM_QosInfo> qos;
+    std::vector<std::size_t> targets; ///< indexes in Scenario::targets; the position is the SCSI target number
+    std::vector<VirtualPort> virtualPorts;
+};
+
+/// One adapter of the HBA API: a card, or one function of a card.
+struct Adapter
+{
+    std::string name; ///< at most 255 bytes
+    std::string manufacturer = "Tavrin Corporation";
+    std::string serialNumber, model, modelDescription, nodeSymbolicName, hardwareVersion, driverVersion,
+        optionRomVersion, firmwareVersion, driverName;
+    Wwn nodeWwn = 0;
+    std::uint32_t vendorSpecificId = 0;
+    std::uint32_t driverType = 0;
+    bool stale = false; ///< the HBA API answers "stale data" until the next refresh
+    AttributeList attributes;
+    std::vector<RM_Feature> features; ///< in ascending order of tag
+    std::vector<Port> ports;
+};
+
+struct Scenario
+{
+    std::string libraryVersion = "12.0.100.0";
+    std::string miliVersion = "2.0.30.0";
+    AttributeList serverAttributes;
+    std::vector<Adapter> adapters;
+    std::vector<Target> targets;
+    std::vector<Fault> faults;
+};
+
+} // namespace tvrsim

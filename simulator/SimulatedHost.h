@@ -1,0 +1,112 @@
+// The state of the simulated host, seen through the calls of the HBA API and of the RM library.
+//
+// Every public function takes the host's lock for itself, so calls may come from many threads. The functions that
+// mirror a library call return that library's status, and fill their output only with status 0 or as they say.
+#pragma once
+
+#include "simulator/Scenario.h"
+#include "simulator/ScsiResponses.h"
+
+#include <map>
+#include <mutex>
+#include <unordered_map>
+
+namespace tvrsim
+{
+
+class SimulatedHost
+{
+public:
+    /// Takes the place of the host. Open handles stay valid for adapters of the same name.
+    void load(Scenario scenario);
+
+    // HBA API, in HbaCalls.cpp.
+
+    /// HBA_STATUS_ERROR if the library is loaded already, as the common library has it.
+    HBA_STATUS loadLibrary();
+    HBA_STATUS freeLibrary();
+    std::uint32_t adapterCount() const;
+    HBA_STATUS adapterName(std::uint32_t index, std::string& name) const;
+    HBA_HANDLE openAdapter(const std::string& name);
+    void closeAdapter(HBA_HANDLE handle);
+    void refreshInformation(HBA_HANDLE handle);
+    HBA_STATUS adapterAttributes(HBA_HANDLE handle, HBA_ADAPTERATTRIBUTES& out) const;
+    HBA_STATUS portAttributes(HBA_HANDLE handle, std::uint32_t index, HBA_PORTATTRIBUTES& out) const;
+    HBA_STATUS targetMapping(HBA_HANDLE handle, std::vector<HBA_FCPSCSIENTRY>& out) const;
+    HBA_STATUS scsi(HBA_HANDLE handle, Wwn target, HBA_UINT64 lun, const ScsiCommand& command, ScsiReply& out);
+
+    // RM library, in RmCalls.cpp. `wwpn` names a physical port, `vport` one of its virtual ports.
+
+    RM_STATUS statusText(RM_STATUS status, std::string& out) const;
+    RM_STATUS libraryVersion(std::string& out) const;
+    RM_STATUS miliVersion(std::string& out) const;
+    RM_STATUS isLocal(Wwn wwpn, std::uint32_t& out) const;
+    RM_STATUS driverType(Wwn wwpn, std::uint32_t& out) const;
+    RM_STATUS feature(Wwn wwpn, std::uint32_t tag, std::uint32_t& out) const;
+    RM_STATUS features(Wwn wwpn, std::vector<RM_Feature>& out) const;
+    RM_STATUS qos(Wwn wwpn, RM_QosInfo& out) const;
+    RM_STATUS pciRegisters(Wwn wwpn, RM_PciRegisters& out) const;
+    RM_STATUS hbaAttributes(Wwn wwpn, AttributeList& out) const;
+    RM_STATUS portAttributes(Wwn wwpn, AttributeList& out) const;
+    RM_STATUS portStatistics(Wwn wwpn, AttributeList& out) const;
+    RM_STATUS serverAttributes(Wwn wwpn, AttributeList& out) const;
+    RM_STATUS luns(Wwn wwpn, Wwn target, std::vector<RM_Lun>& out) const;
+    RM_STATUS scsi(Wwn wwpn, Wwn target, HBA_UINT64 lun, const ScsiCommand& command, ScsiReply& out);
+    RM_STATUS vports(Wwn wwpn, std::vector<RM_VPortEntry>& out) const;
+    RM_STATUS vportAttributes(Wwn wwpn, Wwn vport, RM_VPortAttributes& out) const;
+    RM_STATUS vportTargets(Wwn wwpn, Wwn vport, std::vector<RM_VPortTarget>& out) const;
+    RM_STATUS vportMachine(Wwn wwpn, Wwn vport, RM_VirtualMachine& out) const;
+    RM_STATUS vportScsi(Wwn wwpn, Wwn vport, Wwn target, HBA_UINT64 lun, const ScsiCommand& command, ScsiReply& out);
+
+    // What a test sees and changes. A false result means that there is no such adapter or port.
+
+    std::size_t openHandles() const;
+    /// Name of the adapter behind a handle; empty if there is none.
+    std::string adapterOf(HBA_HANDLE handle) const;
+    bool removeAdapter(const std::string& name);
+    bool makeStale(const std::string& name);
+    bool setPortState(Wwn wwpn, std::uint32_t state);
+    /// The lists of adapter attributes, port attributes and statistics are told apart by the attribute's number.
+    bool setAttributeOf(Wwn wwpn, const Attribute& attribute);
+
+private:
+    struct PortPlace
+    {
+        std::size_t adapter, port;
+    };
+
+    // These are called with the lock held.
+    void index();
+    const Adapter* adapterAt(HBA_HANDLE handle) const;
+    const Adapter* findAdapter(Wwn wwpn) const;
+    const Port* findPort(Wwn wwpn) const;
+    /// Index in Scenario::targets of a target that is among `targets`, from a port in `state`; only an online port
+    /// reaches its targets.
+    std::optional<std::size_t> reach(std::uint32_t state, const std::vector<std::size_t>& targets, Wwn wwpn) const;
+
+    /// These take the lock, and give RM_ERROR_INVALID_WWN for a name that is not there.
+    template <class Use> RM_STATUS onAdapter(Wwn wwpn, Use use) const;
+    template <class Use> RM_STATUS onPort(Wwn wwpn, Use use) const;
+    template <class Use> RM_STATUS onVport(Wwn wwpn, Wwn vport, Use use) const;
+
+    mutable std::mutex _mutex;
+    Scenario _scenario;
+    bool _libraryLoaded = false;
+    HBA_HANDLE _lastHandle = 0;
+    std::map<HBA_HANDLE, std::string> _handles; ///< name of the adapter
+
+    // Made from the scenario by index().
+    std::unordered_map<std::string, std::size_t> _adapterByName;
+    std::unordered_map<Wwn, PortPlace> _portByName;
+    std::unordered_map<Wwn, std::size_t> _targetByName;
+    /// For each port of the host, for each of its targets, the names of the units.
+    std::unordered_map<Wwn, std::vector<std::vector<std::string>>> _osDeviceNames;
+};
+
+/// Copies `text` into a field, cut to leave room for the zero byte.
+template <std::size_t Size> void setText(char (&field)[Size], const std::string& text)
+{
+    field[text.copy(field, Size - 1)] = '\0';
+}
+
+} // namespace tvrsim

@@ -1,0 +1,195 @@
+// Functions of the RM library whose names begin with LRM_ in the local and with RM_ in the fallback library. The file
+// is compiled once for each, with TVRSIM_DUAL_PREFIX as the beginning.
+#include "simulator/frontends/FrontEnd.h"
+
+using namespace tvrsim;
+
+#define TVRSIM_JOIN_(prefix, name) prefix##name
+#define TVRSIM_JOIN(prefix, name) TVRSIM_JOIN_(prefix, name)
+/// The exported name of a function.
+#define DUAL(name) TVRSIM_JOIN(TVRSIM_DUAL_PREFIX, name)
+
+extern "C"
+{
+
+    // The declarations tie each signature to that of the RM library's header.
+    TVRSIM_EXPORT RM_InitLib_t DUAL(InitLib);
+    TVRSIM_EXPORT RM_ExitLib_t DUAL(ExitLib);
+    TVRSIM_EXPORT RM_SetDebugTraces_t DUAL(SetDebugTraces);
+    TVRSIM_EXPORT RM_GetHBAAttributes_t DUAL(GetHBAAttributes);
+    TVRSIM_EXPORT RM_GetPortAttributes_t DUAL(GetPortAttributes);
+    TVRSIM_EXPORT RM_GetPortStatistics_t DUAL(GetPortStatistics);
+    TVRSIM_EXPORT RM_GetServerAttributes_t DUAL(GetServerAttributes);
+    TVRSIM_EXPORT RM_GetDriverType_t DUAL(GetDriverType);
+    TVRSIM_EXPORT RM_GetHBAFeature_t DUAL(GetHBAFeature);
+    TVRSIM_EXPORT RM_GetHBAFeatureList_t DUAL(GetHBAFeatureList);
+    TVRSIM_EXPORT RM_GetQoS_t DUAL(GetQoS);
+    TVRSIM_EXPORT RM_DiagReadPCIRegistersV2_t DUAL(DiagReadPCIRegistersV2);
+    TVRSIM_EXPORT RM_GetLunList_t DUAL(GetLunList);
+    TVRSIM_EXPORT RM_ScsiInquiry_t DUAL(ScsiInquiry);
+    TVRSIM_EXPORT RM_VPList_t DUAL(VPList);
+    TVRSIM_EXPORT RM_VPGetAttributes_t DUAL(VPGetAttributes);
+    TVRSIM_EXPORT RM_VPListTargets_t DUAL(VPListTargets);
+    TVRSIM_EXPORT RM_VpScsiReportLUNs_t DUAL(VpScsiReportLUNs);
+    TVRSIM_EXPORT RM_VpScsiInquiry_t DUAL(VpScsiInquiry);
+    TVRSIM_EXPORT RM_VpScsiReadCapacity_t DUAL(VpScsiReadCapacity);
+    TVRSIM_EXPORT RM_GetVMFromVPort_t DUAL(GetVMFromVPort);
+
+    RM_STATUS DUAL(InitLib)()
+    {
+        return callOf(__func__).status([] { return RM_OK; });
+    }
+
+    RM_STATUS DUAL(ExitLib)()
+    {
+        return callOf(__func__).status([] { return RM_OK; });
+    }
+
+    RM_STATUS DUAL(SetDebugTraces)(std::uint32_t)
+    {
+        return callOf(__func__).status([] { return RM_OK; });
+    }
+
+    RM_STATUS DUAL(GetHBAAttributes)(HBA_WWN wwpn, void* buffer, std::uint32_t* size)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.attributes(buffer, size,
+                               [&](auto& list) { return call.host().hbaAttributes(fromHba(wwpn), list); });
+    }
+
+    RM_STATUS DUAL(GetPortAttributes)(HBA_WWN wwpn, void* buffer, std::uint32_t* size)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.attributes(buffer, size,
+                               [&](auto& list) { return call.host().portAttributes(fromHba(wwpn), list); });
+    }
+
+    RM_STATUS DUAL(GetPortStatistics)(HBA_WWN wwpn, void* buffer, std::uint32_t* size)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.attributes(buffer, size,
+                               [&](auto& list) { return call.host().portStatistics(fromHba(wwpn), list); });
+    }
+
+    RM_STATUS DUAL(GetServerAttributes)(HBA_WWN wwpn, void* buffer, std::uint32_t* size)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.attributes(buffer, size,
+                               [&](auto& list) { return call.host().serverAttributes(fromHba(wwpn), list); });
+    }
+
+    RM_STATUS DUAL(GetDriverType)(HBA_WWN wwpn, std::uint32_t* driverType)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(driverType, [&](std::uint32_t& out) { return call.host().driverType(fromHba(wwpn), out); });
+    }
+
+    RM_STATUS DUAL(GetHBAFeature)(HBA_WWN wwpn, std::uint32_t tag, std::uint32_t* value)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(value, [&](std::uint32_t& out) { return call.host().feature(fromHba(wwpn), tag, out); });
+    }
+
+    RM_STATUS DUAL(GetHBAFeatureList)(HBA_WWN wwpn, RM_FeatureList* list)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.list(list, &RM_FeatureList::count,
+                         [&](auto& entries) { return call.host().features(fromHba(wwpn), entries); });
+    }
+
+    RM_STATUS DUAL(GetQoS)(HBA_WWN wwpn, RM_QosInfo* info)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(info, [&](auto& record) { return call.host().qos(fromHba(wwpn), record); });
+    }
+
+    RM_STATUS DUAL(DiagReadPCIRegistersV2)(HBA_WWN wwpn, RM_PciRegisters* registers)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(registers, [&](auto& record) { return call.host().pciRegisters(fromHba(wwpn), record); });
+    }
+
+    RM_STATUS DUAL(GetLunList)(HBA_WWN wwpn, HBA_WWN target, RM_LunList* list)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.list(list, &RM_LunList::count,
+                         [&](auto& entries) { return call.host().luns(fromHba(wwpn), fromHba(target), entries); });
+    }
+
+    RM_STATUS DUAL(ScsiInquiry)(HBA_WWN wwpn, HBA_WWN target, HBA_UINT64 lun, std::uint8_t evpd, std::uint32_t page,
+                                void* response, std::uint32_t responseSize, void* sense, std::uint32_t senseSize)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.scsi(
+            response, responseSize, sense, senseSize,
+            [&](ScsiReply& reply)
+            { return call.host().scsi(fromHba(wwpn), fromHba(target), lun, inquiryCommand(evpd, page), reply); });
+    }
+
+    RM_STATUS DUAL(VPList)(HBA_WWN wwpn, RM_VPortList* list)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.list(list, &RM_VPortList::count,
+                         [&](auto& entries) { return call.host().vports(fromHba(wwpn), entries); });
+    }
+
+    RM_STATUS DUAL(VPGetAttributes)(HBA_WWN wwpn, HBA_WWN vport, RM_VPortAttributes* attributes)
+    {
+        Call call = callOf(__func__, port(vport));
+        return call.record(attributes, [&](auto& record)
+                           { return call.host().vportAttributes(fromHba(wwpn), fromHba(vport), record); });
+    }
+
+    RM_STATUS DUAL(VPListTargets)(HBA_WWN wwpn, HBA_WWN vport, RM_VPortTargetList* list)
+    {
+        Call call = callOf(__func__, port(vport));
+        return call.list(list, &RM_VPortTargetList::count,
+                         [&](auto& entries)
+                         { return call.host().vportTargets(fromHba(wwpn), fromHba(vport), entries); });
+    }
+
+    RM_STATUS DUAL(VpScsiReportLUNs)(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, void* response,
+                                     std::uint32_t responseSize, void* sense, std::uint32_t senseSize)
+    {
+        Call call = callOf(__func__, port(vport));
+        return call.scsi(response, responseSize, sense, senseSize,
+                         [&](ScsiReply& reply)
+                         {
+                             return call.host().vportScsi(fromHba(wwpn), fromHba(vport), fromHba(target), 0,
+                                                          {ScsiOperation::reportLuns}, reply);
+                         });
+    }
+
+    RM_STATUS DUAL(VpScsiInquiry)(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, HBA_UINT64 lun, std::uint8_t evpd,
+                                  std::uint32_t page, void* response, std::uint32_t responseSize, void* sense,
+                                  std::uint32_t senseSize)
+    {
+        Call call = callOf(__func__, port(vport));
+        return call.scsi(response, responseSize, sense, senseSize,
+                         [&](ScsiReply& reply)
+                         {
+                             return call.host().vportScsi(fromHba(wwpn), fromHba(vport), fromHba(target), lun,
+                                                          inquiryCommand(evpd, page), reply);
+                         });
+    }
+
+    RM_STATUS DUAL(VpScsiReadCapacity)(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, HBA_UINT64 lun, void* response,
+                                       std::uint32_t responseSize, void* sense, std::uint32_t senseSize)
+    {
+        Call call = callOf(__func__, port(vport));
+        return call.scsi(response, responseSize, sense, senseSize,
+                         [&](ScsiReply& reply)
+                         {
+                             return call.host().vportScsi(fromHba(wwpn), fromHba(vport), fromHba(target), lun,
+                                                          {ScsiOperation::readCapacity}, reply);
+                         });
+    }
+
+    RM_STATUS DUAL(GetVMFromVPort)(HBA_WWN wwpn, HBA_WWN vport, RM_VirtualMachine* machine)
+    {
+        Call call = callOf(__func__, port(vport));
+        return call.record(machine, [&](auto& record)
+                           { return call.host().vportMachine(fromHba(wwpn), fromHba(vport), record); });
+    }
+
+} // extern "C"

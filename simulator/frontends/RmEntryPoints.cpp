@@ -1,0 +1,62 @@
+// Functions of the RM library whose names begin with RM_ in both libraries.
+#include "simulator/frontends/FrontEnd.h"
+
+using namespace tvrsim;
+
+extern "C"
+{
+
+    TVRSIM_EXPORT RM_GetAttributeValue_t RM_GetAttributeValue;
+    TVRSIM_EXPORT RM_GetVersion_t RM_GetVersion;
+    TVRSIM_EXPORT RM_MiliVersion_t RM_MiliVersion;
+    TVRSIM_EXPORT RM_StatusString_t RM_StatusString;
+    TVRSIM_EXPORT RM_IsLocalHBA_t RM_IsLocalHBA;
+
+    const void* RM_GetAttributeValue(const void* buffer, std::uint32_t id, std::uint32_t* length, RM_STATUS* status)
+    {
+        const void* found = nullptr;
+        Call call = callOf(__func__);
+        const RM_STATUS result = call.status(
+            [&]() -> RM_STATUS
+            {
+                if (!buffer)
+                    return RM_ERROR;
+                const std::span value = findAttribute({static_cast<const std::byte*>(buffer), usedBytes(buffer)}, id);
+                if (!value.data())
+                    return RM_ERROR;
+                found = value.data();
+                if (length)
+                    *length =
+                        call.isHostile(Hostile::hugeLength) ? 0xFFFF'FFFF : static_cast<std::uint32_t>(value.size());
+                return RM_OK;
+            });
+        if (status)
+            *status = result;
+        return found;
+    }
+
+    RM_STATUS RM_GetVersion(char* buffer, std::uint32_t size)
+    {
+        Call call = callOf(__func__);
+        return call.text(buffer, size, [&](std::string& text) { return call.host().libraryVersion(text); });
+    }
+
+    RM_STATUS RM_MiliVersion(char* buffer, std::uint32_t size)
+    {
+        Call call = callOf(__func__);
+        return call.text(buffer, size, [&](std::string& text) { return call.host().miliVersion(text); });
+    }
+
+    RM_STATUS RM_StatusString(RM_STATUS status, char* buffer, std::uint32_t size)
+    {
+        Call call = callOf(__func__);
+        return call.text(buffer, size, [&](std::string& text) { return call.host().statusText(status, text); });
+    }
+
+    RM_STATUS RM_IsLocalHBA(HBA_WWN wwpn, std::uint32_t* isLocal)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(isLocal, [&](std::uint32_t& out) { return call.host().isLocal(fromHba(wwpn), out); });
+    }
+
+} // extern "C"
