@@ -47,8 +47,9 @@ RM_STATUS fetchList(std::vector<Entry>& out, const char* noMemory, const Call& c
         if (status == RM_OK)
         {
             out.resize(std::min(count, room));
-            std::memcpy(static_cast<void*>(out.data()), buffer.get() + offsetof(List, entry),
-                        out.size() * sizeof(Entry));
+            if (!out.empty())
+                std::memcpy(static_cast<void*>(out.data()), buffer.get() + offsetof(List, entry),
+                            out.size() * sizeof(Entry));
         }
         room = std::min(count, maxListRoom);
     }

@@ -37,7 +37,8 @@ std::vector<HBA_UINT64> decodeReportLuns(const std::array<std::uint8_t, reportLu
     constexpr std::size_t header = 8;
     const std::size_t bytes = std::min<std::size_t>(bigEndian(response.data()), reportLunsSize - header);
     std::vector<HBA_UINT64> luns(bytes / sizeof(HBA_UINT64));
-    std::memcpy(luns.data(), response.data() + header, luns.size() * sizeof(HBA_UINT64));
+    if (!luns.empty())
+        std::memcpy(luns.data(), response.data() + header, luns.size() * sizeof(HBA_UINT64));
     return luns;
 }
 

@@ -149,7 +149,8 @@ template <class List, class Entry> RM_STATUS writeList(const char* function, Lis
         return status;
     const std::uint32_t room = list->count;
     auto* entries = reinterpret_cast<char*>(list) + offsetof(List, entry);
-    std::memcpy(entries, all.data(), std::min<std::size_t>(room, all.size()) * sizeof(Entry));
+    if (!all.empty())
+        std::memcpy(entries, all.data(), std::min<std::size_t>(room, all.size()) * sizeof(Entry));
     list->count = static_cast<std::uint32_t>(all.size());
     return all.size() > room ? RM_ERROR_MORE_DATA : RM_OK;
 }
@@ -307,7 +308,7 @@ HBA_STATUS HBA_GetFcpTargetMapping(HBA_HANDLE handle, HBA_FCPTARGETMAPPING* out)
         return host->mapping(out);
     const auto& all = adapterOf(handle).mapping;
     const std::uint32_t room = out->NumberOfEntries;
-    std::memcpy(out->entry, all.data(), std::min<std::size_t>(room, all.size()) * sizeof all[0]);
+    std::copy_n(all.begin(), std::min<std::size_t>(room, all.size()), out->entry);
     out->NumberOfEntries = static_cast<HBA_UINT32>(all.size());
     return all.size() > room ? HBA_STATUS_ERROR_MORE_DATA : HBA_STATUS_OK;
 }

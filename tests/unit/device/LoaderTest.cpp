@@ -4,6 +4,7 @@
 
 #include <gmock/gmock.h>
 #include <set>
+#include <thread>
 
 using namespace cimple;
 using testing::Contains;
@@ -264,6 +265,27 @@ TEST(Loader, AFailedCloseIsLoggedAndKeepsTheLibrary)
     EXPECT_THAT(log.notable(),
                 testing::Each(testing::MatchesRegex("3 dlclose for lib 0x[0-9a-f]+ failed with fake error\n")));
     EXPECT_EQ(LRM_InitLib(), 0);
+}
+
+TEST(Loader, ThreadsMayMeetInTheFirstCall)
+{
+    const DynamicLoader loader = {
+        [](const char*, int) -> void* { return const_cast<char*>("library"); },
+        [](void*, const char*) -> void* { return reinterpret_cast<void*>(+[]() -> RM_STATUS { return 42; }); },
+        [](void*) { return 0; },
+        []() -> const char* { return nullptr; },
+    };
+    const DynamicLoader previous = setDynamicLoader(loader);
+    loadAllLibraries();
+    std::vector<std::thread> threads;
+    std::atomic<int> right{0};
+    for (int i = 0; i < 8; ++i)
+        threads.emplace_back([&] { right += LRM_InitLib() == 42; });
+    for (std::thread& thread : threads)
+        thread.join();
+    EXPECT_EQ(right, 8);
+    unloadAllLibraries();
+    setDynamicLoader(previous);
 }
 
 } // namespace

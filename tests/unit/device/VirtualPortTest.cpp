@@ -37,7 +37,7 @@ TEST_F(VirtualPortTest, ListsGrowToWhatTheLibraryHas)
         std::vector<RM_VPortEntry> out(3);
         EXPECT_EQ(W::ListVPorts(portId, &out), 0);
         ASSERT_THAT(out, SizeIs(count));
-        EXPECT_EQ(std::memcmp(out.data(), host.vports.data(), count * sizeof out[0]), 0);
+        EXPECT_TRUE(count == 0 || std::memcmp(out.data(), host.vports.data(), count * sizeof out[0]) == 0);
     }
     EXPECT_EQ(host.calls["LRM_VPList"], 3 + 2 * 2);
 }
