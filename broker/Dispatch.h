@@ -1,0 +1,54 @@
+// Where an operation goes: to the store or to the module's providers, to one of them or to many.
+#pragma once
+
+#include "broker/Core.h"
+#include "broker/Handles.h"
+#include "broker/Reply.h"
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace broker
+{
+
+/// Answers clients and up-calls alike. Unknown namespace: CMPI_RC_ERR_INVALID_NAMESPACE; unknown class:
+/// CMPI_RC_ERR_INVALID_CLASS. When one of several providers fails, the whole operation fails with its status.
+class Dispatcher
+{
+public:
+    explicit Dispatcher(Core& core) : _core(core) {}
+
+    /// The class's instances and those of its subclasses, each from its own class's provider.
+    Reply enumerateInstances(std::string_view nameSpace, std::string_view className, const PropertyList& properties);
+    NamesReply enumerateInstanceNames(std::string_view nameSpace, std::string_view className);
+    Reply getInstance(const Path& path, const PropertyList& properties);
+    /// The path of the new instance.
+    NamesReply createInstance(const Object& object);
+    Outcome modifyInstance(const Object& object, const PropertyList& properties);
+    Outcome deleteInstance(const Path& path);
+    /// Asked of all association providers that can refer to the path's class; nothing is filtered here.
+    Reply associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties);
+    NamesReply associatorNames(const Path& path, const AssociationFilter& filter);
+    Reply references(const Path& path, const AssociationFilter& filter, const PropertyList& properties);
+    NamesReply referenceNames(const Path& path, const AssociationFilter& filter);
+    MethodReply invokeMethod(const Path& path, const std::string& method, const std::vector<Property>& in);
+
+private:
+    const ClassInfo* findClass(std::string_view nameSpace, std::string_view className, Outcome& outcome);
+    bool servedByModule(std::string_view nameSpace) const;
+    std::vector<Property> contextEntries(std::string_view nameSpace) const;
+    std::vector<Provider*> associationProviders(const Path& path, const AssociationFilter& filter, Outcome& outcome);
+
+    template <Kind K, class Call>
+    ResultContent run(Provider& provider, const std::string& what, std::string_view nameSpace, ResultContent expected,
+                      bool mustBeDone, Outcome& outcome, Call call);
+    template <class Answer, class Collect, class Stored>
+    Answer fanOutClasses(std::string_view nameSpace, std::string_view className, Collect collect, Stored stored);
+    template <class Answer, class Call>
+    Answer fanOutAssociations(const char* operation, const Path& path, const AssociationFilter& filter, Call call);
+
+    Core& _core;
+};
+
+} // namespace broker

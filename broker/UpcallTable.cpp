@@ -1,0 +1,452 @@
+// The table by which a provider calls back into the broker, and the attachment of its own threads.
+#include "broker/BrokerTables.h"
+#include "broker/Core.h"
+#include "broker/Dispatch.h"
+#include "broker/Handles.h"
+#include "broker/Marshal.h"
+
+namespace broker
+{
+
+namespace
+{
+
+/// What an up-call needs; `frame` is null when the call must fail.
+struct Upcall
+{
+    Core* core = nullptr;
+    Frame* frame = nullptr;
+};
+
+/// Checks broker, thread and context. An up-call with a context that is not the thread's current one is reported and
+/// goes on.
+Upcall enter(const CMPIBroker* mb, const CMPIContext* ctx, const char* function, CMPIStatus* rc)
+{
+    Upcall upcall;
+    upcall.core = openBroker(mb, function);
+    if (!upcall.core)
+    {
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        return upcall;
+    }
+    upcall.frame = openFrame(*upcall.core, function, rc);
+    if (upcall.frame && ctx != upcall.frame->context)
+    {
+        upcall.core->violation(std::string(function) + " with a context that is not the thread's current one");
+    }
+    return upcall;
+}
+
+/// The same with the path that most up-calls have.
+struct PathUpcall : Upcall
+{
+    const PathHandle* path = nullptr;
+
+    PathUpcall(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* object, const char* function,
+               CMPIStatus* rc)
+        : Upcall(enter(mb, ctx, function, rc))
+    {
+        path = frame ? open<PathHandle>(object, function, rc) : nullptr;
+    }
+    explicit operator bool() const { return path != nullptr; }
+    const Path& object() const { return path->content.path; }
+    Dispatcher dispatcher() const { return Dispatcher(*core); }
+};
+
+PropertyList propertyList(const char** properties)
+{
+    return properties ? PropertyList(readNames(properties)) : std::nullopt;
+}
+
+std::string text(const char* characters)
+{
+    return characters ? characters : "";
+}
+
+CMPIEnumeration* enumeration(Frame& frame, Reply&& reply, CMPIStatus* rc)
+{
+    setStatus(rc, reply.status);
+    if (!reply.ok())
+    {
+        return nullptr;
+    }
+    EnumerationContent content{CMPI_instance, {}, 0};
+    for (Object& object : reply.objects)
+    {
+        content.elements.push_back(Value::instance(std::move(object)));
+    }
+    return frame.make<EnumerationHandle>(std::move(content));
+}
+
+CMPIEnumeration* enumeration(Frame& frame, NamesReply&& reply, CMPIStatus* rc)
+{
+    setStatus(rc, reply.status);
+    if (!reply.ok())
+    {
+        return nullptr;
+    }
+    EnumerationContent content{CMPI_ref, {}, 0};
+    for (Path& path : reply.paths)
+    {
+        content.elements.push_back(Value::reference(std::move(path)));
+    }
+    return frame.make<EnumerationHandle>(std::move(content));
+}
+
+// --- threads -------------------------------------------------------------------------------------------
+
+CMPIContext* prepareAttachThread(const CMPIBroker* mb, const CMPIContext* ctx)
+{
+    const Upcall upcall = enter(mb, ctx, "prepareAttachThread", nullptr);
+    if (!upcall.frame)
+    {
+        return nullptr;
+    }
+    auto frame = std::make_unique<Frame>(*upcall.core, mb, "attached thread of " + upcall.frame->what,
+                                         upcall.frame->context->content);
+    CMPIContext* context = frame->context;
+    upcall.core->attachments.add(std::move(frame));
+    return context;
+}
+
+CMPIStatus attachThread(const CMPIBroker* mb, const CMPIContext* ctx)
+{
+    Core* core = openBroker(mb, "attachThread");
+    Frame* frame = core ? core->attachments.find(ctx) : nullptr;
+    if (!frame || frame->attached)
+    {
+        reportViolation(core, frame ? "attachThread with a context that is attached"
+                                    : "attachThread with a context that was not prepared for it");
+        return makeStatus(CMPI_RC_ERR_INVALID_PARAMETER);
+    }
+    frame->attached = true;
+    frame->push();
+    return makeStatus(CMPI_RC_OK);
+}
+
+CMPIStatus detachThread(const CMPIBroker* mb, const CMPIContext* ctx)
+{
+    Core* core = openBroker(mb, "detachThread");
+    std::unique_ptr<Frame> frame = core ? core->attachments.take(ctx) : nullptr;
+    if (!frame || (frame->attached && !frame->pop()))
+    {
+        reportViolation(core, "detachThread with a context that is not attached to this thread");
+        return makeStatus(CMPI_RC_ERR_INVALID_PARAMETER);
+    }
+    return makeStatus(CMPI_RC_OK); // the frame's end frees the context and what was made on the thread
+}
+
+// --- instances -----------------------------------------------------------------------------------------
+
+CMPIStatus deliverIndication(const CMPIBroker* mb, const CMPIContext* ctx, const char* ns,
+                             const CMPIInstance* indication)
+{
+    CMPIStatus status{};
+    const Upcall upcall = enter(mb, ctx, "deliverIndication", &status);
+    const auto* handle = upcall.frame ? open<InstanceHandle>(indication, "deliverIndication", &status) : nullptr;
+    if (handle)
+    {
+        Object object = handle->content.object;
+        object.path.nameSpace = text(ns);
+        const std::lock_guard lock(upcall.core->indicationMutex);
+        upcall.core->indications.push_back(std::move(object));
+    }
+    return status;
+}
+
+CMPIEnumeration* enumerateInstanceNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                                        CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "enumerateInstanceNames", rc);
+    return call ? enumeration(
+                      *call.frame,
+                      call.dispatcher().enumerateInstanceNames(call.object().nameSpace, call.object().className), rc)
+                : nullptr;
+}
+
+CMPIEnumeration* enumerateInstances(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                                    const char** properties, CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "enumerateInstances", rc);
+    return call ? enumeration(*call.frame,
+                              call.dispatcher().enumerateInstances(call.object().nameSpace, call.object().className,
+                                                                   propertyList(properties)),
+                              rc)
+                : nullptr;
+}
+
+CMPIInstance* getInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                          const char** properties, CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "getInstance", rc);
+    if (!call)
+    {
+        return nullptr;
+    }
+    Reply reply = call.dispatcher().getInstance(call.object(), propertyList(properties));
+    setStatus(rc, reply.status);
+    return reply.ok() ? makeInstance(*call.frame, std::move(reply.objects.front())) : nullptr;
+}
+
+/// An instance that a provider hands in, under the path that it gives with it.
+Object instanceAt(const InstanceHandle& instance, const Path& path)
+{
+    Object object = instance.content.object;
+    const Path own = instance.content.pathFromKeys();
+    object.path = path;
+    if (path.keys.empty())
+    {
+        object.path.keys = own.keys;
+    }
+    return object;
+}
+
+CMPIObjectPath* createInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                               const CMPIInstance* inst, CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "createInstance", rc);
+    const auto* instance = call ? open<InstanceHandle>(inst, "createInstance", rc) : nullptr;
+    if (!instance)
+    {
+        return nullptr;
+    }
+    NamesReply reply = call.dispatcher().createInstance(instanceAt(*instance, call.object()));
+    setStatus(rc, reply.status);
+    return reply.ok() && !reply.paths.empty() ? makePath(*call.frame, std::move(reply.paths.front())) : nullptr;
+}
+
+CMPIStatus modifyInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                          const CMPIInstance* inst, const char** properties)
+{
+    CMPIStatus status{};
+    const PathUpcall call(mb, ctx, path, "modifyInstance", &status);
+    const auto* instance = call ? open<InstanceHandle>(inst, "modifyInstance", &status) : nullptr;
+    return instance
+               ? makeStatus(
+                     call.dispatcher().modifyInstance(instanceAt(*instance, call.object()), propertyList(properties))
+                         .status)
+               : status;
+}
+
+CMPIStatus deleteInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path)
+{
+    CMPIStatus status{};
+    const PathUpcall call(mb, ctx, path, "deleteInstance", &status);
+    return call ? makeStatus(call.dispatcher().deleteInstance(call.object()).status) : status;
+}
+
+CMPIEnumeration* execQuery(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath*, const char*,
+                           const char*, CMPIStatus* rc)
+{
+    if (enter(mb, ctx, "execQuery", rc).frame)
+    {
+        setStatus(rc, CMPI_RC_ERR_QUERY_LANGUAGE_NOT_SUPPORTED);
+    }
+    return nullptr;
+}
+
+// --- associations --------------------------------------------------------------------------------------
+
+CMPIEnumeration* associators(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                             const char* assocClass, const char* resultClass, const char* role, const char* resultRole,
+                             const char** properties, CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "associators", rc);
+    return call ? enumeration(*call.frame,
+                              call.dispatcher().associators(
+                                  call.object(), {text(assocClass), text(resultClass), text(role), text(resultRole)},
+                                  propertyList(properties)),
+                              rc)
+                : nullptr;
+}
+
+CMPIEnumeration* associatorNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                                 const char* assocClass, const char* resultClass, const char* role,
+                                 const char* resultRole, CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "associatorNames", rc);
+    return call ? enumeration(*call.frame,
+                              call.dispatcher().associatorNames(
+                                  call.object(), {text(assocClass), text(resultClass), text(role), text(resultRole)}),
+                              rc)
+                : nullptr;
+}
+
+CMPIEnumeration* references(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                            const char* resultClass, const char* role, const char** properties, CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "references", rc);
+    return call ? enumeration(*call.frame,
+                              call.dispatcher().references(call.object(), {text(resultClass), "", text(role), ""},
+                                                           propertyList(properties)),
+                              rc)
+                : nullptr;
+}
+
+CMPIEnumeration* referenceNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
+                                const char* resultClass, const char* role, CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "referenceNames", rc);
+    return call ? enumeration(
+                      *call.frame,
+                      call.dispatcher().referenceNames(call.object(), {text(resultClass), "", text(role), ""}), rc)
+                : nullptr;
+}
+
+// --- methods and properties ----------------------------------------------------------------------------
+
+CMPIData invokeMethod(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path, const char* method,
+                      const CMPIArgs* in, CMPIArgs* out, CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "invokeMethod", rc);
+    const ArgsHandle* inArgs = call && in ? open<ArgsHandle>(in, "invokeMethod", rc) : nullptr;
+    ArgsHandle* outArgs = call && out ? open<ArgsHandle>(out, "invokeMethod", rc) : nullptr;
+    if (!call || (in && !inArgs) || (out && !outArgs))
+    {
+        return nullData(CMPI_null, CMPI_badValue);
+    }
+    MethodReply reply = call.dispatcher().invokeMethod(call.object(), text(method),
+                                                       inArgs ? inArgs->content.args : std::vector<Property>());
+    setStatus(rc, reply.status);
+    if (!reply.ok())
+    {
+        return nullData(CMPI_null, CMPI_badValue);
+    }
+    if (outArgs)
+    {
+        outArgs->content.args = std::move(reply.out);
+    }
+    return toCmpi(*call.frame, reply.returnValue);
+}
+
+CMPIStatus setProperty(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path, const char* name,
+                       const CMPIValue* value, CMPIType type)
+{
+    CMPIStatus status{};
+    const PathUpcall call(mb, ctx, path, "setProperty", &status);
+    if (!call || !name)
+    {
+        return call ? makeStatus(CMPI_RC_ERR_INVALID_PARAMETER) : status;
+    }
+    Value read = fromCmpi(*call.core, value, type, "setProperty", status);
+    if (status.rc != CMPI_RC_OK)
+    {
+        return status;
+    }
+    const Object object{call.object(), {{name, std::move(read)}}};
+    return makeStatus(call.dispatcher().modifyInstance(object, std::vector<std::string>{name}).status);
+}
+
+CMPIData getProperty(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path, const char* name,
+                     CMPIStatus* rc)
+{
+    const PathUpcall call(mb, ctx, path, "getProperty", rc);
+    if (!call)
+    {
+        return nullData(CMPI_null, CMPI_badValue);
+    }
+    if (!name || !call.path->content.info || !call.path->content.info->property(name))
+    {
+        setStatus(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        return nullData(CMPI_null, CMPI_notFound);
+    }
+    const Reply reply = call.dispatcher().getInstance(call.object(), std::vector<std::string>{name});
+    setStatus(rc, reply.status);
+    const Value null = Value::null(call.path->content.info->property(name)->type);
+    const bool set = reply.ok() && reply.objects.front().has(name);
+    return toCmpi(*call.frame, set ? reply.objects.front().get(name) : null);
+}
+
+// --- marks ---------------------------------------------------------------------------------------------
+
+/// The head of the table that a broker of CMPI 2.0 has behind the four of 1.0.
+struct MarkTable
+{
+    int ftVersion;
+    void* (*mark)(const CMPIBroker* mb, CMPIStatus* rc);
+    CMPIStatus (*release)(const CMPIBroker* mb, const void* mark);
+};
+
+void* takeMark(const CMPIBroker* mb, CMPIStatus* rc)
+{
+    Core* core = openBroker(mb, "mark");
+    setStatus(rc, core ? CMPI_RC_OK : CMPI_RC_ERR_INVALID_HANDLE);
+    if (core)
+    {
+        ++core->openMarks;
+    }
+    return core;
+}
+
+CMPIStatus releaseMark(const CMPIBroker* mb, const void* mark)
+{
+    Core* core = openBroker(mb, "release");
+    if (!core || mark != core || core->openMarks == 0)
+    {
+        reportViolation(core, "release of a mark that was not taken");
+        return makeStatus(CMPI_RC_ERR_INVALID_HANDLE);
+    }
+    --core->openMarks;
+    return makeStatus(CMPI_RC_OK);
+}
+
+const MarkTable markTable{.ftVersion = 200, .mark = takeMark, .release = releaseMark};
+
+} // namespace
+
+const CMPIBrokerFT upcallTable{
+    .brokerCapabilities = CMPI_MB_InstanceManipulation | CMPI_MB_AssociationTraversal | CMPI_MB_OSEncapsulationSupport,
+    .brokerVersion = 100,
+    .brokerName = "tvrcim",
+    .prepareAttachThread = prepareAttachThread,
+    .attachThread = attachThread,
+    .detachThread = detachThread,
+    .deliverIndication = deliverIndication,
+    .enumerateInstanceNames = enumerateInstanceNames,
+    .getInstance = getInstance,
+    .createInstance = createInstance,
+    .modifyInstance = modifyInstance,
+    .deleteInstance = deleteInstance,
+    .execQuery = execQuery,
+    .enumerateInstances = enumerateInstances,
+    .associators = associators,
+    .associatorNames = associatorNames,
+    .references = references,
+    .referenceNames = referenceNames,
+    .invokeMethod = invokeMethod,
+    .setProperty = setProperty,
+    .getProperty = getProperty,
+};
+
+void fillProviderBroker(ProviderBroker& broker, Core& core)
+{
+    static const CMPIBrokerFT upcallTableWithMarks = []
+    {
+        CMPIBrokerFT table = upcallTable;
+        table.brokerVersion = 200; // announces the fifth pointer
+        return table;
+    }();
+    broker.cmpi.hdl = &core;
+    broker.cmpi.bft = core.options.marks ? &upcallTableWithMarks : &upcallTable;
+    broker.cmpi.eft = &factoryTable;
+    broker.cmpi.xft = &servicesTable;
+    broker.marks = core.options.marks ? &markTable : nullptr;
+}
+
+Core* openBroker(const CMPIBroker* broker, const char* function)
+{
+    if (!broker || broker->eft != &factoryTable)
+    {
+        reportViolation(nullptr, std::string(function) + " of a broker that is not this one");
+        return nullptr;
+    }
+    auto* core = static_cast<Core*>(broker->hdl);
+    const Frame* frame = Frame::current(*core);
+    if (frame && frame->broker != broker)
+    {
+        core->violation(std::string(function) + " through a broker pointer that this provider was not given");
+    }
+    return core;
+}
+
+} // namespace broker
