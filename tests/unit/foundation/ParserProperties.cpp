@@ -113,7 +113,7 @@ TEST(LogDataLaws, WhatIsAcceptedIsInRange)
             RC_ASSERT(data.level >= 0 && data.level <= 5);
             RC_ASSERT(data.enabled.value() >= 0);
             RC_ASSERT(data.path.size() < logDataSecondLine);
-            RC_ASSERT(data.path.find_first_of(std::string("\r\n\0", 3)) == std::string::npos);
+            RC_ASSERT(data.path.find_first_of(std::string("\n\0", 2)) == std::string::npos);
             RC_ASSERT(modeWritesFile(data.mode) || data.path.empty());
         }));
 }
