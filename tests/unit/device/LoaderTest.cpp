@@ -2,6 +2,7 @@
 
 #include "device/Bindings.h"
 
+#include <dlfcn.h>
 #include <gmock/gmock.h>
 #include <set>
 #include <thread>
@@ -286,6 +287,20 @@ TEST(Loader, ThreadsMayMeetInTheFirstCall)
     EXPECT_EQ(right, 8);
     unloadAllLibraries();
     setDynamicLoader(previous);
+}
+
+TEST(Loader, TheSystemsLoaderIsInPlaceByDefault)
+{
+    const DynamicLoader system = setDynamicLoader({});
+    setDynamicLoader(system);
+    void* library = system.open("libc.so.6", RTLD_NOW);
+    ASSERT_NE(library, nullptr);
+    EXPECT_NE(system.symbol(library, "getpid"), nullptr);
+    EXPECT_EQ(system.symbol(library, "LRM_InitLib"), nullptr);
+    EXPECT_NE(system.error(), nullptr);
+    EXPECT_EQ(system.close(library), 0);
+    EXPECT_EQ(system.open("libno_such_library.so", RTLD_NOW), nullptr);
+    EXPECT_THAT(system.error(), testing::HasSubstr("libno_such_library.so"));
 }
 
 } // namespace
