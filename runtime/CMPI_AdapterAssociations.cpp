@@ -1,0 +1,303 @@
+// Association operations, with the fallback that saves every association provider from writing them: the
+// adapter enumerates the association's instances and follows those that lead to the source.
+#include "runtime/CMPI_AdapterFrame.h"
+
+#include "runtime/Converter.h"
+
+#include <algorithm>
+#include <iterator>
+
+namespace cimple
+{
+
+namespace
+{
+
+/// Association classes have two ends; room for more, as the ends of one instance.
+constexpr std::size_t max_ends = 16;
+
+bool is_association(const CMPI_Adapter& adapter)
+{
+    return adapter.meta_class && (adapter.meta_class->flags & META_ASSOCIATION);
+}
+
+bool is_one_of(int number, std::initializer_list<int> numbers)
+{
+    return std::find(numbers.begin(), numbers.end(), number) != numbers.end();
+}
+
+/// A client's filter by class: none, or the class or one of its superclasses.
+bool fits_class(const Meta_Class* mc, const char* filter)
+{
+    return !filter || !*filter || is_or_derives_from(mc, filter);
+}
+
+/// Answer of the fallback's enumeration in the numbers of the operation that it stands for.
+int fallback_status(int enumerated, int failed, int access_denied)
+{
+    if (enumerated == ENUM_INSTANCES_FAILED)
+        return failed;
+    return enumerated == ENUM_INSTANCES_ACCESS_DENIED ? access_denied : PROVIDER_OK;
+}
+
+/// A handler and its client, which the fallback feeds.
+struct Receiver
+{
+    Instance_Handler handler;
+    void* client;
+
+    /// Gives the instance away; true to go on.
+    bool give(Instance* instance) const { return handler(instance, PROVIDER_OK, client); }
+    void end() const { handler(nullptr, PROVIDER_OK, client); }
+};
+
+// --- references ---------------------------------------------------------------------------------------------
+
+struct Reference_Search
+{
+    const Instance* source;
+    const char* role;
+    Receiver receiver;
+};
+
+bool pass_matching_reference(Instance* association, int, void* client)
+{
+    Ref<> owned(association);
+    const auto& search = *static_cast<const Reference_Search*>(client);
+    if (!association)
+        return false;
+    if (!references_match(search.source, association, search.role))
+        return true;
+    return search.receiver.give(owned.release());
+}
+
+int references_with_fallback(const CMPI_Adapter& adapter, const Instance* source, const Instance* model,
+                             const char* result_class, const char* role, const Receiver& receiver)
+{
+    if (!is_association(adapter))
+        return REFERENCES_FAILED;
+    const int answer =
+        adapter.call(OP_REFERENCES, adapter.provider, source, model, role, receiver.handler, receiver.client);
+    if (is_one_of(answer, {PROVIDER_OK, REFERENCES_FAILED, REFERENCES_ACCESS_DENIED}))
+        return answer;
+
+    int enumerated = PROVIDER_OK;
+    if (fits_class(adapter.meta_class, result_class)) // servers leave this filter to the provider
+    {
+        Reference_Search search{source, role, receiver};
+        enumerated = adapter.call(OP_ENUM_INSTANCES, adapter.provider, model, Instance_Handler(pass_matching_reference),
+                                  &search);
+    }
+    receiver.end();
+    return fallback_status(enumerated, REFERENCES_FAILED, REFERENCES_ACCESS_DENIED);
+}
+
+bool send_reference_name(Reply& reply, Instance* association)
+{
+    nullify(association, false, true, 1);
+    return reply.send_path(association, reply.name_space.c_str());
+}
+
+bool send_reference(Reply& reply, Instance* association)
+{
+    filter_properties(association, reply.properties, false);
+    return reply.send_instance(association, reply.name_space.c_str());
+}
+
+/// The rest of both reference operations: what differs is how the model is cut and how results are sent.
+template <class CutModel>
+Outcome answer_references(const CMPI_Adapter& adapter, const CMPIObjectPath* path, const char* result_class,
+                          const char* role, CutModel cut_model, Instance_Handler handler, Reply& reply)
+{
+    const Meta_Class* mc = adapter.find_class(path);
+    if (!mc) // a client that walks associations sees an empty result, and goes on
+        return {reply.done(), CMPI_RC_ERR_INVALID_CLASS};
+    Ref<> source;
+    if (const CMPIrc rc = make_cimple_reference(mc, path, *source.out()); rc != CMPI_RC_OK)
+        return rc;
+    const Ref<> model(adapter.meta_class ? create(adapter.meta_class) : nullptr);
+    if (!model)
+        return CMPI_RC_ERR_FAILED;
+    cut_model(model.get());
+    const CMPIrc rc = cmpi_status_of(
+        references_with_fallback(adapter, source.get(), model.get(), result_class, role, {handler, &reply}));
+    return rc != CMPI_RC_OK ? rc : reply.done();
+}
+
+CMPIStatus referenceNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                          const CMPIObjectPath* path, const char* resultClass, const char* role)
+{
+    return operate(mi, context, "referenceNames",
+                   [&](CMPI_Adapter& adapter)
+                   {
+                       Reply reply(adapter, context, result, path);
+                       const auto cut = [](Instance* model) { nullify(model, false, true, 1); };
+                       return answer_references(adapter, path, resultClass, role, cut,
+                                                reply_handler<send_reference_name>, reply);
+                   });
+}
+
+CMPIStatus references(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                      const CMPIObjectPath* path, const char* resultClass, const char* role, const char** properties)
+{
+    return operate(mi, context, "references",
+                   [&](CMPI_Adapter& adapter)
+                   {
+                       Reply reply(adapter, context, result, path, properties);
+                       const auto cut = [&](Instance* model) { filter_properties(model, properties, true); };
+                       return answer_references(adapter, path, resultClass, role, cut, reply_handler<send_reference>,
+                                                reply);
+                   });
+}
+
+// --- associators --------------------------------------------------------------------------------------------
+
+/// The client's filters; each may be null or empty.
+struct Association_Filters
+{
+    const char* assoc_class;
+    const char* result_class;
+    const char* role;
+    const char* result_role;
+};
+
+struct Associator_Search
+{
+    const Instance* source;
+    const Association_Filters& filters;
+    Receiver receiver;
+};
+
+bool pass_associators(Instance* association, int, void* client)
+{
+    const Ref<> owned(association);
+    const auto& search = *static_cast<const Associator_Search*>(client);
+    if (!association)
+        return false;
+    const Association_Filters& filters = search.filters;
+    const Instance* ends[max_ends];
+    const std::ptrdiff_t count = get_associators(search.source, association, filters.assoc_class, filters.result_class,
+                                                 filters.role, filters.result_role, ends, std::size(ends));
+    bool go_on = true;
+    for (std::ptrdiff_t i = 0; i < count; ++i)
+    {
+        if (go_on)
+            go_on = search.receiver.give(const_cast<Instance*>(ends[i]));
+        else
+            unref(ends[i]);
+    }
+    return go_on;
+}
+
+int associators_with_fallback(const CMPI_Adapter& adapter, const Instance* source, const Association_Filters& filters,
+                              const Receiver& receiver)
+{
+    if (!is_association(adapter))
+        return ASSOCIATORS_FAILED;
+    const int answer = adapter.call(OP_ASSOCIATORS, adapter.provider, source, filters.assoc_class, filters.result_class,
+                                    filters.role, filters.result_role, receiver.handler, receiver.client);
+    if (is_one_of(answer, {PROVIDER_OK, ASSOCIATORS_FAILED, ASSOCIATORS_ACCESS_DENIED}))
+        return answer;
+
+    const Ref<> model(create(adapter.meta_class));
+    nullify(model.get(), false, true, 1);
+    Associator_Search search{source, filters, receiver};
+    const int enumerated =
+        adapter.call(OP_ENUM_INSTANCES, adapter.provider, model.get(), Instance_Handler(pass_associators), &search);
+    receiver.end();
+    return fallback_status(enumerated, ASSOCIATORS_FAILED, ASSOCIATORS_ACCESS_DENIED);
+}
+
+/// Ends of associations may live in another namespace than the association.
+const char* name_space_of(const Reply& reply, const Instance* referent)
+{
+    return referent->__name_space.empty() ? reply.name_space.c_str() : referent->__name_space.c_str();
+}
+
+bool send_associator_name(Reply& reply, Instance* referent)
+{
+    return reply.send_path(referent, name_space_of(reply, referent));
+}
+
+/// The referent's own provider serves the instance; the association holds only its keys.
+bool fetch_associator(Reply& reply, Instance* referent)
+{
+    return reply.send_fetched(referent, name_space_of(reply, referent));
+}
+
+bool send_associator(Reply& reply, Instance* referent)
+{
+    return reply.send_instance(referent, name_space_of(reply, referent));
+}
+
+CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                           const CMPIObjectPath* path, const char* assocClass, const char* resultClass,
+                           const char* role, const char* resultRole)
+{
+    return operate(mi, context, "associatorNames",
+                   [&](CMPI_Adapter& adapter) -> CMPIrc
+                   {
+                       const Meta_Class* mc = adapter.find_class(path);
+                       if (!mc)
+                           return CMPI_RC_OK;
+                       Ref<> source;
+                       if (const CMPIrc rc = make_cimple_reference(mc, path, *source.out()); rc != CMPI_RC_OK)
+                           return rc;
+                       Reply reply(adapter, context, result, path);
+                       const CMPIrc rc = cmpi_status_of(
+                           associators_with_fallback(adapter, source.get(), {assocClass, resultClass, role, resultRole},
+                                                     {reply_handler<send_associator_name>, &reply}));
+                       return rc != CMPI_RC_OK ? rc : reply.done();
+                   });
+}
+
+/// Asks the provider for whole instances first, and falls back on fetching each end from the broker.
+CMPIrc answer_associators(const CMPI_Adapter& adapter, const Instance* source, const Association_Filters& filters,
+                          Reply& reply)
+{
+    const int answer =
+        adapter.call(OP_ASSOCIATORS_WITH_PROPERTIES, adapter.provider, source, filters.assoc_class,
+                     filters.result_class, filters.role, filters.result_role, reply_handler<send_associator>, &reply);
+    if (is_one_of(answer, {PROVIDER_OK, ASSOCIATORS_PROPERTIES_FAILED, ASSOCIATORS_PROPERTIES_ACCESS_DENIED}))
+        return cmpi_status_of(answer);
+    return cmpi_status_of(
+        associators_with_fallback(adapter, source, filters, {reply_handler<fetch_associator>, &reply}));
+}
+
+CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                       const CMPIObjectPath* path, const char* assocClass, const char* resultClass, const char* role,
+                       const char* resultRole, const char** properties)
+{
+    return operate(mi, context, "associators",
+                   [&](CMPI_Adapter& adapter) -> CMPIrc
+                   {
+                       const Meta_Class* mc = adapter.find_class(path);
+                       if (!mc)
+                           return CMPI_RC_OK;
+                       Ref<> source;
+                       if (const CMPIrc rc = make_cimple_reference(mc, path, *source.out()); rc != CMPI_RC_OK)
+                           return rc;
+                       Reply reply(adapter, context, result, path, properties);
+                       const CMPIrc rc = answer_associators(adapter, source.get(),
+                                                            {assocClass, resultClass, role, resultRole}, reply);
+                       return rc != CMPI_RC_OK ? rc : reply.done();
+                   });
+}
+
+} // namespace
+
+void fill_association_functions(CMPIAssociationMIFT& table)
+{
+    replace_table(table, CMPIAssociationMIFT{
+                             .ftVersion = CMPIVersion100,
+                             .miVersion = CMPIVersion100,
+                             .miName = nullptr,
+                             .cleanup = cleanup<CMPIAssociationMI>,
+                             .associators = associators,
+                             .associatorNames = associatorNames,
+                             .references = references,
+                             .referenceNames = referenceNames,
+                         });
+}
+
+} // namespace cimple

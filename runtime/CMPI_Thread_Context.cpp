@@ -1,0 +1,254 @@
+#include "runtime/CMPI_Thread_Context.h"
+
+#include "runtime/CMPI_Adapter.h"
+#include "runtime/CmpiContainers.h"
+#include "runtime/Converter.h"
+#include "runtime/InstanceSlots.h"
+#include "runtime/RuntimeLog.h"
+
+#include <new>
+#include <utility>
+
+namespace cimple
+{
+
+// --- threads ------------------------------------------------------------------------------------------------
+
+Thread_Context* CMPI_Thread_Context::thread_create_hook(void*)
+{
+    const CMPIContext* prepared = CBPrepareAttachThread(broker, context);
+    return prepared ? new CMPI_Thread_Context(broker, prepared, adapter) : nullptr;
+}
+
+void CMPI_Thread_Context::thread_start_hook()
+{
+    CBAttachThread(broker, context);
+    _attached = true;
+    if (const Broker_Memory_FT* memory = broker_memory(broker))
+        _mark = memory->mark(broker, nullptr);
+}
+
+void CMPI_Thread_Context::thread_exit_hook()
+{
+    // A thread that ends early through Thread::exit() may have a context of a broker's call on top, which has
+    // nothing to detach.
+    if (!_attached)
+        return;
+    _attached = false;
+    // One of the brokers frees what a thread got from it only here, and crashes at the thread's end without it.
+    if (void* mark = std::exchange(_mark, nullptr))
+        broker_memory(broker)->release(broker, mark);
+    CBDetachThread(broker, context);
+    context = nullptr; // freed by the broker
+}
+
+// --- enumeration --------------------------------------------------------------------------------------------
+
+struct Instance_Enumeration
+{
+    CMPIEnumeration* enumeration;
+    const Meta_Class* meta_class;
+    Ref<> current; ///< null at the end
+};
+
+namespace
+{
+
+/// Anything but an instance of the class ends the iteration.
+Ref<> fetch(CMPIEnumeration* enumeration, const Meta_Class* mc)
+{
+    Ref<> instance;
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    if (!CMHasNext(enumeration, &status) || status.rc != CMPI_RC_OK)
+        return instance;
+    const CMPIData data = CMGetNext(enumeration, &status);
+    if (status.rc != CMPI_RC_OK || data.type != CMPI_instance || CMIsNullValue(data) || !data.value.inst)
+        return instance;
+    const CMPIObjectPath* path = CMGetObjectPath(data.value.inst, &status);
+    if (!path || status.rc != CMPI_RC_OK)
+        return instance;
+    if (make_cimple_instance(mc, path, data.value.inst, *instance.out()) != CMPI_RC_OK)
+        instance.reset();
+    return instance;
+}
+
+} // namespace
+
+Instance_Enumeration* CMPI_Thread_Context::instance_enumerator_create(const char* name_space, const Instance* model)
+{
+    CMPIObjectPath* path = path_of(name_space, model);
+    if (!path)
+        return nullptr;
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIEnumeration* enumeration = CBEnumInstances(broker, context, path, nullptr, &status);
+    if (!enumeration || status.rc != CMPI_RC_OK)
+        return nullptr;
+    const Meta_Class* mc = model->__meta_class;
+    return new Instance_Enumeration{enumeration, mc, fetch(enumeration, mc)};
+}
+
+void CMPI_Thread_Context::instance_enumerator_destroy(Instance_Enumeration* enumeration)
+{
+    delete enumeration; // the broker's part belongs to the broker
+}
+
+bool CMPI_Thread_Context::instance_enumerator_more(Instance_Enumeration* enumeration)
+{
+    return static_cast<bool>(enumeration->current);
+}
+
+void CMPI_Thread_Context::instance_enumerator_next(Instance_Enumeration* enumeration)
+{
+    if (enumeration->current)
+        enumeration->current = fetch(enumeration->enumeration, enumeration->meta_class);
+}
+
+Instance* CMPI_Thread_Context::instance_enumerator_get(Instance_Enumeration* enumeration)
+{
+    return Ref<>(enumeration->current).release();
+}
+
+// --- single instances ---------------------------------------------------------------------------------------
+
+CMPIObjectPath* CMPI_Thread_Context::path_of(const char* name_space, const Instance* instance)
+{
+    CMPIObjectPath* path = nullptr;
+    if (!instance || make_cmpi_object_path(broker, instance, name_space, path) != CMPI_RC_OK)
+        return nullptr;
+    return path;
+}
+
+CMPIInstance* CMPI_Thread_Context::instance_of(const char* name_space, const Instance* instance, CMPIObjectPath* path)
+{
+    CMPIInstance* inst = nullptr;
+    if (!path || make_cmpi_instance(broker, instance, name_space, path, nullptr, inst) != CMPI_RC_OK)
+        return nullptr;
+    return inst;
+}
+
+Instance* CMPI_Thread_Context::get_instance(const char* name_space, const Instance* model)
+{
+    CMPIObjectPath* path = path_of(name_space, model);
+    if (!path)
+        return nullptr;
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIInstance* inst = CBGetInstance(broker, context, path, nullptr, &status);
+    if (!inst || status.rc != CMPI_RC_OK)
+        return nullptr;
+    Instance* instance = nullptr;
+    return make_cimple_instance(model->__meta_class, path, inst, instance) == CMPI_RC_OK ? instance : nullptr;
+}
+
+int CMPI_Thread_Context::create_instance(const char* name_space, const Instance* instance)
+{
+    CMPIObjectPath* path = path_of(name_space, instance);
+    CMPIInstance* inst = instance_of(name_space, instance, path);
+    if (!inst)
+        return -1;
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CBCreateInstance(broker, context, path, inst, &status);
+    return status.rc == CMPI_RC_OK ? 0 : -1;
+}
+
+int CMPI_Thread_Context::modify_instance(const char* name_space, const Instance* instance)
+{
+    CMPIObjectPath* path = path_of(name_space, instance);
+    CMPIInstance* inst = instance_of(name_space, instance, path);
+    return inst && CBModifyInstance(broker, context, path, inst, nullptr).rc == CMPI_RC_OK ? 0 : -1;
+}
+
+int CMPI_Thread_Context::delete_instance(const char* name_space, const Instance* instance)
+{
+    CMPIObjectPath* path = path_of(name_space, instance);
+    return path && CBDeleteInstance(broker, context, path).rc == CMPI_RC_OK ? 0 : -1;
+}
+
+// --- methods ------------------------------------------------------------------------------------------------
+
+namespace
+{
+
+/// Reads `Out` parameters back into the record; entries of other names or types are logged and skipped.
+void read_out_arguments(const CMPIArgs* out, const Meta_Repository* repository, Instance* method)
+{
+    CMPIArgs_Container container(nullptr, repository, nullptr, const_cast<CMPIArgs*>(out));
+    Ref<> results;
+    container.convert(method->__meta_class, META_OUT, *results.out());
+    for (const Meta_Feature* mf : features_of(method))
+    {
+        Value value;
+        if ((mf->flags & META_OUT) && read_feature(results.get(), mf, value) == 0)
+            assign(method, mf, value);
+    }
+}
+
+int read_return_value(const CMPIData& data, const Meta_Repository* repository, Instance* method)
+{
+    const Meta_Feature* mf = find_feature(method->__meta_class, "return_value", property_or_reference);
+    Value value;
+    if (!mf || cmpi_to_cimple_value(repository, data, value) != 0 || assign(method, mf, value) != Assign_Result::ok)
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+    return 0;
+}
+
+} // namespace
+
+int CMPI_Thread_Context::invoke_method(const char* name_space, const Instance* reference, Instance* method)
+{
+    if (!name_space || !reference || !method)
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+    const Meta_Repository* repository = reference->__meta_class->meta_repository;
+    if (!repository)
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+    if (!top())
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+    if (!broker)
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+    if (!context)
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    const Meta_Record* record = method->__meta_class;
+    CMPIObjectPath* path = record->flags & META_STATIC
+                               ? CMNewObjectPath(broker, name_space, reference->__meta_class->name, &status)
+                               : path_of(name_space, reference);
+    if (!path || status.rc != CMPI_RC_OK)
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+    CMPIArgs* in = CMNewArgs(broker, &status);
+    if (!in || status.rc != CMPI_RC_OK)
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+    CMPIArgs* out = CMNewArgs(broker, &status);
+    if (!out || status.rc != CMPI_RC_OK)
+        return RUNTIME_LOG(LOG_WARN, "failed"), -1;
+
+    CMPIArgs_Container(broker, repository, name_space, in).convert(method, META_IN);
+    const CMPIData data = CBInvokeMethod(broker, context, path, record->name, in, out, &status);
+    if (status.rc != CMPI_RC_OK)
+        return RUNTIME_LOG(LOG_WARN, "failed[%u]", static_cast<unsigned>(status.rc)), -1;
+    read_out_arguments(out, repository, method);
+    return read_return_value(data, repository, method);
+}
+
+// --- the rest -----------------------------------------------------------------------------------------------
+
+void CMPI_Thread_Context::allow_unload(bool allow)
+{
+    if (adapter)
+        adapter->allow_unload = allow;
+}
+
+bool CMPI_Thread_Context::get_username(String& username)
+{
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIData data = {};
+    if (context)
+        data = CMGetContextEntry(context, CMPIPrincipal, &status);
+    if (!context || status.rc != CMPI_RC_OK || CMIsNullValue(data) || data.type != CMPI_string)
+        return RUNTIME_LOG(LOG_ERR, "username not OK cmpirc=%d", static_cast<int>(status.rc)), false;
+    // Without authentication one broker gives an empty text, another a string without text.
+    username.clear();
+    text_of(data.value.string, username);
+    return true;
+}
+
+} // namespace cimple
