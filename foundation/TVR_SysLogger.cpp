@@ -19,18 +19,41 @@ bool startsWith(const char* text, const char* start, std::size_t size)
     return std::strncmp(text, start, size) == 0;
 }
 
+/// The C library keeps the identity by its address, so it has to forget it before this library is unmapped, even when
+/// the sink is still there by then.
+class Connection
+{
+public:
+    ~Connection() { close(); }
+    void open()
+    {
+        openlog("[TVR][CIM][FC]", LOG_NDELAY | LOG_NOWAIT, LOG_USER);
+        _isOpen = true;
+    }
+    void close()
+    {
+        if (_isOpen.exchange(false))
+            closelog();
+    }
+
+private:
+    std::atomic<bool> _isOpen{false};
+};
+
+Connection connection;
+
 } // namespace
 
 TVR_SysLogger::TVR_SysLogger()
 {
     TVR_Logger::instance().addSink(this);
-    openlog("[TVR][CIM][FC]", LOG_NDELAY | LOG_NOWAIT, LOG_USER);
+    connection.open();
 }
 
 TVR_SysLogger::~TVR_SysLogger()
 {
     TVR_Logger::instance().removeSink(this);
-    closelog();
+    connection.close();
 }
 
 void TVR_SysLogger::write(int level, const char* message)

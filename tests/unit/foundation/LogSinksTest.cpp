@@ -21,10 +21,22 @@ struct SysLogCall
     std::string text;
 };
 std::vector<SysLogCall> sysLogCalls;
+std::vector<std::string> connectionCalls;
 
 } // namespace
 
-/// Takes the place of the C library's for this program.
+// These take the place of the C library's in this program.
+
+extern "C" void openlog(const char* identity, int options, int facility)
+{
+    connectionCalls.push_back(std::string(identity) + " " + std::to_string(options) + " " + std::to_string(facility));
+}
+
+extern "C" void closelog()
+{
+    connectionCalls.push_back("close");
+}
+
 extern "C" void syslog(int priority, const char* format, ...)
 {
     char text[4096];
@@ -228,8 +240,21 @@ TEST_F(RingSink, CutsLongTextsBetweenCharacters)
 class SystemLogSink : public LogTest
 {
 protected:
-    SystemLogSink() { sysLogCalls.clear(); }
+    SystemLogSink()
+    {
+        sysLogCalls.clear();
+        connectionCalls.clear();
+    }
 };
+
+TEST_F(SystemLogSink, HoldsTheConnectionForItsLife)
+{
+    {
+        const TVR_SysLogger sink;
+        EXPECT_THAT(connectionCalls, ElementsAre("[TVR][CIM][FC] 24 8"));
+    }
+    EXPECT_THAT(connectionCalls, ElementsAre("[TVR][CIM][FC] 24 8", "close"));
+}
 
 TEST_F(SystemLogSink, IsSilentForTheLevelsInUse)
 {
