@@ -51,6 +51,20 @@ struct Receiver
     void end() const { handler(nullptr, PROVIDER_OK, client); }
 };
 
+/// Runs `CMPIrc answer(const Instance* source)` with the keys of the path, and ends the reply of a success.
+template <class Answer>
+Outcome answer_from(const CMPI_Adapter& adapter, const CMPIObjectPath* path, Reply& reply, Answer answer)
+{
+    const Meta_Class* mc = adapter.find_class(path);
+    if (!mc) // a client that walks associations sees an empty result, and goes on
+        return {reply.done(), CMPI_RC_ERR_INVALID_CLASS};
+    Ref<> source;
+    if (const CMPIrc rc = make_cimple_reference(mc, path, *source.out()); rc != CMPI_RC_OK)
+        return rc;
+    const CMPIrc rc = answer(source.get());
+    return rc != CMPI_RC_OK ? rc : reply.done();
+}
+
 // --- references ---------------------------------------------------------------------------------------------
 
 struct Reference_Search
@@ -104,24 +118,17 @@ bool send_reference(Reply& reply, Instance* association)
     return reply.send_instance(association, reply.name_space.c_str());
 }
 
-/// The rest of both reference operations: what differs is how the model is cut and how results are sent.
+/// `cut_model` leaves in the model of the association what the request wants.
 template <class CutModel>
-Outcome answer_references(const CMPI_Adapter& adapter, const CMPIObjectPath* path, const char* result_class,
-                          const char* role, CutModel cut_model, Instance_Handler handler, Reply& reply)
+CMPIrc answer_references(const CMPI_Adapter& adapter, const Instance* source, const char* result_class,
+                         const char* role, CutModel cut_model, Instance_Handler handler, Reply& reply)
 {
-    const Meta_Class* mc = adapter.find_class(path);
-    if (!mc) // a client that walks associations sees an empty result, and goes on
-        return {reply.done(), CMPI_RC_ERR_INVALID_CLASS};
-    Ref<> source;
-    if (const CMPIrc rc = make_cimple_reference(mc, path, *source.out()); rc != CMPI_RC_OK)
-        return rc;
     const Ref<> model(adapter.meta_class ? create(adapter.meta_class) : nullptr);
     if (!model)
         return CMPI_RC_ERR_FAILED;
     cut_model(model.get());
-    const CMPIrc rc = cmpi_status_of(
-        references_with_fallback(adapter, source.get(), model.get(), result_class, role, {handler, &reply}));
-    return rc != CMPI_RC_OK ? rc : reply.done();
+    return cmpi_status_of(
+        references_with_fallback(adapter, source, model.get(), result_class, role, {handler, &reply}));
 }
 
 CMPIStatus referenceNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
@@ -132,8 +139,11 @@ CMPIStatus referenceNames(CMPIAssociationMI* mi, const CMPIContext* context, con
                    {
                        Reply reply(adapter, context, result, path);
                        const auto cut = [](Instance* model) { nullify(model, false, true, 1); };
-                       return answer_references(adapter, path, resultClass, role, cut,
-                                                reply_handler<send_reference_name>, reply);
+                       return answer_from(adapter, path, reply,
+                                          [&](const Instance* source) {
+                                              return answer_references(adapter, source, resultClass, role, cut,
+                                                                       reply_handler<send_reference_name>, reply);
+                                          });
                    });
 }
 
@@ -145,8 +155,11 @@ CMPIStatus references(CMPIAssociationMI* mi, const CMPIContext* context, const C
                    {
                        Reply reply(adapter, context, result, path, properties);
                        const auto cut = [&](Instance* model) { filter_properties(model, properties, true); };
-                       return answer_references(adapter, path, resultClass, role, cut, reply_handler<send_reference>,
-                                                reply);
+                       return answer_from(adapter, path, reply,
+                                          [&](const Instance* source) {
+                                              return answer_references(adapter, source, resultClass, role, cut,
+                                                                       reply_handler<send_reference>, reply);
+                                          });
                    });
 }
 
@@ -230,27 +243,6 @@ bool send_associator(Reply& reply, Instance* referent)
     return reply.send_instance(referent, name_space_of(reply, referent));
 }
 
-CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
-                           const CMPIObjectPath* path, const char* assocClass, const char* resultClass,
-                           const char* role, const char* resultRole)
-{
-    return operate(mi, context, "associatorNames",
-                   [&](CMPI_Adapter& adapter) -> CMPIrc
-                   {
-                       const Meta_Class* mc = adapter.find_class(path);
-                       if (!mc)
-                           return CMPI_RC_OK;
-                       Ref<> source;
-                       if (const CMPIrc rc = make_cimple_reference(mc, path, *source.out()); rc != CMPI_RC_OK)
-                           return rc;
-                       Reply reply(adapter, context, result, path);
-                       const CMPIrc rc = cmpi_status_of(
-                           associators_with_fallback(adapter, source.get(), {assocClass, resultClass, role, resultRole},
-                                                     {reply_handler<send_associator_name>, &reply}));
-                       return rc != CMPI_RC_OK ? rc : reply.done();
-                   });
-}
-
 /// Asks the provider for whole instances first, and falls back on fetching each end from the broker.
 CMPIrc answer_associators(const CMPI_Adapter& adapter, const Instance* source, const Association_Filters& filters,
                           Reply& reply)
@@ -264,23 +256,37 @@ CMPIrc answer_associators(const CMPI_Adapter& adapter, const Instance* source, c
         associators_with_fallback(adapter, source, filters, {reply_handler<fetch_associator>, &reply}));
 }
 
+CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                           const CMPIObjectPath* path, const char* assocClass, const char* resultClass,
+                           const char* role, const char* resultRole)
+{
+    const Association_Filters filters{assocClass, resultClass, role, resultRole};
+    return operate(mi, context, "associatorNames",
+                   [&](CMPI_Adapter& adapter)
+                   {
+                       Reply reply(adapter, context, result, path);
+                       return answer_from(adapter, path, reply,
+                                          [&](const Instance* source)
+                                          {
+                                              const Receiver receiver{reply_handler<send_associator_name>, &reply};
+                                              return cmpi_status_of(
+                                                  associators_with_fallback(adapter, source, filters, receiver));
+                                          });
+                   });
+}
+
 CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                        const CMPIObjectPath* path, const char* assocClass, const char* resultClass, const char* role,
                        const char* resultRole, const char** properties)
 {
+    const Association_Filters filters{assocClass, resultClass, role, resultRole};
     return operate(mi, context, "associators",
-                   [&](CMPI_Adapter& adapter) -> CMPIrc
+                   [&](CMPI_Adapter& adapter)
                    {
-                       const Meta_Class* mc = adapter.find_class(path);
-                       if (!mc)
-                           return CMPI_RC_OK;
-                       Ref<> source;
-                       if (const CMPIrc rc = make_cimple_reference(mc, path, *source.out()); rc != CMPI_RC_OK)
-                           return rc;
                        Reply reply(adapter, context, result, path, properties);
-                       const CMPIrc rc = answer_associators(adapter, source.get(),
-                                                            {assocClass, resultClass, role, resultRole}, reply);
-                       return rc != CMPI_RC_OK ? rc : reply.done();
+                       return answer_from(adapter, path, reply,
+                                          [&](const Instance* source)
+                                          { return answer_associators(adapter, source, filters, reply); });
                    });
 }
 
