@@ -330,12 +330,12 @@ void readTemperature(JsonNode& adapter, AttributeList& out)
     if (!adapter.has("temperature"))
         return;
     JsonNode node = adapter.at("temperature");
-    std::uint8_t board = 0, threshold = 0, state = 0;
+    std::uint8_t board = 0, warning = 0, critical = 0;
     node.read("board", board);
-    node.read("threshold", threshold);
-    node.read("state", state);
+    node.read("warning", warning);
+    node.read("critical", critical);
     node.finish();
-    const std::uint32_t word = static_cast<std::uint32_t>(board | threshold << 8 | state << 16);
+    const std::uint32_t word = static_cast<std::uint32_t>(board | warning << 8 | critical << 16);
     setAttribute(out, numberAttribute(RM_HA_BOARD_TEMPERATURE, word));
 }
 
