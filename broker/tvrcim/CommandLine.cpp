@@ -1,0 +1,151 @@
+#include "broker/tvrcim/CommandLine.h"
+
+#include <CLI/CLI.hpp>
+
+#include <map>
+
+namespace tvrcim
+{
+
+namespace
+{
+
+/// Options of a subcommand, read into one command.
+class CommandOptions
+{
+public:
+    CommandOptions(CLI::App& app, Command& command) : _app(app), _command(command) {}
+
+    /// Starts a subcommand; the functions below add to it.
+    CommandOptions& add(const char* name, const char* help)
+    {
+        _current = _app.add_subcommand(name, help);
+        _current->callback([this, name] { _command.name = name; });
+        return *this;
+    }
+    CommandOptions& className()
+    {
+        _current->add_option("CLASS", _command.target, "name of a class")->required();
+        return *this;
+    }
+    CommandOptions& path()
+    {
+        _current->add_option("PATH", _command.target, "Class.key=\"value\",...")->required();
+        return *this;
+    }
+    CommandOptions& names()
+    {
+        _current->add_flag("--names", _command.names, "print paths only");
+        return *this;
+    }
+    CommandOptions& properties()
+    {
+        _current->add_option("--properties", _properties, "names of the properties to show, between commas")
+            ->delimiter(',');
+        return *this;
+    }
+    CommandOptions& assignments(bool required)
+    {
+        _current->add_option("ASSIGNMENTS", _command.assignments, "name=value; arrays as [a,b], null for none")
+            ->required(required);
+        return *this;
+    }
+    CommandOptions& method()
+    {
+        _current->add_option("METHOD", _command.method, "name of a method")->required();
+        return *this;
+    }
+    CommandOptions& all(const char* help)
+    {
+        _current->add_flag("--all", _command.all, help);
+        return *this;
+    }
+    CommandOptions& associationClass(const char* option)
+    {
+        _current->add_option(option, _command.filter.assocClass, "association class");
+        _current->add_option("--role", _command.filter.role, "reference that holds PATH");
+        return *this;
+    }
+    CommandOptions& farEnd()
+    {
+        _current->add_option("--result-class", _command.filter.resultClass, "class of what is at the other end");
+        _current->add_option("--result-role", _command.filter.resultRole, "reference that holds the other end");
+        return *this;
+    }
+
+    /// After parsing.
+    void finish()
+    {
+        if (!_properties.empty())
+        {
+            _command.properties = _properties;
+        }
+    }
+
+private:
+    CLI::App& _app;
+    Command& _command;
+    CLI::App* _current = nullptr;
+    std::vector<std::string> _properties;
+};
+
+void addCommands(CommandOptions& options)
+{
+    options.add("classes", "list the classes that the module serves").all("list all classes of its repository");
+    options.add("class", "show the definition of a class").className();
+    options.add("enum", "show the instances of a class and its subclasses").className().names().properties();
+    options.add("get", "show one instance").path().properties();
+    options.add("assoc", "show what associations join to an instance")
+        .path()
+        .names()
+        .properties()
+        .associationClass("--class")
+        .farEnd();
+    options.add("refs", "show the associations that refer to an instance")
+        .path()
+        .names()
+        .properties()
+        .associationClass("--class,--result-class");
+    options.add("set", "change properties of an instance").path().assignments(true);
+    options.add("create", "create an instance").className().assignments(false);
+    options.add("delete", "delete an instance").path();
+    options.add("call", "call a method").path().method().assignments(false);
+    options.add("host", "show the host and its adapters as a tree");
+}
+
+} // namespace
+
+CommandLine parseCommandLine(int argc, const char* const* argv)
+{
+    CommandLine line;
+    Settings& settings = line.settings;
+    CLI::App app("A CIM broker for one machine, with the Fibre Channel provider inside it.", "tvrcim");
+    app.add_option("--module", settings.module, "provider module to load");
+    CLI::Option* scenario =
+        app.add_option("--scenario", settings.scenario, "scenario file of the simulated host")->check(CLI::ExistingFile);
+    app.add_flag("--hardware", settings.hardware, "use the adapters of this machine, not the simulator")
+        ->excludes(scenario);
+    app.add_option("--platform", settings.platform, "file with instances of the platform's classes")
+        ->check(CLI::ExistingFile);
+    app.add_option("--namespace", settings.nameSpace, "namespace of classes and paths")->capture_default_str();
+    const std::map<std::string, Format> formats{
+        {"table", Format::table}, {"json", Format::json}, {"mof", Format::mof}};
+    app.add_option("--format", settings.format, "table, json or mof")->transform(CLI::Transformer(formats));
+    app.fallthrough();
+    app.require_subcommand(1);
+    CommandOptions options(app, settings.command);
+    addCommands(options);
+    try
+    {
+        app.parse(argc, argv);
+        options.finish();
+    }
+    catch (const CLI::ParseError& error)
+    {
+        line.proceed = false;
+        line.exitCode = app.exit(error) == 0 ? 0 : exitUsage;
+    }
+    return line;
+}
+
+} // namespace tvrcim

@@ -1,0 +1,279 @@
+#include "broker/tvrcim/Commands.h"
+
+#include "broker/PathText.h"
+#include "broker/tvrcim/HostReport.h"
+
+#include <algorithm>
+#include <array>
+
+namespace tvrcim
+{
+
+using namespace broker;
+
+namespace
+{
+
+template <class Answer> Answer checked(Answer answer)
+{
+    if (!answer.ok())
+    {
+        throw CimError(answer);
+    }
+    return answer;
+}
+
+Path pathOf(const Session& session, const std::string& text)
+{
+    try
+    {
+        return parsePath(text, session.broker.classes(), session.nameSpace);
+    }
+    catch (const std::invalid_argument& error)
+    {
+        throw UsageError("PATH: " + std::string(error.what()));
+    }
+}
+
+/// A path that names an instance.
+Path instancePathOf(const Session& session, const std::string& text)
+{
+    Path path = pathOf(session, text);
+    if (const std::string key = missingKey(path, session.broker.classes()); !key.empty())
+    {
+        throw UsageError("PATH: the key '" + key + "' of " + path.className + " is missing");
+    }
+    return path;
+}
+
+const ClassInfo& classOf(const Session& session, const std::string& name)
+{
+    const ClassInfo* info = session.broker.classes().find(name);
+    if (!info)
+    {
+        throw CimError({CMPI_RC_ERR_INVALID_CLASS, "there is no class '" + name + "'"});
+    }
+    return *info;
+}
+
+std::vector<std::string> namesOf(const std::vector<Property>& properties)
+{
+    std::vector<std::string> names;
+    std::transform(properties.begin(), properties.end(), std::back_inserter(names),
+                   [](const Property& property) { return property.name; });
+    return names;
+}
+
+void done(Session& session, const Json& json, const std::string& text)
+{
+    if (session.format == Format::json)
+    {
+        printJson(session.out, json);
+    }
+    else
+    {
+        session.out << text << '\n';
+    }
+}
+
+// --- one function a command ----------------------------------------------------------------------------
+
+void listClasses(Session& session, const Command& command)
+{
+    std::vector<const ClassInfo*> classes;
+    for (const auto& info : session.broker.classes().all())
+    {
+        const std::vector<std::string>& served = session.broker.servedClasses();
+        if (command.all || std::find(served.begin(), served.end(), info->name) != served.end())
+        {
+            classes.push_back(info.get());
+        }
+    }
+    std::sort(classes.begin(), classes.end(),
+              [](const ClassInfo* a, const ClassInfo* b) { return NameLess{}(a->name, b->name); });
+    printClasses(session.out, session.format, classes);
+}
+
+void showClass(Session& session, const Command& command)
+{
+    printClass(session.out, session.format, classOf(session, command.target));
+}
+
+void enumerate(Session& session, const Command& command)
+{
+    if (command.names)
+    {
+        printPaths(session.out, session.format,
+                   checked(session.broker.enumerateInstanceNames(session.nameSpace, command.target)).paths);
+        return;
+    }
+    const Reply reply =
+        checked(session.broker.enumerateInstances(session.nameSpace, command.target, command.properties));
+    printObjects(session.out, session.format, reply.objects, command.properties);
+}
+
+void get(Session& session, const Command& command)
+{
+    const Reply reply =
+        checked(session.broker.getInstance(instancePathOf(session, command.target), command.properties));
+    if (session.format == Format::json)
+    {
+        printJson(session.out, toJson(reply.objects.front()));
+        return;
+    }
+    printObjects(session.out, session.format, reply.objects, std::nullopt);
+}
+
+void followAssociations(Session& session, const Command& command)
+{
+    const Path path = instancePathOf(session, command.target);
+    if (command.names)
+    {
+        printPaths(session.out, session.format, checked(session.broker.associatorNames(path, command.filter)).paths);
+        return;
+    }
+    const Reply reply = checked(session.broker.associators(path, command.filter, command.properties));
+    printObjects(session.out, session.format, reply.objects, command.properties);
+}
+
+void followReferences(Session& session, const Command& command)
+{
+    const Path path = instancePathOf(session, command.target);
+    if (command.names)
+    {
+        printPaths(session.out, session.format, checked(session.broker.referenceNames(path, command.filter)).paths);
+        return;
+    }
+    const Reply reply = checked(session.broker.references(path, command.filter, command.properties));
+    printObjects(session.out, session.format, reply.objects, command.properties);
+}
+
+void set(Session& session, const Command& command)
+{
+    const Path path = instancePathOf(session, command.target);
+    const ClassInfo& info = classOf(session, path.className);
+    const Object object{path, parseAssignments(session.broker.classes(), path.nameSpace, info.properties, info.name,
+                                               command.assignments)};
+    const std::vector<std::string> names = namesOf(object.properties);
+    checked(session.broker.modifyInstance(object, names));
+    done(session, {{"path", pathText(path)}, {"changed", names}}, "changed " + pathText(path));
+}
+
+void create(Session& session, const Command& command)
+{
+    const ClassInfo& info = classOf(session, command.target);
+    Object object{{session.nameSpace, info.name, {}},
+                  parseAssignments(session.broker.classes(), session.nameSpace, info.properties, info.name,
+                                   command.assignments)};
+    for (const std::string& key : info.keys)
+    {
+        if (object.has(key))
+        {
+            object.path.setKey(key, object.get(key));
+        }
+    }
+    printPaths(session.out, session.format, checked(session.broker.createInstance(object)).paths);
+}
+
+void remove(Session& session, const Command& command)
+{
+    const Path path = instancePathOf(session, command.target);
+    checked(session.broker.deleteInstance(path));
+    done(session, {{"path", pathText(path)}, {"deleted", true}}, "deleted " + pathText(path));
+}
+
+void call(Session& session, const Command& command)
+{
+    const Path path = pathOf(session, command.target);
+    const ClassInfo& info = classOf(session, path.className);
+    const MethodInfo* method = info.method(command.method);
+    if (!method)
+    {
+        throw CimError({CMPI_RC_ERR_METHOD_NOT_FOUND, info.name + " has no method '" + command.method + "'"});
+    }
+    const std::vector<Property> in = parseAssignments(session.broker.classes(), path.nameSpace, method->parameters,
+                                                      method->name, command.assignments);
+    printMethodReply(session.out, session.format, checked(session.broker.invokeMethod(path, method->name, in)));
+}
+
+void showHost(Session& session, const Command&)
+{
+    const HostReport report(session.broker, session.nameSpace);
+    if (session.format == Format::json)
+    {
+        printJson(session.out, report.json());
+    }
+    else
+    {
+        report.print(session.out);
+    }
+}
+
+struct CommandRow
+{
+    const char* name;
+    void (*run)(Session& session, const Command& command);
+};
+
+constexpr std::array<CommandRow, 11> commands{{
+    {"classes", listClasses},
+    {"class", showClass},
+    {"enum", enumerate},
+    {"get", get},
+    {"assoc", followAssociations},
+    {"refs", followReferences},
+    {"set", set},
+    {"create", create},
+    {"delete", remove},
+    {"call", call},
+    {"host", showHost},
+}};
+
+} // namespace
+
+CimError::CimError(const Outcome& outcome)
+    : std::runtime_error(statusName(outcome.status) + (outcome.message.empty() ? "" : ": " + outcome.message))
+{
+}
+
+std::vector<Property> parseAssignments(const ClassTable& classes, std::string_view nameSpace,
+                                       const std::vector<FeatureInfo>& features, const std::string& owner,
+                                       const std::vector<std::string>& texts)
+{
+    std::vector<Property> result;
+    for (const std::string& text : texts)
+    {
+        const std::size_t mark = text.find('=');
+        const std::string name = text.substr(0, mark);
+        const auto feature = std::find_if(features.begin(), features.end(),
+                                          [&](const FeatureInfo& f) { return sameName(f.name, name); });
+        if (mark == std::string::npos || feature == features.end())
+        {
+            throw UsageError("'" + text + "': " +
+                             (mark == std::string::npos ? "an assignment is written name=value"
+                                                        : owner + " has no '" + name + "'"));
+        }
+        try
+        {
+            setNamed(result, feature->name, parseValue(Target(classes, nameSpace, *feature), text.substr(mark + 1)));
+        }
+        catch (const std::invalid_argument& error)
+        {
+            throw UsageError("'" + text + "': " + error.what());
+        }
+    }
+    return result;
+}
+
+void runCommand(Session& session, const Command& command)
+{
+    const auto* row =
+        std::find_if(commands.begin(), commands.end(), [&](const CommandRow& r) { return command.name == r.name; });
+    if (row == commands.end())
+    {
+        throw UsageError("there is no command '" + command.name + "'");
+    }
+    row->run(session, command);
+}
+
+} // namespace tvrcim

@@ -1,0 +1,59 @@
+// The tool's commands on a broker.
+#pragma once
+
+#include "broker/Broker.h"
+#include "broker/tvrcim/Printing.h"
+
+#include <ostream>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+namespace tvrcim
+{
+
+/// A wrong argument; the text names it.
+class UsageError : public std::runtime_error
+{
+public:
+    using std::runtime_error::runtime_error;
+};
+
+/// An operation that the broker refused.
+class CimError : public std::runtime_error
+{
+public:
+    explicit CimError(const broker::Outcome& outcome);
+};
+
+/// One command with its arguments; what a command does not use stays empty.
+struct Command
+{
+    std::string name;
+    std::string target; ///< class name or path
+    std::string method;
+    std::vector<std::string> assignments; ///< name=value
+    broker::PropertyList properties;
+    broker::AssociationFilter filter;
+    bool names = false;
+    bool all = false;
+};
+
+/// Where a command works and how it prints.
+struct Session
+{
+    broker::Broker& broker;
+    std::string nameSpace;
+    Format format;
+    std::ostream& out;
+};
+
+/// Runs a command and prints its result. Throws UsageError or CimError.
+void runCommand(Session& session, const Command& command);
+
+/// Properties or parameters from name=value texts, typed by the features that may be named. Throws UsageError.
+std::vector<broker::Property> parseAssignments(const broker::ClassTable& classes, std::string_view nameSpace,
+                                               const std::vector<broker::FeatureInfo>& features,
+                                               const std::string& owner, const std::vector<std::string>& texts);
+
+} // namespace tvrcim

@@ -1,0 +1,32 @@
+// What must be in place before the module is opened: the simulator's libraries, a scenario, a file tree of its own.
+#pragma once
+
+#include <filesystem>
+#include <optional>
+#include <string>
+
+namespace tvrcim
+{
+
+/// The provider module beside this executable: in the build tree, in an installation, or by the loader's search path.
+std::string findModule();
+
+/// Opens the simulator's libraries, so that the module finds them by name, and loads a scenario file unless its name is
+/// empty (the simulator then shows its default host). Throws std::runtime_error with the reason.
+void startSimulator(const std::string& scenario);
+
+/// A temporary file tree that the process's fixed paths lead into; removed with the object.
+class FileRoot
+{
+public:
+    /// Does nothing when TVR_FILE_ROOT is set already.
+    FileRoot();
+    ~FileRoot();
+    FileRoot(const FileRoot&) = delete;
+    FileRoot& operator=(const FileRoot&) = delete;
+
+private:
+    std::filesystem::path _path;
+};
+
+} // namespace tvrcim

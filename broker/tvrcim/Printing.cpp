@@ -1,0 +1,276 @@
+#include "broker/tvrcim/Printing.h"
+
+#include "broker/PathText.h"
+#include "broker/QualifierText.h"
+
+#include <algorithm>
+#include <array>
+#include <cstdio>
+
+namespace tvrcim
+{
+
+using namespace broker;
+
+namespace
+{
+
+std::string joined(const std::vector<std::string>& names)
+{
+    std::string text;
+    for (const std::string& name : names)
+    {
+        text += (text.empty() ? "" : ", ") + name;
+    }
+    return text;
+}
+
+void printBlock(std::ostream& out, const Object& object)
+{
+    std::size_t width = 0;
+    for (const Property& property : object.properties)
+    {
+        width = std::max(width, property.name.size());
+    }
+    out << pathText(object.path) << '\n';
+    for (const Property& property : object.properties)
+    {
+        out << "    " << padded(property.name, width) << "  " << oneLine(valueText(property.value)) << '\n';
+    }
+}
+
+void printColumns(std::ostream& out, const std::vector<Object>& objects, const std::vector<std::string>& columns)
+{
+    Table table(columns);
+    for (const Object& object : objects)
+    {
+        std::vector<std::string> row;
+        for (const std::string& column : columns)
+        {
+            row.push_back(object.has(column) ? oneLine(valueText(object.get(column))) : "-");
+        }
+        table.add(std::move(row));
+    }
+    table.print(out);
+}
+
+std::string typeOf(const FeatureInfo& feature)
+{
+    return feature.referenceClass.empty() ? typeText(feature.type)
+                                          : typeText(feature.type) + " " + feature.referenceClass;
+}
+
+std::string parameterList(const MethodInfo& method)
+{
+    std::vector<std::string> texts;
+    for (const FeatureInfo& parameter : method.parameters)
+    {
+        const bool in = parameter.flags & cimple::META_IN;
+        const bool out = parameter.flags & cimple::META_OUT;
+        const std::string direction = in && out ? "in out " : out ? "out " : "in ";
+        texts.push_back(direction + typeOf(parameter) + " " + parameter.name);
+    }
+    return joined(texts);
+}
+
+void printClassTable(std::ostream& out, const ClassInfo& info)
+{
+    out << info.name;
+    for (const ClassInfo* ancestor = info.superclass; ancestor; ancestor = ancestor->superclass)
+    {
+        out << " : " << ancestor->name;
+    }
+    const std::vector<std::string> qualifiers = qualifierNames(info.flags);
+    out << (qualifiers.empty() ? "\n\n" : "\n[" + joined(qualifiers) + "]\n\n");
+    Table properties({"PROPERTY", "TYPE", "QUALIFIERS", "DEFAULT", "DECLARED IN"});
+    for (const FeatureInfo& property : info.properties)
+    {
+        const bool initial = !property.defaultValue.isNull();
+        properties.add({property.name, typeOf(property), joined(qualifierNames(property.flags)),
+                        initial ? valueText(property.defaultValue) : "", property.origin->name});
+    }
+    properties.print(out);
+    if (info.methods.empty())
+    {
+        return;
+    }
+    out << '\n';
+    Table methods({"METHOD", "RETURNS", "PARAMETERS", "DECLARED IN"});
+    for (const MethodInfo& method : info.methods)
+    {
+        methods.add({method.name, typeText(method.returnType), parameterList(method), method.origin->name});
+    }
+    methods.print(out);
+}
+
+} // namespace
+
+std::size_t displayWidth(const std::string& text)
+{
+    constexpr unsigned continuationMask = 0xC0;
+    constexpr unsigned continuation = 0x80;
+    return static_cast<std::size_t>(
+        std::count_if(text.begin(), text.end(), [](unsigned char c) { return (c & continuationMask) != continuation; }));
+}
+
+std::string padded(const std::string& text, std::size_t width)
+{
+    const std::size_t shown = displayWidth(text);
+    return shown < width ? text + std::string(width - shown, ' ') : text;
+}
+
+std::string oneLine(const std::string& text)
+{
+    std::string result;
+    for (const char c : text)
+    {
+        if (static_cast<unsigned char>(c) >= ' ' && c != '\x7f')
+        {
+            result += c;
+            continue;
+        }
+        std::array<char, 8> escape{};
+        std::snprintf(escape.data(), escape.size(), "\\x%02x", static_cast<unsigned>(static_cast<unsigned char>(c)));
+        result += c == '\n' ? "\\n" : c == '\t' ? "\\t" : escape.data();
+    }
+    return result;
+}
+
+void Table::print(std::ostream& out) const
+{
+    std::vector<std::size_t> widths(_rows.front().size());
+    for (const auto& row : _rows)
+    {
+        for (std::size_t i = 0; i < row.size(); ++i)
+        {
+            widths[i] = std::max(widths[i], displayWidth(row[i]));
+        }
+    }
+    for (const auto& row : _rows)
+    {
+        std::string line;
+        for (std::size_t i = 0; i < row.size(); ++i)
+        {
+            line += padded(row[i], widths[i]) + "  ";
+        }
+        line.erase(line.find_last_not_of(' ') + 1);
+        out << line << '\n';
+    }
+}
+
+void printJson(std::ostream& out, const Json& json)
+{
+    out << json.dump(2, ' ', false, Json::error_handler_t::replace) << '\n';
+}
+
+void printObjects(std::ostream& out, Format format, const std::vector<Object>& objects, const PropertyList& columns)
+{
+    if (format == Format::json)
+    {
+        Json list = Json::array();
+        std::transform(objects.begin(), objects.end(), std::back_inserter(list),
+                       [](const Object& object) { return toJson(object); });
+        printJson(out, list);
+        return;
+    }
+    if (format == Format::table && columns)
+    {
+        printColumns(out, objects, *columns);
+        return;
+    }
+    for (const Object& object : objects)
+    {
+        out << (&object == &objects.front() ? "" : "\n");
+        if (format == Format::mof)
+        {
+            out << mofText(object);
+        }
+        else
+        {
+            printBlock(out, object);
+        }
+    }
+}
+
+void printPaths(std::ostream& out, Format format, const std::vector<Path>& paths)
+{
+    if (format == Format::json)
+    {
+        Json list = Json::array();
+        for (const Path& path : paths)
+        {
+            list.push_back({{"class", path.className}, {"namespace", path.nameSpace}, {"path", pathText(path)}});
+        }
+        printJson(out, list);
+        return;
+    }
+    for (const Path& path : paths)
+    {
+        out << fullPathText(path) << '\n';
+    }
+}
+
+void printClass(std::ostream& out, Format format, const ClassInfo& info)
+{
+    switch (format)
+    {
+    case Format::json:
+        printJson(out, toJson(info));
+        break;
+    case Format::mof:
+        out << mofText(info);
+        break;
+    default:
+        printClassTable(out, info);
+    }
+}
+
+void printClasses(std::ostream& out, Format format, const std::vector<const ClassInfo*>& classes)
+{
+    if (format == Format::json)
+    {
+        Json list = Json::array();
+        for (const ClassInfo* info : classes)
+        {
+            list.push_back({{"name", info->name},
+                            {"superclass", info->superclass ? Json(info->superclass->name) : Json(nullptr)},
+                            {"association", info->isAssociation()},
+                            {"keys", info->keys}});
+        }
+        printJson(out, list);
+        return;
+    }
+    if (format == Format::mof)
+    {
+        for (const ClassInfo* info : classes)
+        {
+            out << mofText(*info) << '\n';
+        }
+        return;
+    }
+    Table table({"CLASS", "SUPERCLASS", "KIND", "KEYS"});
+    for (const ClassInfo* info : classes)
+    {
+        const char* kind = info->isAssociation() ? "association" : info->isAbstract() ? "abstract" : "class";
+        table.add({info->name, info->superclass ? info->superclass->name : "-", kind, joined(info->keys)});
+    }
+    table.print(out);
+}
+
+void printMethodReply(std::ostream& out, Format format, const MethodReply& reply)
+{
+    if (format == Format::json)
+    {
+        printJson(out, {{"returnValue", toJson(reply.returnValue)}, {"out", propertiesToJson(reply.out)}});
+        return;
+    }
+    Table table({"PARAMETER", "VALUE"});
+    table.add({"(returned)", oneLine(valueText(reply.returnValue))});
+    for (const Property& parameter : reply.out)
+    {
+        table.add({parameter.name, oneLine(valueText(parameter.value))});
+    }
+    table.print(out);
+}
+
+} // namespace tvrcim

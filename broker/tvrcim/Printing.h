@@ -1,0 +1,51 @@
+// Output of the tool: aligned tables for people, JSON and MOF for programs.
+#pragma once
+
+#include "broker/Json.h"
+#include "broker/Reply.h"
+
+#include <ostream>
+#include <string>
+#include <vector>
+
+namespace tvrcim
+{
+
+enum class Format
+{
+    table,
+    json,
+    mof,
+};
+
+/// Rows of cells under a heading, each column as wide as its widest cell.
+class Table
+{
+public:
+    explicit Table(std::vector<std::string> heading) : _rows{std::move(heading)} {}
+    void add(std::vector<std::string> row) { _rows.push_back(std::move(row)); }
+    void print(std::ostream& out) const;
+
+private:
+    std::vector<std::vector<std::string>> _rows; ///< the heading first
+};
+
+/// Characters that a UTF-8 text shows.
+std::size_t displayWidth(const std::string& text);
+/// The text filled up with blanks on the right.
+std::string padded(const std::string& text, std::size_t width);
+/// Line breaks and other control characters as escapes, so that a value stays on its line.
+std::string oneLine(const std::string& text);
+
+/// Instances: with `columns` a table of these properties, otherwise a block for each.
+void printObjects(std::ostream& out, Format format, const std::vector<broker::Object>& objects,
+                  const broker::PropertyList& columns);
+/// One path a line, or a JSON list of them.
+void printPaths(std::ostream& out, Format format, const std::vector<broker::Path>& paths);
+void printClass(std::ostream& out, Format format, const broker::ClassInfo& info);
+void printClasses(std::ostream& out, Format format, const std::vector<const broker::ClassInfo*>& classes);
+void printMethodReply(std::ostream& out, Format format, const broker::MethodReply& reply);
+/// JSON with indentation; bytes that are no UTF-8 are replaced.
+void printJson(std::ostream& out, const broker::Json& json);
+
+} // namespace tvrcim
