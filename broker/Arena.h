@@ -107,11 +107,13 @@ public:
     Core& core;
     const CMPIBroker* broker;
     std::string what;
-    ContextHandle* context;
-    bool attached = false; ///< pushed by attachThread rather than by a call
 
 private:
-    std::vector<std::unique_ptr<Tracked>> _objects;
+    std::vector<std::unique_ptr<Tracked>> _objects; ///< the first is the context
+
+public:
+    ContextHandle* context;
+    bool attached = false; ///< pushed by attachThread rather than by a call
 };
 
 /// A frame that is the thread's innermost one for its own life.
