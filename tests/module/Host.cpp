@@ -1,0 +1,182 @@
+#include "tests/module/Host.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <dlfcn.h>
+#include <fstream>
+#include <sstream>
+#include <stdexcept>
+#include <unistd.h>
+
+namespace module_test
+{
+
+namespace
+{
+
+namespace fs = std::filesystem;
+
+void* openLibrary(const char* file)
+{
+    void* library = dlopen((fs::path(TVR_SIMULATOR_FOLDER) / file).c_str(), RTLD_NOW | RTLD_LOCAL);
+    if (!library)
+        throw std::runtime_error(dlerror());
+    return library;
+}
+
+/// A control function of the simulator, which stays loaded for the life of the process.
+template <class Function> Function* control(const char* name)
+{
+    static void* const simulator = openLibrary("libtvrsim.so");
+    return reinterpret_cast<Function*>(dlsym(simulator, name));
+}
+
+#define TVR_CONTROL(name) (*control<decltype(::name)>(#name))
+
+void loadScenario(const std::string& scenario)
+{
+    char error[1024] = "";
+    const bool isText = scenario.find('{') != std::string::npos;
+    const std::string file = (fs::path(TVR_SCENARIO_FOLDER) / (scenario + ".json")).string();
+    const int loaded = isText ? TVR_CONTROL(tvrsim_load_scenario_text)(scenario.c_str(), error, sizeof(error))
+                              : TVR_CONTROL(tvrsim_load_scenario)(file.c_str(), error, sizeof(error));
+    if (!loaded)
+        throw std::runtime_error(error);
+}
+
+fs::path makeRoot()
+{
+    std::string name = (fs::temp_directory_path() / "tvr-module-XXXXXX").string();
+    if (!mkdtemp(name.data()))
+        throw std::runtime_error("no temporary folder");
+    return name;
+}
+
+/// The part of a log line from the level on: "[threadid =1l] [time] [File.cpp:12][TVR_DBG] text".
+std::string fromLevel(const std::string& line)
+{
+    const std::size_t level = line.find("][TVR_");
+    return level == std::string::npos ? line : line.substr(level + 1);
+}
+
+} // namespace
+
+Host::Host(const std::string& scenario, Libraries libraries) : _root(makeRoot())
+{
+    options.module = TVR_MODULE_FILE;
+    write("/proc/version", "Linux version 6.1.0 (test)\n");
+    write("/etc/issue", "Debian GNU/Linux 12 \\n \\l\n");
+    write("/etc/tavrin_fc_provider.dmp", "2,5,1\n" + (_root / "provider.log").string());
+    setenv("TVR_FILE_ROOT", _root.c_str(), 1);
+    loadScenario(scenario);
+    if (libraries.hbaApi)
+        _libraries.push_back(openLibrary("libHBAAPI.so.2"));
+    if (libraries.localRm)
+        _libraries.push_back(openLibrary("liblrmapi.so"));
+    if (libraries.fallbackRm)
+        _libraries.push_back(openLibrary("librmapi.so"));
+}
+
+Host::~Host()
+{
+    TVR_CONTROL(tvrsim_clear_faults)(); // opens every gate, so that the refresh can end
+    _broker.reset();
+    for (void* library : _libraries)
+        dlclose(library);
+    std::error_code ignored;
+    fs::remove_all(_root, ignored);
+}
+
+broker::Broker& Host::broker()
+{
+    if (!_broker)
+        _broker = std::make_unique<broker::Broker>(options);
+    return *_broker;
+}
+
+void Host::unload()
+{
+    for (const broker::CleanupAnswer& answer : broker().unload())
+        EXPECT_EQ(answer.status, CMPI_RC_OK) << answer.className;
+    for (const broker::Violation& violation : broker().violations())
+        ADD_FAILURE() << violation.text;
+    EXPECT_EQ(TVR_CONTROL(tvrsim_open_handles)(), 0u);
+    const std::string semaphore = "/dev/shm/sem.TVR_RM_INIT_LIB_";
+    EXPECT_FALSE(fs::exists(semaphore + std::to_string(getpid())));
+    EXPECT_FALSE(fs::exists(semaphore + "DONE_" + std::to_string(getpid())));
+    _broker.reset();
+}
+
+broker::Reply Host::enumerate(const std::string& className)
+{
+    return broker().enumerateInstances("root/tavrin", className);
+}
+
+std::vector<broker::Object> Host::instancesOf(const std::string& className)
+{
+    broker::Reply reply = enumerate(className);
+    EXPECT_TRUE(reply.ok()) << className << ": " << broker::statusName(reply.status) << " " << reply.message;
+    return std::move(reply.objects);
+}
+
+void Host::write(const std::string& path, const std::string& text) const
+{
+    const fs::path file = _root.string() + path;
+    fs::create_directories(file.parent_path());
+    std::ofstream(file) << text;
+}
+
+std::string Host::read(const std::string& path) const
+{
+    std::ostringstream text;
+    text << std::ifstream(_root.string() + path).rdbuf();
+    return text.str();
+}
+
+std::vector<std::string> Host::log() const
+{
+    std::vector<std::string> lines;
+    std::ifstream file(_root / "provider.log");
+    for (std::string line; std::getline(file, line);)
+        lines.push_back(fromLevel(line));
+    return lines;
+}
+
+std::size_t Host::logged(const std::string& levelAndText) const
+{
+    const std::vector<std::string> lines = log();
+    return static_cast<std::size_t>(std::count_if(
+        lines.begin(), lines.end(), [&](const std::string& line) { return line.starts_with(levelAndText); }));
+}
+
+void Host::addFault(const std::string& row)
+{
+    char error[1024] = "";
+    if (!TVR_CONTROL(tvrsim_add_fault)(row.c_str(), error, sizeof(error)))
+        throw std::runtime_error(error);
+}
+
+std::uint64_t Host::calls(const std::string& function) const
+{
+    return TVR_CONTROL(tvrsim_call_count)(function.c_str());
+}
+
+void Host::openGate(const std::string& gate)
+{
+    TVR_CONTROL(tvrsim_open_gate)(gate.c_str());
+}
+
+bool Host::awaitGate(const std::string& gate, unsigned calls)
+{
+    return TVR_CONTROL(tvrsim_await_gate)(gate.c_str(), calls, 20000) != 0;
+}
+
+std::string text(const broker::Object& object, const std::string& property)
+{
+    const broker::Value& value = object.get(property);
+    return value.isNull() ? std::string() : value.asString();
+}
+
+} // namespace module_test
