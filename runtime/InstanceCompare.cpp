@@ -39,50 +39,53 @@ bool properties_equal(const Instance* a, const Meta_Property* pa, const Instance
                               : array_slot(a, pa->offset).equal(array_slot(b, pb->offset));
 }
 
-/// The feature of b's class that answers to feature `index` of a's. Related classes share records in the same
-/// position, so that the search by name is left to classes that override or are strangers.
-const Meta_Feature* counterpart(const Instance* b, const Meta_Feature* mf, std::size_t index, std::uint32_t mask)
+bool referents_equal(const Instance* a, const Meta_Reference* ra, const Instance* b, const Meta_Reference* rb)
 {
-    const auto features = features_of(b);
-    return index < features.size() && features[index] == mf ? mf : find_feature(b->__meta_class, mf->name, mask);
-}
-
-bool key_properties_equal(const Instance* a, const Meta_Property* pa, const Instance* b, std::size_t index)
-{
-    const Meta_Feature* mf = counterpart(b, pa, index, META_PROPERTY);
-    if (!mf || !(mf->flags & META_KEY))
-        return false;
-    const auto* pb = static_cast<const Meta_Property*>(mf);
-    return pa->type == pb->type && pa->subscript == pb->subscript && properties_equal(a, pa, b, pb);
-}
-
-bool key_references_equal(const Instance* a, const Meta_Reference* ra, const Instance* b, std::size_t index)
-{
-    const Meta_Feature* mf = counterpart(b, ra, index, META_REFERENCE);
-    if (!mf || !(mf->flags & META_KEY) || slot_kind(mf) != Slot_Kind::reference)
-        return false;
-    const auto* rb = static_cast<const Meta_Reference*>(mf);
-    if (!is_subclass(ra->meta_class, rb->meta_class) && !is_subclass(rb->meta_class, ra->meta_class))
-        return false;
     const Instance* to_a = reference_slot(a, ra);
     const Instance* to_b = reference_slot(b, rb);
     return to_a && to_b ? key_eq(to_a, to_b) : to_a == to_b;
 }
 
-bool key_features_equal(const Instance* a, const Meta_Feature* mf, const Instance* b, std::size_t index)
+/// properties_equal() for the usual key: searches of long lists spend their time here.
+bool string_keys_equal(const Instance* a, const Instance* b, std::uint32_t offset)
 {
-    switch (slot_kind(mf))
-    {
-    case Slot_Kind::scalar:
-    case Slot_Kind::array:
-        return key_properties_equal(a, static_cast<const Meta_Property*>(mf), b, index);
-    case Slot_Kind::reference:
-        return key_references_equal(a, static_cast<const Meta_Reference*>(mf), b, index);
-    case Slot_Kind::reference_array: // no part of the key
-    case Slot_Kind::none:
-        return true;
-    }
-    return true;
+    const auto& x = slot<Property<String>>(a, offset);
+    const auto& y = slot<Property<String>>(b, offset);
+    return x.is_null() == y.is_null() && (x.is_null() || x.value.shares(y.value) || x.value == y.value);
+}
+
+/// Compares a key that both classes describe by one record. A reference array is no part of the key.
+bool shared_keys_equal(const Instance* a, const Instance* b, const Meta_Feature* mf)
+{
+    if (const Meta_Property* mp = as_property(mf))
+        return mp->type == STRING && mp->subscript == 0 ? string_keys_equal(a, b, mp->offset)
+                                                        : properties_equal(a, mp, b, mp);
+    const Meta_Reference* mr = as_single_reference(mf);
+    return !mr || referents_equal(a, mr, b, mr);
+}
+
+bool key_properties_equal(const Instance* a, const Meta_Property* pa, const Instance* b)
+{
+    const Meta_Property* pb = as_property(find_feature(b->__meta_class, pa->name, META_PROPERTY));
+    return pb && (pb->flags & META_KEY) && pa->type == pb->type && pa->subscript == pb->subscript &&
+           properties_equal(a, pa, b, pb);
+}
+
+bool key_references_equal(const Instance* a, const Meta_Reference* ra, const Instance* b)
+{
+    const Meta_Feature* mf = find_feature(b->__meta_class, ra->name, META_REFERENCE);
+    const Meta_Reference* rb = mf && (mf->flags & META_KEY) ? as_single_reference(mf) : nullptr;
+    return rb && (is_subclass(ra->meta_class, rb->meta_class) || is_subclass(rb->meta_class, ra->meta_class)) &&
+           referents_equal(a, ra, b, rb);
+}
+
+/// Compares a key of a's class with the key of its name in b's, which may be of another kind or missing.
+bool named_keys_equal(const Instance* a, const Instance* b, const Meta_Feature* mf)
+{
+    if (const Meta_Property* mp = as_property(mf))
+        return key_properties_equal(a, mp, b);
+    const Meta_Reference* mr = as_single_reference(mf);
+    return !mr || key_references_equal(a, mr, b);
 }
 
 /// Number of keys after which a class has no more; parameter records do not count theirs.
@@ -98,31 +101,17 @@ bool both_null_or_identical(const Instance* a, const Instance* b)
 
 bool features_identical(const Instance* a, const Instance* b, const Meta_Feature* mf)
 {
-    switch (slot_kind(mf))
-    {
-    case Slot_Kind::scalar:
-    case Slot_Kind::array:
-    {
-        const auto* mp = static_cast<const Meta_Property*>(mf);
+    if (const Meta_Property* mp = as_property(mf))
         return properties_equal(a, mp, b, mp);
-    }
-    case Slot_Kind::reference:
-    {
-        const auto* mr = static_cast<const Meta_Reference*>(mf);
+    if (const Meta_Reference* mr = as_single_reference(mf))
         return both_null_or_identical(reference_slot(a, mr), reference_slot(b, mr));
-    }
-    case Slot_Kind::reference_array:
-    {
-        const auto* mr = static_cast<const Meta_Reference*>(mf);
-        const auto in_a = references_in(a, mr);
-        const auto in_b = references_in(b, mr);
-        return null_byte(a, mr) == null_byte(b, mr) &&
-               std::equal(in_a.begin(), in_a.end(), in_b.begin(), in_b.end(), both_null_or_identical);
-    }
-    case Slot_Kind::none:
-        return true;
-    }
-    return true;
+    const Meta_Reference* mr = as_reference(mf);
+    if (!mr)
+        return true; // methods take no room
+    const auto in_a = references_in(a, mr);
+    const auto in_b = references_in(b, mr);
+    return null_byte(a, mr) == null_byte(b, mr) &&
+           std::equal(in_a.begin(), in_a.end(), in_b.begin(), in_b.end(), both_null_or_identical);
 }
 
 } // namespace
@@ -130,14 +119,19 @@ bool features_identical(const Instance* a, const Instance* b, const Meta_Feature
 bool key_eq(const Instance* a, const Instance* b)
 {
     const auto features = features_of(a);
+    const auto others = features_of(b);
     std::size_t keys_left = keys_to_expect(a->__meta_class);
-    for (std::size_t i = 0; i < features.size() && keys_left != 0; ++i)
+    for (std::size_t i = 0; i < features.size(); ++i)
     {
-        if (!(features[i]->flags & META_KEY))
+        const Meta_Feature* mf = features[i];
+        if (!(mf->flags & META_KEY)) [[likely]]
             continue;
-        if (!key_features_equal(a, features[i], b, i))
+        // Related classes have their common features at one position: only overrides and strangers need a search.
+        const bool shared = i < others.size() && others[i] == mf;
+        if (!(shared ? shared_keys_equal(a, b, mf) : named_keys_equal(a, b, mf)))
             return false;
-        --keys_left;
+        if (--keys_left == 0)
+            break;
     }
     return true;
 }

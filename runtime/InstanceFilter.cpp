@@ -63,19 +63,12 @@ void copy_feature(Instance* dest, const Instance* src, const Meta_Feature* mf)
 
 bool is_null(const Instance* instance, const Meta_Feature* mf)
 {
-    switch (slot_kind(mf))
-    {
-    case Slot_Kind::scalar:
-    case Slot_Kind::array:
-        return null_byte(instance, static_cast<const Meta_Property*>(mf)) != 0;
-    case Slot_Kind::reference:
-        return reference_slot(instance, static_cast<const Meta_Reference*>(mf)) == nullptr;
-    case Slot_Kind::reference_array:
-        return null_byte(instance, static_cast<const Meta_Reference*>(mf)) != 0;
-    case Slot_Kind::none:
-        return true;
-    }
-    return true;
+    if (const Meta_Property* mp = as_property(mf))
+        return null_byte(instance, mp) != 0;
+    if (const Meta_Reference* mr = as_single_reference(mf))
+        return reference_slot(instance, mr) == nullptr;
+    const Meta_Reference* mr = as_reference(mf);
+    return !mr || null_byte(instance, mr) != 0;
 }
 
 /// Gives a null single reference an empty instance of its class.
@@ -86,25 +79,15 @@ void fill_reference(Instance* instance, const Meta_Reference* mr)
         referent = create(mr->meta_class, false);
 }
 
-/// Makes a feature readable again. False for a method.
-bool make_non_null(Instance* instance, const Meta_Feature* mf)
+/// Makes a property or reference readable again.
+void make_non_null(Instance* instance, const Meta_Feature* mf)
 {
-    switch (slot_kind(mf))
-    {
-    case Slot_Kind::scalar:
-    case Slot_Kind::array:
-        null_byte(instance, static_cast<const Meta_Property*>(mf)) = 0;
-        return true;
-    case Slot_Kind::reference:
-        fill_reference(instance, static_cast<const Meta_Reference*>(mf));
-        return true;
-    case Slot_Kind::reference_array:
-        null_byte(instance, static_cast<const Meta_Reference*>(mf)) = 0;
-        return true;
-    case Slot_Kind::none:
-        return false;
-    }
-    return false;
+    if (const Meta_Property* mp = as_property(mf))
+        null_byte(instance, mp) = 0;
+    else if (const Meta_Reference* mr = as_single_reference(mf))
+        fill_reference(instance, mr);
+    else
+        null_byte(instance, as_reference(mf)) = 0;
 }
 
 } // namespace
@@ -113,8 +96,9 @@ void nullify(Instance* instance, bool keys, bool non_keys, std::uint8_t value)
 {
     for (const Meta_Feature* mf : features_of(instance))
     {
-        if ((mf->flags & META_PROPERTY) && (mf->flags & META_KEY ? keys : non_keys))
-            null_byte(instance, static_cast<const Meta_Property*>(mf)) = value;
+        const Meta_Property* mp = as_property(mf);
+        if (mp && (mp->flags & META_KEY ? keys : non_keys))
+            null_byte(instance, mp) = value;
     }
 }
 
@@ -139,8 +123,11 @@ int filter_properties(Instance* instance, const char* const* names, bool keep_ke
     for (; *names; ++names)
     {
         const Meta_Feature* mf = find_feature(instance->__meta_class, *names, any_feature);
-        if (mf && !(mf->flags & META_KEY) && !make_non_null(instance, mf))
+        if (!mf || (mf->flags & META_KEY))
+            continue;
+        if (mf->flags & META_METHOD)
             return -1;
+        make_non_null(instance, mf);
     }
     return 0;
 }
@@ -160,8 +147,8 @@ void create_ref_children(Instance* instance)
 {
     for (const Meta_Feature* mf : features_of(instance))
     {
-        if (slot_kind(mf) == Slot_Kind::reference)
-            fill_reference(instance, static_cast<const Meta_Reference*>(mf));
+        if (const Meta_Reference* mr = as_single_reference(mf))
+            fill_reference(instance, mr);
     }
 }
 

@@ -41,10 +41,10 @@ bool points_at(const Meta_Reference* mr, const Instance* referent, const Instanc
     return referent && is_subclass(mr->meta_class, instance->__meta_class) && key_eq(instance, referent);
 }
 
-/// The single reference that a feature is; null for all others.
-const Meta_Reference* single_reference(const Meta_Feature* mf)
+void visit_referent(Instance* referent, void (*proc)(Instance*, void* client), void* client)
 {
-    return slot_kind(mf) == Slot_Kind::reference ? static_cast<const Meta_Reference*>(mf) : nullptr;
+    if (referent)
+        visit(referent, proc, client);
 }
 
 } // namespace
@@ -54,19 +54,12 @@ void visit(Instance* instance, void (*proc)(Instance*, void* client), void* clie
     proc(instance, client);
     for (const Meta_Feature* mf : features_of(instance))
     {
-        const Slot_Kind kind = slot_kind(mf);
-        if (kind == Slot_Kind::reference)
+        if (const Meta_Reference* mr = as_single_reference(mf))
+            visit_referent(reference_slot(instance, mr), proc, client);
+        else if (const Meta_Reference* array = as_reference(mf))
         {
-            if (Instance* referent = reference_slot(instance, static_cast<const Meta_Reference*>(mf)))
-                visit(referent, proc, client);
-        }
-        else if (kind == Slot_Kind::reference_array)
-        {
-            for (Instance* referent : references_in(instance, static_cast<const Meta_Reference*>(mf)))
-            {
-                if (referent)
-                    visit(referent, proc, client);
-            }
+            for (Instance* referent : references_in(instance, array))
+                visit_referent(referent, proc, client);
         }
     }
 }
@@ -81,7 +74,7 @@ bool references_match(const Instance* instance, const Instance* assoc, const cha
 {
     for (const Meta_Feature* mf : features_of(assoc))
     {
-        const Meta_Reference* mr = single_reference(mf);
+        const Meta_Reference* mr = as_single_reference(mf);
         if (mr && fits_role(mr, role) && points_at(mr, reference_slot(assoc, mr), instance))
             return true;
     }
@@ -97,7 +90,7 @@ std::ptrdiff_t get_associators(const Instance* instance, const Instance* assoc, 
     std::size_t count = 0;
     for (const Meta_Feature* mf : features_of(assoc))
     {
-        const Meta_Reference* mr = single_reference(mf);
+        const Meta_Reference* mr = as_single_reference(mf);
         if (!mr)
             continue;
         const Instance* referent = reference_slot(assoc, mr);

@@ -34,6 +34,12 @@ inline Slot_Kind slot_kind(const Meta_Feature* mf)
     return Slot_Kind::none;
 }
 
+/// The single reference that a feature is; null for all others.
+inline const Meta_Reference* as_single_reference(const Meta_Feature* mf)
+{
+    return slot_kind(mf) == Slot_Kind::reference ? static_cast<const Meta_Reference*>(mf) : nullptr;
+}
+
 inline std::span<const Meta_Feature* const> features_of(const Meta_Record* record)
 {
     return {record->meta_features, record->num_meta_features};

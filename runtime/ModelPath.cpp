@@ -170,22 +170,13 @@ bool read_reference(Path_Reader& reader, Instance* instance, const Meta_Referenc
 
 bool read_value(Path_Reader& reader, Instance* instance, const Meta_Feature* mf)
 {
-    switch (slot_kind(mf))
-    {
-    case Slot_Kind::scalar:
-    {
-        const auto* mp = static_cast<const Meta_Property*>(mf);
-        null_byte(instance, mp) = 0;
-        return read_property(reader, instance, mp);
-    }
-    case Slot_Kind::reference:
-        return read_reference(reader, instance, static_cast<const Meta_Reference*>(mf));
-    case Slot_Kind::array:
-    case Slot_Kind::reference_array:
-    case Slot_Kind::none:
+    if (const Meta_Reference* mr = as_single_reference(mf))
+        return read_reference(reader, instance, mr);
+    if (slot_kind(mf) != Slot_Kind::scalar)
         return false;
-    }
-    return false;
+    const auto* mp = static_cast<const Meta_Property*>(mf);
+    null_byte(instance, mp) = 0;
+    return read_property(reader, instance, mp);
 }
 
 /// Reads key=value pairs up to the end of the text; each key of the class must stand there once.

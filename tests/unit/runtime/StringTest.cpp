@@ -99,7 +99,7 @@ TEST(String, CopiesShareUntilOneChanges)
     b.append('!'); // private and with room: edited in place
     EXPECT_EQ(b.c_str(), place);
 
-    a = a;
+    a = *&a;
     EXPECT_EQ(a, "text");
     String moved(std::move(a));
     EXPECT_TRUE(a.empty());
