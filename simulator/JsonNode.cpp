@@ -195,7 +195,7 @@ void JsonNode::finish() const
         {
             std::vector<std::string> known = _known;
             std::ranges::sort(known);
-            known.erase(std::ranges::unique(known).begin(), known.end());
+            known.erase(std::unique(known.begin(), known.end()), known.end());
             std::string expected;
             for (const std::string& name : known)
                 expected += (expected.empty() ? "" : ", ") + name;

@@ -93,11 +93,10 @@ TEST(AttributeRows, NumbersAndNamesAreUnique)
             numbers.push_back(row.id);
             names.emplace_back(row.key);
         }
-    const std::size_t all = numbers.size();
     std::ranges::sort(numbers);
     std::ranges::sort(names);
-    EXPECT_EQ(std::ranges::unique(numbers).begin() - numbers.begin(), static_cast<std::ptrdiff_t>(all));
-    EXPECT_EQ(std::ranges::unique(names).begin() - names.begin(), static_cast<std::ptrdiff_t>(all));
+    EXPECT_EQ(std::ranges::adjacent_find(numbers), numbers.end());
+    EXPECT_EQ(std::ranges::adjacent_find(names), names.end());
 }
 
 } // namespace

@@ -5,6 +5,8 @@
 #include <gmock/gmock.h>
 
 #include <filesystem>
+#include <fstream>
+#include <iterator>
 
 namespace tvrsim
 {
@@ -167,6 +169,39 @@ TEST(ScenarioReader, DefaultHostShowsEveryKindOfDevice)
     EXPECT_EQ(down, 1u);
     EXPECT_EQ(virtualPorts, 1u);
     EXPECT_THAT(types, ElementsAre(0, 1, 8, 13, 17));
+}
+
+// The page that documents the format.
+
+std::string documentation()
+{
+    std::ifstream stream(TVRSIM_SCENARIO_FOLDER "/../../docs/scenarios.md");
+    return {std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
+}
+
+TEST(ScenarioDocumentation, NamesEveryAttributeAndHostileKind)
+{
+    const std::string page = documentation();
+    for (const auto rows : {adapterAttributeRows, portAttributeRows, statisticsRows, serverAttributeRows})
+        for (const AttributeRow& row : rows)
+            EXPECT_NE(page.find(std::string("`") + row.key + '`'), std::string::npos) << row.key;
+    for (const HostileRow& row : hostileRows)
+        EXPECT_NE(page.find(std::string("`") + row.name + '`'), std::string::npos) << row.name;
+}
+
+TEST(ScenarioDocumentation, ExamplesAreScenarios)
+{
+    const std::string page = documentation();
+    const std::string begin = "```json\n", end = "```";
+    std::size_t examples = 0;
+    for (std::size_t place = page.find(begin); place != std::string::npos; place = page.find(begin, place))
+    {
+        place += begin.size();
+        const std::string example = page.substr(place, page.find(end, place) - place);
+        EXPECT_NO_THROW(readScenario(example, "example")) << example;
+        ++examples;
+    }
+    EXPECT_GE(examples, 5u);
 }
 
 } // namespace
