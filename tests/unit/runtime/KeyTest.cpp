@@ -184,6 +184,14 @@ TEST(Associations, ReferencesMatchByKeyClassAndRole)
     EXPECT_FALSE(references_match(other.get(), link.get(), ""));
     const Ref<T_Link> empty(make_link<T_Link>(nullptr, nullptr));
     EXPECT_FALSE(references_match(disk.get(), empty.get(), ""));
+
+    Meta_Class alien_class = T_Base::static_meta_class; // the same keys in a class that no reference accepts
+    alien_class.name = "T_Alien";
+    const Ref<> alien(create(&alien_class));
+    static_cast<T_Base*>(alien.get())->System = disk->System;
+    static_cast<T_Base*>(alien.get())->Name = disk->Name;
+    EXPECT_TRUE(key_eq(alien.get(), link->Antecedent));
+    EXPECT_FALSE(references_match(alien.get(), link.get(), ""));
 }
 
 /// Names of the ends that get_associators() collects, or "-" when the association does not concern the instance.
