@@ -49,11 +49,12 @@ int CMPI_Container::relax(Value::Type, Value&)
     return 0;
 }
 
-int CMPI_Container::to_data(const char* name, const Value& value, std::uint32_t flags, CMPIData& data)
+int CMPI_Container::set_value(const char* name, const Value& value, std::uint32_t flags)
 {
+    CMPIData data;
     if (_to_cmpi_data(broker, name_space, value, flags, data) != 0)
         return RUNTIME_LOG(LOG_WARN, "_to_cmpi_data() failed: feature=%s", name), -1;
-    return 0;
+    return add_entry(name, data).rc == CMPI_RC_OK ? 0 : -1;
 }
 
 // --- narrowing of keys --------------------------------------------------------------------------------------
@@ -199,15 +200,12 @@ CMPIData CMPIArgs_Container::entry_at(CMPICount index, CMPIString** name, CMPISt
     return CMGetArgAt(_args, index, name, status);
 }
 
-int CMPIArgs_Container::set_value(const char* name, const Value& value, std::uint32_t flags)
+CMPIStatus CMPIArgs_Container::add_entry(const char* name, const CMPIData& data)
 {
     constexpr char return_value[] = "return_value";
-    CMPIData data;
-    if (to_data(name, value, flags, data) != 0)
-        return -1;
     if (std::strncmp(name, return_value, sizeof return_value) == 0)
-        return _return_data = data, 0;
-    return CMAddArg(_args, name, value_pointer(data), data.type).rc == CMPI_RC_OK ? 0 : -1;
+        return _return_data = data, CMPIStatus{CMPI_RC_OK, nullptr};
+    return CMAddArg(_args, name, value_pointer(data), data.type);
 }
 
 std::size_t CMPIObjectPath_Container::get_size()
@@ -220,12 +218,9 @@ CMPIData CMPIObjectPath_Container::entry_at(CMPICount index, CMPIString** name, 
     return CMGetKeyAt(_path, index, name, status);
 }
 
-int CMPIObjectPath_Container::set_value(const char* name, const Value& value, std::uint32_t flags)
+CMPIStatus CMPIObjectPath_Container::add_entry(const char* name, const CMPIData& data)
 {
-    CMPIData data;
-    if (to_data(name, value, flags, data) != 0)
-        return -1;
-    return CMAddKey(_path, name, value_pointer(data), data.type).rc == CMPI_RC_OK ? 0 : -1;
+    return CMAddKey(_path, name, value_pointer(data), data.type);
 }
 
 std::size_t CMPIInstance_Container::get_size()
@@ -238,12 +233,9 @@ CMPIData CMPIInstance_Container::entry_at(CMPICount index, CMPIString** name, CM
     return CMGetPropertyAt(_instance, index, name, status);
 }
 
-int CMPIInstance_Container::set_value(const char* name, const Value& value, std::uint32_t flags)
+CMPIStatus CMPIInstance_Container::add_entry(const char* name, const CMPIData& data)
 {
-    CMPIData data;
-    if (to_data(name, value, flags, data) != 0)
-        return -1;
-    return CMSetProperty(_instance, name, value_pointer(data), data.type).rc == CMPI_RC_OK ? 0 : -1;
+    return CMSetProperty(_instance, name, value_pointer(data), data.type);
 }
 
 } // namespace cimple

@@ -7,12 +7,13 @@
 namespace cimple
 {
 
-/// What the three share: the reading rule and the conversion before a write.
+/// What the three share: the rules of reading and the conversion before a write.
 class CMPI_Container : public Container
 {
 public:
     int get_name(std::size_t index, String& name) override;
     int get_value(std::size_t index, Value::Type type, Value& value) override;
+    int set_value(const char* name, const Value& value, std::uint32_t flags) override;
 
 protected:
     CMPI_Container(const CMPIBroker* mb, const Meta_Repository* repository, const char* ns)
@@ -23,8 +24,7 @@ protected:
     virtual CMPIData entry_at(CMPICount index, CMPIString** name, CMPIStatus* status) = 0;
     /// Brings a value nearer to the type asked for, by the rules of the container. -1 when it must but cannot.
     virtual int relax(Value::Type type, Value& value);
-    /// The broker's form of a value; logs its own failure.
-    int to_data(const char* name, const Value& value, std::uint32_t flags, CMPIData& data);
+    virtual CMPIStatus add_entry(const char* name, const CMPIData& data) = 0;
 
     const CMPIBroker* broker;
     const char* name_space; ///< of references that have none of their own; may be null when only reading
@@ -38,12 +38,12 @@ public:
         : CMPI_Container(mb, repository, ns), _args(args)
     {}
     std::size_t get_size() override;
-    int set_value(const char* name, const Value& value, std::uint32_t flags) override;
-    /// What set_value() got as "return_value"; of type CMPI_null when it got none.
+    /// What was set as "return_value", which is no argument; of type CMPI_null when it got none.
     const CMPIData& return_data() const { return _return_data; }
 
 private:
     CMPIData entry_at(CMPICount index, CMPIString** name, CMPIStatus* status) override;
+    CMPIStatus add_entry(const char* name, const CMPIData& data) override;
     int relax(Value::Type type, Value& value) override;
 
     CMPIArgs* _args;
@@ -59,10 +59,10 @@ public:
         : CMPI_Container(mb, repository, ns), _path(path)
     {}
     std::size_t get_size() override;
-    int set_value(const char* name, const Value& value, std::uint32_t flags) override;
 
 private:
     CMPIData entry_at(CMPICount index, CMPIString** name, CMPIStatus* status) override;
+    CMPIStatus add_entry(const char* name, const CMPIData& data) override;
     int relax(Value::Type type, Value& value) override;
 
     CMPIObjectPath* _path;
@@ -77,10 +77,10 @@ public:
         : CMPI_Container(mb, repository, ns), _instance(instance)
     {}
     std::size_t get_size() override;
-    int set_value(const char* name, const Value& value, std::uint32_t flags) override;
 
 private:
     CMPIData entry_at(CMPICount index, CMPIString** name, CMPIStatus* status) override;
+    CMPIStatus add_entry(const char* name, const CMPIData& data) override;
 
     CMPIInstance* _instance;
 };
