@@ -23,10 +23,13 @@ public:
 
     /// `function` is the exported name; `subject` tells what the call concerns. May block.
     Call(Simulation& simulation, const char* function, const Subject& subject = {})
-        : _host(simulation.host), _effects(simulation.enter(function, subject))
+        : _simulation(simulation), _effects(simulation.enter(function, subject))
     {}
+    ~Call() { _simulation.leave(_effects); }
+    Call(const Call&) = delete;
+    Call& operator=(const Call&) = delete;
 
-    SimulatedHost& host() { return _host; }
+    SimulatedHost& host() { return _simulation.host; }
 
     /// A fault wants the call to fail.
     bool fails() const { return _effects.status.has_value(); }
@@ -140,7 +143,7 @@ private:
     void deliverScsi(ScsiReply reply, void* response, std::size_t responseSize, void* sense,
                      std::size_t senseSize) const;
 
-    SimulatedHost& _host;
+    Simulation& _simulation;
     const Effects _effects;
 };
 

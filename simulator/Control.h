@@ -33,6 +33,8 @@ extern "C"
     /// Calls of an exported function, by its exact name, since the scenario was loaded or the counts were reset.
     TVRSIM_EXPORT std::uint64_t tvrsim_call_count(const char* function);
     TVRSIM_EXPORT void tvrsim_reset_counts();
+    /// Nanoseconds spent inside calls since the process began, their waits at gates and delays left out.
+    TVRSIM_EXPORT std::uint64_t tvrsim_nanoseconds();
 
     /// Adds a fault row, as in the "faults" of a scenario. Its calls are counted from now on.
     TVRSIM_EXPORT int tvrsim_add_fault(const char* row, char* error, std::size_t errorSize);

@@ -38,6 +38,7 @@ struct Effects
     std::optional<std::int32_t> status;
     std::optional<std::size_t> truncate;
     std::optional<Hostile> hostile;
+    std::chrono::steady_clock::time_point begun; ///< when the call came, or its last wait ended
 };
 
 /// The rows in force. Safe for use from many threads.

@@ -29,13 +29,23 @@ void Simulation::clearFaults()
 
 Effects Simulation::enter(const char* function, const std::function<std::string()>& subject)
 {
+    using Clock = std::chrono::steady_clock;
+    const Clock::time_point arrival = Clock::now();
     counts.add(function);
-    const Effects effects = _faults.meet(function, subject);
+    Effects effects = _faults.meet(function, subject);
     for (const std::string& gate : effects.gates)
         gates.pass(gate);
     if (effects.delay.count() > 0)
         std::this_thread::sleep_for(effects.delay);
+    const bool waited = effects.delay.count() > 0 || !effects.gates.empty();
+    effects.begun = waited ? Clock::now() : arrival;
     return effects;
+}
+
+void Simulation::leave(const Effects& effects)
+{
+    const std::chrono::nanoseconds took = std::chrono::steady_clock::now() - effects.begun;
+    nanoseconds.fetch_add(static_cast<std::uint64_t>(took.count()), std::memory_order_relaxed);
 }
 
 } // namespace tvrsim

@@ -5,6 +5,8 @@
 #include "simulator/Gates.h"
 #include "simulator/SimulatedHost.h"
 
+#include <atomic>
+
 namespace tvrsim
 {
 
@@ -20,7 +22,11 @@ public:
 
     /// Begins a call: counts it, and waits as long as faults say. No lock is held meanwhile.
     Effects enter(const char* function, const std::function<std::string()>& subject);
+    /// Ends it: adds the time that it took, without its waits.
+    void leave(const Effects& effects);
 
+    /// Spent inside calls since the process began, threads added up.
+    std::atomic<std::uint64_t> nanoseconds{0};
     SimulatedHost host;
     CallCounts counts;
     Gates gates;

@@ -101,6 +101,11 @@ void tvrsim_reset_counts()
     simulation().counts.reset();
 }
 
+std::uint64_t tvrsim_nanoseconds()
+{
+    return simulation().nanoseconds;
+}
+
 int tvrsim_add_fault(const char* row, char* error, std::size_t errorSize)
 {
     return attempt(error, errorSize, [&] { tvrsim_simulation()->addFault(readFault(row, "fault")); });
