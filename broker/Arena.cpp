@@ -72,8 +72,7 @@ std::vector<std::unique_ptr<Tracked>> CloneRegistry::takeAll()
 Frame::Frame(Core& frameCore, const CMPIBroker* frameBroker, std::string name, std::vector<Property> contextEntries)
     : core(frameCore), broker(frameBroker), what(std::move(name)),
       context(make<ContextHandle>(std::move(contextEntries)))
-{
-}
+{}
 
 Frame::~Frame()
 {

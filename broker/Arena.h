@@ -2,7 +2,8 @@
 //
 // Every object is made in a frame: the scope of one call into a provider, or of one attachment of a provider's thread.
 // At the frame's end its objects die. A clone belongs to whoever made it until it is released. Dead objects lose their
-// content but stay recognisable for a while in the graveyard, so that a late use is reported instead of being undefined.
+// content but stay recognisable for a while in the graveyard, so that a late use is reported instead of being
+// undefined.
 #pragma once
 
 #include "broker/Value.h"

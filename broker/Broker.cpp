@@ -60,8 +60,7 @@ const cimple::Meta_Repository* repositoryOf(const ModuleImage& image)
 Core::Core(Options brokerOptions)
     : options(std::move(brokerOptions)), image(imageOf(options)), classes(repositoryOf(*image)),
       graveyard(options.quarantine), store(classes), providers(*this)
-{
-}
+{}
 
 std::string statusName(CMPIrc status)
 {

@@ -75,8 +75,7 @@ Value defaultValue(const cimple::Meta_Property& property)
     Value::List elements;
     for (std::size_t i = 0; i < list.size; ++i)
     {
-        elements.push_back(
-            scalarDefault(elementType, static_cast<const char*>(list.data) + i * widths[property.type]));
+        elements.push_back(scalarDefault(elementType, static_cast<const char*>(list.data) + i * widths[property.type]));
     }
     return Value::array(elementType, std::move(elements));
 }
@@ -154,7 +153,8 @@ const cimple::Meta_Class& declarer(const cimple::Meta_Class& meta, std::size_t i
 bool NameLess::operator()(std::string_view a, std::string_view b) const
 {
     return std::lexicographical_compare(
-        a.begin(), a.end(), b.begin(), b.end(), [](char x, char y)
+        a.begin(), a.end(), b.begin(), b.end(),
+        [](char x, char y)
         { return std::tolower(static_cast<unsigned char>(x)) < std::tolower(static_cast<unsigned char>(y)); });
 }
 

@@ -19,11 +19,11 @@ struct ClassInfo;
 struct FeatureInfo
 {
     std::string name;
-    CMPIType type = CMPI_null;      ///< with the array bit; CMPI_ref or CMPI_instance for references
-    std::string referenceClass;     ///< of a reference or embedded instance
-    std::uint32_t flags = 0;        ///< cimple::Meta_Flag bits
-    Value defaultValue;             ///< null if the schema has none
-    const ClassInfo* origin = {};   ///< the class that declares it; null for a parameter
+    CMPIType type = CMPI_null;    ///< with the array bit; CMPI_ref or CMPI_instance for references
+    std::string referenceClass;   ///< of a reference or embedded instance
+    std::uint32_t flags = 0;      ///< cimple::Meta_Flag bits
+    Value defaultValue;           ///< null if the schema has none
+    const ClassInfo* origin = {}; ///< the class that declares it; null for a parameter
 
     bool isKey() const { return (flags & cimple::META_KEY) != 0; }
     /// A reference to another object (an embedded instance is none).

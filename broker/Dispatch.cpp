@@ -47,8 +47,8 @@ Object filtered(Object object, const PropertyList& list)
         std::erase_if(object.properties,
                       [&](const Property& property)
                       {
-                          return std::none_of(list->begin(), list->end(), [&](const std::string& name)
-                                              { return sameName(name, property.name); });
+                          return std::none_of(list->begin(), list->end(),
+                                              [&](const std::string& name) { return sameName(name, property.name); });
                       });
     }
     return object;
@@ -78,7 +78,8 @@ const std::vector<std::string>* listOf(const PropertyList& properties)
 
 bool canReference(const ClassInfo& association, const ClassInfo& source)
 {
-    return std::any_of(association.properties.begin(), association.properties.end(), [&](const FeatureInfo& property)
+    return std::any_of(association.properties.begin(), association.properties.end(),
+                       [&](const FeatureInfo& property)
                        { return property.isReference() && source.isA(property.referenceClass); });
 }
 
@@ -89,7 +90,8 @@ bool canReference(const ClassInfo& association, const ClassInfo& source)
 bool Dispatcher::servedByModule(std::string_view nameSpace) const
 {
     const std::vector<std::string>& spaces = _core.options.moduleNamespaces;
-    return std::any_of(spaces.begin(), spaces.end(), [&](const std::string& space)
+    return std::any_of(spaces.begin(), spaces.end(),
+                       [&](const std::string& space)
                        { return canonicalNameSpace(space) == canonicalNameSpace(nameSpace); });
 }
 
@@ -97,7 +99,8 @@ const ClassInfo* Dispatcher::findClass(std::string_view nameSpace, std::string_v
 {
     const std::vector<std::string>& platform = _core.options.platformNamespaces;
     const bool served = servedByModule(nameSpace);
-    if (!served && std::none_of(platform.begin(), platform.end(), [&](const std::string& space)
+    if (!served && std::none_of(platform.begin(), platform.end(),
+                                [&](const std::string& space)
                                 { return canonicalNameSpace(space) == canonicalNameSpace(nameSpace); }))
     {
         outcome = failure(CMPI_RC_ERR_INVALID_NAMESPACE, "there is no namespace '" + std::string(nameSpace) + "'");
@@ -251,12 +254,12 @@ Reply Dispatcher::getInstance(const Path& path, const PropertyList& properties)
         return answer;
     }
     NameList names(listOf(properties));
-    append(answer, run<Kind::instance>(
-                       *provider, "getInstance " + info->name, path.nameSpace,
-                       {.kind = ResultKind::instances, .expectedClass = info, .limit = 1}, true, answer,
-                       [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result) {
-                           return mi->ft->getInstance(mi, frame.context, result, makePath(frame, path), names.get());
-                       }));
+    append(answer, run<Kind::instance>(*provider, "getInstance " + info->name, path.nameSpace,
+                                       {.kind = ResultKind::instances, .expectedClass = info, .limit = 1}, true, answer,
+                                       [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result) {
+                                           return mi->ft->getInstance(mi, frame.context, result, makePath(frame, path),
+                                                                      names.get());
+                                       }));
     if (answer.ok() && answer.objects.empty())
     {
         _core.violation("getInstance " + info->name + " answered OK without an instance");
@@ -375,10 +378,12 @@ Answer Dispatcher::fanOutAssociations(const char* operation, const Path& path, c
         const bool own = filter.assocClass.empty() && _core.options.fanout == Fanout::own_class;
         const std::string& assocClass = own ? provider->info->name : filter.assocClass;
         Outcome outcome;
-        append(answer, run<Kind::association>(
-                           *provider, operation + (" " + provider->info->name), path.nameSpace, {.kind = kind}, true,
-                           outcome, [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result)
-                           { return call(mi, frame, result, makePath(frame, path), filterText(assocClass)); }));
+        append(answer, run<Kind::association>(*provider, operation + (" " + provider->info->name), path.nameSpace,
+                                              {.kind = kind}, true, outcome,
+                                              [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result) {
+                                                  return call(mi, frame, result, makePath(frame, path),
+                                                              filterText(assocClass));
+                                              }));
         if (!outcome.ok())
         {
             return failed<Answer>(outcome);
@@ -416,8 +421,7 @@ Reply Dispatcher::references(const Path& path, const AssociationFilter& filter, 
     NameList names(listOf(properties));
     return fanOutAssociations<Reply>(
         "references", path, filter,
-        [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
-        {
+        [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass) {
             return mi->ft->references(mi, frame.context, result, source, assocClass, filterText(filter.role),
                                       names.get());
         });
@@ -448,18 +452,18 @@ MethodReply Dispatcher::invokeMethod(const Path& path, const std::string& method
             failure(CMPI_RC_ERR_METHOD_NOT_AVAILABLE, "no provider serves the methods of " + info->name));
     }
     const MethodInfo* definition = info->method(method);
-    ResultContent result = run<Kind::method>(
-        *provider, "invokeMethod " + info->name + "." + method, path.nameSpace,
-        {.kind = ResultKind::data, .limit = 1, .method = definition}, true, answer,
-        [&](CMPIMethodMI* mi, Frame& frame, ResultHandle* handle)
-        {
-            const ArgsHandle* inArgs = frame.make<ArgsHandle>({in, nullptr});
-            ArgsHandle* outArgs = frame.make<ArgsHandle>({{}, definition});
-            const CMPIStatus status = mi->ft->invokeMethod(mi, frame.context, handle, makePath(frame, path),
-                                                           method.c_str(), inArgs, outArgs);
-            answer.out = std::move(outArgs->content.args);
-            return status;
-        });
+    ResultContent result =
+        run<Kind::method>(*provider, "invokeMethod " + info->name + "." + method, path.nameSpace,
+                          {.kind = ResultKind::data, .limit = 1, .method = definition}, true, answer,
+                          [&](CMPIMethodMI* mi, Frame& frame, ResultHandle* handle)
+                          {
+                              const ArgsHandle* inArgs = frame.make<ArgsHandle>({in, nullptr});
+                              ArgsHandle* outArgs = frame.make<ArgsHandle>({{}, definition});
+                              const CMPIStatus status = mi->ft->invokeMethod(
+                                  mi, frame.context, handle, makePath(frame, path), method.c_str(), inArgs, outArgs);
+                              answer.out = std::move(outArgs->content.args);
+                              return status;
+                          });
     if (!answer.ok())
     {
         return failed<MethodReply>(answer);

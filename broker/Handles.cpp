@@ -98,10 +98,9 @@ CMPIStatus releaseClone(Tracked* object)
 Tracked* openAny(const void* object)
 {
     static constexpr std::array<const void*, 10> tables{
-        &StringHandle::functions,      &DateTimeHandle::functions, &ArrayHandle::functions,
-        &EnumerationHandle::functions, &PathHandle::functions,     &InstanceHandle::functions,
-        &ArgsHandle::functions,        &ContextHandle::functions,  &SelectExpHandle::functions,
-        &ResultHandle::functions};
+        &StringHandle::functions,    &DateTimeHandle::functions, &ArrayHandle::functions, &EnumerationHandle::functions,
+        &PathHandle::functions,      &InstanceHandle::functions, &ArgsHandle::functions,  &ContextHandle::functions,
+        &SelectExpHandle::functions, &ResultHandle::functions};
     if (!object)
     {
         return nullptr;

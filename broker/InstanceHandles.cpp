@@ -179,10 +179,10 @@ ResultHandle* openResult(const CMPIResult* result, ResultContent::Kind kind, con
     }
     const ResultContent& content = handle->content;
     const std::size_t given = content.objects.size() + content.paths.size() + (content.data ? 1 : 0);
-    const char* fault = content.done            ? " after returnDone"
-                        : content.kind != kind  ? " in an operation that gives no such result"
+    const char* fault = content.done             ? " after returnDone"
+                        : content.kind != kind   ? " in an operation that gives no such result"
                         : given >= content.limit ? " though the operation gives only one result"
-                                                : nullptr;
+                                                 : nullptr;
     if (fault)
     {
         handle->core->violation(function + std::string(fault));

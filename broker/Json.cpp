@@ -198,7 +198,12 @@ Object objectFromJson(const ClassTable& classes, std::string_view nameSpace, con
     Object object;
     object.path.nameSpace = json.value("namespace", std::string(nameSpace));
     object.path.className = info->name;
-    for (const auto& [name, value] : json.value("properties", Json::object()).items())
+    const Json properties = json.value("properties", Json::object());
+    if (!properties.is_object())
+    {
+        throw std::invalid_argument("the \"properties\" of an instance are an object");
+    }
+    for (const auto& [name, value] : properties.items())
     {
         const FeatureInfo* feature = info->property(name);
         if (!feature)

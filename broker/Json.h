@@ -12,8 +12,8 @@ namespace broker
 /// Members keep their order, so that output is stable.
 using Json = nlohmann::ordered_json;
 
-/// Numbers, booleans and arrays as such; strings, datetimes and references (full paths) as strings; an embedded instance
-/// as an object; a real that is no number as null.
+/// Numbers, booleans and arrays as such; strings, datetimes and references (full paths) as strings; an embedded
+/// instance as an object; a real that is no number as null.
 Json toJson(const Value& value);
 /// {"class", "namespace", "path", "properties": {...}}
 Json toJson(const Object& object);

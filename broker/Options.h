@@ -43,9 +43,9 @@ enum class IntegerKeys
 
 struct Options
 {
-    std::string module = {};                   ///< path of the shared object, opened when `image` is null
-    std::shared_ptr<ModuleImage> image = {};   ///< a module that is already at hand
-    bool globalSymbols = false;                ///< open the shared object with RTLD_GLOBAL
+    std::string module = {};                 ///< path of the shared object, opened when `image` is null
+    std::shared_ptr<ModuleImage> image = {}; ///< a module that is already at hand
+    bool globalSymbols = false;              ///< open the shared object with RTLD_GLOBAL
     Fanout fanout = Fanout::null_class;
     LoadKinds loadKinds = LoadKinds::lazy;
     CleanupCalls cleanupCalls = CleanupCalls::each;

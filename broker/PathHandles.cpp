@@ -12,7 +12,7 @@ namespace
 {
 
 /// Sets a text of the path; null clears it.
-template <std::string Path::* Member> CMPIStatus setText(CMPIObjectPath* path, const char* text)
+template <std::string Path::*Member> CMPIStatus setText(CMPIObjectPath* path, const char* text)
 {
     CMPIStatus status{};
     if (auto* handle = open<PathHandle>(path, "set", &status))
@@ -23,7 +23,7 @@ template <std::string Path::* Member> CMPIStatus setText(CMPIObjectPath* path, c
     return status;
 }
 
-template <std::string Path::* Member> CMPIString* getText(const CMPIObjectPath* path, CMPIStatus* rc)
+template <std::string Path::*Member> CMPIString* getText(const CMPIObjectPath* path, CMPIStatus* rc)
 {
     const auto* handle = open<PathHandle>(path, "get", rc);
     return handle ? newString(*handle->core, "get", rc, handle->content.path.*Member) : nullptr;

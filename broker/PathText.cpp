@@ -153,8 +153,8 @@ Path parsePath(std::string_view text, const ClassTable& classes, std::string_vie
         reader.take(':');
     }
     path.className = reader.until(".");
-    if (path.className.empty() || !std::all_of(path.className.begin(), path.className.end(), [](unsigned char c)
-                                               { return std::isalnum(c) || c == '_'; }))
+    if (path.className.empty() || !std::all_of(path.className.begin(), path.className.end(),
+                                               [](unsigned char c) { return std::isalnum(c) || c == '_'; }))
     {
         throw std::invalid_argument("'" + path.className + "' is no class name");
     }
@@ -183,8 +183,8 @@ std::string missingKey(const Path& path, const ClassTable& classes)
     {
         return {};
     }
-    const auto missing = std::find_if(info->keys.begin(), info->keys.end(),
-                                      [&](const std::string& name) { return !path.key(name); });
+    const auto missing =
+        std::find_if(info->keys.begin(), info->keys.end(), [&](const std::string& name) { return !path.key(name); });
     return missing == info->keys.end() ? std::string() : *missing;
 }
 

@@ -11,11 +11,38 @@ namespace
 {
 
 /// By bit number; the first four say what kind a feature is.
-constexpr std::array<const char*, 32> flagNames{
-    "Property",   "Reference",    "Method",         "Class",     "Abstract",  "Aggregate",    "Aggregation", "Association",
-    "Composition", "Counter",     "Delete",         "DN",        "EmbeddedObject", "Exception", "Expensive", "Experimental",
-    "Gauge",      "IfDeleted",    "In",             "Indication", "Invisible", "Key",         "Large",       "OctetString",
-    "Out",        "Read",         "Required",       "Static",    "Terminal",  "Weak",         "Write",       "EmbeddedInstance"};
+constexpr std::array<const char*, 32> flagNames{"Property",
+                                                "Reference",
+                                                "Method",
+                                                "Class",
+                                                "Abstract",
+                                                "Aggregate",
+                                                "Aggregation",
+                                                "Association",
+                                                "Composition",
+                                                "Counter",
+                                                "Delete",
+                                                "DN",
+                                                "EmbeddedObject",
+                                                "Exception",
+                                                "Expensive",
+                                                "Experimental",
+                                                "Gauge",
+                                                "IfDeleted",
+                                                "In",
+                                                "Indication",
+                                                "Invisible",
+                                                "Key",
+                                                "Large",
+                                                "OctetString",
+                                                "Out",
+                                                "Read",
+                                                "Required",
+                                                "Static",
+                                                "Terminal",
+                                                "Weak",
+                                                "Write",
+                                                "EmbeddedInstance"};
 constexpr unsigned firstQualifier = 4;
 
 std::string qualifierList(std::uint32_t flags, const char* indent)

@@ -127,8 +127,8 @@ int condWait(void* condition, void* mutex)
 
 int timedCondWait(void* condition, void* mutex, timespec* until)
 {
-    return until ? pthread_cond_timedwait(static_cast<pthread_cond_t*>(condition),
-                                          static_cast<pthread_mutex_t*>(mutex), until)
+    return until ? pthread_cond_timedwait(static_cast<pthread_cond_t*>(condition), static_cast<pthread_mutex_t*>(mutex),
+                                          until)
                  : EINVAL;
 }
 

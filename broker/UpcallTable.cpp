@@ -158,10 +158,11 @@ CMPIEnumeration* enumerateInstanceNames(const CMPIBroker* mb, const CMPIContext*
                                         CMPIStatus* rc)
 {
     const PathUpcall call(mb, ctx, path, "enumerateInstanceNames", rc);
-    return call ? enumeration(
-                      *call.frame,
-                      call.dispatcher().enumerateInstanceNames(call.object().nameSpace, call.object().className), rc)
-                : nullptr;
+    return call
+               ? enumeration(*call.frame,
+                             call.dispatcher().enumerateInstanceNames(call.object().nameSpace, call.object().className),
+                             rc)
+               : nullptr;
 }
 
 CMPIEnumeration* enumerateInstances(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
@@ -221,11 +222,10 @@ CMPIStatus modifyInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CM
     CMPIStatus status{};
     const PathUpcall call(mb, ctx, path, "modifyInstance", &status);
     const auto* instance = call ? open<InstanceHandle>(inst, "modifyInstance", &status) : nullptr;
-    return instance
-               ? makeStatus(
-                     call.dispatcher().modifyInstance(instanceAt(*instance, call.object()), propertyList(properties))
-                         .status)
-               : status;
+    return instance ? makeStatus(call.dispatcher()
+                                     .modifyInstance(instanceAt(*instance, call.object()), propertyList(properties))
+                                     .status)
+                    : status;
 }
 
 CMPIStatus deleteInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path)
@@ -287,9 +287,9 @@ CMPIEnumeration* referenceNames(const CMPIBroker* mb, const CMPIContext* ctx, co
                                 const char* resultClass, const char* role, CMPIStatus* rc)
 {
     const PathUpcall call(mb, ctx, path, "referenceNames", rc);
-    return call ? enumeration(
-                      *call.frame,
-                      call.dispatcher().referenceNames(call.object(), {text(resultClass), "", text(role), ""}), rc)
+    return call ? enumeration(*call.frame,
+                              call.dispatcher().referenceNames(call.object(), {text(resultClass), "", text(role), ""}),
+                              rc)
                 : nullptr;
 }
 

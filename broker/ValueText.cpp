@@ -126,7 +126,8 @@ DateTime parseDateTime(std::string_view text)
 std::string_view trimmed(std::string_view text)
 {
     const auto first = text.find_first_not_of(' ');
-    return first == std::string_view::npos ? std::string_view() : text.substr(first, text.find_last_not_of(' ') - first + 1);
+    return first == std::string_view::npos ? std::string_view()
+                                           : text.substr(first, text.find_last_not_of(' ') - first + 1);
 }
 
 /// The text between brackets as elements between commas, for arrays that are no JSON.
@@ -234,8 +235,8 @@ std::string mofValue(const Value& value)
         return joined(value.asList(), "{", "}", mofValue);
     }
     const CMPIType type = value.type();
-    const bool bare = isInteger(type) || type == CMPI_char16 || type == CMPI_boolean || type == CMPI_real32 ||
-                      type == CMPI_real64;
+    const bool bare =
+        isInteger(type) || type == CMPI_char16 || type == CMPI_boolean || type == CMPI_real32 || type == CMPI_real64;
     return bare ? valueText(value) : quoteText(valueText(value));
 }
 

@@ -25,23 +25,21 @@ std::string quoteText(std::string_view text);
 struct Target
 {
     const ClassTable& classes;
-    std::string_view nameSpace;      ///< of references that name none
+    std::string_view nameSpace; ///< of references that name none
     CMPIType type;
     std::string_view referenceClass; ///< of references and embedded instances
 
     Target(const ClassTable& table, std::string_view space, const FeatureInfo& feature)
         : classes(table), nameSpace(space), type(feature.type), referenceClass(feature.referenceClass)
-    {
-    }
+    {}
     Target(const ClassTable& table, std::string_view space, CMPIType valueType, std::string_view refClass = {})
         : classes(table), nameSpace(space), type(valueType), referenceClass(refClass)
-    {
-    }
+    {}
     Target element() const { return {classes, nameSpace, static_cast<CMPIType>(type & ~CMPI_ARRAY), referenceClass}; }
 };
 
-/// Reads a value of the target's type. "null" is a null; arrays are "[a,b]" or JSON; embedded instances are JSON; a text
-/// in double quotes is a JSON string. Throws std::invalid_argument with the reason.
+/// Reads a value of the target's type. "null" is a null; arrays are "[a,b]" or JSON; embedded instances are JSON; a
+/// text in double quotes is a JSON string. Throws std::invalid_argument with the reason.
 Value parseValue(const Target& target, std::string_view text);
 
 } // namespace broker

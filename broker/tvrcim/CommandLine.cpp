@@ -121,15 +121,14 @@ CommandLine parseCommandLine(int argc, const char* const* argv)
     Settings& settings = line.settings;
     CLI::App app("A CIM broker for one machine, with the Fibre Channel provider inside it.", "tvrcim");
     app.add_option("--module", settings.module, "provider module to load");
-    CLI::Option* scenario =
-        app.add_option("--scenario", settings.scenario, "scenario file of the simulated host")->check(CLI::ExistingFile);
+    CLI::Option* scenario = app.add_option("--scenario", settings.scenario, "scenario file of the simulated host")
+                                ->check(CLI::ExistingFile);
     app.add_flag("--hardware", settings.hardware, "use the adapters of this machine, not the simulator")
         ->excludes(scenario);
     app.add_option("--platform", settings.platform, "file with instances of the platform's classes")
         ->check(CLI::ExistingFile);
     app.add_option("--namespace", settings.nameSpace, "namespace of classes and paths")->capture_default_str();
-    const std::map<std::string, Format> formats{
-        {"table", Format::table}, {"json", Format::json}, {"mof", Format::mof}};
+    const std::map<std::string, Format> formats{{"table", Format::table}, {"json", Format::json}, {"mof", Format::mof}};
     app.add_option("--format", settings.format, "table, json or mof")->transform(CLI::Transformer(formats));
     app.fallthrough();
     app.require_subcommand(1);

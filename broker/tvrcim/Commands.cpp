@@ -162,9 +162,9 @@ void set(Session& session, const Command& command)
 void create(Session& session, const Command& command)
 {
     const ClassInfo& info = classOf(session, command.target);
-    Object object{{session.nameSpace, info.name, {}},
-                  parseAssignments(session.broker.classes(), session.nameSpace, info.properties, info.name,
-                                   command.assignments)};
+    Object object{
+        {session.nameSpace, info.name, {}},
+        parseAssignments(session.broker.classes(), session.nameSpace, info.properties, info.name, command.assignments)};
     for (const std::string& key : info.keys)
     {
         if (object.has(key))
@@ -233,8 +233,7 @@ constexpr std::array<CommandRow, 11> commands{{
 
 CimError::CimError(const Outcome& outcome)
     : std::runtime_error(statusName(outcome.status) + (outcome.message.empty() ? "" : ": " + outcome.message))
-{
-}
+{}
 
 std::vector<Property> parseAssignments(const ClassTable& classes, std::string_view nameSpace,
                                        const std::vector<FeatureInfo>& features, const std::string& owner,
@@ -249,9 +248,9 @@ std::vector<Property> parseAssignments(const ClassTable& classes, std::string_vi
                                           [&](const FeatureInfo& f) { return sameName(f.name, name); });
         if (mark == std::string::npos || feature == features.end())
         {
-            throw UsageError("'" + text + "': " +
-                             (mark == std::string::npos ? "an assignment is written name=value"
-                                                        : owner + " has no '" + name + "'"));
+            throw UsageError(
+                "'" + text + "': " +
+                (mark == std::string::npos ? "an assignment is written name=value" : owner + " has no '" + name + "'"));
         }
         try
         {

@@ -29,12 +29,12 @@ public:
 /// One command with its arguments; what a command does not use stays empty.
 struct Command
 {
-    std::string name;
-    std::string target; ///< class name or path
-    std::string method;
-    std::vector<std::string> assignments; ///< name=value
-    broker::PropertyList properties;
-    broker::AssociationFilter filter;
+    std::string name = {};
+    std::string target = {}; ///< class name or path
+    std::string method = {};
+    std::vector<std::string> assignments = {}; ///< name=value
+    broker::PropertyList properties = {};
+    broker::AssociationFilter filter = {};
     bool names = false;
     bool all = false;
 };

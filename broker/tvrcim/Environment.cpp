@@ -41,8 +41,8 @@ fs::path locate(std::initializer_list<fs::path> folders, const std::string& file
 void* openLibrary(const std::string& file)
 {
     const fs::path folder = executableFolder();
-    const fs::path path =
-        locate({folder / "../simulator", folder / "../lib/tavrin-fc-simulator", TVRCIM_BUILD_FOLDER "/simulator"}, file);
+    const fs::path path = locate(
+        {folder / "../simulator", folder / "../lib/tavrin-fc-simulator", TVRCIM_BUILD_FOLDER "/simulator"}, file);
     if (path.empty())
     {
         throw std::runtime_error("the simulator's " + file + " is not installed; use --hardware for real adapters");

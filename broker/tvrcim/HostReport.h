@@ -15,7 +15,7 @@ namespace tvrcim
 /// An element of the host.
 struct HostNode
 {
-    std::string kind;        ///< "Card", "Chip", ...
+    std::string kind; ///< "Card", "Chip", ...
     std::string name;
     std::string association; ///< class of the association that leads here from the parent
     std::vector<std::pair<std::string, std::string>> facts = {};

@@ -109,8 +109,8 @@ std::size_t displayWidth(const std::string& text)
 {
     constexpr unsigned continuationMask = 0xC0;
     constexpr unsigned continuation = 0x80;
-    return static_cast<std::size_t>(
-        std::count_if(text.begin(), text.end(), [](unsigned char c) { return (c & continuationMask) != continuation; }));
+    return static_cast<std::size_t>(std::count_if(
+        text.begin(), text.end(), [](unsigned char c) { return (c & continuationMask) != continuation; }));
 }
 
 std::string padded(const std::string& text, std::size_t width)

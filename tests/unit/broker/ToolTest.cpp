@@ -1,0 +1,196 @@
+// The tool's commands, command line and reports.
+#include "tests/unit/broker/FakeModule.h"
+
+#include "broker/tvrcim/CommandLine.h"
+#include "broker/tvrcim/HostReport.h"
+#include "broker/tvrcim/Printing.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <fstream>
+#include <sstream>
+
+namespace
+{
+
+using namespace broker;
+using namespace tvrcim;
+using broker_test::Fixture;
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+CommandLine parse(std::vector<const char*> words)
+{
+    words.insert(words.begin(), "tvrcim");
+    return parseCommandLine(static_cast<int>(words.size()), words.data());
+}
+
+TEST(CommandLineTest, OptionsStandBeforeOrBehindTheCommand)
+{
+    const CommandLine line =
+        parse({"--namespace", "root/x", "enum", "TST_Base", "--properties", "a,b", "--format", "json"});
+    ASSERT_TRUE(line.proceed);
+    EXPECT_EQ(line.settings.nameSpace, "root/x");
+    EXPECT_EQ(line.settings.format, Format::json);
+    EXPECT_EQ(line.settings.command.name, "enum");
+    EXPECT_EQ(line.settings.command.target, "TST_Base");
+    EXPECT_THAT(line.settings.command.properties.value(), ElementsAre("a", "b"));
+
+    const Command assoc =
+        parse({"assoc", "P.k=1", "--class", "A", "--result-class", "R", "--role", "X", "--result-role", "Y", "--names"})
+            .settings.command;
+    EXPECT_EQ(assoc.filter.assocClass + assoc.filter.resultClass + assoc.filter.role + assoc.filter.resultRole, "ARXY");
+    EXPECT_TRUE(assoc.names);
+    const Command call = parse({"call", "P.k=1", "Add", "A=1", "B=[1,2]"}).settings.command;
+    EXPECT_EQ(call.method, "Add");
+    EXPECT_THAT(call.assignments, ElementsAre("A=1", "B=[1,2]"));
+}
+
+TEST(CommandLineTest, UsageErrorsExitWithTwo)
+{
+    for (const std::vector<const char*>& words : {std::vector<const char*>{},
+                                                  {"nonsense"},
+                                                  {"enum"},
+                                                  {"set", "P.k=1"},
+                                                  {"--format", "xml", "classes"},
+                                                  {"--scenario", "/nonexistent", "classes"},
+                                                  {"enum", "A", "--unknown"}})
+    {
+        testing::internal::CaptureStderr();
+        const CommandLine line = parse(words);
+        EXPECT_FALSE(line.proceed);
+        EXPECT_EQ(line.exitCode, exitUsage);
+        EXPECT_NE(testing::internal::GetCapturedStderr(), "");
+    }
+    testing::internal::CaptureStdout();
+    EXPECT_EQ(parse({"--help"}).exitCode, 0);
+    EXPECT_THAT(testing::internal::GetCapturedStdout(), HasSubstr("host"));
+}
+
+/// Runs commands on a broker whose store holds one computer system.
+struct Tool : Fixture
+{
+    Tool()
+    {
+        EXPECT_EQ(run({"create", "IBMSD_ComputerSystem", "", {"CreationClassName=C", "Name=\"b\\\"x\""}}),
+                  "root/ibmse:IBMSD_ComputerSystem.CreationClassName=\"C\",Name=\"b\\\"x\"\n");
+    }
+    std::string run(const Command& command, Format format = Format::table)
+    {
+        std::ostringstream out;
+        Session session{*broker, "root/ibmse", format, out};
+        runCommand(session, command);
+        return out.str();
+    }
+    std::string path = "IBMSD_ComputerSystem.CreationClassName=\"C\",Name=\"b\\\"x\"";
+};
+
+TEST(Commands, InstancesGoThroughTheirLife)
+{
+    Tool tool;
+    EXPECT_EQ(tool.run({"get", tool.path}), tool.path + "\n"
+                                                        "    CreationClassName  C\n"
+                                                        "    Name               b\"x\n"
+                                                        "    ElementName        host\n");
+    EXPECT_EQ(tool.run({"set", tool.path, "", {"elementname=two\nlines"}}), "changed " + tool.path + "\n");
+    Command columns{"enum", "IBMSD_ComputerSystem"};
+    columns.properties = std::vector<std::string>{"ElementName", "Name"};
+    EXPECT_EQ(tool.run(columns), "ElementName  Name\n"
+                                 "two\\nlines   b\"x\n");
+    const Json json = Json::parse(tool.run({"enum", "IBMSD_ComputerSystem"}, Format::json));
+    EXPECT_EQ(json[0]["properties"]["ElementName"], "two\nlines");
+    EXPECT_EQ(json[0]["path"], tool.path);
+    EXPECT_EQ(tool.run({"get", tool.path}, Format::mof),
+              "instance of IBMSD_ComputerSystem\n{\n    CreationClassName = \"C\";\n    Name = \"b\\\"x\";\n"
+              "    ElementName = \"two\nlines\";\n};\n");
+    EXPECT_EQ(tool.run({"delete", tool.path}), "deleted " + tool.path + "\n");
+    EXPECT_THROW(tool.run({"get", tool.path}), CimError);
+    EXPECT_EQ(tool.run({"enum", "IBMSD_ComputerSystem"}), "");
+}
+
+TEST(Commands, WrongArgumentsAreNamed)
+{
+    Tool tool;
+    const auto refusal = [&](const Command& command) -> std::string
+    {
+        try
+        {
+            tool.run(command);
+        }
+        catch (const UsageError& error)
+        {
+            return error.what();
+        }
+        catch (const CimError& error)
+        {
+            return std::string("CIM ") + error.what();
+        }
+        return "";
+    };
+    EXPECT_THAT(refusal({"get", "IBMSD_ComputerSystem.Name=x"}), HasSubstr("'CreationClassName'"));
+    EXPECT_THAT(refusal({"get", "IBMSD_ComputerSystem.Nam=x"}), HasSubstr("'Nam'"));
+    EXPECT_THAT(refusal({"set", tool.path, "", {"Colour=red"}}), HasSubstr("'Colour=red'"));
+    EXPECT_THAT(refusal({"set", tool.path, "", {"ElementName"}}), HasSubstr("'ElementName'"));
+    EXPECT_THAT(refusal({"call", "root/tavrin:TST_Base.Id=a", "Add", {"A=-1"}}), HasSubstr("'A=-1'"));
+    EXPECT_THAT(refusal({"call", "root/tavrin:TST_Base.Id=a", "Sub"}), HasSubstr("CIM CIM_ERR_METHOD_NOT_FOUND"));
+    EXPECT_THAT(refusal({"enum", "Nope"}), HasSubstr("CIM CIM_ERR_INVALID_CLASS"));
+    EXPECT_THAT(refusal({"class", "Nope"}), HasSubstr("'Nope'"));
+}
+
+TEST(Commands, ClassesAndMethodsAreShown)
+{
+    Tool tool;
+    EXPECT_THAT(tool.run({"class", "TST_Disk"}), HasSubstr("Level     uint16              Read, Write       3 "));
+    EXPECT_THAT(tool.run({"class", "TST_Disk"}), HasSubstr("in uint32 A, out uint32 Sum, out string[] Notes"));
+    EXPECT_EQ(Json::parse(tool.run({"class", "TST_Disk"}, Format::json))["superclass"], "TST_Base");
+    const std::string classes = tool.run({"classes"});
+    EXPECT_THAT(classes, HasSubstr("TST_Link  -           association  Left, Right"));
+    EXPECT_THAT(classes, testing::Not(HasSubstr("IBMSD")));
+    Command all{"classes"};
+    all.all = true;
+    EXPECT_THAT(tool.run(all), HasSubstr("IBMSD"));
+
+    tool.on("invokeMethod",
+            [](const broker_test::Call& call)
+            {
+                CMPIValue value{};
+                value.uint32 = CMGetArg(call.in, "A", nullptr).value.uint32 * 2;
+                CMAddArg(call.out, "Sum", &value, CMPI_uint32);
+                CMReturnData(call.result, nullptr, CMPI_uint32);
+                return CMReturnDone(call.result);
+            });
+    const Command call{"call", "root/tavrin:TST_Base.Id=a", "Add", {"A=0x10"}};
+    EXPECT_EQ(tool.run(call), "PARAMETER   VALUE\n(returned)  null\nSum         32\n");
+    EXPECT_EQ(Json::parse(tool.run(call, Format::json)), Json::parse(R"({"returnValue":null,"out":{"Sum":32}})"));
+    EXPECT_EQ(tool.violations(), "");
+}
+
+TEST(Printing, TreesShowFactsUnderTheirNodes)
+{
+    HostNode root{"Host", "h", ""};
+    root.facts = {{"a", "1"}, {"long", "2"}};
+    root.children = {{"Card", "c", ""}, {"Card", "d", ""}};
+    root.children[0].children = {{"Chip", "x", ""}};
+    root.children[0].children[0].facts = {{"tag", "t"}};
+    std::ostringstream out;
+    printTree(out, root);
+    EXPECT_EQ(out.str(), "Host  h\n"
+                         "│   a     1\n"
+                         "│   long  2\n"
+                         "├── Card  c\n"
+                         "│   └── Chip  x\n"
+                         "│           tag  t\n"
+                         "└── Card  d\n");
+}
+
+TEST(Printing, ControlCharactersStayOnTheirLine)
+{
+    EXPECT_EQ(oneLine("a\tb\nc\x1b[0m\x7f"), "a\\tb\\nc\\x1b[0m\\x7f");
+    EXPECT_EQ(displayWidth("──é"), 3U);
+    std::ostringstream out;
+    printJson(out, Json("\xff"));
+    EXPECT_EQ(out.str(), "\"\xEF\xBF\xBD\"\n");
+}
+
+} // namespace
