@@ -1,23 +1,29 @@
 #include "runtime/CMPI_Thread_Context.h"
 
-#include "runtime/CMPI_Adapter.h"
+#include "runtime/CMPI_AdapterFrame.h"
 #include "runtime/CmpiContainers.h"
 #include "runtime/Converter.h"
 #include "runtime/InstanceSlots.h"
-#include "runtime/RuntimeLog.h"
 
-#include <new>
 #include <utility>
 
 namespace cimple
 {
+
+CMPI_Thread_Context::CMPI_Thread_Context(const CMPIBroker* mb, const CMPIContext* ctx, CMPI_Adapter* owner)
+    : broker(mb), context(ctx), adapter(owner), _adapter_data(owner ? owner->static_data : nullptr)
+{}
+
+CMPI_Thread_Context::CMPI_Thread_Context(const CMPI_Thread_Context& creator, const CMPIContext* prepared)
+    : broker(creator.broker), context(prepared), adapter(creator.adapter), _adapter_data(creator._adapter_data)
+{}
 
 // --- threads ------------------------------------------------------------------------------------------------
 
 Thread_Context* CMPI_Thread_Context::thread_create_hook(void*)
 {
     const CMPIContext* prepared = CBPrepareAttachThread(broker, context);
-    return prepared ? new CMPI_Thread_Context(broker, prepared, adapter) : nullptr;
+    return prepared ? new CMPI_Thread_Context(*this, prepared) : nullptr;
 }
 
 void CMPI_Thread_Context::thread_start_hook()
@@ -233,7 +239,8 @@ int CMPI_Thread_Context::invoke_method(const char* name_space, const Instance* r
 
 void CMPI_Thread_Context::allow_unload(bool allow)
 {
-    if (adapter)
+    const Adapter_Use current(_adapter_data);
+    if (current && current.get() == adapter)
         adapter->allow_unload = allow;
 }
 

@@ -8,18 +8,18 @@ namespace cimple
 {
 
 class CMPI_Adapter;
+struct Static_Adapter_Data;
 
 /// Lives for one adapter call on a broker's thread, or as long as a provider's thread.
 class CMPI_Thread_Context final : public Thread_Context
 {
 public:
-    CMPI_Thread_Context(const CMPIBroker* mb, const CMPIContext* ctx, CMPI_Adapter* owner)
-        : broker(mb), context(ctx), adapter(owner)
-    {}
+    /// `owner` may be null.
+    CMPI_Thread_Context(const CMPIBroker* mb, const CMPIContext* ctx, CMPI_Adapter* owner);
 
     const CMPIBroker* broker;
     const CMPIContext* context;
-    CMPI_Adapter* adapter;
+    CMPI_Adapter* adapter; ///< may be gone before a provider's thread ends: only for comparison there
 
     Thread_Context* thread_create_hook(void* arg) override;
     void thread_start_hook() override;
@@ -40,10 +40,13 @@ public:
     bool get_username(String& username) override;
 
 private:
+    CMPI_Thread_Context(const CMPI_Thread_Context& creator, const CMPIContext* prepared);
+
     CMPIObjectPath* path_of(const char* name_space, const Instance* instance);
     CMPIInstance* instance_of(const char* name_space, const Instance* instance, CMPIObjectPath* path);
 
-    void* _mark = nullptr; ///< of the broker's memory, between start and exit of a provider's thread
+    Static_Adapter_Data* _adapter_data; ///< of `adapter`; stays
+    void* _mark = nullptr;              ///< of the broker's memory, between start and exit of a provider's thread
     bool _attached = false;
 };
 

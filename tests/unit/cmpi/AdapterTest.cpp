@@ -1,6 +1,7 @@
 #include "runtime/CMPI_Adapter.h"
 
 #include "runtime/Thread_Context.h"
+#include "runtime/cimom.h"
 #include "tests/unit/cmpi/FakeProvider.h"
 
 #include <gtest/gtest.h>
@@ -99,11 +100,34 @@ TEST_F(Adapter, lives_from_the_first_factory_call_to_the_last_cleanup)
 
 TEST_F(Adapter, stays_while_the_provider_forbids_unloading)
 {
-    provider.data.adapter->allow_unload = false;
+    auto* method = provider.make<CMPIMethodMI>(broker, 'M');
+    CMPIArgs* args = broker.args();
+    Thread late;
+    std::atomic<bool> gone = false;
+    // An up-call forbids it, and one of a thread that outlives the adapter does no harm.
+    provider.method = [&](Instance*)
+    {
+        cimom::allow_unload(false);
+        Thread::create_joinable(
+            late,
+            [](void* arg) -> void*
+            {
+                while (!*static_cast<std::atomic<bool>*>(arg))
+                    std::this_thread::yield();
+                cimom::allow_unload(false);
+                return nullptr;
+            },
+            &gone);
+    };
+    method->ft->invokeMethod(method, broker.context(), broker.result(results), path("d0"), "Reset", args, args);
+    EXPECT_EQ(method->ft->cleanup(method, broker.context(), 1).rc, CMPI_RC_OK);
     EXPECT_EQ(mi->ft->cleanup(mi, broker.context(), 0).rc, CMPI_RC_DO_NOT_UNLOAD);
     EXPECT_EQ(provider.count(OP_UNLOAD), 0);
     EXPECT_EQ(mi->ft->cleanup(mi, broker.context(), 1).rc, CMPI_RC_OK);
     EXPECT_EQ(provider.count(OP_DESTROY_PROVIDER), 1);
+    gone = true;
+    void* value = nullptr;
+    Thread::join(late, value);
 }
 
 TEST_F(Adapter, may_be_entered_again_on_the_thread_that_loads)
