@@ -187,6 +187,13 @@ std::span<const std::byte> findAttribute(std::span<const std::byte> buffer, std:
     return {};
 }
 
+void markCut(std::span<std::byte> buffer)
+{
+    const auto used = static_cast<std::uint32_t>(buffer.size());
+    if (used >= sizeof(Header))
+        std::memcpy(buffer.data() + offsetof(Header, used), &used, sizeof used);
+}
+
 std::size_t usedBytes(const void* buffer)
 {
     Header header;

@@ -57,6 +57,9 @@ std::vector<std::byte> encodeAttributes(const AttributeList& list, bool terminat
 /// null pointer if the attribute is not there or the buffer is damaged before it or in it.
 std::span<const std::byte> findAttribute(std::span<const std::byte> buffer, std::uint32_t id);
 
+/// Tells a buffer that was cut how long it is now, if its beginning is still there.
+void markCut(std::span<std::byte> buffer);
+
 /// The bytes in use of a buffer of unknown size, by its own words; 0 if it holds no attributes.
 std::size_t usedBytes(const void* buffer);
 

@@ -11,11 +11,12 @@ std::int32_t Call::deliverAttributes(const AttributeList& list, void* out, std::
         std::memset(out, 0xFF, room);
         return RM_OK;
     }
-    const std::vector<std::byte> buffer = encodeAttributes(list, !isHostile(Hostile::unterminatedText));
+    std::vector<std::byte> buffer = encodeAttributes(list, !isHostile(Hostile::unterminatedText));
     size = static_cast<std::uint32_t>(buffer.size());
     if (buffer.size() > room)
         return RM_ERROR_MORE_DATA;
     const std::size_t written = kept(buffer.size());
+    markCut({buffer.data(), written});
     std::memcpy(out, buffer.data(), written);
     size = isHostile(Hostile::hugeLength) ? 0xFFFF'FFFF : static_cast<std::uint32_t>(written);
     return RM_OK;

@@ -200,6 +200,7 @@ TEST_F(Faulty, AttributeBuffersKeepToTheirRoom)
     add(R"({"function": "LRM_GetHBAAttributes", "truncate": 21, "to": 1})");
     EXPECT_EQ(fill(64, size), RM_OK);
     EXPECT_EQ(size, 21u);
+    EXPECT_EQ(usedBytes(buffer), 21u);
     EXPECT_NE(findAttribute({buffer, size}, 1).data(), nullptr);
     EXPECT_EQ(findAttribute({buffer, size}, 2).data(), nullptr);
 

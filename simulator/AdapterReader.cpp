@@ -1,0 +1,176 @@
+#include "simulator/ScenarioParts.h"
+
+#include <algorithm>
+
+namespace tvrsim
+{
+
+namespace
+{
+
+constexpr NamedNumber portTypes[] = {
+    {"unknown", HBA_PORTTYPE_UNKNOWN},  {"other", HBA_PORTTYPE_OTHER},   {"notPresent", HBA_PORTTYPE_NOTPRESENT},
+    {"nPort", HBA_PORTTYPE_NPORT},      {"nlPort", HBA_PORTTYPE_NLPORT}, {"privateLoop", HBA_PORTTYPE_LPORT},
+    {"pointToPoint", HBA_PORTTYPE_PTP},
+};
+
+constexpr NamedNumber portStates[] = {
+    {"unknown", HBA_PORTSTATE_UNKNOWN},
+    {"online", HBA_PORTSTATE_ONLINE},
+    {"offline", HBA_PORTSTATE_OFFLINE},
+    {"bypassed", HBA_PORTSTATE_BYPASSED},
+    {"diagnostics", HBA_PORTSTATE_DIAGNOSTICS},
+    {"linkDown", HBA_PORTSTATE_LINKDOWN},
+    {"error", HBA_PORTSTATE_ERROR},
+    {"loopback", HBA_PORTSTATE_LOOPBACK},
+};
+
+void readFc4Types(JsonNode& node, const char* key, std::array<std::uint8_t, 32>& out)
+{
+    out[2] = 0x01; // FCP
+    if (!node.has(key))
+        return;
+    out = {};
+    std::ranges::copy(node.at(key).asBytes(out.size()), out.begin());
+}
+
+std::vector<std::size_t> readTargetNames(JsonNode& node, const std::vector<Target>& targets)
+{
+    std::vector<std::size_t> indexes;
+    node.forEach("targets",
+                 [&](const JsonNode& item)
+                 {
+                     const auto place = std::ranges::find(targets, item.asText(255), &Target::name);
+                     if (place == targets.end())
+                         item.fail("the name of a target");
+                     const auto index = static_cast<std::size_t>(place - targets.begin());
+                     if (std::ranges::find(indexes, index) != indexes.end())
+                         item.fail("each target once");
+                     indexes.push_back(index);
+                 });
+    return indexes;
+}
+
+RM_VirtualMachine readMachine(JsonNode node)
+{
+    RM_VirtualMachine machine{};
+    node.at("name").asText(sizeof machine.name - 1).copy(machine.name, sizeof machine.name - 1);
+    node.at("uuid").asText(sizeof machine.uuid - 1).copy(machine.uuid, sizeof machine.uuid - 1);
+    node.finish();
+    return machine;
+}
+
+VirtualPort readVirtualPort(JsonNode& node, const std::vector<Target>& targets)
+{
+    VirtualPort vport;
+    vport.wwpn = node.at("wwpn").asWwn();
+    vport.wwnn = vport.wwpn;
+    node.readWwn("wwnn", vport.wwnn);
+    node.readWwn("fabricName", vport.fabricName);
+    node.read("fcId", vport.fcId);
+    node.readNamed("state", vport.state, portStates);
+    node.read("symbolicName", vport.symbolicName);
+    vport.targets = readTargetNames(node, targets);
+    if (node.has("virtualMachine"))
+        vport.machine = readMachine(node.at("virtualMachine"));
+    node.finish();
+    return vport;
+}
+
+RM_QosInfo readQos(JsonNode node)
+{
+    RM_QosInfo qos{};
+    node.read("supported", qos.supported);
+    node.read("enabled", qos.enabled);
+    node.read("priority", qos.priority);
+    node.read("bandwidth", qos.bandwidth);
+    node.finish();
+    return qos;
+}
+
+Port readPort(JsonNode& node, const std::vector<Target>& targets)
+{
+    Port port;
+    port.wwpn = node.at("wwpn").asWwn();
+    port.wwnn = port.wwpn;
+    node.readWwn("wwnn", port.wwnn);
+    node.readWwn("fabricName", port.fabricName);
+    node.read("fcId", port.fcId);
+    node.readNamed("type", port.type, portTypes);
+    node.readNamed("state", port.state, portStates);
+    node.read("supportedClasses", port.supportedClasses);
+    readFc4Types(node, "supportedFc4Types", port.supportedFc4Types);
+    readFc4Types(node, "activeFc4Types", port.activeFc4Types);
+    node.read("symbolicName", port.symbolicName);
+    node.read("osDeviceName", port.osDeviceName);
+    node.read("supportedSpeed", port.supportedSpeed);
+    node.read("speed", port.speed);
+    node.read("maxFrameSize", port.maxFrameSize);
+    node.read("discoveredPorts", port.discoveredPorts);
+    node.read("scsiBus", port.scsiBus);
+    readAttributes(node, "attributes", portAttributeRows, port.attributes);
+    readAttributes(node, "statistics", statisticsRows, port.statistics);
+    if (node.has("pci"))
+        port.pci = readPci(node.at("pci"));
+    if (node.has("qos"))
+        port.qos = readQos(node.at("qos"));
+    port.targets = readTargetNames(node, targets);
+    node.forEach("virtualPorts", [&](JsonNode& item) { port.virtualPorts.push_back(readVirtualPort(item, targets)); });
+    node.finish();
+    return port;
+}
+
+/// The attribute that carries the temperature of the board and its two limits, a byte each.
+void readTemperature(JsonNode& adapter, AttributeList& out)
+{
+    if (!adapter.has("temperature"))
+        return;
+    JsonNode node = adapter.at("temperature");
+    std::uint8_t board = 0, warning = 0, critical = 0;
+    node.read("board", board);
+    node.read("warning", warning);
+    node.read("critical", critical);
+    node.finish();
+    const std::uint32_t word = static_cast<std::uint32_t>(board | warning << 8 | critical << 16);
+    setAttribute(out, numberAttribute(RM_HA_BOARD_TEMPERATURE, word));
+}
+
+std::vector<RM_Feature> readFeatures(JsonNode node)
+{
+    std::vector<RM_Feature> features;
+    for (const auto& [tag, value] : node.numberedMembers())
+        features.push_back({tag, static_cast<std::uint32_t>(value.asNumber(UINT32_MAX))});
+    std::ranges::sort(features, {}, &RM_Feature::tag);
+    return features;
+}
+
+} // namespace
+
+Adapter readAdapter(JsonNode& node, const std::vector<Target>& targets)
+{
+    Adapter adapter;
+    adapter.name = node.at("name").asText(255);
+    node.read("manufacturer", adapter.manufacturer, 63);
+    node.read("serialNumber", adapter.serialNumber, 63);
+    node.read("model", adapter.model);
+    node.read("modelDescription", adapter.modelDescription);
+    node.readWwn("nodeWwn", adapter.nodeWwn);
+    node.read("nodeSymbolicName", adapter.nodeSymbolicName);
+    node.read("hardwareVersion", adapter.hardwareVersion);
+    node.read("driverVersion", adapter.driverVersion);
+    node.read("optionRomVersion", adapter.optionRomVersion);
+    node.read("firmwareVersion", adapter.firmwareVersion);
+    node.read("driverName", adapter.driverName);
+    node.read("vendorSpecificId", adapter.vendorSpecificId);
+    node.read("driverType", adapter.driverType);
+    node.read("stale", adapter.stale);
+    readTemperature(node, adapter.attributes);
+    readAttributes(node, "attributes", adapterAttributeRows, adapter.attributes);
+    if (node.has("features"))
+        adapter.features = readFeatures(node.at("features"));
+    node.forEach("ports", [&](JsonNode& item) { adapter.ports.push_back(readPort(item, targets)); });
+    node.finish();
+    return adapter;
+}
+
+} // namespace tvrsim
