@@ -7,6 +7,7 @@
 #include "foundation/FilePaths.h"
 #include "foundation/HostInformation.h"
 #include "foundation/Log.h"
+#include "runtime/Thread_Context.h"
 
 #include <csignal>
 #include <exception>
@@ -31,6 +32,8 @@ std::int32_t references = 0;
 class AgentEnd
 {
 public:
+    /// The threads that are joined at the end still need their contexts: the key of these must outlive this object.
+    AgentEnd() { Thread_Context::top(); }
     ~AgentEnd()
     {
         if (ProviderAgent* agent = singleton.load())

@@ -8,13 +8,21 @@ namespace cimple
 namespace
 {
 
-// The key has no destructor: who pushes a context pops it, and the library may be closed while threads live on.
+// No function ends the values of a thread: who pushes a context pops it, and the library may be closed while threads
+// live on.
 pthread_key_t _thread_context_key;
 pthread_once_t _thread_context_key_once = PTHREAD_ONCE_INIT;
+
+/// Gives the key back when the library is closed: a process has few, and may load the library again and again.
+struct Key_End
+{
+    ~Key_End() { pthread_key_delete(_thread_context_key); }
+};
 
 void make_key()
 {
     pthread_key_create(&_thread_context_key, nullptr);
+    static const Key_End end;
 }
 
 void set_top(Thread_Context* context)
