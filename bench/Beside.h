@@ -1,0 +1,68 @@
+// An operation and its floor, measured in turn in one benchmark, and the table that comes of it.
+#pragma once
+
+#include <benchmark/benchmark.h>
+
+#include <chrono>
+#include <cstddef>
+#include <string>
+#include <vector>
+
+namespace bench
+{
+
+/// Nanoseconds that `work()` takes.
+template <class Work> double nanosecondsOf(Work work)
+{
+    const auto start = std::chrono::steady_clock::now();
+    work();
+    const std::chrono::duration<double, std::nano> took = std::chrono::steady_clock::now() - start;
+    return took.count();
+}
+
+/// Bytes on the heap that are in use, of all threads.
+std::size_t heapBytes();
+
+/// What one row of the table says. The figures are medians: other load on the machine makes single rounds long.
+class Row
+{
+public:
+    explicit Row(benchmark::State& state) : _state(state) {}
+    /// Puts the medians into the state's counters.
+    ~Row();
+    Row(const Row&) = delete;
+    Row& operator=(const Row&) = delete;
+
+    /// One round, in nanoseconds of one call. The state must use manual time.
+    void add(double operation, double floor);
+    /// A remark for the last column, such as a size in bytes.
+    void note(const std::string& text) { _state.SetLabel(text); }
+
+private:
+    benchmark::State& _state;
+    std::vector<double> _operation, _floor;
+};
+
+/// Runs both in turn, `calls` at a time.
+template <class Operation, class Floor>
+void runBeside(benchmark::State& state, Operation operation, Floor floor, int calls = 1)
+{
+    const auto perCall = [calls](auto& work)
+    {
+        const double took = nanosecondsOf(
+            [&]
+            {
+                for (int i = 0; i < calls; i++)
+                    work();
+            });
+        return took / calls;
+    };
+    Row row(state);
+    for (auto _ : state)
+    {
+        const double took = perCall(operation);
+        row.add(took, perCall(floor));
+    }
+}
+
+} // namespace bench
