@@ -12,9 +12,8 @@ Instance* insertInstance(Instance_Map& map, Instance* instance, const InsertFail
 {
     if (instance && map.insert(instance) != -1)
         return instance;
-    const char* slash = std::strrchr(failure.where.file_name(), '/');
-    const unsigned line = failure.where.line();
-    TVR_Logger::instance().log(slash ? slash + 1 : failure.where.file_name(), &line, TVR_CRIT, "%s", failure.text);
+    const char* slash = std::strrchr(failure.file, '/');
+    TVR_Logger::instance().log(slash ? slash + 1 : failure.file, &failure.line, TVR_CRIT, "%s", failure.text);
     unref(instance);
     return nullptr;
 }

@@ -5,7 +5,6 @@
 #include "foundation/Log.h"
 #include "runtime/Instance.h"
 
-#include <source_location>
 #include <type_traits>
 
 namespace cimple
@@ -14,11 +13,12 @@ namespace cimple
 /// The literal text of a refused insert, with the place that names it.
 struct InsertFailure
 {
-    InsertFailure(const char* text, std::source_location where = std::source_location::current())
-        : text(text), where(where)
+    InsertFailure(const char* text, const char* file = __builtin_FILE(), unsigned line = __builtin_LINE())
+        : text(text), file(file), line(line)
     {}
     const char* text;
-    std::source_location where;
+    const char* file;
+    unsigned line;
 };
 
 /// Puts the instance in the map, which owns it from then on. If equal keys are there, logs the text at level 1,
