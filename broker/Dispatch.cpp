@@ -156,8 +156,13 @@ ResultContent Dispatcher::run(Provider& provider, const std::string& what, std::
     return std::move(result->content);
 }
 
-template <class Answer, class Collect, class Stored>
-Answer Dispatcher::fanOutClasses(std::string_view nameSpace, std::string_view className, Collect collect, Stored stored)
+// --- instances -----------------------------------------------------------------------------------------
+
+/// Enumerates through the providers and the store. `call` gets the MI, the context, the result and the class path;
+/// `stored` adds one of the store's instances to the answer.
+template <class Answer, class Call, class Stored>
+Answer Dispatcher::enumerate(const char* operation, std::string_view nameSpace, std::string_view className, Call call,
+                             Stored stored)
 {
     Answer answer;
     const ClassInfo* root = findClass(nameSpace, className, answer);
@@ -165,16 +170,26 @@ Answer Dispatcher::fanOutClasses(std::string_view nameSpace, std::string_view cl
     {
         return answer;
     }
+    const ResultKind kind = std::is_same_v<Answer, Reply> ? ResultKind::instances : ResultKind::paths;
     for (const ClassInfo* info : _core.classes.withSubclasses(*root))
     {
         Provider* provider = servedByModule(nameSpace) ? _core.providers.find(info->name) : nullptr;
         if (!provider)
         {
-            stored(answer, _core.store.enumerate(nameSpace, info->name));
+            for (Object& object : _core.store.enumerate(nameSpace, info->name))
+            {
+                stored(answer, std::move(object));
+            }
             continue;
         }
         Outcome outcome;
-        append(answer, collect(*provider, outcome));
+        append(answer, run<Kind::instance>(*provider, operation + (" " + info->name), nameSpace,
+                                           {.kind = kind, .expectedClass = info}, true, outcome,
+                                           [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
+                                           {
+                                               Path path{std::string(nameSpace), info->name, {}};
+                                               return call(mi, frame.context, result, makePath(frame, std::move(path)));
+                                           }));
         if (!outcome.ok())
         {
             return failed<Answer>(outcome);
@@ -183,56 +198,24 @@ Answer Dispatcher::fanOutClasses(std::string_view nameSpace, std::string_view cl
     return answer;
 }
 
-// --- instances -----------------------------------------------------------------------------------------
-
 Reply Dispatcher::enumerateInstances(std::string_view nameSpace, std::string_view className,
                                      const PropertyList& properties)
 {
     NameList names(listOf(properties));
-    return fanOutClasses<Reply>(
-        nameSpace, className,
-        [&](Provider& provider, Outcome& outcome)
-        {
-            return run<Kind::instance>(
-                provider, "enumerateInstances " + provider.info->name, nameSpace,
-                {.kind = ResultKind::instances, .expectedClass = provider.info}, true, outcome,
-                [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
-                {
-                    const CMPIObjectPath* path = makePath(frame, {std::string(nameSpace), provider.info->name, {}});
-                    return mi->ft->enumerateInstances(mi, frame.context, result, path, names.get());
-                });
-        },
-        [&](Reply& answer, std::vector<Object>&& objects)
-        {
-            for (Object& object : objects)
-            {
-                answer.objects.push_back(filtered(std::move(object), properties));
-            }
-        });
+    return enumerate<Reply>(
+        "enumerateInstances", nameSpace, className,
+        [&](CMPIInstanceMI* mi, ContextHandle* context, ResultHandle* result, PathHandle* path)
+        { return mi->ft->enumerateInstances(mi, context, result, path, names.get()); },
+        [&](Reply& answer, Object&& object) { answer.objects.push_back(filtered(std::move(object), properties)); });
 }
 
 NamesReply Dispatcher::enumerateInstanceNames(std::string_view nameSpace, std::string_view className)
 {
-    return fanOutClasses<NamesReply>(
-        nameSpace, className,
-        [&](Provider& provider, Outcome& outcome)
-        {
-            return run<Kind::instance>(
-                provider, "enumerateInstanceNames " + provider.info->name, nameSpace,
-                {.kind = ResultKind::paths, .expectedClass = provider.info}, true, outcome,
-                [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
-                {
-                    const CMPIObjectPath* path = makePath(frame, {std::string(nameSpace), provider.info->name, {}});
-                    return mi->ft->enumerateInstanceNames(mi, frame.context, result, path);
-                });
-        },
-        [](NamesReply& answer, std::vector<Object>&& objects)
-        {
-            for (Object& object : objects)
-            {
-                answer.paths.push_back(std::move(object.path));
-            }
-        });
+    return enumerate<NamesReply>(
+        "enumerateInstanceNames", nameSpace, className,
+        [&](CMPIInstanceMI* mi, ContextHandle* context, ResultHandle* result, PathHandle* path)
+        { return mi->ft->enumerateInstanceNames(mi, context, result, path); },
+        [](NamesReply& answer, Object&& object) { answer.paths.push_back(std::move(object.path)); });
 }
 
 Reply Dispatcher::getInstance(const Path& path, const PropertyList& properties)

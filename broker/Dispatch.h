@@ -43,8 +43,9 @@ private:
     template <Kind K, class Call>
     ResultContent run(Provider& provider, const std::string& what, std::string_view nameSpace, ResultContent expected,
                       bool mustBeDone, Outcome& outcome, Call call);
-    template <class Answer, class Collect, class Stored>
-    Answer fanOutClasses(std::string_view nameSpace, std::string_view className, Collect collect, Stored stored);
+    template <class Answer, class Call, class Stored>
+    Answer enumerate(const char* operation, std::string_view nameSpace, std::string_view className, Call call,
+                     Stored stored);
     template <class Answer, class Call>
     Answer fanOutAssociations(const char* operation, const Path& path, const AssociationFilter& filter, Call call);
 

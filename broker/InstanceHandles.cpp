@@ -55,20 +55,9 @@ CMPIData getProperty(const CMPIInstance* instance, const char* name, CMPIStatus*
 CMPIData getPropertyAt(const CMPIInstance* instance, CMPICount index, CMPIString** name, CMPIStatus* rc)
 {
     const auto* handle = open<InstanceHandle>(instance, "getPropertyAt", rc);
-    if (!handle || index >= handle->content.object.properties.size())
-    {
-        if (handle)
-        {
-            setStatus(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
-        }
-        return nullData(CMPI_null, CMPI_notFound);
-    }
-    const Property& property = handle->content.object.properties[index];
-    if (name)
-    {
-        *name = newString(*handle->core, "getPropertyAt", rc, property.name);
-    }
-    return answer(*handle->core, property.value, "getPropertyAt", rc);
+    const Property* property =
+        handle ? entryAt(*handle->core, handle->content.object.properties, index, name, "getPropertyAt", rc) : nullptr;
+    return property ? answer(*handle->core, property->value, "getPropertyAt", rc) : nullData(CMPI_null, CMPI_notFound);
 }
 
 CMPICount getPropertyCount(const CMPIInstance* instance, CMPIStatus* rc)

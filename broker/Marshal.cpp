@@ -251,6 +251,21 @@ CMPIData answer(const Core& core, const Value& value, const char* function, CMPI
     return frame ? toCmpi(*frame, value) : nullData(value.type(), CMPI_badValue);
 }
 
+const Property* entryAt(const Core& core, const std::vector<Property>& list, CMPICount index, CMPIString** name,
+                        const char* function, CMPIStatus* rc)
+{
+    if (index >= list.size())
+    {
+        setStatus(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        return nullptr;
+    }
+    if (name)
+    {
+        *name = newString(core, function, rc, list[index].name);
+    }
+    return &list[index];
+}
+
 Value narrowed(const Value& value, CMPIType type)
 {
     if (value.isNull() || !isInteger(value.type()) || !isInteger(type))

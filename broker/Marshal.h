@@ -21,6 +21,11 @@ CMPIData keyToCmpi(Frame& frame, const Value& value);
 /// toCmpi() in this thread's frame; null data without one.
 CMPIData answer(const Core& core, const Value& value, const char* function, CMPIStatus* rc);
 
+/// The entry at `index`, as the functions that go through named values by index find it; its name as a string unless
+/// `name` is null. An index behind the end answers null and CMPI_RC_ERR_NO_SUCH_PROPERTY.
+const Property* entryAt(const Core& core, const std::vector<Property>& list, CMPICount index, CMPIString** name,
+                        const char* function, CMPIStatus* rc);
+
 /// The same integer as another integer type, if it fits; other values as they are.
 Value narrowed(const Value& value, CMPIType type);
 

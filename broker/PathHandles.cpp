@@ -92,20 +92,9 @@ CMPIData getKey(const CMPIObjectPath* path, const char* name, CMPIStatus* rc)
 CMPIData getKeyAt(const CMPIObjectPath* path, CMPICount index, CMPIString** name, CMPIStatus* rc)
 {
     const auto* handle = open<PathHandle>(path, "getKeyAt", rc);
-    if (!handle || index >= handle->content.path.keys.size())
-    {
-        if (handle)
-        {
-            setStatus(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
-        }
-        return nullData(CMPI_null, CMPI_notFound);
-    }
-    const Property& key = handle->content.path.keys[index];
-    if (name)
-    {
-        *name = newString(*handle->core, "getKeyAt", rc, key.name);
-    }
-    return keyAnswer(*handle, key.value, "getKeyAt", rc);
+    const Property* key =
+        handle ? entryAt(*handle->core, handle->content.path.keys, index, name, "getKeyAt", rc) : nullptr;
+    return key ? keyAnswer(*handle, key->value, "getKeyAt", rc) : nullData(CMPI_null, CMPI_notFound);
 }
 
 CMPICount getKeyCount(const CMPIObjectPath* path, CMPIStatus* rc)

@@ -5,6 +5,8 @@
 #include "broker/Handles.h"
 #include "broker/Marshal.h"
 
+#include <type_traits>
+
 namespace broker
 {
 
@@ -63,32 +65,38 @@ std::string text(const char* characters)
     return characters ? characters : "";
 }
 
-CMPIEnumeration* enumeration(Frame& frame, Reply&& reply, CMPIStatus* rc)
+std::vector<Object>& resultsOf(Reply& reply)
 {
-    setStatus(rc, reply.status);
-    if (!reply.ok())
-    {
-        return nullptr;
-    }
-    EnumerationContent content{CMPI_instance, {}, 0};
-    for (Object& object : reply.objects)
-    {
-        content.elements.push_back(Value::instance(std::move(object)));
-    }
-    return frame.make<EnumerationHandle>(std::move(content));
+    return reply.objects;
 }
 
-CMPIEnumeration* enumeration(Frame& frame, NamesReply&& reply, CMPIStatus* rc)
+std::vector<Path>& resultsOf(NamesReply& reply)
+{
+    return reply.paths;
+}
+
+Value elementOf(Object&& object)
+{
+    return Value::instance(std::move(object));
+}
+
+Value elementOf(Path&& path)
+{
+    return Value::reference(std::move(path));
+}
+
+/// The results as an enumeration of the frame; null when the operation failed.
+template <class Answer> CMPIEnumeration* enumeration(Frame& frame, Answer&& reply, CMPIStatus* rc)
 {
     setStatus(rc, reply.status);
     if (!reply.ok())
     {
         return nullptr;
     }
-    EnumerationContent content{CMPI_ref, {}, 0};
-    for (Path& path : reply.paths)
+    EnumerationContent content{std::is_same_v<Answer, Reply> ? CMPI_instance : CMPI_ref, {}, 0};
+    for (auto& result : resultsOf(reply))
     {
-        content.elements.push_back(Value::reference(std::move(path)));
+        content.elements.push_back(elementOf(std::move(result)));
     }
     return frame.make<EnumerationHandle>(std::move(content));
 }

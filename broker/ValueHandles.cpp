@@ -165,20 +165,8 @@ template <class H> struct NamedAccess
     static CMPIData getAt(const Cmpi* object, CMPICount index, CMPIString** name, CMPIStatus* rc)
     {
         const H* handle = open<H>(object, "getAt", rc);
-        if (!handle || index >= list(*handle).size())
-        {
-            if (handle)
-            {
-                setStatus(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
-            }
-            return nullData(CMPI_null, CMPI_notFound);
-        }
-        const Property& property = list(*handle)[index];
-        if (name)
-        {
-            *name = newString(*handle->core, "getAt", rc, property.name);
-        }
-        return value(*handle, property, rc);
+        const Property* property = handle ? entryAt(*handle->core, list(*handle), index, name, "getAt", rc) : nullptr;
+        return property ? value(*handle, *property, rc) : nullData(CMPI_null, CMPI_notFound);
     }
 
     static CMPICount count(const Cmpi* object, CMPIStatus* rc)

@@ -124,28 +124,33 @@ void get(Session& session, const Command& command)
     printObjects(session.out, session.format, reply.objects, std::nullopt);
 }
 
-void followAssociations(Session& session, const Command& command)
+/// The two forms of an association operation.
+struct Traversal
+{
+    NamesReply (Broker::*names)(const Path& path, const AssociationFilter& filter);
+    Reply (Broker::*objects)(const Path& path, const AssociationFilter& filter, const PropertyList& properties);
+};
+
+void follow(Session& session, const Command& command, const Traversal& traversal)
 {
     const Path path = instancePathOf(session, command.target);
     if (command.names)
     {
-        printPaths(session.out, session.format, checked(session.broker.associatorNames(path, command.filter)).paths);
+        printPaths(session.out, session.format, checked((session.broker.*traversal.names)(path, command.filter)).paths);
         return;
     }
-    const Reply reply = checked(session.broker.associators(path, command.filter, command.properties));
+    const Reply reply = checked((session.broker.*traversal.objects)(path, command.filter, command.properties));
     printObjects(session.out, session.format, reply.objects, command.properties);
+}
+
+void followAssociations(Session& session, const Command& command)
+{
+    follow(session, command, {&Broker::associatorNames, &Broker::associators});
 }
 
 void followReferences(Session& session, const Command& command)
 {
-    const Path path = instancePathOf(session, command.target);
-    if (command.names)
-    {
-        printPaths(session.out, session.format, checked(session.broker.referenceNames(path, command.filter)).paths);
-        return;
-    }
-    const Reply reply = checked(session.broker.references(path, command.filter, command.properties));
-    printObjects(session.out, session.format, reply.objects, command.properties);
+    follow(session, command, {&Broker::referenceNames, &Broker::references});
 }
 
 void set(Session& session, const Command& command)
