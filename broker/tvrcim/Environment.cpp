@@ -1,13 +1,16 @@
 #include "broker/tvrcim/Environment.h"
 
 #include <array>
+#include <csignal>
 #include <cstdlib>
 #include <fstream>
 #include <initializer_list>
 #include <stdexcept>
-#include <vector>
+#include <thread>
 
 #include <dlfcn.h>
+#include <pthread.h>
+#include <unistd.h>
 
 namespace tvrcim
 {
@@ -61,6 +64,30 @@ void copyText(const fs::path& from, const fs::path& to)
     std::ofstream(to) << std::ifstream(from).rdbuf();
 }
 
+/// Removes the folder when a signal ends the process. Must be called before other threads start, since they inherit
+/// the signal mask.
+void removeOnSignal(const fs::path& folder)
+{
+    sigset_t signals;
+    sigemptyset(&signals);
+    for (const int signal : {SIGHUP, SIGINT, SIGTERM})
+    {
+        sigaddset(&signals, signal);
+    }
+    pthread_sigmask(SIG_BLOCK, &signals, nullptr);
+    std::thread(
+        [signals, folder]
+        {
+            int signal = 0;
+            sigwait(&signals, &signal);
+            std::error_code error;
+            fs::remove_all(folder, error);
+            constexpr int endedBySignal = 128; // as shells report it
+            _exit(endedBySignal + signal);
+        })
+        .detach();
+}
+
 } // namespace
 
 std::string findModule()
@@ -103,6 +130,7 @@ FileRoot::FileRoot()
         throw std::runtime_error("cannot make a folder in " + fs::temp_directory_path().string());
     }
     _path = name;
+    removeOnSignal(_path);
     for (const char* folder : {"etc", "proc", "tmp", "var/log", "opt/ibm/platform/log"})
     {
         fs::create_directories(_path / folder);
