@@ -73,6 +73,10 @@ void createComputerSystemConformsToProfile(ProviderAgent& agent, const TVRHBA_Re
         TVR_LOG(TVR_DBG, "This is IBM/VMWare comp Sys - do nothing");
         return;
     }
+    if (!profile)
+        return;
+    TVR_LOG(TVR_DBG, "Generating TVRHBA_ComputerSystemConformsToProfile (Computer System,%s)",
+            profile->InstanceID.value.c_str());
     using Conforms = TVRHBA_ComputerSystemConformsToProfile;
     if (auto conforms = associate<Conforms>(&Conforms::ConformantStandard, profile, &Conforms::ManagedElement,
                                             computerSystem(agent)))

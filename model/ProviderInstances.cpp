@@ -100,6 +100,7 @@ std::uint32_t createProviderSoftwareIdentity(ProviderAgent& agent)
     if (auto installed = associate<Installed>(&Installed::System, system, &Installed::InstalledSoftware, identity))
         insert(agent.m_TVRHBA_InstalledSoftwareIdentity_map, installed,
                "Insert Failed : m_TVRHBA_InstalledSoftwareIdentity_map");
+    TVR_LOG(TVR_DBG, "Generating TVRHBA_SoftwareConformsToProfile (CMPI HBA Provider, Software)");
     using Conforms = TVRHBA_SoftwareConformsToProfile;
     if (auto conforms = associate<Conforms>(&Conforms::ConformantStandard, findProfile(agent, "Software"),
                                             &Conforms::ManagedElement, identity))
