@@ -84,10 +84,10 @@ Row::~Row()
     _state.counters["floor_ns"] = median(_floor);
 }
 
-void Row::add(double operation, double floor)
+void Row::add(double operation, double floor, int calls)
 {
-    _operation.push_back(operation);
-    _floor.push_back(floor);
+    _operation.push_back(operation / calls);
+    _floor.push_back(floor / calls);
     _state.SetIterationTime(operation / 1e9);
 }
 

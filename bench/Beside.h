@@ -33,8 +33,8 @@ public:
     Row(const Row&) = delete;
     Row& operator=(const Row&) = delete;
 
-    /// One round, in nanoseconds of one call. The state must use manual time.
-    void add(double operation, double floor);
+    /// One round of `calls` calls, in nanoseconds. The state must use manual time.
+    void add(double operation, double floor, int calls = 1);
     /// A remark for the last column, such as a size in bytes.
     void note(const std::string& text) { _state.SetLabel(text); }
 
@@ -47,21 +47,20 @@ private:
 template <class Operation, class Floor>
 void runBeside(benchmark::State& state, Operation operation, Floor floor, int calls = 1)
 {
-    const auto perCall = [calls](auto& work)
+    const auto time = [calls](auto& work)
     {
-        const double took = nanosecondsOf(
+        return nanosecondsOf(
             [&]
             {
                 for (int i = 0; i < calls; i++)
                     work();
             });
-        return took / calls;
     };
     Row row(state);
     for (auto _ : state)
     {
-        const double took = perCall(operation);
-        row.add(took, perCall(floor));
+        const double took = time(operation);
+        row.add(took, time(floor), calls);
     }
 }
 
