@@ -194,7 +194,16 @@ CMPIInstance* getInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CM
     }
     Reply reply = call.dispatcher().getInstance(call.object(), propertyList(properties));
     setStatus(rc, reply.status);
-    return reply.ok() ? makeInstance(*call.frame, std::move(reply.objects.front())) : nullptr;
+    if (!reply.ok())
+    {
+        return nullptr;
+    }
+    InstanceHandle* instance = makeInstance(*call.frame, std::move(reply.objects.front()));
+    if (properties) // keys that the list leaves out are in the path alone
+    {
+        instance->ft->setPropertyFilter(instance, properties, NameList(&instance->content.info->keys).get());
+    }
+    return instance;
 }
 
 /// An instance that a provider hands in, under the path that it gives with it.
