@@ -108,6 +108,7 @@ void ProviderAgent::start()
     TVR_LOG(TVR_DBG, "Initializing RM API ");
     if (loadAllLibraries() == 1)
         TVR_LOG(TVR_ERR, "Error : In Loading Library ");
+    resolveAllEntries();
     m_pMethodWrapper = std::make_unique<TVR_MethodWrapper>();
     m_pData = std::make_unique<Data>();
     TVR_LOG(TVR_INFO, "Tavrin Provider v%d.%d.%d-%d Loaded[%d]", providerVersion[0], providerVersion[1],

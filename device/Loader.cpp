@@ -38,6 +38,8 @@ DynamicLoader dynamicLoader = {
 
 std::array<std::atomic<void*>, slotCount> slots{};
 std::array<std::atomic<void*>, entryPoints.size()> firstLookups{};
+/// The look-ups of every row are in `firstLookups`, absent ones included.
+std::atomic<bool> allResolved{false};
 
 const char* loaderError()
 {
@@ -103,6 +105,7 @@ DynamicLoader setDynamicLoader(const DynamicLoader& loader)
 
 int loadAllLibraries()
 {
+    allResolved = false;
     hbaLibMissing = !openLibrary(hbaApiSlot, "HBAAPI.so.2") && !openLibrary(hbaApiSlot, "HBAAPI.so");
     lrmLibMissing = !openLibrary(localRmSlot, "lrmapi");
     rmLibMissing = lrmLibMissing && !openLibrary(fallbackRmSlot, "rmapi");
@@ -111,6 +114,7 @@ int loadAllLibraries()
 
 int unloadAllLibraries()
 {
+    allResolved = false;
     for (auto& slot : slots)
     {
         void* library = slot;
@@ -128,8 +132,17 @@ int unloadAllLibraries()
     return 0;
 }
 
+void resolveAllEntries()
+{
+    for (std::size_t row = 0; row < entryPoints.size(); ++row)
+        firstLookups[row] = resolveEntry(row);
+    allResolved = true;
+}
+
 void* resolveEntry(std::size_t row)
 {
+    if (allResolved)
+        return firstLookups[row];
     switch (entryPoints[row].family)
     {
     case Family::rmDual:

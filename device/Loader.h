@@ -33,6 +33,11 @@ int loadAllLibraries();
 /// for an absent entry point, until the libraries are loaded again.
 int unloadAllLibraries();
 
+/// Looks every entry point up, so that no binding does so until the libraries are loaded or unloaded again. The thread
+/// that closes the provider's library holds the loader's lock while it waits for the refresh to end: a refresh that
+/// looked something up would wait for it in turn.
+void resolveAllEntries();
+
 /// Entry point of a row of `entryPoints`, or null. The first look-up is kept until a library is opened again;
 /// look-ups in the fallback library are made anew on every call.
 void* resolveEntry(std::size_t row);
