@@ -60,8 +60,15 @@ public:
 
 TVR_Logger& TVR_Logger::instance()
 {
-    static TVR_Logger* const logger = new TVR_Logger;
-    return *logger;
+    // Never destroyed, since code logs to the last; nothing is left on the heap when the library is unmapped.
+    union Storage
+    {
+        TVR_Logger logger;
+        Storage() : logger() {}
+        ~Storage() {}
+    };
+    static Storage storage;
+    return storage.logger;
 }
 
 void TVR_Logger::log(const char* file, const unsigned* line, int level, const char* format, ...)
@@ -107,6 +114,8 @@ bool TVR_Logger::removeSink(TVR_LoggerInterface* sink)
     if (dynamic_cast<TVR_SysLogger*>(sink) == _sysLogger)
         _sysLogger = nullptr;
     _sinks.erase(found);
+    if (_sinks.empty())
+        _sinks.shrink_to_fit();
     return true;
 }
 

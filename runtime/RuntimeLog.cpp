@@ -37,11 +37,17 @@ struct Log_State
     int lock_file = -1;
 };
 
-/// Never destroyed: threads may log while the process ends.
+/// Never destroyed: threads may log while the process ends. Not on the heap, where an unmapped library would leave it.
 Log_State& state()
 {
-    static Log_State& instance = *new Log_State;
-    return instance;
+    union Storage
+    {
+        Log_State state;
+        Storage() : state() {}
+        ~Storage() {}
+    };
+    static Storage storage;
+    return storage.state;
 }
 
 int level_of(const char* name)
