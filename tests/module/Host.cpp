@@ -1,5 +1,7 @@
 #include "tests/module/Host.h"
 
+#include "tests/module/Process.h"
+
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -8,6 +10,7 @@
 #include <fstream>
 #include <sstream>
 #include <stdexcept>
+#include <sys/inotify.h>
 #include <unistd.h>
 
 namespace module_test
@@ -26,14 +29,20 @@ void* openLibrary(const char* file)
     return library;
 }
 
-/// A control function of the simulator, which stays loaded for the life of the process.
-template <class Function> Function* control(const char* name)
+void* controlFunction(const char* name)
 {
     static void* const simulator = openLibrary("libtvrsim.so");
-    return reinterpret_cast<Function*>(dlsym(simulator, name));
+    return dlsym(simulator, name);
 }
 
-#define TVR_CONTROL(name) (*control<decltype(::name)>(#name))
+/// A control function of the simulator, which stays loaded for the life of the process. Looked up at the first use at
+/// its place only: a dlclose in another thread holds look-ups back.
+#define TVR_CONTROL(name)                                                                                              \
+    (*[]                                                                                                               \
+     {                                                                                                                 \
+         static auto* const function = reinterpret_cast<decltype(::name)*>(controlFunction(#name));                    \
+         return function;                                                                                              \
+     }())
 
 void loadScenario(const std::string& scenario)
 {
@@ -149,6 +158,20 @@ std::size_t Host::logged(const std::string& levelAndText) const
     const std::vector<std::string> lines = log();
     return static_cast<std::size_t>(std::count_if(
         lines.begin(), lines.end(), [&](const std::string& line) { return line.starts_with(levelAndText); }));
+}
+
+bool Host::awaitLog(const std::string& levelAndText, std::size_t lines) const
+{
+    FolderWatch changes(_root, IN_MODIFY);
+    while (logged(levelAndText) < lines)
+        if (!changes.wait(20000))
+            return false;
+    return true;
+}
+
+bool Host::awaitRefresh(std::size_t refreshes) const
+{
+    return awaitLog("[TVR_DBG] PERF: DataFetch_Handler Thread END", refreshes);
 }
 
 void Host::addFault(const std::string& row)

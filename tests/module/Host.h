@@ -49,6 +49,10 @@ public:
     std::vector<std::string> log() const;
     /// How many lines of the log have this text behind their level, such as "[TVR_ERR] dlopen failed".
     std::size_t logged(const std::string& levelAndText) const;
+    /// Waits until the log has at least so many such lines; false if that does not happen in time.
+    bool awaitLog(const std::string& levelAndText, std::size_t lines = 1) const;
+    /// Waits until the module has done so many refreshes.
+    bool awaitRefresh(std::size_t refreshes = 1) const;
 
     void addFault(const std::string& row);
     std::uint64_t calls(const std::string& function) const;
