@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <array>
-#include <cctype>
 #include <cstring>
 
 namespace broker
@@ -152,10 +151,8 @@ const cimple::Meta_Class& declarer(const cimple::Meta_Class& meta, std::size_t i
 
 bool NameLess::operator()(std::string_view a, std::string_view b) const
 {
-    return std::lexicographical_compare(
-        a.begin(), a.end(), b.begin(), b.end(),
-        [](char x, char y)
-        { return std::tolower(static_cast<unsigned char>(x)) < std::tolower(static_cast<unsigned char>(y)); });
+    return std::lexicographical_compare(a.begin(), a.end(), b.begin(), b.end(),
+                                        [](char x, char y) { return lowerLetter(x) < lowerLetter(y); });
 }
 
 const FeatureInfo* MethodInfo::parameter(std::string_view parameterName) const

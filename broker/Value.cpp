@@ -16,11 +16,6 @@ namespace
 constexpr std::uint64_t microsecondsPerSecond = 1'000'000;
 constexpr std::uint64_t secondsPerDay = 86'400;
 
-unsigned char lower(char c)
-{
-    return static_cast<unsigned char>(std::tolower(static_cast<unsigned char>(c)));
-}
-
 std::uint64_t digits(const std::string& text, std::size_t pos, std::size_t count)
 {
     std::uint64_t number = 0;
@@ -353,13 +348,14 @@ unsigned integerBits(CMPIType type)
 bool sameName(std::string_view a, std::string_view b)
 {
     return a.size() == b.size() &&
-           std::equal(a.begin(), a.end(), b.begin(), [](char x, char y) { return x == y || lower(x) == lower(y); });
+           std::equal(a.begin(), a.end(), b.begin(),
+                      [](char x, char y) { return x == y || lowerLetter(x) == lowerLetter(y); });
 }
 
 std::string lowerCase(std::string_view text)
 {
     std::string result(text);
-    std::transform(result.begin(), result.end(), result.begin(), [](char c) { return static_cast<char>(lower(c)); });
+    std::transform(result.begin(), result.end(), result.begin(), lowerLetter);
     return result;
 }
 

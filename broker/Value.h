@@ -147,6 +147,12 @@ bool isSignedInteger(CMPIType type);
 /// Bits of an integer type or of char16; 0 for another type.
 unsigned integerBits(CMPIType type);
 
+/// An ASCII letter in lower case; names of CIM elements have no others.
+inline char lowerLetter(char c)
+{
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c + ('a' - 'A')) : c;
+}
+
 /// Case-insensitive equality of names.
 bool sameName(std::string_view a, std::string_view b);
 std::string lowerCase(std::string_view text);
