@@ -4,6 +4,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 
 namespace cimple
@@ -56,8 +57,15 @@ std::optional<std::string> readTextFile(const char* path, std::size_t limit)
     const File file(std::fopen(path, "re"));
     if (!file)
         return std::nullopt;
-    std::string text(limit, '\0');
-    text.resize(std::fread(text.data(), 1, limit, file.get()));
+    std::string text;
+    char part[4096]; // files are far below their limits
+    while (text.size() < limit)
+    {
+        const std::size_t size = std::fread(part, 1, std::min(sizeof part, limit - text.size()), file.get());
+        if (size == 0)
+            break;
+        text.append(part, size);
+    }
     return text;
 }
 
