@@ -11,15 +11,6 @@ namespace bench
 namespace
 {
 
-double median(std::vector<double>& samples)
-{
-    if (samples.empty())
-        return 0;
-    const auto middle = samples.begin() + static_cast<std::ptrdiff_t>(samples.size() / 2);
-    std::nth_element(samples.begin(), middle, samples.end());
-    return *middle;
-}
-
 /// Three significant digits and a unit: "1.23 us".
 std::string timeText(double nanoseconds)
 {
@@ -80,14 +71,14 @@ std::size_t heapBytes()
 
 Row::~Row()
 {
-    _state.counters["operation_ns"] = median(_operation);
-    _state.counters["floor_ns"] = median(_floor);
+    _state.counters["operation_ns"] = _operation;
+    _state.counters["floor_ns"] = _floor;
 }
 
 void Row::add(double operation, double floor, int calls)
 {
-    _operation.push_back(operation / calls);
-    _floor.push_back(floor / calls);
+    _operation = std::min(_operation, operation / calls);
+    _floor = std::min(_floor, floor / calls);
     _state.SetIterationTime(operation / 1e9);
 }
 

@@ -5,8 +5,8 @@
 
 #include <chrono>
 #include <cstddef>
+#include <limits>
 #include <string>
-#include <vector>
 
 namespace bench
 {
@@ -23,12 +23,13 @@ template <class Work> double nanosecondsOf(Work work)
 /// Bytes on the heap that are in use, of all threads.
 std::size_t heapBytes();
 
-/// What one row of the table says. The figures are medians: other load on the machine makes single rounds long.
+/// What one row of the table says. The figures are those of the best round: other load on the machine makes rounds
+/// longer, and nothing makes them shorter.
 class Row
 {
 public:
     explicit Row(benchmark::State& state) : _state(state) {}
-    /// Puts the medians into the state's counters.
+    /// Puts the figures into the state's counters.
     ~Row();
     Row(const Row&) = delete;
     Row& operator=(const Row&) = delete;
@@ -40,7 +41,7 @@ public:
 
 private:
     benchmark::State& _state;
-    std::vector<double> _operation, _floor;
+    double _operation = std::numeric_limits<double>::max(), _floor = _operation;
 };
 
 /// Runs both in turn, `calls` at a time.
