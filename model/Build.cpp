@@ -24,12 +24,18 @@ String formatText(const char* format, ...)
     va_start(args, format);
     va_list again;
     va_copy(again, args);
-    const int size = std::vsnprintf(nullptr, 0, format, args);
+    char brief[256]; // most texts fit, and are formatted once
+    const int size = std::vsnprintf(brief, sizeof brief, format, args);
     va_end(args);
-    std::string text(size > 0 ? static_cast<std::size_t>(size) : 0, '\0');
-    std::vsnprintf(text.data(), text.size() + 1, format, again);
+    String text(size > 0 ? brief : "");
+    if (size > 0 && static_cast<std::size_t>(size) >= sizeof brief)
+    {
+        std::string whole(static_cast<std::size_t>(size), '\0');
+        std::vsnprintf(whole.data(), whole.size() + 1, format, again);
+        text = whole;
+    }
     va_end(again);
-    return String(text);
+    return text;
 }
 
 } // namespace cimple
