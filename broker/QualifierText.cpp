@@ -1,8 +1,9 @@
 #include "broker/QualifierText.h"
 
 #include "broker/ValueText.h"
+#include "runtime/Meta.h"
 
-#include <array>
+#include <iterator>
 
 namespace broker
 {
@@ -10,39 +11,7 @@ namespace broker
 namespace
 {
 
-/// By bit number; the first four say what kind a feature is.
-constexpr std::array<const char*, 32> flagNames{"Property",
-                                                "Reference",
-                                                "Method",
-                                                "Class",
-                                                "Abstract",
-                                                "Aggregate",
-                                                "Aggregation",
-                                                "Association",
-                                                "Composition",
-                                                "Counter",
-                                                "Delete",
-                                                "DN",
-                                                "EmbeddedObject",
-                                                "Exception",
-                                                "Expensive",
-                                                "Experimental",
-                                                "Gauge",
-                                                "IfDeleted",
-                                                "In",
-                                                "Indication",
-                                                "Invisible",
-                                                "Key",
-                                                "Large",
-                                                "OctetString",
-                                                "Out",
-                                                "Read",
-                                                "Required",
-                                                "Static",
-                                                "Terminal",
-                                                "Weak",
-                                                "Write",
-                                                "EmbeddedInstance"};
+/// The flags below this bit say what kind a feature is.
 constexpr unsigned firstQualifier = 4;
 
 std::string qualifierList(std::uint32_t flags, const char* indent)
@@ -93,9 +62,9 @@ std::string methodText(const MethodInfo& method)
 
 std::uint32_t qualifierMask(std::string_view name)
 {
-    for (unsigned bit = firstQualifier; bit < flagNames.size(); ++bit)
+    for (unsigned bit = firstQualifier; bit < std::size(cimple::flag_names); ++bit)
     {
-        if (sameName(flagNames[bit], name))
+        if (sameName(cimple::flag_names[bit], name))
         {
             return 1U << bit;
         }
@@ -106,11 +75,11 @@ std::uint32_t qualifierMask(std::string_view name)
 std::vector<std::string> qualifierNames(std::uint32_t flags)
 {
     std::vector<std::string> names;
-    for (unsigned bit = firstQualifier; bit < flagNames.size(); ++bit)
+    for (unsigned bit = firstQualifier; bit < std::size(cimple::flag_names); ++bit)
     {
         if (flags & (1U << bit))
         {
-            names.emplace_back(flagNames[bit]);
+            names.emplace_back(cimple::flag_names[bit]);
         }
     }
     return names;

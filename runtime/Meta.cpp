@@ -19,41 +19,6 @@ constexpr const char* type_names[num_types] = {
     "uint64",  "sint64", "real32", "real64", "char16", "string", "datetime",
 };
 
-constexpr const char* flag_names[32] = {
-    "Property",
-    "Reference",
-    "Method",
-    "Class",
-    "Abstract",
-    "Aggregate",
-    "Aggregation",
-    "Association",
-    "Composition",
-    "Counter",
-    "Delete",
-    "DN",
-    "EmbeddedObject",
-    "Exception",
-    "Expensive",
-    "Experimental",
-    "Gauge",
-    "IfDeleted",
-    "In",
-    "Indication",
-    "Invisible",
-    "Key",
-    "Large",
-    "OctetString",
-    "Out",
-    "Read",
-    "Required",
-    "Static",
-    "Terminal",
-    "Weak",
-    "Write",
-    "EmbeddedInstance",
-};
-
 // Length, first and last character of a type name select at most two names to compare: uint32 and sint64 have
 // one hash, as have sint32 and uint64.
 constexpr std::size_t hash_base = 9;

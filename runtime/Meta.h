@@ -88,6 +88,42 @@ enum Meta_Flag : std::uint32_t
 inline constexpr std::uint32_t any_feature = META_PROPERTY | META_REFERENCE | META_METHOD;
 inline constexpr std::uint32_t property_or_reference = META_PROPERTY | META_REFERENCE;
 
+/// The names of the flags, by bit.
+inline constexpr const char* flag_names[32] = {
+    "Property",
+    "Reference",
+    "Method",
+    "Class",
+    "Abstract",
+    "Aggregate",
+    "Aggregation",
+    "Association",
+    "Composition",
+    "Counter",
+    "Delete",
+    "DN",
+    "EmbeddedObject",
+    "Exception",
+    "Expensive",
+    "Experimental",
+    "Gauge",
+    "IfDeleted",
+    "In",
+    "Indication",
+    "Invisible",
+    "Key",
+    "Large",
+    "OctetString",
+    "Out",
+    "Read",
+    "Required",
+    "Static",
+    "Terminal",
+    "Weak",
+    "Write",
+    "EmbeddedInstance",
+};
+
 /// Name of flag bit `bit` ("Property", "Reference", ...); null above 31.
 const char* flag_name(unsigned bit);
 
