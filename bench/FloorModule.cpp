@@ -189,17 +189,26 @@ CMPIInstance* Recipe::makeInstance(const CMPIBroker* broker) const
 
 // --- module ---------------------------------------------------------------------------------------------
 
-FloorModule::FloorModule(const cimple::Meta_Class& servedClass, const std::vector<broker::Object>& objects)
-    : _registration{"floor", "floor", nullptr, &servedClass, nullptr}
+FloorModule::FloorModule(const cimple::Meta_Class& servedClass, const std::vector<broker::Object>& objects,
+                         const std::vector<std::string>& registered)
 {
     recipes.clear();
     for (const broker::Object& object : objects)
         recipes.emplace_back(object);
+
+    _registrations.reserve(1 + registered.size()); // the records point to each other
+    _registrations.push_back({"floor", "floor", nullptr, &servedClass, nullptr});
+    for (const std::string& name : registered)
+    {
+        const cimple::Meta_Class* other = cimple::find_class(servedClass.meta_repository, name.c_str());
+        if (other != &servedClass)
+            _registrations.push_back({"floor", "floor", nullptr, other, &_registrations.back()});
+    }
 }
 
 void* FloorModule::symbol(const std::string& name) const
 {
-    const std::string className = _registration.meta_class->name;
+    const std::string className = _registrations.front().meta_class->name;
     if (name == className + "_Create_InstanceMI")
         return reinterpret_cast<void*>(&makeInstanceMI);
     if (name == className + "_Create_AssociationMI")

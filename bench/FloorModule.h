@@ -43,20 +43,23 @@ private:
     std::vector<Named> _keys, _properties;
 };
 
-/// A module of one class, given as an instance provider and as an association provider. Every enumeration and every
+/// A module that serves one class, as an instance provider and as an association provider. Every enumeration and every
 /// associators operation makes all of the objects, get makes the first.
 ///
 /// One exists at a time, for factories have no argument that would lead to it.
 class FloorModule : public broker::ModuleImage
 {
 public:
-    FloorModule(const cimple::Meta_Class& servedClass, const std::vector<broker::Object>& objects);
+    /// `registered` names the classes that the module also registers, without factories for them: the broker looks
+    /// through them as it does for a module that serves them.
+    FloorModule(const cimple::Meta_Class& servedClass, const std::vector<broker::Object>& objects,
+                const std::vector<std::string>& registered = {});
 
     void* symbol(const std::string& name) const override;
-    const cimple::Registration* registrations() const override { return &_registration; }
+    const cimple::Registration* registrations() const override { return &_registrations.back(); }
 
 private:
-    cimple::Registration _registration;
+    std::vector<cimple::Registration> _registrations; ///< that of the served class is the first
 };
 
 } // namespace bench

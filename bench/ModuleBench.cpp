@@ -91,7 +91,7 @@ void runOperation(benchmark::State& state, const cimple::Meta_Class& floorClass,
     const std::vector<broker::Object> known = objects(host);
     BenchHost::awaitEndOfRefresh();
     broker::Options options;
-    options.image = std::make_shared<FloorModule>(floorClass, known);
+    options.image = std::make_shared<FloorModule>(floorClass, known, host.broker().servedClasses());
     broker::Broker floor(options);
 
     const auto answer = operation(host.broker(), known);
