@@ -1,5 +1,6 @@
 // Every class of the catalog, from its factories to its last cleanup, as clients with different servers see it.
 #include "broker/PathText.h"
+#include "tests/module/Clock.h"
 #include "tests/module/Walk.h"
 
 #include <gmock/gmock.h>
@@ -44,6 +45,7 @@ class Catalog : public testing::TestWithParam<Server>
 protected:
     Catalog()
     {
+        stopClock(); // what is read twice has the same time
         host.options.integerKeys = GetParam().integerKeys;
         host.options.loadKinds = GetParam().loadKinds;
         if (GetParam().platform)

@@ -104,6 +104,8 @@ protected:
 
     ~Boundary() override
     {
+        for (const broker::CleanupAnswer& answer : core->providers.cleanup({}, true)) // loaded by up-calls
+            EXPECT_EQ(answer.status, CMPI_RC_OK) << answer.className;
         for (const broker::Violation& violation : core->violations.all())
             ADD_FAILURE() << violation.text;
     }
