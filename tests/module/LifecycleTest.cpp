@@ -10,6 +10,7 @@
 #include <dlfcn.h>
 #include <fstream>
 #include <future>
+#include <optional>
 #include <sys/inotify.h>
 #include <thread>
 
@@ -262,6 +263,9 @@ TEST(Life, UnloadWaitsForTheRefreshHoweverManyCleanupsTheServerCalls)
 {
     for (const auto cleanups : {broker::CleanupCalls::each, broker::CleanupCalls::last_of_kind})
     {
+        std::optional<LeftBehind> without;
+        if (cleanups != broker::CleanupCalls::each)
+            without.emplace();
         Host host;
         host.options.cleanupCalls = cleanups;
         FolderWatch written(host.root() / "etc", IN_CLOSE_WRITE);
@@ -343,6 +347,7 @@ TEST(Life, AThousandRoundsLeaveTheProcessAsItWas)
 
 TEST(Life, LibraryThatDoesNotInitialiseGivesAnEmptyModule)
 {
+    const LeftBehind agentWithoutReferences;
     Host host;
     host.addFault(R"({"function": "LRM_InitLib", "status": 1, "to": 1})");
     EXPECT_TRUE(host.instancesOf("TVRHBA_Card").empty());
