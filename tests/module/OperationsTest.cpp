@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <map>
 #include <set>
 
 using namespace module_test;
@@ -28,6 +29,9 @@ protected:
             if (broker().classes().find(className)->isAssociation())
                 for (Object& object : exactInstancesOf(broker(), className))
                     all.push_back(std::move(object));
+        for (const Object& association : all)
+            for (const broker::Property& reference : referencesOf(association))
+                _atEnd[identity(reference.value.asPath())].insert(&association);
     }
 
     broker::Broker& broker() { return host.broker(); }
@@ -45,8 +49,9 @@ protected:
     template <class Found>
     void follow(const Path& source, const std::string& assocClass, const std::string& role, Found found)
     {
-        for (const Object& association : all)
+        for (const Object* candidate : _atEnd[identity(source)])
         {
+            const Object& association = *candidate;
             std::vector<broker::Property> others = referencesOf(association);
             const std::size_t ends = others.size();
             std::erase_if(
@@ -88,6 +93,9 @@ protected:
 
     Host host;
     std::vector<Object> all; ///< association instances of all classes
+
+private:
+    std::map<std::string, std::set<const Object*>> _atEnd; ///< by the identities of their ends
 };
 
 INSTANTIATE_TEST_SUITE_P(Brokers, Associations, testing::Values(broker::Fanout::null_class, broker::Fanout::own_class),
@@ -140,8 +148,8 @@ struct Values
 };
 
 const Values values = {
-    {"", "TVRHBA_CardContainsChip", "CIM_Container", "CIM_Dependency", "TVRHBA_ConnectorDependsOnChip"},
-    {"", "TVRHBA_Chip", "tvrhba_chip", "CIM_PhysicalElement", "TVRHBA_Product"},
+    {"", "TVRHBA_CardContainsChip", "CIM_Container", "CIM_Dependency"},
+    {"", "tvrhba_chip", "CIM_PhysicalElement", "TVRHBA_Product"},
     {"", "GroupComponent", "partcomponent", "Antecedent", "NoSuchRole"},
 };
 
