@@ -116,6 +116,32 @@ TEST(EntryPoints, SameFailureValuesWhenTheLibrariesLackTheFunctions)
     }
 }
 
+std::vector<void*> allEntries()
+{
+    std::vector<void*> entries;
+    for (std::size_t row = 0; row < entryPoints.size(); ++row)
+        entries.push_back(resolveEntry(row));
+    return entries;
+}
+
+TEST(EntryPoints, AreNotLookedUpAgainOnceAllAreResolved)
+{
+    FakeHost host;
+    for (const std::set<std::string>& files :
+         {std::set<std::string>{"libHBAAPI.so.2", "liblrmapi.so"}, {"libHBAAPI.so.2", "librmapi.so"}, {}})
+    {
+        host.files = files;
+        host.absentSymbols = {"HBA_SendReadCapacity", "LRM_GetVPD", "RM_GetVPD"};
+        loadAllLibraries();
+        const auto entries = allEntries();
+        resolveAllEntries();
+        host.loaderCalls.clear();
+        EXPECT_EQ(allEntries(), entries);
+        EXPECT_THAT(host.loaderCalls, testing::IsEmpty());
+        unloadAllLibraries();
+    }
+}
+
 struct LoadCase
 {
     std::set<std::string> files;
