@@ -4,10 +4,6 @@
 function(tvr_library name)
   cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "LINKS")
   file(GLOB sources CONFIGURE_DEPENDS ${CMAKE_CURRENT_SOURCE_DIR}/*.cpp)
-  if(NOT sources) # TEMPORARY while the folders are being filled
-    file(WRITE ${CMAKE_CURRENT_BINARY_DIR}/empty.cpp "")
-    set(sources ${CMAKE_CURRENT_BINARY_DIR}/empty.cpp)
-  endif()
   add_library(${name} STATIC ${sources})
   target_include_directories(${name} PUBLIC ${PROJECT_SOURCE_DIR})
   target_link_libraries(${name} PUBLIC ${arg_LINKS})
