@@ -88,10 +88,14 @@ bool named_keys_equal(const Instance* a, const Instance* b, const Meta_Feature* 
     return !mr || key_references_equal(a, mr, b);
 }
 
-/// Number of keys after which a class has no more; parameter records do not count theirs.
-std::size_t keys_to_expect(const Meta_Class* mc)
+/// Compares the key at one place of a's features with the key of the same name in b. Related classes have their common
+/// features at one position: only overrides and strangers need a search.
+bool keys_equal_at(const Instance* a, const Instance* b, std::size_t index)
 {
-    return mc->flags & META_METHOD ? mc->num_meta_features : mc->num_keys;
+    const Meta_Feature* mf = features_of(a)[index];
+    const auto others = features_of(b);
+    const bool shared = index < others.size() && others[index] == mf;
+    return shared ? shared_keys_equal(a, b, mf) : named_keys_equal(a, b, mf);
 }
 
 bool both_null_or_identical(const Instance* a, const Instance* b)
@@ -118,21 +122,14 @@ bool features_identical(const Instance* a, const Instance* b, const Meta_Feature
 
 bool key_eq(const Instance* a, const Instance* b)
 {
+    const Meta_Class* mc = a->__meta_class;
+    if (!(mc->flags & META_METHOD) && mc->keys) // parameter records stand on their method, which lists no keys
+        return std::all_of(mc->keys, mc->keys + mc->num_keys,
+                           [a, b](std::uint16_t index) { return keys_equal_at(a, b, index); });
     const auto features = features_of(a);
-    const auto others = features_of(b);
-    std::size_t keys_left = keys_to_expect(a->__meta_class);
     for (std::size_t i = 0; i < features.size(); ++i)
-    {
-        const Meta_Feature* mf = features[i];
-        if (!(mf->flags & META_KEY)) [[likely]]
-            continue;
-        // Related classes have their common features at one position: only overrides and strangers need a search.
-        const bool shared = i < others.size() && others[i] == mf;
-        if (!(shared ? shared_keys_equal(a, b, mf) : named_keys_equal(a, b, mf)))
+        if ((features[i]->flags & META_KEY) && !keys_equal_at(a, b, i))
             return false;
-        if (--keys_left == 0)
-            break;
-    }
     return true;
 }
 

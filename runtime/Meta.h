@@ -195,6 +195,7 @@ struct Meta_Class : Meta_Record
     const Meta_Class* super_meta_class;
     std::size_t num_keys; ///< of the whole chain
     const Meta_Repository* meta_repository;
+    const std::uint16_t* keys = nullptr; ///< indexes of the num_keys key features, or null: their flags tell
 };
 
 struct Meta_Repository

@@ -122,8 +122,11 @@ private:
                 *member = {&feature, &c};
             }
         }
-        c.num_keys = std::count_if(c.members.begin(), c.members.end(),
-                                   [](const Member& m) { return is_set(m.feature->qualifiers, "Key"); });
+        for (std::size_t i = 0; i < c.members.size(); ++i)
+        {
+            if (is_set(c.members[i].feature->qualifiers, "Key"))
+                c.keys.push_back(i);
+        }
     }
 
     void check_override(const Class& c, const Feature& feature, const Feature& base)
@@ -227,7 +230,7 @@ private:
     /// A subclass keeps the keys of its superclass: more of them would change what identifies an instance.
     void check_new_keys(const Class& c)
     {
-        if (c.superclass && c.superclass->num_keys > 0 && c.num_keys > c.superclass->num_keys)
+        if (c.superclass && !c.superclass->keys.empty() && c.keys.size() > c.superclass->keys.size())
         {
             refuse(c.place, "class " + in_quotes(c.name) + " adds keys to those of its superclass");
         }

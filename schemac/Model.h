@@ -119,8 +119,8 @@ struct Class
 
     // resolved by check()
     const Class* superclass = nullptr;
-    std::vector<Member> members; ///< inherited ones in their order, then the own ones
-    std::size_t num_keys = 0;
+    std::vector<Member> members;   ///< inherited ones in their order, then the own ones
+    std::vector<std::size_t> keys; ///< indexes in `members`
 };
 
 struct Schema

@@ -143,6 +143,9 @@ std::string class_table(const Class& c)
 {
     std::vector<std::string> addresses;
     std::vector<std::string> locals;
+    std::vector<std::string> keys;
+    for (std::size_t index : c.keys)
+        keys.push_back(std::to_string(index));
     for (const Member& member : c.members)
     {
         addresses.push_back(address_of_record(member));
@@ -156,12 +159,14 @@ std::string class_table(const Class& c)
             "static constinit const Meta_Feature* const " + c.name + "_features[] = " + braced(addresses, 1) + ";\n";
         text += "static constinit const std::uint8_t " + c.name + "_locals[] = " + braced(locals, 32) + ";\n";
     }
+    if (!keys.empty())
+        text += "static constinit const std::uint16_t " + c.name + "_keys[] = " + braced(keys, 32) + ";\n";
     const std::string superclass = c.superclass ? "&" + c.superclass->name + "::static_meta_class" : "nullptr";
     return text + "constinit const Meta_Class " + c.name + "::static_meta_class = {\n    {" +
            feature_head(class_flags(c), c.name) + ", " + (empty ? "nullptr" : c.name + "_features") + ", " +
            std::to_string(c.members.size()) + ", sizeof(" + c.name + ")},\n    " +
-           (empty ? "nullptr" : c.name + "_locals") + ", " + superclass + ", " + std::to_string(c.num_keys) +
-           ", &the_repository};\n";
+           (empty ? "nullptr" : c.name + "_locals") + ", " + superclass + ", " + std::to_string(c.keys.size()) +
+           ", &the_repository, " + (keys.empty() ? "nullptr" : c.name + "_keys") + "};\n";
 }
 
 std::string tables_of(const Class& c)

@@ -23,7 +23,7 @@ struct HostNames
     std::optional<HostAddress> address = HostAddress{"tavrin-host.example.net", {192, 0, 2, 17}};
 };
 
-/// Until the first call the machine's own names stand.
+/// Until the first call the answers are those of a HostNames{}: no test depends on the machine's resolver.
 void setHostNames(const HostNames& names);
 
 } // namespace module_test

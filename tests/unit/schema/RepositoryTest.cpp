@@ -139,6 +139,8 @@ TEST(Records, KeysAreCountedOverTheChain)
         const std::vector<const Meta_Feature*> features = features_of(*mc);
         const auto is_key = [](const Meta_Feature* feature) { return (feature->flags & META_KEY) != 0; };
         EXPECT_EQ(mc->num_keys, std::size_t(std::count_if(features.begin(), features.end(), is_key))) << mc->name;
+        for (std::size_t i = 0; i < mc->num_keys; ++i)
+            EXPECT_TRUE(is_key(features[mc->keys[i]]) && (i == 0 || mc->keys[i - 1] < mc->keys[i])) << mc->name;
         EXPECT_TRUE(!is_served(mc) || mc->num_keys > 0) << mc->name;
     }
 }

@@ -34,9 +34,9 @@ TEST(Model, OverridesStandInTheInheritedPlaceAndKeysCountTheChain)
     const Class& b = *schema.find_class("t_b");
     EXPECT_THAT(member_names(b),
                 testing::ElementsAre("T_Device.InstanceID", "T_Element.Caption", "T_A.State", "T_B.Start", "T_A.Own"));
-    EXPECT_EQ(b.num_keys, 1u);
-    EXPECT_EQ(schema.find_class("T_Element")->num_keys, 0u);
-    EXPECT_EQ(schema.find_class("T_Link")->num_keys, 2u);
+    EXPECT_EQ(b.keys.size(), 1u);
+    EXPECT_EQ(schema.find_class("T_Element")->keys.size(), 0u);
+    EXPECT_EQ(schema.find_class("T_Link")->keys.size(), 2u);
     EXPECT_TRUE(is_or_derives_from(&b, schema.find_class("T_Device")));
     EXPECT_FALSE(is_or_derives_from(schema.find_class("T_Device"), &b));
 }
