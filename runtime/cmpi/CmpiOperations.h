@@ -1,4 +1,4 @@
-// The customary names of CMPI operations, as inline functions over the function tables.
+// The customary names of those CMPI operations that are in use, as inline functions over the function tables.
 //
 // They compile with any published header set: what one set takes as const and another not is passed non-const.
 // `rc` may be null everywhere.
@@ -27,35 +27,13 @@ inline CMPIArray* CMNewArray(const CMPIBroker* mb, CMPICount count, CMPIType typ
 {
     return mb->eft->newArray(mb, count, type, rc);
 }
-inline CMPIDateTime* CMNewDateTime(const CMPIBroker* mb, CMPIStatus* rc)
-{
-    return mb->eft->newDateTime(mb, rc);
-}
-inline CMPIDateTime* CMNewDateTimeFromBinary(const CMPIBroker* mb, CMPIUint64 usec, CMPIBoolean interval,
-                                             CMPIStatus* rc)
-{
-    return mb->eft->newDateTimeFromBinary(mb, usec, interval, rc);
-}
 inline CMPIDateTime* CMNewDateTimeFromChars(const CMPIBroker* mb, const char* text, CMPIStatus* rc)
 {
     return mb->eft->newDateTimeFromChars(mb, text, rc);
 }
-inline CMPIBoolean CMClassPathIsA(const CMPIBroker* mb, const CMPIObjectPath* path, const char* class_name,
-                                  CMPIStatus* rc)
-{
-    return mb->eft->classPathIsA(mb, path, class_name, rc);
-}
 
 // --- up-calls ---------------------------------------------------------------------------------------------
 
-inline unsigned int CBBrokerVersion(const CMPIBroker* mb)
-{
-    return static_cast<unsigned int>(mb->bft->brokerVersion);
-}
-inline const char* CBBrokerName(const CMPIBroker* mb)
-{
-    return mb->bft->brokerName;
-}
 /// To be called on the existing thread; both later calls take the result, on the new thread.
 inline CMPIContext* CBPrepareAttachThread(const CMPIBroker* mb, const CMPIContext* ctx)
 {
@@ -74,11 +52,6 @@ inline CMPIStatus CBDeliverIndication(const CMPIBroker* mb, const CMPIContext* c
                                       const CMPIInstance* indication)
 {
     return mb->bft->deliverIndication(mb, ctx, ns, indication);
-}
-inline CMPIEnumeration* CBEnumInstanceNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
-                                            CMPIStatus* rc)
-{
-    return mb->bft->enumerateInstanceNames(mb, ctx, path, rc);
 }
 inline CMPIEnumeration* CBEnumInstances(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
                                         const char** properties, CMPIStatus* rc)
@@ -109,29 +82,6 @@ inline CMPIData CBInvokeMethod(const CMPIBroker* mb, const CMPIContext* ctx, con
 {
     return mb->bft->invokeMethod(mb, ctx, path, method, in, out, rc);
 }
-inline CMPIEnumeration* CBAssociators(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
-                                      const char* assoc_class, const char* result_class, const char* role,
-                                      const char* result_role, const char** properties, CMPIStatus* rc)
-{
-    return mb->bft->associators(mb, ctx, path, assoc_class, result_class, role, result_role, properties, rc);
-}
-inline CMPIEnumeration* CBAssociatorNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
-                                          const char* assoc_class, const char* result_class, const char* role,
-                                          const char* result_role, CMPIStatus* rc)
-{
-    return mb->bft->associatorNames(mb, ctx, path, assoc_class, result_class, role, result_role, rc);
-}
-inline CMPIEnumeration* CBReferences(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
-                                     const char* result_class, const char* role, const char** properties,
-                                     CMPIStatus* rc)
-{
-    return mb->bft->references(mb, ctx, path, result_class, role, properties, rc);
-}
-inline CMPIEnumeration* CBReferenceNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
-                                         const char* result_class, const char* role, CMPIStatus* rc)
-{
-    return mb->bft->referenceNames(mb, ctx, path, result_class, role, rc);
-}
 
 // --- result -----------------------------------------------------------------------------------------------
 
@@ -158,25 +108,13 @@ inline const char* CMGetCharsPtr(const CMPIString* str, CMPIStatus* rc)
 {
     return str->ft->getCharPtr(str, rc);
 }
-inline CMPIUint64 CMGetBinaryFormat(const CMPIDateTime* dt, CMPIStatus* rc)
-{
-    return dt->ft->getBinaryFormat(dt, rc);
-}
 inline CMPIString* CMGetStringFormat(const CMPIDateTime* dt, CMPIStatus* rc)
 {
     return dt->ft->getStringFormat(dt, rc);
 }
-inline CMPIBoolean CMIsInterval(const CMPIDateTime* dt, CMPIStatus* rc)
-{
-    return dt->ft->isInterval(dt, rc);
-}
 inline CMPICount CMGetArrayCount(const CMPIArray* array, CMPIStatus* rc)
 {
     return array->ft->getSize(array, rc);
-}
-inline CMPIType CMGetArrayType(const CMPIArray* array, CMPIStatus* rc)
-{
-    return array->ft->getSimpleType(array, rc);
 }
 inline CMPIData CMGetArrayElementAt(const CMPIArray* array, CMPICount index, CMPIStatus* rc)
 {
@@ -195,20 +133,12 @@ inline CMPIData CMGetNext(const CMPIEnumeration* en, CMPIStatus* rc)
 {
     return en->ft->getNext(en, rc);
 }
-inline CMPIArray* CMToArray(const CMPIEnumeration* en, CMPIStatus* rc)
-{
-    return en->ft->toArray(en, rc);
-}
 
 // --- context ----------------------------------------------------------------------------------------------
 
 inline CMPIData CMGetContextEntry(const CMPIContext* ctx, const char* name, CMPIStatus* rc)
 {
     return ctx->ft->getEntry(ctx, name, rc);
-}
-inline CMPIStatus CMAddContextEntry(const CMPIContext* ctx, const char* name, const CMPIValue* value, CMPIType type)
-{
-    return ctx->ft->addEntry(ctx, name, value, type);
 }
 
 // --- arguments, object paths, instances: `name` may be null, an index counts from 0 -------------------------
@@ -249,25 +179,9 @@ inline CMPIString* CMGetNameSpace(const CMPIObjectPath* path, CMPIStatus* rc)
 {
     return path->ft->getNameSpace(path, rc);
 }
-inline CMPIStatus CMSetNameSpace(CMPIObjectPath* path, const char* ns)
-{
-    return path->ft->setNameSpace(path, ns);
-}
 inline CMPIString* CMGetClassName(const CMPIObjectPath* path, CMPIStatus* rc)
 {
     return path->ft->getClassName(path, rc);
-}
-inline CMPIStatus CMSetClassName(CMPIObjectPath* path, const char* class_name)
-{
-    return path->ft->setClassName(path, class_name);
-}
-inline CMPIString* CMGetHostname(const CMPIObjectPath* path, CMPIStatus* rc)
-{
-    return path->ft->getHostname(path, rc);
-}
-inline CMPIStatus CMSetHostname(CMPIObjectPath* path, const char* host)
-{
-    return path->ft->setHostname(path, host);
 }
 inline CMPICount CMGetPropertyCount(const CMPIInstance* inst, CMPIStatus* rc)
 {
@@ -294,17 +208,9 @@ inline CMPIObjectPath* CMGetObjectPath(const CMPIInstance* inst, CMPIStatus* rc)
 {
     return inst->ft->getObjectPath(inst, rc);
 }
-inline CMPIStatus CMSetObjectPath(CMPIInstance* inst, const CMPIObjectPath* path)
-{
-    return inst->ft->setObjectPath(inst, path);
-}
 inline CMPIString* CMGetSelExpString(const CMPISelectExp* exp, CMPIStatus* rc)
 {
     return exp->ft->getString(exp, rc);
-}
-inline CMPIBoolean CMEvaluateSelExp(const CMPISelectExp* exp, const CMPIInstance* inst, CMPIStatus* rc)
-{
-    return exp->ft->evaluate(exp, inst, rc);
 }
 
 // --- all objects ------------------------------------------------------------------------------------------
@@ -317,10 +223,6 @@ template <class Object> CMPIStatus CMRelease(Object* object)
 template <class Object> Object* CMClone(const Object* object, CMPIStatus* rc)
 {
     return object->ft->clone(object, rc);
-}
-template <class Object> bool CMIsNullObject(const Object* object)
-{
-    return object == nullptr;
 }
 inline bool CMIsNullValue(const CMPIData& data)
 {
