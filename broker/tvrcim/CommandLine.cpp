@@ -77,9 +77,7 @@ public:
     void finish()
     {
         if (!_properties.empty())
-        {
             _command.properties = _properties;
-        }
     }
 
 private:
@@ -113,6 +111,14 @@ void addCommands(CommandOptions& options)
     options.add("host", "show the host and its adapters as a tree");
 }
 
+std::vector<std::string> serverNames()
+{
+    std::vector<std::string> names;
+    for (const broker::Personality& personality : broker::personalities)
+        names.emplace_back(personality.name);
+    return names;
+}
+
 } // namespace
 
 CommandLine parseCommandLine(int argc, const char* const* argv)
@@ -130,6 +136,9 @@ CommandLine parseCommandLine(int argc, const char* const* argv)
     app.add_option("--namespace", settings.nameSpace, "namespace of classes and paths")->capture_default_str();
     const std::map<std::string, Format> formats{{"table", Format::table}, {"json", Format::json}, {"mof", Format::mof}};
     app.add_option("--format", settings.format, "table, json or mof")->transform(CLI::Transformer(formats));
+    const auto play = [&settings](const std::string& name) { settings.personality = *broker::findPersonality(name); };
+    app.add_option_function<std::string>("--server", play, "CIM server to play: strict, small-footprint or open-group")
+        ->check(CLI::IsMember(serverNames()));
     app.fallthrough();
     app.require_subcommand(1);
     CommandOptions options(app, settings.command);

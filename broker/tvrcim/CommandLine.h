@@ -16,6 +16,7 @@ struct Settings
     std::string nameSpace = "root/tavrin";
     Format format = Format::table;
     bool hardware = false;
+    broker::Personality personality = broker::strict;
     Command command;
 };
 

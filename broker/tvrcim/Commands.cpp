@@ -1,7 +1,9 @@
 #include "broker/tvrcim/Commands.h"
 
-#include "broker/PathText.h"
 #include "broker/tvrcim/HostReport.h"
+#include "broker/values/PathText.h"
+
+#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <array>
@@ -17,9 +19,7 @@ namespace
 template <class Answer> Answer checked(Answer answer)
 {
     if (!answer.ok())
-    {
         throw CimError(answer);
-    }
     return answer;
 }
 
@@ -40,9 +40,7 @@ Path instancePathOf(const Session& session, const std::string& text)
 {
     Path path = pathOf(session, text);
     if (const std::string key = missingKey(path, session.broker.classes()); !key.empty())
-    {
         throw UsageError("PATH: the key '" + key + "' of " + path.className + " is missing");
-    }
     return path;
 }
 
@@ -50,9 +48,7 @@ const ClassInfo& classOf(const Session& session, const std::string& name)
 {
     const ClassInfo* info = session.broker.classes().find(name);
     if (!info)
-    {
         throw CimError({CMPI_RC_ERR_INVALID_CLASS, "there is no class '" + name + "'"});
-    }
     return *info;
 }
 
@@ -67,13 +63,9 @@ std::vector<std::string> namesOf(const std::vector<Property>& properties)
 void done(Session& session, const Json& json, const std::string& text)
 {
     if (session.format == Format::json)
-    {
         printJson(session.out, json);
-    }
     else
-    {
         session.out << text << '\n';
-    }
 }
 
 // --- one function a command ----------------------------------------------------------------------------
@@ -85,9 +77,7 @@ void listClasses(Session& session, const Command& command)
     {
         const std::vector<std::string>& served = session.broker.servedClasses();
         if (command.all || std::find(served.begin(), served.end(), info->name) != served.end())
-        {
             classes.push_back(info.get());
-        }
     }
     std::sort(classes.begin(), classes.end(),
               [](const ClassInfo* a, const ClassInfo* b) { return NameLess{}(a->name, b->name); });
@@ -171,12 +161,8 @@ void create(Session& session, const Command& command)
         {session.nameSpace, info.name, {}},
         parseAssignments(session.broker.classes(), session.nameSpace, info.properties, info.name, command.assignments)};
     for (const std::string& key : info.keys)
-    {
         if (object.has(key))
-        {
             object.path.setKey(key, object.get(key));
-        }
-    }
     printPaths(session.out, session.format, checked(session.broker.createInstance(object)).paths);
 }
 
@@ -193,9 +179,7 @@ void call(Session& session, const Command& command)
     const ClassInfo& info = classOf(session, path.className);
     const MethodInfo* method = info.method(command.method);
     if (!method)
-    {
         throw CimError({CMPI_RC_ERR_METHOD_NOT_FOUND, info.name + " has no method '" + command.method + "'"});
-    }
     const std::vector<Property> in = parseAssignments(session.broker.classes(), path.nameSpace, method->parameters,
                                                       method->name, command.assignments);
     printMethodReply(session.out, session.format, checked(session.broker.invokeMethod(path, method->name, in)));
@@ -205,13 +189,9 @@ void showHost(Session& session, const Command&)
 {
     const HostReport report(session.broker, session.nameSpace);
     if (session.format == Format::json)
-    {
         printJson(session.out, report.json());
-    }
     else
-    {
         report.print(session.out);
-    }
 }
 
 struct CommandRow
@@ -274,9 +254,7 @@ void runCommand(Session& session, const Command& command)
     const auto* row =
         std::find_if(commands.begin(), commands.end(), [&](const CommandRow& r) { return command.name == r.name; });
     if (row == commands.end())
-    {
         throw UsageError("there is no command '" + command.name + "'");
-    }
     row->run(session, command);
 }
 

@@ -1,7 +1,7 @@
 // The tool's commands on a broker.
 #pragma once
 
-#include "broker/Broker.h"
+#include "broker/core/Broker.h"
 #include "broker/tvrcim/Printing.h"
 
 #include <ostream>

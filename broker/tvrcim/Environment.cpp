@@ -1,15 +1,12 @@
 #include "broker/tvrcim/Environment.h"
 
 #include <array>
-#include <csignal>
 #include <cstdlib>
 #include <fstream>
 #include <initializer_list>
 #include <stdexcept>
-#include <thread>
 
 #include <dlfcn.h>
-#include <pthread.h>
 #include <unistd.h>
 
 namespace tvrcim
@@ -34,9 +31,7 @@ fs::path locate(std::initializer_list<fs::path> folders, const std::string& file
     {
         std::error_code error;
         if (fs::is_regular_file(folder / file, error))
-        {
             return folder / file;
-        }
     }
     return {};
 }
@@ -47,14 +42,10 @@ void* openLibrary(const std::string& file)
     const fs::path path = locate(
         {folder / "../simulator", folder / "../lib/tavrin-fc-simulator", TVRCIM_BUILD_FOLDER "/simulator"}, file);
     if (path.empty())
-    {
         throw std::runtime_error("the simulator's " + file + " is not installed; use --hardware for real adapters");
-    }
     void* library = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
     if (!library)
-    {
         throw std::runtime_error(std::string("cannot open the simulator: ") + dlerror());
-    }
     return library; // stays open: the simulated host lives as long as the process
 }
 
@@ -62,30 +53,6 @@ void copyText(const fs::path& from, const fs::path& to)
 {
     // Read as a stream, since files below /proc tell no size.
     std::ofstream(to) << std::ifstream(from).rdbuf();
-}
-
-/// Removes the folder when a signal ends the process. Must be called before other threads start, since they inherit
-/// the signal mask.
-void removeOnSignal(const fs::path& folder)
-{
-    sigset_t signals;
-    sigemptyset(&signals);
-    for (const int signal : {SIGHUP, SIGINT, SIGTERM})
-    {
-        sigaddset(&signals, signal);
-    }
-    pthread_sigmask(SIG_BLOCK, &signals, nullptr);
-    std::thread(
-        [signals, folder]
-        {
-            int signal = 0;
-            sigwait(&signals, &signal);
-            std::error_code error;
-            fs::remove_all(folder, error);
-            constexpr int endedBySignal = 128; // as shells report it
-            _exit(endedBySignal + signal);
-        })
-        .detach();
 }
 
 } // namespace
@@ -100,45 +67,45 @@ std::string findModule()
     return path.empty() ? file : path.lexically_normal().string();
 }
 
+std::string findRegistration(const std::string& module)
+{
+    const fs::path path(module);
+    std::string name = path.stem();
+    const std::string file = name.erase(0, name.starts_with("lib") ? 3 : 0) + ".reg";
+    const fs::path beside = path.has_parent_path() ? path.parent_path() : executableFolder();
+    return locate({beside, beside / "../generated/mof", beside / "../share/tavrin-fc-provider",
+                   TVRCIM_BUILD_FOLDER "/generated/mof"},
+                  file)
+        .string();
+}
+
 void startSimulator(const std::string& scenario)
 {
     void* core = openLibrary("libtvrsim.so");
     openLibrary("liblrmapi.so");
     openLibrary("libHBAAPI.so.2");
     if (scenario.empty())
-    {
         return;
-    }
     using Load = int (*)(const char* path, char* error, std::size_t errorSize); // 1 for success
     const auto load = reinterpret_cast<Load>(dlsym(core, "tvrsim_load_scenario"));
     std::array<char, 1024> error{};
     if (!load || load(scenario.c_str(), error.data(), error.size()) != 1)
-    {
         throw std::runtime_error(load ? error.data() : "the simulator cannot load scenarios");
-    }
 }
 
-FileRoot::FileRoot()
+FileRoot::FileRoot(SignalEnd& signals)
 {
     if (std::getenv("TVR_FILE_ROOT"))
-    {
         return;
-    }
     std::string name = (fs::temp_directory_path() / "tvrcim-XXXXXX").string();
     if (!mkdtemp(name.data()))
-    {
         throw std::runtime_error("cannot make a folder in " + fs::temp_directory_path().string());
-    }
     _path = name;
-    removeOnSignal(_path);
+    signals.removes(_path);
     for (const char* folder : {"etc", "proc", "tmp", "var/log", "opt/ibm/platform/log"})
-    {
         fs::create_directories(_path / folder);
-    }
     for (const char* file : {"proc/version", "etc/issue"})
-    {
         copyText(fs::path("/") / file, _path / file);
-    }
     setenv("TVR_FILE_ROOT", name.c_str(), 1);
 }
 

@@ -1,6 +1,8 @@
 // What must be in place before the module is opened: the simulator's libraries, a scenario, a file tree of its own.
 #pragma once
 
+#include "broker/tvrcim/SignalEnd.h"
+
 #include <filesystem>
 #include <optional>
 #include <string>
@@ -11,6 +13,9 @@ namespace tvrcim
 /// The provider module beside this executable: in the build tree, in an installation, or by the loader's search path.
 std::string findModule();
 
+/// The registration file of a module: beside it, in the build tree, or in an installation; empty if there is none.
+std::string findRegistration(const std::string& module);
+
 /// Opens the simulator's libraries, so that the module finds them by name, and loads a scenario file unless its name is
 /// empty (the simulator then shows its default host). Throws std::runtime_error with the reason.
 void startSimulator(const std::string& scenario);
@@ -19,8 +24,8 @@ void startSimulator(const std::string& scenario);
 class FileRoot
 {
 public:
-    /// Does nothing when TVR_FILE_ROOT is set already.
-    FileRoot();
+    /// Does nothing when TVR_FILE_ROOT is set already. The tree is removed by the signals too.
+    explicit FileRoot(SignalEnd& signals);
     ~FileRoot();
     FileRoot(const FileRoot&) = delete;
     FileRoot& operator=(const FileRoot&) = delete;

@@ -1,8 +1,10 @@
 #include "broker/tvrcim/HostReport.h"
 
-#include "broker/PathText.h"
 #include "broker/tvrcim/Commands.h"
 #include "broker/tvrcim/Printing.h"
+#include "broker/values/PathText.h"
+
+#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <array>
@@ -92,12 +94,8 @@ HostNode describe(const KindRow& row, const Object& object, const char* associat
 {
     HostNode node{row.kind, oneLine(valueText(object.get(row.nameProperty))), association};
     for (const FactRow& fact : row.facts)
-    {
         if (std::string text = factText(object, fact); !text.empty())
-        {
             node.facts.emplace_back(fact.label, std::move(text));
-        }
-    }
     return node;
 }
 
@@ -108,18 +106,14 @@ public:
     Host(Broker& broker, const std::string& nameSpace) : _broker(broker), _nameSpace(nameSpace)
     {
         for (const KindRow& row : kinds)
-        {
             _objects[row.className] = enumerate(row.className);
-        }
     }
 
     std::vector<Object> enumerate(const std::string& className)
     {
         Reply reply = _broker.enumerateInstances(_nameSpace, className);
         if (!reply.ok())
-        {
             throw CimError(reply);
-        }
         return std::move(reply.objects);
     }
 
@@ -130,9 +124,7 @@ public:
     {
         NamesReply reply = _broker.associatorNames(path, {.assocClass = association});
         if (!reply.ok())
-        {
             throw CimError(reply);
-        }
         return std::move(reply.paths);
     }
 
@@ -147,14 +139,10 @@ public:
             const auto found = std::find_if(objects.begin(), objects.end(),
                                             [&](const Object& object) { return sameObject(object.path, other); });
             if (found == objects.end())
-            {
                 continue;
-            }
             result.push_back(describe(row, *found, association));
             if (children)
-            {
                 result.back().children = (this->*children)(*found);
-            }
         }
         return result;
     }
@@ -237,20 +225,14 @@ void printNode(std::ostream& out, const HostNode& node, const std::string& first
     constexpr std::size_t associationColumn = 72;
     std::string line = first + node.kind + "  " + node.name;
     if (!node.association.empty())
-    {
         line = padded(line, associationColumn) + "  " + node.association;
-    }
     out << line << '\n';
     std::size_t width = 0;
     for (const auto& [label, text] : node.facts)
-    {
         width = std::max(width, label.size());
-    }
     const std::string stem = rest + (node.children.empty() ? "    " : "│   ");
     for (const auto& [label, text] : node.facts)
-    {
         out << stem << padded(label, width) << "  " << text << '\n';
-    }
     for (const HostNode& child : node.children)
     {
         const bool last = &child == &node.children.back();
@@ -262,17 +244,11 @@ Json toJson(const HostNode& node)
 {
     Json json{{"kind", node.kind}, {"name", node.name}};
     if (!node.association.empty())
-    {
         json["association"] = node.association;
-    }
     for (const auto& [label, text] : node.facts)
-    {
         json["facts"][label] = text;
-    }
     for (const HostNode& child : node.children)
-    {
         json["parts"].push_back(toJson(child));
-    }
     return json;
 }
 

@@ -1,8 +1,8 @@
 // The host and its adapters as a tree: what contains what, by the associations that the provider serves.
 #pragma once
 
-#include "broker/Broker.h"
-#include "broker/Json.h"
+#include "broker/core/Broker.h"
+#include "broker/values/Json.h"
 
 #include <ostream>
 #include <string>

@@ -1,11 +1,14 @@
 #include "broker/tvrcim/Printing.h"
 
-#include "broker/PathText.h"
-#include "broker/QualifierText.h"
+#include "broker/values/PathText.h"
+#include "broker/values/QualifierText.h"
+
+#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <array>
 #include <cstdio>
+#include <iterator>
 
 namespace tvrcim
 {
@@ -19,9 +22,7 @@ std::string joined(const std::vector<std::string>& names)
 {
     std::string text;
     for (const std::string& name : names)
-    {
         text += (text.empty() ? "" : ", ") + name;
-    }
     return text;
 }
 
@@ -29,14 +30,10 @@ void printBlock(std::ostream& out, const Object& object)
 {
     std::size_t width = 0;
     for (const Property& property : object.properties)
-    {
         width = std::max(width, property.name.size());
-    }
     out << pathText(object.path) << '\n';
     for (const Property& property : object.properties)
-    {
         out << "    " << padded(property.name, width) << "  " << oneLine(valueText(property.value)) << '\n';
-    }
 }
 
 void printColumns(std::ostream& out, const std::vector<Object>& objects, const std::vector<std::string>& columns)
@@ -46,9 +43,7 @@ void printColumns(std::ostream& out, const std::vector<Object>& objects, const s
     {
         std::vector<std::string> row;
         for (const std::string& column : columns)
-        {
             row.push_back(object.has(column) ? oneLine(valueText(object.get(column))) : "-");
-        }
         table.add(std::move(row));
     }
     table.print(out);
@@ -77,9 +72,7 @@ void printClassTable(std::ostream& out, const ClassInfo& info)
 {
     out << info.name;
     for (const ClassInfo* ancestor = info.superclass; ancestor; ancestor = ancestor->superclass)
-    {
         out << " : " << ancestor->name;
-    }
     const std::vector<std::string> qualifiers = qualifierNames(info.flags);
     out << (qualifiers.empty() ? "\n\n" : "\n[" + joined(qualifiers) + "]\n\n");
     Table properties({"PROPERTY", "TYPE", "QUALIFIERS", "DEFAULT", "DECLARED IN"});
@@ -91,15 +84,11 @@ void printClassTable(std::ostream& out, const ClassInfo& info)
     }
     properties.print(out);
     if (info.methods.empty())
-    {
         return;
-    }
     out << '\n';
     Table methods({"METHOD", "RETURNS", "PARAMETERS", "DECLARED IN"});
     for (const MethodInfo& method : info.methods)
-    {
         methods.add({method.name, typeText(method.returnType), parameterList(method), method.origin->name});
-    }
     methods.print(out);
 }
 
@@ -140,19 +129,13 @@ void Table::print(std::ostream& out) const
 {
     std::vector<std::size_t> widths(_rows.front().size());
     for (const auto& row : _rows)
-    {
         for (std::size_t i = 0; i < row.size(); ++i)
-        {
             widths[i] = std::max(widths[i], displayWidth(row[i]));
-        }
-    }
     for (const auto& row : _rows)
     {
         std::string line;
         for (std::size_t i = 0; i < row.size(); ++i)
-        {
             line += padded(row[i], widths[i]) + "  ";
-        }
         line.erase(line.find_last_not_of(' ') + 1);
         out << line << '\n';
     }
@@ -160,7 +143,7 @@ void Table::print(std::ostream& out) const
 
 void printJson(std::ostream& out, const Json& json)
 {
-    out << json.dump(2, ' ', false, Json::error_handler_t::replace) << '\n';
+    out << jsonText(json, true) << '\n';
 }
 
 void printObjects(std::ostream& out, Format format, const std::vector<Object>& objects, const PropertyList& columns)
@@ -182,13 +165,9 @@ void printObjects(std::ostream& out, Format format, const std::vector<Object>& o
     {
         out << (&object == &objects.front() ? "" : "\n");
         if (format == Format::mof)
-        {
             out << mofText(object);
-        }
         else
-        {
             printBlock(out, object);
-        }
     }
 }
 
@@ -198,16 +177,12 @@ void printPaths(std::ostream& out, Format format, const std::vector<Path>& paths
     {
         Json list = Json::array();
         for (const Path& path : paths)
-        {
             list.push_back({{"class", path.className}, {"namespace", path.nameSpace}, {"path", pathText(path)}});
-        }
         printJson(out, list);
         return;
     }
     for (const Path& path : paths)
-    {
         out << fullPathText(path) << '\n';
-    }
 }
 
 void printClass(std::ostream& out, Format format, const ClassInfo& info)
@@ -243,9 +218,7 @@ void printClasses(std::ostream& out, Format format, const std::vector<const Clas
     if (format == Format::mof)
     {
         for (const ClassInfo* info : classes)
-        {
             out << mofText(*info) << '\n';
-        }
         return;
     }
     Table table({"CLASS", "SUPERCLASS", "KIND", "KEYS"});
@@ -267,9 +240,7 @@ void printMethodReply(std::ostream& out, Format format, const MethodReply& reply
     Table table({"PARAMETER", "VALUE"});
     table.add({"(returned)", oneLine(valueText(reply.returnValue))});
     for (const Property& parameter : reply.out)
-    {
         table.add({parameter.name, oneLine(valueText(parameter.value))});
-    }
     table.print(out);
 }
 

@@ -1,8 +1,8 @@
 // Output of the tool: aligned tables for people, JSON and MOF for programs.
 #pragma once
 
-#include "broker/Json.h"
-#include "broker/Reply.h"
+#include "broker/core/Reply.h"
+#include "broker/values/Json.h"
 
 #include <ostream>
 #include <string>

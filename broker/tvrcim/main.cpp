@@ -17,34 +17,43 @@ int report(const char* kind, const std::exception& error, int exitCode)
     return exitCode;
 }
 
-/// Runs the command, then unloads the module, and tells what it did wrong on the way.
-int run(const Settings& settings)
+/// Runs the command and tells why it failed, where it did.
+int runAndReport(Session& session, const Command& command, SignalEnd& signals)
 {
-    std::optional<FileRoot> files;
-    if (!settings.hardware)
-    {
-        files.emplace();
-        startSimulator(settings.scenario);
-    }
-    broker::Broker broker({.module = settings.module.empty() ? findModule() : settings.module});
-    if (!settings.platform.empty())
-    {
-        broker::loadPlatformFile(broker.store(), broker.classes(), settings.platform);
-    }
-    Session session{broker, settings.nameSpace, settings.format, std::cout};
-    int exitCode = 0;
     try
     {
-        runCommand(session, settings.command);
+        runCommand(session, command);
+        return 0;
     }
     catch (const CimError& error)
     {
-        exitCode = report("", error, exitCimError);
+        signals.passIfNone(); // a signal unloads the module under the command
+        return report("", error, exitCimError);
     }
     catch (const UsageError& error)
     {
-        exitCode = report("", error, exitUsage);
+        return report("", error, exitUsage);
     }
+}
+
+/// Sets up the host, runs the command, then unloads the module and tells what it did wrong on the way.
+int run(const Settings& settings)
+{
+    SignalEnd signals;
+    std::optional<FileRoot> files;
+    if (!settings.hardware)
+    {
+        files.emplace(signals);
+        startSimulator(settings.scenario);
+    }
+    const std::string module = settings.module.empty() ? findModule() : settings.module;
+    broker::Broker broker(
+        {.module = module, .registration = findRegistration(module), .personality = settings.personality});
+    const UnloadedBySignal entrusted(signals, broker);
+    if (!settings.platform.empty())
+        broker::loadPlatformFile(broker.store(), broker.classes(), settings.platform);
+    Session session{broker, settings.nameSpace, settings.format, std::cout};
+    int exitCode = runAndReport(session, settings.command, signals);
     std::cout.flush();
     broker.unload();
     for (const broker::Violation& violation : broker.violations())
@@ -61,9 +70,7 @@ int main(int argc, char** argv)
 {
     const CommandLine line = parseCommandLine(argc, argv);
     if (!line.proceed)
-    {
         return line.exitCode;
-    }
     try
     {
         return run(line.settings);

@@ -1,0 +1,100 @@
+#include "broker/core/Arena.h"
+
+#include "broker/core/Core.h"
+#include "broker/tables/Handles.h"
+
+#include <algorithm>
+#include <iterator>
+#include <utility>
+
+namespace broker
+{
+
+namespace
+{
+
+std::vector<Frame*>& threadFrames()
+{
+    thread_local std::vector<Frame*> frames;
+    return frames;
+}
+
+} // namespace
+
+void Graveyard::accept(std::vector<std::unique_ptr<Tracked>>&& objects)
+{
+    for (const auto& object : objects)
+        object->bury();
+    std::vector<std::unique_ptr<Tracked>> tooOld; // freed outside the lock
+    const std::lock_guard lock(_mutex);
+    for (auto& object : objects)
+        _dead.push_back(std::move(object));
+    while (_dead.size() > _capacity)
+    {
+        tooOld.push_back(std::move(_dead.front()));
+        _dead.pop_front();
+    }
+}
+
+Frame::Frame(Core& frameCore, const CMPIBroker* frameBroker, std::string name, std::vector<Property> contextEntries)
+    : core(frameCore), broker(frameBroker), what(std::move(name)),
+      context(make<ContextHandle>(std::move(contextEntries)))
+{}
+
+Frame::~Frame()
+{
+    core.graveyard.accept(std::move(_objects));
+}
+
+const void* Frame::mark()
+{
+    return _marks.emplace_back(std::make_unique<std::size_t>(_objects.size())).get();
+}
+
+std::size_t Frame::release(const void* mark)
+{
+    const auto set =
+        std::find_if(_marks.begin(), _marks.end(), [&](const auto& candidate) { return candidate.get() == mark; });
+    if (set == _marks.end())
+        return 0;
+    const auto later = _objects.begin() + static_cast<std::ptrdiff_t>(**set);
+    std::vector<std::unique_ptr<Tracked>> dead(std::make_move_iterator(later), std::make_move_iterator(_objects.end()));
+    _objects.erase(later, _objects.end());
+    core.graveyard.accept(std::move(dead));
+    const auto ended = static_cast<std::size_t>(_marks.end() - set);
+    _marks.erase(set, _marks.end());
+    return ended;
+}
+
+int objectVersion(const Core& core)
+{
+    return core.options.personality.objectVersion;
+}
+
+Frame* Frame::current()
+{
+    const std::vector<Frame*>& frames = threadFrames();
+    return frames.empty() ? nullptr : frames.back();
+}
+
+Frame* Frame::current(const Core& wanted)
+{
+    Frame* frame = current();
+    return frame && &frame->core == &wanted ? frame : nullptr;
+}
+
+void Frame::push()
+{
+    threadFrames().push_back(this);
+}
+
+bool Frame::pop()
+{
+    std::vector<Frame*>& frames = threadFrames();
+    if (frames.empty() || frames.back() != this)
+        return false;
+    frames.pop_back();
+    return true;
+}
+
+} // namespace broker

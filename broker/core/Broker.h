@@ -1,0 +1,85 @@
+// An embedded CIM broker for one provider module: the client side of it, for tests and tools.
+//
+//   broker::Broker b({.module = "libtavrin_fc_provider.so"});
+//   broker::Reply cards = b.enumerateInstances("root/tavrin", "TVRHBA_Card");
+#pragma once
+
+#include "broker/core/Options.h"
+#include "broker/core/Providers.h"
+#include "broker/core/Reply.h"
+#include "broker/core/Store.h"
+#include "broker/core/Violations.h"
+#include "broker/values/ClassInfo.h"
+
+#include <memory>
+#include <shared_mutex>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace broker
+{
+
+/// All operations may be called from many threads at once. They never throw for what a provider does; they answer a CIM
+/// status. It is strict: each breach of the CMPI contract is collected as a violation while the operation goes on.
+class Broker
+{
+public:
+    /// Opens the module and reads its class definitions. Throws std::runtime_error when it cannot.
+    explicit Broker(Options options);
+    /// Unloads if that was not done.
+    ~Broker();
+    Broker(const Broker&) = delete;
+    Broker& operator=(const Broker&) = delete;
+
+    Reply enumerateInstances(std::string_view nameSpace, std::string_view className,
+                             const PropertyList& properties = std::nullopt);
+    NamesReply enumerateInstanceNames(std::string_view nameSpace, std::string_view className);
+    /// One instance when the status is OK.
+    Reply getInstance(const Path& path, const PropertyList& properties = std::nullopt);
+    Reply associators(const Path& path, const AssociationFilter& filter = {},
+                      const PropertyList& properties = std::nullopt);
+    NamesReply associatorNames(const Path& path, const AssociationFilter& filter = {});
+    /// `filter` has a class in `assocClass` and a role; the rest is not used.
+    Reply references(const Path& path, const AssociationFilter& filter = {},
+                     const PropertyList& properties = std::nullopt);
+    NamesReply referenceNames(const Path& path, const AssociationFilter& filter = {});
+    /// The path of the new instance.
+    NamesReply createInstance(const Object& object);
+    Outcome modifyInstance(const Object& object, const PropertyList& properties = std::nullopt);
+    Outcome deleteInstance(const Path& path);
+    MethodReply invokeMethod(const Path& path, const std::string& method, const std::vector<Property>& in = {});
+
+    const ClassTable& classes() const;
+    Store& store();
+    /// Classes that the module serves, in its order of linking.
+    const std::vector<std::string>& servedClasses() const;
+    /// Namespaces that the class is registered for, in lower case; none for a class that the module does not serve.
+    std::vector<std::string> nameSpacesOf(std::string_view className) const;
+    /// Whether the module has a factory of that kind for the class.
+    bool serves(std::string_view className, Kind kind) const;
+
+    /// Calls the class's factories of these kinds that were not called yet.
+    Outcome loadProvider(std::string_view className, const std::vector<Kind>& kinds);
+    /// Calls cleanup of each loaded MI of the class, or of all classes for an empty name. An MI that answers OK is
+    /// loaded again at its next use.
+    std::vector<CleanupAnswer> cleanup(std::string_view className, bool terminating);
+    /// Waits for running operations, cleans up everything with `terminating` set, closes the module and looks for
+    /// clones, thread contexts and marks that the provider left. Operations answer CMPI_RC_ERR_FAILED from then on.
+    std::vector<CleanupAnswer> unload();
+    bool loaded() const;
+
+    std::vector<Violation> violations() const;
+    void clearViolations();
+    std::size_t liveClones() const;
+    /// What the provider delivered as indications.
+    std::vector<Object> indications() const;
+
+private:
+    template <class Answer, class Operation> Answer guarded(Operation operation);
+
+    std::unique_ptr<Core> _core;
+    mutable std::shared_mutex _gate; ///< shared by operations, taken alone by load and unload
+};
+
+} // namespace broker

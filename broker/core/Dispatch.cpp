@@ -1,0 +1,497 @@
+#include "broker/core/Dispatch.h"
+
+#include "broker/tables/Handles.h"
+#include "broker/tables/Marshal.h"
+#include "broker/tables/PassedValues.h"
+
+#include <algorithm>
+#include <iterator>
+#include <type_traits>
+
+namespace broker
+{
+
+namespace
+{
+
+using ResultKind = ResultContent::Kind;
+
+template <Kind K>
+using MiOf = std::conditional_t<K == Kind::instance, CMPIInstanceMI,
+                                std::conditional_t<K == Kind::association, CMPIAssociationMI, CMPIMethodMI>>;
+
+Outcome failure(CMPIrc status, std::string message)
+{
+    return {status, std::move(message)};
+}
+
+Outcome outcomeOf(const CMPIStatus& status, const ClassInfo& info)
+{
+    if (status.rc == CMPI_RC_OK)
+        return {};
+    const StringHandle* text = status.msg ? open<StringHandle>(status.msg, "getCharPtr") : nullptr;
+    return failure(status.rc, info.name + (text ? ": " + text->content.text : " answered so"));
+}
+
+const char* filterText(const std::string& text)
+{
+    return text.empty() ? nullptr : text.c_str();
+}
+
+ResultContent delivered(ResultContent&& result, NullElements nullElements)
+{
+    for (Object& object : result.objects)
+        object.properties = delivered(std::move(object.properties), nullElements);
+    return std::move(result);
+}
+
+void append(Reply& answer, ResultContent&& result)
+{
+    std::move(result.objects.begin(), result.objects.end(), std::back_inserter(answer.objects));
+}
+
+void append(NamesReply& answer, ResultContent&& result)
+{
+    std::move(result.paths.begin(), result.paths.end(), std::back_inserter(answer.paths));
+}
+
+template <class Answer> Answer failed(const Outcome& outcome)
+{
+    Answer answer;
+    static_cast<Outcome&>(answer) = outcome;
+    return answer;
+}
+
+const std::vector<std::string>* listOf(const PropertyList& properties)
+{
+    return properties ? &*properties : nullptr;
+}
+
+bool canReference(const ClassInfo& association, const ClassInfo& source)
+{
+    return std::any_of(association.properties.begin(), association.properties.end(),
+                       [&](const FeatureInfo& property)
+                       { return property.isReference() && source.isA(property.referenceClass); });
+}
+
+} // namespace
+
+// --- where things are ----------------------------------------------------------------------------------
+
+bool Dispatcher::exists(std::string_view nameSpace) const
+{
+    if (!_core.options.personality.interopAlias && sameName(nameSpace, "root/interop"))
+        return false;
+    const std::string wanted = canonicalNameSpace(nameSpace);
+    const std::vector<std::string>& platform = _core.options.platformNamespaces;
+    return _core.providers.inUse(wanted) ||
+           std::any_of(platform.begin(), platform.end(),
+                       [&](const std::string& space) { return canonicalNameSpace(space) == wanted; });
+}
+
+/// The class's provider if it is registered for the namespace, otherwise null.
+Provider* Dispatcher::providerOf(const ClassInfo& info, std::string_view nameSpace) const
+{
+    Provider* provider = _core.providers.find(info.name);
+    return provider && provider->isRegisteredFor(nameSpace) ? provider : nullptr;
+}
+
+/// A class without a provider exists in every namespace, one with a provider where that is registered.
+const ClassInfo* Dispatcher::findClass(std::string_view nameSpace, std::string_view className, Outcome& outcome)
+{
+    if (!exists(nameSpace))
+    {
+        outcome = failure(CMPI_RC_ERR_INVALID_NAMESPACE, "there is no namespace '" + std::string(nameSpace) + "'");
+        return nullptr;
+    }
+    const ClassInfo* info = _core.classes.find(className);
+    if (!info || (_core.providers.find(info->name) && !providerOf(*info, nameSpace)))
+    {
+        outcome = failure(CMPI_RC_ERR_INVALID_CLASS,
+                          "there is no class '" + std::string(className) + "' in " + std::string(nameSpace));
+        return nullptr;
+    }
+    return info;
+}
+
+/// The class of a path that a request names.
+const ClassInfo* Dispatcher::findClassOf(const Path& path, Outcome& outcome)
+{
+    const ClassInfo* info = findClass(path.nameSpace, path.className, outcome);
+    const bool bare = std::any_of(path.keys.begin(), path.keys.end(),
+                                  [](const Property& key) {
+                                      return key.value.type() == CMPI_ref && !key.value.isNull() &&
+                                             key.value.asPath().nameSpace.empty();
+                                  });
+    if (info && bare && !_core.options.personality.bareReferences)
+    {
+        outcome =
+            failure(CMPI_RC_ERR_INVALID_CLASS, "a key of " + info->name + " refers to a path without a namespace");
+        return nullptr;
+    }
+    return info;
+}
+
+// --- what a server makes of a request ------------------------------------------------------------------
+
+PathHandle* Dispatcher::passed(Frame& frame, const Path& path, bool source) const
+{
+    return makePath(frame, _core.options.personality.nullForEmptyKeys ? withoutEmptyKeys(path, source) : path);
+}
+
+InstanceHandle* Dispatcher::passed(Frame& frame, const Object& object) const
+{
+    if (!_core.options.personality.nullForEmptyKeys)
+        return makeInstance(frame, object);
+    return makeInstance(frame, {withoutEmptyKeys(object.path, false), withoutEmptyKeys(object.properties)});
+}
+
+std::vector<Property> Dispatcher::passed(const std::vector<Property>& arguments) const
+{
+    const Personality& personality = _core.options.personality;
+    std::vector<Property> result = personality.nullForEmptyKeys ? withoutEmptyKeys(arguments) : arguments;
+    if (!personality.nullArguments)
+        std::erase_if(result, [](const Property& argument) { return argument.value.isNull(); });
+    return result;
+}
+
+/// The property list that a provider gets for an enumeration without one.
+PropertyList Dispatcher::listOfSuperclass(std::string_view className) const
+{
+    const ClassInfo* root = _core.classes.find(className);
+    if (!root || !_core.options.personality.listOfSuperclass || root->subclasses.empty())
+        return std::nullopt;
+    std::vector<std::string> names;
+    std::transform(root->properties.begin(), root->properties.end(), std::back_inserter(names),
+                   [](const FeatureInfo& property) { return property.name; });
+    return names;
+}
+
+std::vector<Property> Dispatcher::contextEntries(std::string_view nameSpace) const
+{
+    const char* principal = _core.options.personality.principal;
+    return {{CMPIInvocationFlags, Value::uint32(0)},
+            {CMPIPrincipal, principal ? Value::string(principal) : Value::null(CMPI_string)},
+            {CMPIInitNameSpace, Value::string(std::string(nameSpace))}};
+}
+
+// --- one call into a provider --------------------------------------------------------------------------
+
+/// Loads the provider, calls it in a frame of its own and checks how it ended. `call` gets the MI, the frame and the
+/// result, and returns the provider's status.
+template <Kind K, class Call>
+ResultContent Dispatcher::run(Provider& provider, const std::string& what, std::string_view nameSpace,
+                              ResultContent expected, bool mustBeDone, Outcome& outcome, Call call)
+{
+    auto* mi = static_cast<MiOf<K>*>(_core.providers.load(provider, K, outcome));
+    if (!mi)
+        return {};
+    CallFrame frame(_core, provider.broker, what, contextEntries(nameSpace));
+    ResultHandle* result = frame.make<ResultHandle>(std::move(expected));
+    const CMPIStatus status = call(mi, frame, result);
+    outcome = outcomeOf(status, *provider.info);
+    if (Frame::current() != &frame)
+        _core.violation("the provider left an attachment on the broker's thread");
+    if (outcome.ok() && mustBeDone && !result->content.done)
+        _core.violation("success without returnDone");
+    if (outcome.ok() && result->content.kind == ResultKind::data && !result->content.data)
+        _core.violation("success of a method without returnData");
+    return outcome.ok() ? delivered(std::move(result->content), _core.options.personality.nullElements)
+                        : ResultContent();
+}
+
+/// Whether the failure of one of so many providers leaves the request to the others.
+bool Dispatcher::skips(const Outcome& outcome, std::size_t providers) const
+{
+    return _core.options.personality.skipsNotSupported && providers > 1 && outcome.status == CMPI_RC_ERR_NOT_SUPPORTED;
+}
+
+/// What the client gets of the instances where the broker applies the property list.
+Reply Dispatcher::cut(Reply answer, const PropertyList& properties) const
+{
+    if (_core.options.personality.propertyFilters == PropertyFilters::broker)
+        for (Object& object : answer.objects)
+            object = filtered(std::move(object), properties);
+    return answer;
+}
+
+// --- instances -----------------------------------------------------------------------------------------
+
+/// Enumerates through the providers and the store. `call` gets the MI, the context, the result and the class path;
+/// `stored` adds one of the store's instances to the answer.
+template <class Answer, class Call, class Stored>
+Answer Dispatcher::enumerate(const char* operation, std::string_view nameSpace, std::string_view className, Call call,
+                             Stored stored)
+{
+    Answer answer;
+    const ClassInfo* root = findClass(nameSpace, className, answer);
+    if (!root)
+        return answer;
+    const ResultKind kind = std::is_same_v<Answer, Reply> ? ResultKind::instances : ResultKind::paths;
+    const std::vector<const ClassInfo*> family = _core.classes.withSubclasses(*root);
+    const auto served = [&](const ClassInfo* info) { return providerOf(*info, nameSpace) != nullptr; };
+    const auto providers = static_cast<std::size_t>(std::count_if(family.begin(), family.end(), served));
+    for (const ClassInfo* info : family)
+    {
+        Provider* provider = providerOf(*info, nameSpace);
+        if (!provider)
+        {
+            for (Object& object : _core.store.enumerate(nameSpace, info->name))
+                stored(answer, std::move(object));
+            continue;
+        }
+        const auto ask = [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result) {
+            return call(mi, frame.context, result, makePath(frame, {std::string(nameSpace), info->name, {}}));
+        };
+        Outcome outcome;
+        append(answer, run<Kind::instance>(*provider, operation + (" " + info->name), nameSpace,
+                                           {.kind = kind, .expectedClass = info}, true, outcome, ask));
+        if (!outcome.ok() && !skips(outcome, providers))
+            return failed<Answer>(outcome);
+    }
+    return answer;
+}
+
+Reply Dispatcher::enumerateInstances(std::string_view nameSpace, std::string_view className,
+                                     const PropertyList& properties)
+{
+    const PropertyList list = properties ? properties : listOfSuperclass(className);
+    NameList names(listOf(list));
+    const auto ask = [&](CMPIInstanceMI* mi, ContextHandle* context, ResultHandle* result, PathHandle* path)
+    { return mi->ft->enumerateInstances(mi, context, result, path, names.get()); };
+    const auto stored = [&](Reply& answer, Object&& object)
+    { answer.objects.push_back(filtered(std::move(object), properties)); };
+    return cut(enumerate<Reply>("enumerateInstances", nameSpace, className, ask, stored), list);
+}
+
+NamesReply Dispatcher::enumerateInstanceNames(std::string_view nameSpace, std::string_view className)
+{
+    return enumerate<NamesReply>(
+        "enumerateInstanceNames", nameSpace, className,
+        [&](CMPIInstanceMI* mi, ContextHandle* context, ResultHandle* result, PathHandle* path)
+        { return mi->ft->enumerateInstanceNames(mi, context, result, path); },
+        [](NamesReply& answer, Object&& object) { answer.paths.push_back(std::move(object.path)); });
+}
+
+Reply Dispatcher::getInstance(const Path& path, const PropertyList& properties)
+{
+    Reply answer;
+    const ClassInfo* info = findClassOf(path, answer);
+    if (!info)
+        return answer;
+    Provider* provider = providerOf(*info, path.nameSpace);
+    if (!provider)
+    {
+        answer = _core.store.get(path);
+        for (Object& object : answer.objects)
+            object = filtered(std::move(object), properties);
+        return answer;
+    }
+    NameList names(listOf(properties));
+    const auto ask = [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
+    { return mi->ft->getInstance(mi, frame.context, result, passed(frame, path), names.get()); };
+    append(answer,
+           run<Kind::instance>(*provider, "getInstance " + info->name, path.nameSpace,
+                               {.kind = ResultKind::instances, .expectedClass = info, .limit = 1}, true, answer, ask));
+    if (answer.ok() && answer.objects.empty())
+    {
+        _core.violation("getInstance " + info->name + " answered OK without an instance");
+        return failed<Reply>(failure(CMPI_RC_ERR_FAILED, info->name + " gave no instance"));
+    }
+    return answer.ok() ? cut(std::move(answer), properties) : failed<Reply>(answer);
+}
+
+NamesReply Dispatcher::createInstance(const Object& object)
+{
+    NamesReply answer;
+    const ClassInfo* info = findClassOf(object.path, answer);
+    if (!info)
+        return answer;
+    Provider* provider = providerOf(*info, object.path.nameSpace);
+    if (!provider)
+        return _core.store.create(object);
+    const auto ask = [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
+    { return mi->ft->createInstance(mi, frame.context, result, passed(frame, object.path), passed(frame, object)); };
+    append(answer,
+           run<Kind::instance>(*provider, "createInstance " + info->name, object.path.nameSpace,
+                               {.kind = ResultKind::paths, .expectedClass = info, .limit = 1}, true, answer, ask));
+    return answer.ok() ? answer : failed<NamesReply>(answer);
+}
+
+Outcome Dispatcher::modifyInstance(const Object& object, const PropertyList& properties)
+{
+    Outcome outcome;
+    const ClassInfo* info = findClassOf(object.path, outcome);
+    if (!info)
+        return outcome;
+    Provider* provider = providerOf(*info, object.path.nameSpace);
+    if (!provider)
+        return _core.store.modify(object, properties);
+    NameList names(listOf(properties));
+    run<Kind::instance>(*provider, "modifyInstance " + info->name, object.path.nameSpace, {}, false, outcome,
+                        [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
+                        {
+                            return mi->ft->modifyInstance(mi, frame.context, result, passed(frame, object.path),
+                                                          passed(frame, object), names.get());
+                        });
+    return outcome;
+}
+
+Outcome Dispatcher::deleteInstance(const Path& path)
+{
+    Outcome outcome;
+    const ClassInfo* info = findClassOf(path, outcome);
+    if (!info)
+        return outcome;
+    Provider* provider = providerOf(*info, path.nameSpace);
+    if (!provider)
+        return _core.store.remove(path);
+    run<Kind::instance>(*provider, "deleteInstance " + info->name, path.nameSpace, {}, true, outcome,
+                        [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
+                        { return mi->ft->deleteInstance(mi, frame.context, result, passed(frame, path)); });
+    return outcome;
+}
+
+// --- associations --------------------------------------------------------------------------------------
+
+/// The class that a request starts from; null with the reason where no provider is asked.
+const ClassInfo* Dispatcher::associationSource(const Path& path, const AssociationFilter& filter, Outcome& outcome)
+{
+    const ClassInfo* source = findClassOf(path, outcome);
+    if (!source)
+        return nullptr;
+    for (const std::string& name : {filter.assocClass, filter.resultClass})
+        if (!name.empty() && !_core.classes.find(name))
+        {
+            outcome = failure(CMPI_RC_ERR_INVALID_PARAMETER, "there is no class '" + name + "'");
+            return nullptr;
+        }
+    const ClassInfo* named = _core.classes.find(filter.assocClass);
+    if (_core.options.personality.ownInterop &&
+        canonicalNameSpace(path.nameSpace) == canonicalNameSpace("root/interop") &&
+        !(named && _core.providers.find(named->name)))
+    {
+        outcome = failure(CMPI_RC_ERR_FAILED, "the server's own interop provider does not know " + source->name);
+        return nullptr;
+    }
+    return source;
+}
+
+std::vector<Provider*> Dispatcher::associationProviders(const Path& path, const AssociationFilter& filter,
+                                                        Outcome& outcome)
+{
+    std::vector<Provider*> providers;
+    const ClassInfo* source = associationSource(path, filter, outcome);
+    if (!source)
+        return providers;
+    for (const std::string& name : _core.providers.classNames())
+    {
+        const ClassInfo* association = _core.classes.find(name);
+        const bool wanted = filter.assocClass.empty() || association->isA(filter.assocClass);
+        Provider* provider = providerOf(*association, path.nameSpace);
+        if (wanted && provider && _core.providers.serves(name, Kind::association) &&
+            canReference(*association, *source))
+            providers.push_back(provider);
+    }
+    return providers;
+}
+
+/// Calls all association providers in question. `call` gets the MI, the frame, the result, the path and the association
+/// class to name (null for none).
+template <class Answer, class Call>
+Answer Dispatcher::fanOutAssociations(const char* operation, const Path& path, const AssociationFilter& filter,
+                                      Call call)
+{
+    Answer answer;
+    const ResultKind kind = std::is_same_v<Answer, Reply> ? ResultKind::instances : ResultKind::paths;
+    const std::vector<Provider*> providers = associationProviders(path, filter, answer);
+    for (Provider* provider : providers)
+    {
+        const bool own = filter.assocClass.empty() && _core.options.personality.fanout == Fanout::own_class;
+        const std::string& assocClass = own ? provider->info->name : filter.assocClass;
+        const auto ask = [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result)
+        { return call(mi, frame, result, passed(frame, path, true), filterText(assocClass)); };
+        Outcome outcome;
+        append(answer, run<Kind::association>(*provider, operation + (" " + provider->info->name), path.nameSpace,
+                                              {.kind = kind}, true, outcome, ask));
+        if (!outcome.ok() && !skips(outcome, providers.size()))
+            return failed<Answer>(outcome);
+    }
+    return answer;
+}
+
+Reply Dispatcher::associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties)
+{
+    NameList names(listOf(properties));
+    const auto ask =
+        [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
+    {
+        return mi->ft->associators(mi, frame.context, result, source, assocClass, filterText(filter.resultClass),
+                                   filterText(filter.role), filterText(filter.resultRole), names.get());
+    };
+    return cut(fanOutAssociations<Reply>("associators", path, filter, ask), properties);
+}
+
+NamesReply Dispatcher::associatorNames(const Path& path, const AssociationFilter& filter)
+{
+    return fanOutAssociations<NamesReply>(
+        "associatorNames", path, filter,
+        [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
+        {
+            return mi->ft->associatorNames(mi, frame.context, result, source, assocClass,
+                                           filterText(filter.resultClass), filterText(filter.role),
+                                           filterText(filter.resultRole));
+        });
+}
+
+Reply Dispatcher::references(const Path& path, const AssociationFilter& filter, const PropertyList& properties)
+{
+    NameList names(listOf(properties));
+    const auto ask =
+        [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
+    { return mi->ft->references(mi, frame.context, result, source, assocClass, filterText(filter.role), names.get()); };
+    return cut(fanOutAssociations<Reply>("references", path, filter, ask), properties);
+}
+
+NamesReply Dispatcher::referenceNames(const Path& path, const AssociationFilter& filter)
+{
+    return fanOutAssociations<NamesReply>(
+        "referenceNames", path, filter,
+        [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
+        { return mi->ft->referenceNames(mi, frame.context, result, source, assocClass, filterText(filter.role)); });
+}
+
+// --- methods -------------------------------------------------------------------------------------------
+
+MethodReply Dispatcher::invokeMethod(const Path& path, const std::string& method, const std::vector<Property>& in)
+{
+    MethodReply answer;
+    const ClassInfo* info = findClassOf(path, answer);
+    if (!info)
+        return answer;
+    Provider* provider = providerOf(*info, path.nameSpace);
+    if (!provider)
+    {
+        return failed<MethodReply>(
+            failure(CMPI_RC_ERR_METHOD_NOT_AVAILABLE, "no provider serves the methods of " + info->name));
+    }
+    const MethodInfo* definition = info->method(method);
+    const auto ask = [&](CMPIMethodMI* mi, Frame& frame, ResultHandle* result)
+    {
+        const ArgsHandle* inArgs = frame.make<ArgsHandle>({passed(in), nullptr});
+        ArgsHandle* outArgs = frame.make<ArgsHandle>({{}, definition});
+        const CMPIStatus status =
+            mi->ft->invokeMethod(mi, frame.context, result, passed(frame, path), method.c_str(), inArgs, outArgs);
+        answer.out = delivered(std::move(outArgs->content.args), _core.options.personality.nullElements);
+        return status;
+    };
+    ResultContent result =
+        run<Kind::method>(*provider, "invokeMethod " + info->name + "." + method, path.nameSpace,
+                          {.kind = ResultKind::data, .limit = 1, .method = definition}, true, answer, ask);
+    if (!answer.ok())
+        return failed<MethodReply>(answer);
+    answer.returnValue = result.data.value_or(Value());
+    return answer;
+}
+
+} // namespace broker
