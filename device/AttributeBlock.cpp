@@ -2,6 +2,7 @@
 
 #include "device/Bindings.h"
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
 
 #include <algorithm>
 #include <cstdio>
@@ -27,7 +28,11 @@ RM_STATUS logText(RM_STATUS status, const char* label, const std::string& text)
 
 } // namespace
 
-AttributeBlock::AttributeBlock(std::uint32_t room) : _room(room), _bytes(new (std::nothrow) std::byte[room]{}) {}
+AttributeBlock::AttributeBlock(std::uint32_t room) : _room(room), _bytes(new (std::nothrow) std::byte[room]{})
+{
+    if (!_bytes)
+        ++left_out_for_memory;
+}
 
 RM_STATUS AttributeBlock::bytes(std::uint32_t id, std::span<const std::byte>& out) const
 {
@@ -52,7 +57,7 @@ template <class Integer> RM_STATUS AttributeBlock::integer(std::uint32_t id, Int
     std::span<const std::byte> value;
     if (RM_STATUS status = bytes(id, value); status != RM_OK)
         return status;
-    if (value.size() != sizeof out)
+    if (value.size() < sizeof out)
         return RM_ERROR;
     std::memcpy(&out, value.data(), sizeof out);
     return RM_OK;
@@ -113,7 +118,7 @@ RM_STATUS readMacAddress(const AttributeBlock& block, std::uint32_t id, const ch
 {
     std::span<const std::byte> value;
     RM_STATUS status = block.bytes(id, value);
-    if (status == RM_OK && value.size() != 6)
+    if (status == RM_OK && value.size() < 6)
         status = RM_ERROR;
     if (status == RM_OK)
     {

@@ -12,8 +12,9 @@
 namespace cimple
 {
 
-/// A buffer that the library fills and reads. A value counts only if it lies inside the buffer and has the length
-/// of its form; anything else is a failure of status RM_ERROR. The readers leave `out` alone on failure.
+/// A buffer that the library fills and reads. A value counts only if it lies inside the buffer and is no shorter than
+/// its form, since libraries round lengths up; anything else is a failure of status RM_ERROR. The readers leave `out`
+/// alone on failure.
 class AttributeBlock
 {
 public:

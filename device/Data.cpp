@@ -4,6 +4,7 @@
 #include "device/FCAdapter.h"
 #include "device/FreePart.h"
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
 
 #include <algorithm>
 #include <cstring>
@@ -34,11 +35,24 @@ bool isNetworkName(std::string_view name)
     return name.starts_with("Tavrin-O") || name.starts_with("Tavrin-N");
 }
 
+std::uint32_t adaptersReported()
+try
+{
+    return HBA_GetNumberOfAdapters();
+}
+catch (...)
+{
+    note_missing_memory();
+    TVR_LOG(TVR_ERR, "HBA_GetNumberOfAdapters failed");
+    return 0;
+}
+
 } // namespace
 
 Data::Data()
 {
     HBA_LoadLibrary();
+    resolveAbsentEntries();
     TVR_LOG(TVR_DBG, "Data Pointer Constructed.");
 }
 
@@ -53,7 +67,7 @@ void Data::buildAdapterData()
     TVR_LOG(TVR_DBG, "buildAdapterData");
     freeAllData();
     TVR_LOG(TVR_DBG, "buildAdapterData - with hbaapi");
-    const std::uint32_t reported = HBA_GetNumberOfAdapters();
+    const std::uint32_t reported = adaptersReported();
     TVR_LOG(TVR_DBG, "Number of Adapters detected = %u", reported);
     if (reported == 0)
     {
@@ -69,30 +83,33 @@ void Data::buildAdapterData()
 
 /// False if the adapter was skipped.
 bool Data::keepAdapter(std::uint32_t number)
+try
 {
     char name[nameReserve] = {};
     if (const HBA_STATUS status = HBA_GetAdapterName(number, name); status != HBA_STATUS_OK)
-        return TVR_LOG(TVR_WARN, "Error hbaStatus = %d, Skipping Adapter# %u", status, number), false;
+    {
+        TVR_LOG(TVR_WARN, "Error hbaStatus = %d, Skipping Adapter# %u", status, number);
+        return false;
+    }
     name[nameRoom - 1] = 0;
     if (isNetworkName(name))
         return false;
     TVR_LOG(TVR_DBG, "FC AdapterName : [%s]", name);
-    try
-    {
-        auto adapter = std::make_unique<FCAdapter>(name, number);
-        TVR_LOG(TVR_DBG, "Adapter Function type : %d", adapter->functionType);
-        if (isOtherFunction(adapter->functionType))
-            return false;
-        adapters.reserve(adapters.size() + 1);
-        ports.insert(ports.end(), adapter->ports.begin(), adapter->ports.end());
-        adapters.push_back(adapter.release());
-        dataValid = true;
-        return true;
-    }
-    catch (...)
-    {
-        return TVR_LOG(TVR_ERR, "Catch ALL error during creating adapter..., Skipping Adapter# %d", number), false;
-    }
+    auto adapter = std::make_unique<FCAdapter>(name, number);
+    TVR_LOG(TVR_DBG, "Adapter Function type : %d", adapter->functionType);
+    if (isOtherFunction(adapter->functionType))
+        return false;
+    adapters.reserve(adapters.size() + 1);
+    ports.insert(ports.end(), adapter->ports.begin(), adapter->ports.end());
+    adapters.push_back(adapter.release());
+    dataValid = true;
+    return true;
+}
+catch (...)
+{
+    note_missing_memory();
+    TVR_LOG(TVR_ERR, "Catch ALL error during creating adapter..., Skipping Adapter# %d", number);
+    return false;
 }
 
 void Data::buildSANData()
@@ -106,6 +123,7 @@ void Data::buildSANData()
         }
         catch (...)
         {
+            note_missing_memory();
             TVR_LOG(TVR_ERR, "Issue with Target Rescan with Adapter- moving to the next adapter");
         }
 }

@@ -12,11 +12,12 @@ namespace cimple
 /// How the name of an entry point is looked up; libraries in device/Loader.h.
 enum class Family : std::uint8_t
 {
-    rmDual,    ///< LRM_ name in the local RM library; LRM_ then RM_ name in the fallback library
-    lrmOnly,   ///< LRM_ name in both
-    rmOnly,    ///< RM_ name in both
-    hbaApi,    ///< in the HBA API library, or in the fallback RM library if that is missing
-    vendorQos, ///< in the global scope of the process
+    rmDual,      ///< LRM_ name in the local RM library; LRM_ then RM_ name in the fallback library
+    lrmOnly,     ///< LRM_ name in both
+    rmOnly,      ///< RM_ name in both
+    hbaApi,      ///< in the HBA API library, or as `vendorClose` if that is missing
+    vendorQos,   ///< in the global scope of the process
+    vendorClose, ///< in the fallback RM library, or in the global scope beside the local one
 };
 
 /// What a call returns while its entry point is absent.
@@ -216,7 +217,7 @@ inline constexpr auto entryPoints = std::to_array<EntryPoint>({
     {"HBA_RemoveCallback", Family::hbaApi},
     {"HBA_SendReadCapacity", Family::hbaApi},
     {"HBA_SendScsiInquiry", Family::hbaApi},
-    {"CPQFC_CloseAdapter", Family::vendorQos, absentNothing},
+    {"CPQFC_CloseAdapter", Family::vendorClose, absentNothing},
     {"CPQFC_FreeLibrary", Family::vendorQos},
     {"CPQFC_GetNumberOfAdapters", Family::vendorQos},
     {"CPQFC_LoadLibrary", Family::vendorQos},

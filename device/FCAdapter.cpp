@@ -5,6 +5,7 @@
 #include "device/ForeignText.h"
 #include "device/HbaAdapter.h"
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
 
 #include <algorithm>
 #include <exception>
@@ -22,43 +23,56 @@ constexpr std::uint32_t maxPorts = 256;
 
 using Attributes = FCAdapterAttributes;
 
-struct AttributeRow
+struct Source
 {
-    std::uint32_t id;
-    const char* label;
-    void (*read)(Attributes& to, const AttributeBlock& from, const AttributeRow& row);
+    HBA_WWN wwpn;
+    AttributeBlock block;
 };
 
-template <std::uint32_t Attributes::*Field>
-void number(Attributes& to, const AttributeBlock& from, const AttributeRow& row)
+struct AttributeRow
 {
-    readAdapterNumber(from, row.id, row.label, to.*Field);
+    std::uint32_t id; ///< 0 for what has a call of its own
+    const char* label;
+    void (*read)(Attributes& to, const Source& from, const AttributeRow& row);
+};
+
+template <std::uint32_t Attributes::*Field> void number(Attributes& to, const Source& from, const AttributeRow& row)
+{
+    readAdapterNumber(from.block, row.id, row.label, to.*Field);
 }
 
-template <std::string Attributes::*Field> void text(Attributes& to, const AttributeBlock& from, const AttributeRow& row)
+template <std::string Attributes::*Field> void text(Attributes& to, const Source& from, const AttributeRow& row)
 {
-    readText(from, row.id, row.label, to.*Field);
+    readText(from.block, row.id, row.label, to.*Field);
 }
 
-void boardTemperature(Attributes& to, const AttributeBlock& from, const AttributeRow& row)
+void boardTemperature(Attributes& to, const Source& from, const AttributeRow& row)
 {
     std::uint32_t word = 0;
-    if (readAdapterNumber(from, row.id, row.label, word) != RM_OK)
+    if (readAdapterNumber(from.block, row.id, row.label, word) != RM_OK)
         return;
     to.boardTemperature = word & 0xFF;
     to.boardTemperatureThreshold = word >> 8 & 0xFF;
     to.boardTemperatureState = word >> 16 & 0xFF;
 }
 
-void bootCodeEnabled(Attributes& to, const AttributeBlock& from, const AttributeRow& row)
+void bootCodeEnabled(Attributes& to, const Source& from, const AttributeRow& row)
 {
     std::uint32_t enabled = 0;
-    to.bootCodeEnabled = readAdapterNumber(from, row.id, row.label, enabled) == RM_OK && enabled != 0;
+    to.bootCodeEnabled = readAdapterNumber(from.block, row.id, row.label, enabled) == RM_OK && enabled != 0;
 }
 
-void ieeeAddress(Attributes& to, const AttributeBlock& from, const AttributeRow& row)
+void ieeeAddress(Attributes& to, const Source& from, const AttributeRow& row)
 {
-    readMacAddress(from, row.id, row.label, to.ieeeAddress);
+    readMacAddress(from.block, row.id, row.label, to.ieeeAddress);
+}
+
+void driverType(Attributes& to, const Source& from, const AttributeRow& row)
+{
+    std::uint32_t type = 0;
+    const RM_STATUS status = LRM_GetDriverType(from.wwpn, &type);
+    if (logAdapterNumber(status, row.label, type) == RM_OK)
+        to.driverType = type;
 }
 
 constexpr AttributeRow attributeRows[] = {
@@ -67,6 +81,7 @@ constexpr AttributeRow attributeRows[] = {
     {RM_HA_BOARD_TEMPERATURE, "_BoardTemperature", boardTemperature},
     {RM_HA_DEVICE_ID, "_DeviceID", number<&Attributes::deviceID>},
     {RM_HA_MODEL_ID, "_ModelID", number<&Attributes::modelID>},
+    {0, "_DriverType", driverType},
     {RM_HA_DIAG_VERSION, "_DiagVersion", number<&Attributes::diagVersion>},
     {RM_HA_PORT_NUMBER, "_PortNumber", number<&Attributes::portNumber>},
     {RM_HA_FUNCTION_TYPE, "_FunctionType", number<&Attributes::functionType>},
@@ -144,20 +159,14 @@ void FCAdapterAttributes::readHbaAttributes(const std::string& adapterName)
 
 void FCAdapterAttributes::readRmAttributes()
 {
-    const HBA_WWN wwpn = wwnOf(port0WWPN);
-    AttributeBlock block(RM_HBA_ATTRIBUTES_SIZE);
-    if (const RM_STATUS status = block.fetch(LRM_GetHBAAttributes, wwpn); status != RM_OK)
+    Source source{wwnOf(port0WWPN), AttributeBlock(RM_HBA_ATTRIBUTES_SIZE)};
+    if (const RM_STATUS status = source.block.fetch(LRM_GetHBAAttributes, source.wwpn); status != RM_OK)
     {
         TVR_LOG(TVR_ERR, "ERROR: RM_GetHBAAttributes call failed (%d)", status);
         throw std::exception();
     }
     for (const AttributeRow& row : attributeRows)
-        row.read(*this, block, row);
-
-    std::uint32_t type = 0;
-    const RM_STATUS status = LRM_GetDriverType(wwpn, &type);
-    if (logAdapterNumber(status, "_DriverType", type) == RM_OK)
-        driverType = type;
+        row.read(*this, source, row);
 }
 
 FCAdapter::FCAdapter(const std::string& adapterName, std::uint32_t number) : Adapter(adapterName, number, fibreChannel)
@@ -175,6 +184,7 @@ FCAdapter::FCAdapter(const std::string& adapterName, std::uint32_t number) : Ada
         }
         catch (...)
         {
+            note_missing_memory();
             TVR_LOG(TVR_ERR, "Failed to fetch information for port: [%d] on adapter: [%s]", index, name.c_str());
         }
 }
@@ -194,6 +204,7 @@ void FCAdapter::rescanTargets()
         }
         catch (...)
         {
+            note_missing_memory();
             TVR_LOG(TVR_ERR, "Issue with Target Rescan - moving to the next Port");
         }
 }

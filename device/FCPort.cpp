@@ -6,6 +6,7 @@
 #include "device/HbaAdapter.h"
 #include "device/TargetMapping.h"
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
 
 #include <algorithm>
 #include <exception>
@@ -173,6 +174,7 @@ void FCPort::rescanTargets(Adapter& owner)
         }
         catch (...)
         {
+            note_missing_memory();
             TVR_LOG(TVR_ERR, "target creation failed - moving to the next target");
         }
 }

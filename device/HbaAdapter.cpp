@@ -1,6 +1,6 @@
 #include "device/HbaAdapter.h"
 
-#include "foundation/Log.h"
+#include "device/FreePart.h"
 
 #include <exception>
 
@@ -16,6 +16,11 @@ HbaAdapter::HbaAdapter(const std::string& name)
         TVR_LOG(TVR_ERR, "HBA_OpenAdapter failed, skipping Adapter %s", name.c_str());
         throw std::exception();
     }
+}
+
+HbaAdapter::~HbaAdapter()
+{
+    freePart(TVR_ERR, "HBA_CloseAdapter failed", [&] { HBA_CloseAdapter(_handle); });
 }
 
 } // namespace cimple

@@ -13,7 +13,7 @@ class HbaAdapter
 {
 public:
     explicit HbaAdapter(const std::string& name);
-    ~HbaAdapter() { HBA_CloseAdapter(_handle); }
+    ~HbaAdapter();
     HbaAdapter(const HbaAdapter&) = delete;
     HbaAdapter& operator=(const HbaAdapter&) = delete;
     HBA_HANDLE handle() const { return _handle; }

@@ -38,7 +38,8 @@ DynamicLoader dynamicLoader = {
 
 std::array<std::atomic<void*>, slotCount> slots{};
 std::array<std::atomic<void*>, entryPoints.size()> firstLookups{};
-/// The look-ups of every row are in `firstLookups`, absent ones included.
+std::array<std::atomic<bool>, entryPoints.size()> boundRows{};
+/// The look-ups of every bound row are in `firstLookups`, absent ones included.
 std::atomic<bool> allResolved{false};
 
 const char* loaderError()
@@ -47,7 +48,7 @@ const char* loaderError()
     return text ? text : "";
 }
 
-/// A library at a new address makes what was found in the old one stale.
+/// What was found in a library is stale once it is closed, and when another was opened.
 void forgetLookups()
 {
     for (auto& entry : firstLookups)
@@ -62,7 +63,10 @@ bool openLibrary(Slot slot, const std::string& name)
         return true;
     void* library = dynamicLoader.open(file.c_str(), RTLD_NOW);
     if (!library)
-        return TVR_LOG(TVR_ERR, "dlopen failed :%s", loaderError()), false;
+    {
+        TVR_LOG(TVR_ERR, "dlopen failed :%s", loaderError());
+        return false;
+    }
     forgetLookups();
     slots[slot] = library;
     return true;
@@ -74,26 +78,47 @@ void* firstLookup(std::size_t row, Slot slot)
     if (!library && slot != globalSlot)
         return nullptr;
     void* entry = firstLookups[row];
-    if (!entry)
-    {
-        entry = dynamicLoader.symbol(library, entryPoints[row].name);
+    if (!entry && (entry = dynamicLoader.symbol(library, entryPoints[row].name)))
         firstLookups[row] = entry;
-    }
     return entry;
 }
 
+/// Beside the local RM library the fallback is never opened: its null handle searches the global scope of the process.
 void* fallbackLookup(std::size_t row)
 {
     void* library = slots[fallbackRmSlot];
-    if (rmLibMissing || !library)
+    if (rmLibMissing || (!library && !slots[localRmSlot]))
         return nullptr;
     const EntryPoint& point = entryPoints[row];
     const char* secondName = point.family == Family::rmDual ? point.name + 1 : point.name;
     void* entry = dynamicLoader.symbol(library, point.name);
-    if (!entry)
-        entry = dynamicLoader.symbol(library, secondName);
-    firstLookups[row] = entry;
-    return entry;
+    return entry ? entry : dynamicLoader.symbol(library, secondName);
+}
+
+void* lookUp(std::size_t row)
+{
+    switch (entryPoints[row].family)
+    {
+    case Family::rmDual:
+    case Family::lrmOnly:
+    case Family::rmOnly:
+        return lrmLibMissing ? fallbackLookup(row) : firstLookup(row, localRmSlot);
+    case Family::hbaApi:
+        return hbaLibMissing ? fallbackLookup(row) : firstLookup(row, hbaApiSlot);
+    case Family::vendorQos:
+        return cpqLibMissing ? nullptr : firstLookup(row, globalSlot);
+    case Family::vendorClose:
+        return fallbackLookup(row);
+    }
+    return nullptr;
+}
+
+void lookUpAbsent()
+{
+    for (std::size_t row = 0; row < entryPoints.size(); ++row)
+        if (boundRows[row] && !firstLookups[row])
+            if (void* entry = lookUp(row))
+                firstLookups[row] = entry;
 }
 
 } // namespace
@@ -129,34 +154,30 @@ int unloadAllLibraries()
         std::snprintf(handle, sizeof handle, "%p", library);
         TVR_LOG(TVR_ERR, "dlclose for lib %s failed with %s\n", handle, loaderError());
     }
+    forgetLookups();
     return 0;
 }
 
 void resolveAllEntries()
 {
-    for (std::size_t row = 0; row < entryPoints.size(); ++row)
-        firstLookups[row] = resolveEntry(row);
+    lookUpAbsent();
     allResolved = true;
+}
+
+void resolveAbsentEntries()
+{
+    if (allResolved)
+        lookUpAbsent();
 }
 
 void* resolveEntry(std::size_t row)
 {
-    if (allResolved)
-        return firstLookups[row];
-    switch (entryPoints[row].family)
-    {
-    case Family::rmDual:
-    case Family::lrmOnly:
-    case Family::rmOnly:
-        return lrmLibMissing ? fallbackLookup(row) : firstLookup(row, localRmSlot);
-    case Family::hbaApi:
-        return hbaLibMissing ? fallbackLookup(row) : firstLookup(row, hbaApiSlot);
-    case Family::vendorQos:
-        break;
-    }
-    if (row == entryRow("CPQFC_CloseAdapter"))
-        return fallbackLookup(row);
-    return cpqLibMissing ? nullptr : firstLookup(row, globalSlot);
+    return allResolved ? firstLookups[row].load() : lookUp(row);
+}
+
+bool markBound(std::size_t row) noexcept
+{
+    return boundRows[row] = true;
 }
 
 } // namespace cimple

@@ -33,13 +33,21 @@ int loadAllLibraries();
 /// for an absent entry point, until the libraries are loaded again.
 int unloadAllLibraries();
 
-/// Looks every entry point up, so that no binding does so until the libraries are loaded or unloaded again. The thread
-/// that closes the provider's library holds the loader's lock while it waits for the refresh to end: a refresh that
-/// looked something up would wait for it in turn.
+/// Looks every entry point up that a binding calls, so that no binding does so until the libraries are loaded or
+/// unloaded again: a look-up takes the lock of the system's loader, and a thread that somebody waits for under this
+/// lock must not ask for it.
 void resolveAllEntries();
+
+/// Looks again for those that resolveAllEntries() did not find: a library that is initialised may load others, which
+/// define them. For the end of an initialisation and for the head of a method; not on a thread that somebody may wait
+/// for in a dlclose, nor while the libraries are unloaded. Does nothing before resolveAllEntries().
+void resolveAbsentEntries();
 
 /// Entry point of a row of `entryPoints`, or null. The first look-up is kept until a library is opened again;
 /// look-ups in the fallback library are made anew on every call.
 void* resolveEntry(std::size_t row);
+
+/// The program calls this row. For bindings, before the program starts.
+bool markBound(std::size_t row) noexcept;
 
 } // namespace cimple

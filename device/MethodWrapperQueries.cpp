@@ -12,6 +12,7 @@
 #include <cstring>
 #include <memory>
 #include <new>
+#include <utility>
 
 namespace cimple
 {
@@ -39,7 +40,10 @@ RM_STATUS fetchList(std::vector<Entry>& out, const char* noMemory, const Call& c
         const std::size_t size = std::max(sizeof(List), offsetof(List, entry) + std::size_t(room) * sizeof(Entry));
         const std::unique_ptr<std::byte[]> buffer(new (std::nothrow) std::byte[size]{});
         if (!buffer)
-            return TVR_LOG(TVR_DBG, "%s", noMemory), RM_ERROR_NO_MEMORY;
+        {
+            TVR_LOG(TVR_DBG, "%s", noMemory);
+            return RM_ERROR_NO_MEMORY;
+        }
         std::uint32_t count = room;
         std::memcpy(buffer.get(), &count, sizeof count);
         status = call(reinterpret_cast<List*>(buffer.get()));
@@ -62,6 +66,25 @@ RM_STATUS logged(RM_STATUS status)
     if (status != RM_OK)
         TVR_MethodWrapper::logStatus(status);
     return status;
+}
+
+/// For the handler of a query: the status of what was thrown.
+RM_STATUS thrownStatus() noexcept
+{
+    try
+    {
+        throw;
+    }
+    catch (const std::bad_alloc&)
+    {
+        TVR_LOG(TVR_DBG, "Unable to allocate the memory");
+        return RM_ERROR_NO_MEMORY;
+    }
+    catch (...)
+    {
+        TVR_LOG(TVR_ERR, "An exception came out of the RM library");
+        return RM_ERROR;
+    }
 }
 
 /// A virtual port behind a physical one, and a target behind that.
@@ -95,27 +118,49 @@ template <class Function> RM_STATUS readVersion(std::string& version, const Func
 } // namespace
 
 RM_STATUS TVR_MethodWrapper::GetMILILibVersion(std::string* version)
+try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::GetMILILibVersion");
     if (!version)
-        return TVR_LOG(TVR_DBG, "Invalid Output pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid Output pointer");
+        return RM_ERROR;
+    }
     const RM_STATUS status = readVersion(*version, RM_MiliVersion);
     if (status != RM_OK)
-        return TVR_LOG(TVR_DBG, "ERROR: Failed to get MILILibVersion, returned with code %d", status), status;
+    {
+        TVR_LOG(TVR_DBG, "ERROR: Failed to get MILILibVersion, returned with code %d", status);
+        return status;
+    }
     TVR_LOG(TVR_DBG, "MILILibVersion: %s", version->c_str());
     return status;
 }
+catch (...)
+{
+    return thrownStatus();
+}
 
 RM_STATUS TVR_MethodWrapper::GetLibraryVersion(std::string* version)
+try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::GetLibraryVersion");
     if (!version)
-        return TVR_LOG(TVR_DBG, "Invalid Output pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid Output pointer");
+        return RM_ERROR;
+    }
     const RM_STATUS status = readVersion(*version, RM_GetVersion);
     if (status != RM_OK)
-        return TVR_LOG(TVR_DBG, "ERROR: Failed to get LIBVersion, returned with code %d", status), status;
+    {
+        TVR_LOG(TVR_DBG, "ERROR: Failed to get LIBVersion, returned with code %d", status);
+        return status;
+    }
     TVR_LOG(TVR_DBG, "LIBVersion: %s", version->c_str());
     return status;
+}
+catch (...)
+{
+    return thrownStatus();
 }
 
 RM_STATUS TVR_MethodWrapper::SetMILITraceLevel(std::uint32_t level)
@@ -125,10 +170,14 @@ RM_STATUS TVR_MethodWrapper::SetMILITraceLevel(std::uint32_t level)
 }
 
 RM_STATUS TVR_MethodWrapper::GetHBAFeatureList(const HBA_WWN& wwpn, std::vector<RM_Feature>* features)
+try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::GetHBAFeatureList");
     if (!features)
-        return TVR_LOG(TVR_DBG, "Invalid Output pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid Output pointer");
+        return RM_ERROR;
+    }
     const RM_STATUS status =
         fetchList<RM_FeatureList>(*features, "Unable to allocate the memory for retrieving features. ",
                                   [&](RM_FeatureList* list) { return LRM_GetHBAFeatureList(wwpn, list); });
@@ -138,12 +187,19 @@ RM_STATUS TVR_MethodWrapper::GetHBAFeatureList(const HBA_WWN& wwpn, std::vector<
         TVR_LOG(TVR_DBG, "TVR_MethodWrapper::Features: %d->%u", feature.tag, feature.value);
     return status;
 }
+catch (...)
+{
+    return thrownStatus();
+}
 
 RM_STATUS TVR_MethodWrapper::GetQosInfo(const HBA_WWN& wwpn, RM_QosInfo* info)
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::GetQosInfo");
     if (!info)
-        return TVR_LOG(TVR_DBG, "Invalid Output pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid Output pointer");
+        return RM_ERROR;
+    }
     RM_QosInfo record{};
     const RM_STATUS status = LRM_GetQoS(wwpn, &record);
     if (status == RM_OK)
@@ -152,36 +208,58 @@ RM_STATUS TVR_MethodWrapper::GetQosInfo(const HBA_WWN& wwpn, RM_QosInfo* info)
 }
 
 RM_STATUS TVR_MethodWrapper::getTargetOS_info(const char* deviceId, char* out)
+try
 {
     TVR_LOG(TVR_DBG, "Entering getTargetOS_info");
     if (!deviceId)
-        return TVR_LOG(TVR_DBG, "Invalid macAddr passed"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid macAddr passed");
+        return RM_ERROR;
+    }
     if (!out)
-        return TVR_LOG(TVR_DBG, "Invalid Output pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid Output pointer");
+        return RM_ERROR;
+    }
     HBA_WWN wwpn{};
     if (const int failed = idToWwn(&wwpn, deviceId))
         return failed;
     AttributeBlock block(RM_SERVER_ATTRIBUTES_SIZE);
     if (!block.allocated())
-        return TVR_LOG(TVR_DBG, "ERROR: TVR_MethodWrapper::getTargetOS_info: Unable to allocate buffer"),
-               RM_ERROR_NO_MEMORY;
+    {
+        TVR_LOG(TVR_DBG, "ERROR: TVR_MethodWrapper::getTargetOS_info: Unable to allocate buffer");
+        return RM_ERROR_NO_MEMORY;
+    }
     if (const RM_STATUS status = block.fetch(LRM_GetServerAttributes, wwpn); status != RM_OK)
-        return TVR_LOG(TVR_ERR, "RM_GetServerAttributes failed with %d", status), status;
+    {
+        TVR_LOG(TVR_ERR, "RM_GetServerAttributes failed with %d", status);
+        return status;
+    }
     std::string name;
     if (block.text(RM_SA_OPERATING_SYSTEM, name) != RM_OK)
-        return TVR_LOG(TVR_DBG, "ERROR: TVR_MethodWrapper::getTargetOS_info:Unable to retrieve attribute value"),
-               RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "ERROR: TVR_MethodWrapper::getTargetOS_info:Unable to retrieve attribute value");
+        return RM_ERROR;
+    }
     out[name.copy(out, operatingSystemSize)] = 0;
     TVR_LOG(TVR_DBG, "Exiting getTargetOS_info");
     return RM_OK;
 }
+catch (...)
+{
+    return thrownStatus();
+}
 
 RM_STATUS TVR_MethodWrapper::tvrcimGetTargetMapping(const char* deviceId, const char* targetId,
                                                     std::vector<TargetLun>* luns)
+try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::tvrcimGetTargetMapping");
     if (!luns)
-        return TVR_LOG(TVR_DBG, "Invalid input pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid input pointer");
+        return RM_ERROR;
+    }
     HBA_WWN wwpn{};
     HBA_WWN target{};
     if (idToWwn(&wwpn, deviceId) != 0 || idToWwn(&target, targetId) != 0)
@@ -191,8 +269,8 @@ RM_STATUS TVR_MethodWrapper::tvrcimGetTargetMapping(const char* deviceId, const 
                                                    [&](RM_LunList* out) { return LRM_GetLunList(wwpn, target, out); });
     if (status != RM_OK)
         return logged(status);
-    luns->clear();
-    luns->reserve(list.size());
+    std::vector<TargetLun> described;
+    described.reserve(list.size());
     for (const RM_Lun& lun : list)
     {
         const auto answer = sendScsi<inquirySize>(
@@ -202,27 +280,42 @@ RM_STATUS TVR_MethodWrapper::tvrcimGetTargetMapping(const char* deviceId, const 
                                        senseSize);
             });
         logged(answer.status);
-        luns->push_back({lun, answer.status == RM_OK ? decodeInquiry(answer.response) : StandardInquiry{}});
+        described.push_back({lun, answer.status == RM_OK ? decodeInquiry(answer.response) : StandardInquiry{}});
     }
+    *luns = std::move(described);
     return RM_OK;
+}
+catch (...)
+{
+    return thrownStatus();
 }
 
 RM_STATUS TVR_MethodWrapper::ListVPorts(const char* deviceId, std::vector<RM_VPortEntry>* vports)
+try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::ListVPorts");
     if (!vports)
-        return TVR_LOG(TVR_DBG, "Invalid input pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid input pointer");
+        return RM_ERROR;
+    }
     HBA_WWN wwpn{};
     if (const int failed = idToWwn(&wwpn, deviceId))
         return failed;
-    const RM_STATUS status = fetchList<RM_VPortList>(*vports, "ListVPorts: Unable to allocate buffer",
-                                                     [&](RM_VPortList* list) { return LRM_VPList(wwpn, list); });
+    std::vector<RM_VPortEntry> list;
+    const RM_STATUS status = fetchList<RM_VPortList>(list, "ListVPorts: Unable to allocate buffer",
+                                                     [&](RM_VPortList* out) { return LRM_VPList(wwpn, out); });
     if (status != RM_OK)
         return logged(status);
-    for (const RM_VPortEntry& vport : *vports)
+    for (const RM_VPortEntry& vport : list)
         TVR_LOG(TVR_DBG, "VPort WWPN: %s, VPort WWNN: %s", hbaNameToString(vport.wwpn).c_str(),
                 hbaNameToString(vport.wwnn).c_str());
+    *vports = std::move(list);
     return status;
+}
+catch (...)
+{
+    return thrownStatus();
 }
 
 RM_STATUS TVR_MethodWrapper::ListVPortAttributes(const char* deviceId, const char* vportId,
@@ -230,7 +323,10 @@ RM_STATUS TVR_MethodWrapper::ListVPortAttributes(const char* deviceId, const cha
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::ListVPortAttributes");
     if (!attributes)
-        return TVR_LOG(TVR_DBG, "Invalid input vp attributes pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid input vp attributes pointer");
+        return RM_ERROR;
+    }
     VPortPath path;
     if (const int failed = path.convert(deviceId, vportId))
         return failed;
@@ -245,35 +341,49 @@ RM_STATUS TVR_MethodWrapper::ListVPortAttributes(const char* deviceId, const cha
 
 RM_STATUS TVR_MethodWrapper::ListVPortTargets(const char* deviceId, const char* vportId,
                                               std::vector<RM_VPortTarget>* targets)
+try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::ListVPortTargets");
     if (!targets)
-        return TVR_LOG(TVR_DBG, "Invalid input pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid input pointer");
+        return RM_ERROR;
+    }
     VPortPath path;
     if (const int failed = path.convert(deviceId, vportId))
         return failed;
-    const RM_STATUS status = fetchList<RM_VPortTargetList>(*targets, "ListVPortTargets: Unable to allocate buffer",
-                                                           [&](RM_VPortTargetList* list)
-                                                           { return LRM_VPListTargets(path.wwpn, path.vport, list); });
+    std::vector<RM_VPortTarget> list;
+    const RM_STATUS status = fetchList<RM_VPortTargetList>(list, "ListVPortTargets: Unable to allocate buffer",
+                                                           [&](RM_VPortTargetList* out)
+                                                           { return LRM_VPListTargets(path.wwpn, path.vport, out); });
     if (status != RM_OK)
         return logged(status);
-    TVR_LOG(TVR_DBG, "%d Targets Found on Virtual Port ", static_cast<int>(targets->size()));
-    for (const RM_VPortTarget& target : *targets)
+    TVR_LOG(TVR_DBG, "%d Targets Found on Virtual Port ", static_cast<int>(list.size()));
+    for (const RM_VPortTarget& target : list)
     {
         TVR_LOG(TVR_DBG, "SCSI Bus no: %d", target.scsiBusNumber);
         TVR_LOG(TVR_DBG, "SCSI Target no: %d", target.scsiTargetNumber);
         TVR_LOG(TVR_DBG, "Target WWPN: %s, Target WWNN: %s", hbaNameToString(target.wwpn).c_str(),
                 hbaNameToString(target.wwnn).c_str());
     }
+    *targets = std::move(list);
     return status;
+}
+catch (...)
+{
+    return thrownStatus();
 }
 
 RM_STATUS TVR_MethodWrapper::ListVPortLuns(const char* deviceId, const char* vportId, const char* targetId,
                                            std::vector<HBA_UINT64>* luns)
+try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::ListVPortLuns");
     if (!luns)
-        return TVR_LOG(TVR_DBG, "Invalid input pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid input pointer");
+        return RM_ERROR;
+    }
     VPortPath path;
     if (const int failed = path.convert(deviceId, vportId, targetId))
         return failed;
@@ -289,13 +399,21 @@ RM_STATUS TVR_MethodWrapper::ListVPortLuns(const char* deviceId, const char* vpo
     TVR_LOG(TVR_DBG, "%d LUNs Found on Virtual Port ", static_cast<int>(luns->size()));
     return RM_OK;
 }
+catch (...)
+{
+    return thrownStatus();
+}
 
 RM_STATUS TVR_MethodWrapper::VPortLunAttr(const char* deviceId, const char* vportId, const char* targetId,
                                           HBA_UINT64 lun, VPortLunAttributes* attributes)
+try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::VPortLunAttr");
     if (!attributes)
-        return TVR_LOG(TVR_DBG, "Invalid input pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid input pointer");
+        return RM_ERROR;
+    }
     VPortPath path;
     if (const int failed = path.convert(deviceId, vportId, targetId))
         return failed;
@@ -318,12 +436,19 @@ RM_STATUS TVR_MethodWrapper::VPortLunAttr(const char* deviceId, const char* vpor
     *attributes = {decodeInquiry(inquiry.response), decodeCapacity(capacity.response)};
     return RM_OK;
 }
+catch (...)
+{
+    return thrownStatus();
+}
 
 RM_STATUS TVR_MethodWrapper::ListVMfromVPort(const char* deviceId, const char* vportId, RM_VirtualMachine* machine)
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::ListVMfromVPort");
     if (!machine)
-        return TVR_LOG(TVR_DBG, "Invalid input pointer"), RM_ERROR;
+    {
+        TVR_LOG(TVR_DBG, "Invalid input pointer");
+        return RM_ERROR;
+    }
     VPortPath path;
     if (const int failed = path.convert(deviceId, vportId))
         return failed;

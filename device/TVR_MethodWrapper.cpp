@@ -5,12 +5,11 @@
 #include "foundation/Log.h"
 
 #include <cctype>
-#include <cerrno>
 #include <charconv>
 #include <cstdio>
 #include <cstring>
 #include <exception>
-#include <fcntl.h>
+#include <mutex>
 #include <unistd.h>
 
 namespace cimple
@@ -25,25 +24,34 @@ namespace
 /// opens when the first is done.
 constexpr unsigned untouched = 2;
 
-sem_t* openSemaphore(const std::string& name, unsigned value)
+/// The init semaphore of this process while an object has it. Neither is destroyed at the end of the process, when the
+/// last object may still come to close.
+constinit std::mutex sharedInitMutex;
+constinit ProcessSemaphore* sharedInit = nullptr;
+
+std::shared_ptr<ProcessSemaphore> joinInitSemaphore(const std::string& name)
 {
-    sem_t* semaphore = sem_open(name.c_str(), O_CREAT, 0644, value);
-    return semaphore == SEM_FAILED ? nullptr : semaphore;
+    const std::lock_guard lock(sharedInitMutex);
+    // After a fork the one that is known is the parent's.
+    if (sharedInit && sharedInit->isOwn())
+        return sharedInit->shared_from_this();
+    auto semaphore = std::make_shared<ProcessSemaphore>(name, untouched);
+    sharedInit = semaphore.get();
+    return semaphore;
 }
 
-void waitFor(sem_t* semaphore)
-{
-    while (sem_wait(semaphore) != 0 && errno == EINTR)
-        ;
-}
-
-void closeAndUnlink(sem_t*& semaphore, const std::string& name)
+/// The first object that leaves takes the name away: the next to come makes a new one.
+void leaveInitSemaphore(std::shared_ptr<ProcessSemaphore>& semaphore) noexcept
 {
     if (!semaphore)
         return;
-    sem_close(semaphore);
-    sem_unlink(name.c_str());
-    semaphore = nullptr;
+    {
+        const std::lock_guard lock(sharedInitMutex);
+        if (sharedInit == semaphore.get())
+            sharedInit = nullptr;
+        semaphore->removeName();
+    }
+    semaphore.reset();
 }
 
 /// Positions of an HBA name that hold a separator.
@@ -73,69 +81,73 @@ TVR_MethodWrapper::TVR_MethodWrapper()
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::Constructor");
     TVR_LOG(TVR_DBG, "Setting Up for FIFO.. ");
-    initSem = openSemaphore(initSemName, untouched);
-    if (initSem)
+    initSem = joinInitSemaphore(initSemName);
+    const int value = initSem->value();
+    initSem->wait();
+    if (value == static_cast<int>(untouched))
+        initialiseLibrary();
+    else
     {
-        int value = 0;
-        sem_getvalue(initSem, &value);
-        waitFor(initSem);
-        if (value == static_cast<int>(untouched))
-            initialiseLibrary();
-        else
-        {
-            TVR_LOG(TVR_DBG, "Waiting on Completed Semaphore.. To issue RM Calls..%s.. sem = %p", initSemName.c_str(),
-                    static_cast<void*>(initSem));
-            waitFor(initSem);
-            TVR_LOG(TVR_DBG, "Recieved signal on Completed Semaphore.. To issue RM Calls");
-        }
+        TVR_LOG(TVR_DBG, "Waiting on Completed Semaphore.. To issue RM Calls..%s.. sem = %p", initSemName.c_str(),
+                static_cast<void*>(initSem.get()));
+        initSem->wait();
+        TVR_LOG(TVR_DBG, "Recieved signal on Completed Semaphore.. To issue RM Calls");
     }
     TVR_LOG(TVR_DBG, "RM Library initialized");
 }
 
 void TVR_MethodWrapper::initialiseLibrary()
+try
 {
     TVR_LOG(TVR_DBG, "Aquired Semaphore.. Running RM_InitLib %s ", initSemName.c_str());
     initOwner = 1;
-    doneSem = openSemaphore(doneSemName, 0);
+    doneSem = std::make_unique<ProcessSemaphore>(doneSemName, 0);
     TVR_LOG(TVR_DBG, "Aquired Completed Semaphore.. Running RM_InitLib %s", doneSemName.c_str());
-    const RM_STATUS status = LRM_InitLib();
-    if (status > 0)
+    if (const RM_STATUS status = LRM_InitLib(); status > 0)
     {
         TVR_LOG(TVR_CRIT, "Error : Initialization of RMLib:: RM_InitLib failed with[%d]", status);
-        sem_post(initSem);
-        closeSemaphores();
         throw std::exception();
     }
+    resolveAbsentEntries();
     TVR_LOG(TVR_DBG, "Signalling Completed Semaphore.. Running RM_InitLib");
-    sem_post(initSem);
+    initSem->post();
     TVR_LOG(TVR_DBG, "Signaled Completed Semaphore.. Running RM_InitLib");
+}
+catch (...)
+{
+    initSem->post(); // who waits for this object goes on
+    closeSemaphores();
+    throw;
 }
 
 TVR_MethodWrapper::~TVR_MethodWrapper()
 {
-    TVR_LOG(TVR_DBG, "TVR_MethodWrapper::Destructor");
-    if (initSem)
+    if (getpid() != pid)
     {
-        int value = 0;
-        sem_post(initSem);
-        sem_getvalue(initSem, &value);
-        TVR_LOG(TVR_DBG, "Value of Sem in destructor=%d", value);
+        closeSemaphores();
+        return;
     }
+    TVR_LOG(TVR_DBG, "TVR_MethodWrapper::Destructor");
+    initSem->post();
+    TVR_LOG(TVR_DBG, "Value of Sem in destructor=%d", initSem->value());
     closeSemaphores();
     TVR_LOG(TVR_DBG, "RM Library uninitialzed");
 }
 
-void TVR_MethodWrapper::closeSemaphores()
+void TVR_MethodWrapper::closeSemaphores() noexcept
 {
-    closeAndUnlink(initSem, initSemName);
-    closeAndUnlink(doneSem, doneSemName);
+    leaveInitSemaphore(initSem);
+    doneSem.reset();
 }
 
 int TVR_MethodWrapper::Id2HBAName(char* out, const char* deviceId)
 {
     TVR_LOG(TVR_DBG, "Entering TVR_MethodWrapper::Id2HBAName");
     if (!out || !deviceId)
-        return TVR_LOG(TVR_ERR, "Null pointer argument in one of the arguments"), 1;
+    {
+        TVR_LOG(TVR_ERR, "Null pointer argument in one of the arguments");
+        return 1;
+    }
     TVR_LOG(TVR_DBG, "DeviceID is:: %s", deviceId);
     if (*deviceId == '"')
         ++deviceId;
@@ -150,10 +162,16 @@ int TVR_MethodWrapper::str2HBAName(HBA_WWN* out, const char* text)
 {
     TVR_LOG(TVR_DBG, "Entering TVR_MethodWrapper::str2HBAName");
     if (!out || !text || std::strlen(text) != hbaNameLength)
-        return TVR_LOG(TVR_ERR, "INVALID HBA Name"), 1;
+    {
+        TVR_LOG(TVR_ERR, "INVALID HBA Name");
+        return 1;
+    }
     TVR_LOG(TVR_DBG, "wwpn:( %s ) ", text);
     if (!isHBAName(text))
-        return TVR_LOG(TVR_ERR, "INVALID HBA Name"), 1;
+    {
+        TVR_LOG(TVR_ERR, "INVALID HBA Name");
+        return 1;
+    }
     HBA_UINT8* b = out->wwn;
     for (std::size_t i = 0; i < sizeof out->wwn; ++i)
         std::from_chars(text + 3 * i, text + 3 * i + 2, b[i], 16);
@@ -171,9 +189,15 @@ int TVR_MethodWrapper::idToWwn(HBA_WWN* out, const char* deviceId)
 {
     char name[hbaNameLength + 1];
     if (Id2HBAName(name, deviceId) != 0)
-        return TVR_LOG(TVR_ERR, "Id2HBAName failed"), 1;
+    {
+        TVR_LOG(TVR_ERR, "Id2HBAName failed");
+        return 1;
+    }
     if (str2HBAName(out, name) != 0)
-        return TVR_LOG(TVR_ERR, "str2HBAName failed"), 1;
+    {
+        TVR_LOG(TVR_ERR, "str2HBAName failed");
+        return 1;
+    }
     return 0;
 }
 
@@ -205,7 +229,8 @@ int TVR_MethodWrapper::Validatewwpn(const HBA_WWN& wwpn)
     TVR_LOG(TVR_DBG, "RM_IsLocalHBA: status=%d", status);
     if (status == RM_OK && isLocal)
         return 0;
-    return TVR_LOG(TVR_ERR, "HBA IS NOT LOCAL"), 1;
+    TVR_LOG(TVR_ERR, "HBA IS NOT LOCAL");
+    return 1;
 }
 
 bool TVR_MethodWrapper::IsKestorCNA(const HBA_WWN& wwpn)

@@ -1,11 +1,12 @@
 // The one class through which the rest of the program uses the RM library.
 #pragma once
 
+#include "device/ProcessSemaphore.h"
 #include "device/RmApi.h"
 #include "device/ScsiCommand.h"
 
 #include <atomic>
-#include <semaphore.h>
+#include <memory>
 #include <string>
 #include <sys/types.h>
 #include <vector>
@@ -35,8 +36,9 @@ class TVR_MethodWrapper
 {
 public:
     /// Initialises the RM library once in the process; a second object waits until that is done. Throws
-    /// std::exception if the library refuses.
+    /// std::exception if the library refuses, and what the library throws.
     TVR_MethodWrapper();
+    /// In a child of a fork it lets go of the parent's object without a word.
     ~TVR_MethodWrapper();
     TVR_MethodWrapper(const TVR_MethodWrapper&) = delete;
     TVR_MethodWrapper& operator=(const TVR_MethodWrapper&) = delete;
@@ -93,13 +95,13 @@ public:
 
 private:
     void initialiseLibrary();
-    void closeSemaphores();
+    void closeSemaphores() noexcept;
 
     const pid_t pid;
     const std::string initSemName;
     const std::string doneSemName;
-    sem_t* initSem = nullptr;
-    sem_t* doneSem = nullptr; ///< a mark that this object ran the initialisation; nothing waits on it
+    std::shared_ptr<ProcessSemaphore> initSem; ///< one for all objects of the process
+    std::unique_ptr<ProcessSemaphore> doneSem; ///< a mark that this object ran the initialisation; nothing waits on it
 };
 
 } // namespace cimple

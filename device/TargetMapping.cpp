@@ -38,7 +38,10 @@ HBA_STATUS TargetMapping::fetch(const HbaAdapter& adapter)
         TVR_LOG(TVR_DBG, "To retry the HBA_GetFcpTargetMapping command");
         TVR_LOG(TVR_DBG, "Deleting the allocated memory");
         if (!allocate())
-            return TVR_LOG(TVR_CRIT, "Could not allocate memory..break "), status;
+        {
+            TVR_LOG(TVR_CRIT, "Could not allocate memory..break ");
+            return status;
+        }
         status = HBA_GetFcpTargetMapping(adapter.handle(), _mapping.get());
         if (status == HBA_STATUS_OK)
         {
@@ -58,7 +61,8 @@ HBA_STATUS TargetMapping::fetch(const HbaAdapter& adapter)
         else
         {
             _mapping.reset();
-            return TVR_LOG(TVR_ERR, "Error hbaStatus=%d", status), status;
+            TVR_LOG(TVR_ERR, "Error hbaStatus=%d", status);
+            return status;
         }
     }
     TVR_LOG(TVR_DBG, "Successful target info fetched");

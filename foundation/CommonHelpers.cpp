@@ -118,7 +118,10 @@ int stringToWwn(std::uint8_t (&out)[8], const String& text)
 {
     const std::string_view digits = text.view();
     if (digits.size() != 16 || !std::all_of(digits.begin(), digits.end(), isHexDigit))
-        return TVR_LOG(TVR_ERR, "INVALID WWN"), 1;
+    {
+        TVR_LOG(TVR_ERR, "INVALID WWN");
+        return 1;
+    }
     for (std::size_t i = 0; i < 8; ++i)
         out[i] = static_cast<std::uint8_t>(hexValue(digits[2 * i]) << 4 | hexValue(digits[2 * i + 1]));
     return 0;

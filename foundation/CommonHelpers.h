@@ -6,7 +6,7 @@
 
 #include "foundation/FirmwareVersion.h"
 #include "foundation/HostInformation.h"
-#include "runtime/String.h"
+#include "runtime/values/String.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -1,7 +1,7 @@
 // The kernel driver's lines of the system log, as the driver log shows them.
 #pragma once
 
-#include "runtime/String.h"
+#include "runtime/values/String.h"
 
 #include <cstddef>
 #include <vector>

@@ -1,20 +1,16 @@
-// Opening the files that the program reads and writes.
+// Opening, reading and replacing the files of the program. Only regular files are touched: a pipe, a device or a socket
+// in the place of one is a failure and cannot block.
 #pragma once
 
+#include "runtime/base/RegularFile.h"
+
 #include <cstddef>
-#include <cstdio>
-#include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 
 namespace cimple
 {
-
-struct CloseFile
-{
-    void operator()(std::FILE* file) const { std::fclose(file); }
-};
-using File = std::unique_ptr<std::FILE, CloseFile>;
 
 enum class WriteMode
 {
@@ -22,11 +18,30 @@ enum class WriteMode
     Append,   ///< as "a+"
 };
 
-/// Opens for writing, creating the file with 0644; null with errno on failure. In a folder that anybody may write to,
-/// a symbolic link is refused. A pipe without a reader is an error and never blocks.
-File openForWriting(const char* path, WriteMode mode);
+/// Opens for writing, creating the file with 0644; none with errno on failure. In a folder that anybody may write to,
+/// a symbolic link is refused.
+File_Descriptor openForWriting(const char* path, WriteMode mode);
 
-/// The first `limit` bytes of a file; nothing, with errno, if it does not open. What opens but cannot be read is empty.
+/// The first `limit` bytes of a file; nothing, with errno, if it does not open or cannot be read.
 std::optional<std::string> readTextFile(const char* path, std::size_t limit);
+
+enum class Replacement
+{
+    Unchanged,  ///< the file has this text
+    Done,       ///< the file was replaced or made
+    NotOpened,  ///< there is no way to the file
+    NotWritten, ///< the text did not reach the disk
+};
+constexpr bool failed(Replacement replacement)
+{
+    return replacement == Replacement::NotOpened || replacement == Replacement::NotWritten;
+}
+
+/// Gives a file a new text in one step: readers and whoever comes after a crash find the old text or the new one,
+/// whole. The text is written to a temporary file beside it, which takes the file's place once it is on the disk. On a
+/// failure, told in errno, the file is as before and nothing is left beside it. The file keeps its permissions but for
+/// others' write bits; a new one has 0644. A symbolic link stays and the file behind it is replaced, where nobody but
+/// root could have led it there; other links are refused.
+Replacement replaceFile(const char* path, std::string_view text) noexcept;
 
 } // namespace cimple

@@ -39,7 +39,8 @@ std::uint16_t digit(char c)
 
 int fail()
 {
-    return TVR_LOG(TVR_DBG, "parseVersion Error: Invalid Firmware String"), invalidVersion;
+    TVR_LOG(TVR_DBG, "parseVersion Error: Invalid Firmware String");
+    return invalidVersion;
 }
 
 int parse(std::string_view text, FirmwareVersion& out)
@@ -72,7 +73,10 @@ int parse(std::string_view text, FirmwareVersion& out)
 int parseVersion(const char* text, FirmwareVersion& out)
 {
     if (!text)
-        return TVR_LOG(TVR_DBG, "parseVersion Error: Input FirmwareVersion is Null"), invalidVersion;
+    {
+        TVR_LOG(TVR_DBG, "parseVersion Error: Input FirmwareVersion is Null");
+        return invalidVersion;
+    }
     TVR_LOG(TVR_DBG, "Input Version String: [%s]", text);
     try
     {
@@ -80,7 +84,8 @@ int parseVersion(const char* text, FirmwareVersion& out)
     }
     catch (...)
     {
-        return TVR_LOG(TVR_ERR, "parseVersion: error occurred while parsing..."), invalidVersion;
+        TVR_LOG(TVR_ERR, "parseVersion: error occurred while parsing...");
+        return invalidVersion;
     }
 }
 

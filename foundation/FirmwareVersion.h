@@ -1,7 +1,7 @@
 // Version texts of firmware, such as "1.11a5", and of other software, such as "12.4.243.20".
 #pragma once
 
-#include "runtime/String.h"
+#include "runtime/values/String.h"
 
 #include <cstdint>
 

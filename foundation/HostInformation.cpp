@@ -1,13 +1,13 @@
 #include "foundation/HostInformation.h"
 
+#include "foundation/File.h"
 #include "foundation/FilePaths.h"
 #include "foundation/Log.h"
 
 #include <sys/statvfs.h>
 
 #include <atomic>
-#include <exception>
-#include <fstream>
+#include <new>
 #include <string>
 
 namespace cimple
@@ -40,9 +40,28 @@ bool IsReadOnlyFS()
 void setStatvfs(Statvfs function)
 {
     askFileSystem = function ? function : statvfs;
+    forgetRootFileSystem();
+}
+
+void forgetRootFileSystem()
+{
     isChecked = false;
     isReadOnly = false;
 }
+
+namespace
+{
+
+constexpr std::size_t lineBuffer = 256;
+constexpr std::size_t maximumBanner = 64 * 1024; // what clients get as a property
+
+/// The text up to its first NUL.
+String textOf(const std::string& content)
+{
+    return content.c_str();
+}
+
+} // namespace
 
 int getOSInformation(String& osName, String& osDistribution)
 {
@@ -51,29 +70,27 @@ int getOSInformation(String& osName, String& osDistribution)
     osDistribution = "Unknown";
 
     TVR_LOG(TVR_DBG, "Under _LINUX -- getting the os name and version");
-    std::ifstream version(filePath(FilePath::KernelVersion));
+    const auto version = readTextFile(filePath(FilePath::KernelVersion).c_str(), lineBuffer - 1);
     if (!version)
         return 1;
-    char line[256];
-    version.getline(line, sizeof line);
-    osName = line;
+    osName = textOf(version->substr(0, version->find('\n')));
 
     TVR_LOG(TVR_DBG, "Under _LINUX -- Getting the OS Distribution Name");
-    std::ifstream issue(filePath(FilePath::OsDistribution), std::ios::ate);
-    if (!issue)
-        return TVR_LOG(TVR_ERR, "Unable to open the /etc/issue file to get OSDistribution Name"), 1;
-    std::string banner;
     try
     {
-        banner.resize(static_cast<std::size_t>(issue.tellg()));
+        const auto banner = readTextFile(filePath(FilePath::OsDistribution).c_str(), maximumBanner);
+        if (!banner)
+        {
+            TVR_LOG(TVR_ERR, "Unable to open the /etc/issue file to get OSDistribution Name");
+            return 1;
+        }
+        osDistribution = textOf(*banner);
     }
-    catch (const std::exception&)
+    catch (const std::bad_alloc&)
     {
-        return TVR_LOG(TVR_ERR, "Unable to allocate the memory to store OSDistributionName"), 1;
+        TVR_LOG(TVR_ERR, "Unable to allocate the memory to store OSDistributionName");
+        return 1;
     }
-    issue.seekg(0);
-    issue.read(banner.data(), static_cast<std::streamsize>(banner.size()));
-    osDistribution = banner.c_str();
     return 0;
 }
 

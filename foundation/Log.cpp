@@ -1,48 +1,20 @@
 #include "foundation/Log.h"
 
+#include "foundation/HostInformation.h"
 #include "foundation/TVR_FileLogger.h"
 #include "foundation/TVR_SysLogger.h"
+#include "runtime/base/Immortal.h"
+#include "runtime/log/LogLine.h"
 
-#include <algorithm>
 #include <cerrno>
 #include <cstdarg>
-#include <cstdio>
-#include <memory>
+#include <utility>
 
 namespace cimple
 {
 
 namespace
 {
-
-/// A formatted message of any length; short ones need no memory. One that finds no memory is cut.
-class Message
-{
-public:
-    Message(const char* format, va_list args)
-    {
-        va_list again;
-        va_copy(again, args);
-        const int size = std::vsnprintf(_short, sizeof _short, format, args);
-        if (size < 0)
-            _short[0] = '\0';
-        else if (static_cast<std::size_t>(size) >= sizeof _short)
-            formatLong(static_cast<std::size_t>(size), format, again);
-        va_end(again);
-    }
-    const char* text() const { return _long ? _long.get() : _short; }
-
-private:
-    void formatLong(std::size_t size, const char* format, va_list args)
-    {
-        _long.reset(new (std::nothrow) char[size + 1]);
-        if (_long)
-            std::vsnprintf(_long.get(), size + 1, format, args);
-    }
-
-    char _short[1024];
-    std::unique_ptr<char[]> _long;
-};
 
 /// Set while the thread is inside the sinks.
 thread_local bool dispatching = false;
@@ -60,27 +32,26 @@ public:
 
 TVR_Logger& TVR_Logger::instance()
 {
-    // Never destroyed, since code logs to the last; nothing is left on the heap when the library is unmapped.
-    union Storage
-    {
-        TVR_Logger logger;
-        Storage() : logger() {}
-        ~Storage() {}
-    };
-    static Storage storage;
-    return storage.logger;
+    static Immortal<TVR_Logger> logger; // code logs to the last
+    return *logger;
+}
+
+bool TVR_Logger::wants(int level) const
+{
+    const unsigned taken = isForSystemLog() ? TVR_SysLogger::levels : _taken.load();
+    return (taken & levelBit(level)) != 0;
 }
 
 void TVR_Logger::log(const char* file, const unsigned* line, int level, const char* format, ...)
 {
-    if (dispatching)
+    if (dispatching || !wants(level))
         return;
     const int error = errno;
     va_list args;
     va_start(args, format);
-    const Message message(format, args);
+    const Log_Message message(format, args);
     va_end(args);
-    if (_enabled == 0 && _sysLogger.load())
+    if (isForSystemLog())
     {
         TVR_SysLogger::write(level, message.text());
     }
@@ -88,35 +59,58 @@ void TVR_Logger::log(const char* file, const unsigned* line, int level, const ch
     {
         Auto_Mutex lock(_mutex);
         const Dispatching mark;
-        for (TVR_LoggerInterface* sink : _sinks)
+        for (TVR_LoggerInterface* sink = _sinks; sink; sink = sink->_next)
             sink->logMessage(level, file, *line, message.text());
     }
     errno = error;
 }
 
+TVR_LoggerInterface** TVR_Logger::findSink(TVR_LoggerInterface* sink)
+{
+    TVR_LoggerInterface** link = &_sinks;
+    while (*link && *link != sink)
+        link = &(*link)->_next;
+    return link;
+}
+
 bool TVR_Logger::addSink(TVR_LoggerInterface* sink)
 {
     Auto_Mutex lock(_mutex);
-    if (std::find(_sinks.begin(), _sinks.end(), sink) != _sinks.end())
+    TVR_LoggerInterface** const link = findSink(sink);
+    if (*link)
         return false;
-    _sinks.push_back(sink);
+    *link = sink;
     if (auto* sysLogger = dynamic_cast<TVR_SysLogger*>(sink))
         _sysLogger = sysLogger;
+    askSinks();
     return true;
 }
 
 bool TVR_Logger::removeSink(TVR_LoggerInterface* sink)
 {
     Auto_Mutex lock(_mutex);
-    const auto found = std::find(_sinks.begin(), _sinks.end(), sink);
-    if (found == _sinks.end())
+    TVR_LoggerInterface** const link = findSink(sink);
+    if (!*link)
         return false;
     if (dynamic_cast<TVR_SysLogger*>(sink) == _sysLogger)
         _sysLogger = nullptr;
-    _sinks.erase(found);
-    if (_sinks.empty())
-        _sinks.shrink_to_fit();
+    *link = std::exchange(sink->_next, nullptr);
+    askSinks();
     return true;
+}
+
+void TVR_Logger::sinkChanged()
+{
+    Auto_Mutex lock(_mutex);
+    askSinks();
+}
+
+void TVR_Logger::askSinks()
+{
+    unsigned taken = 0;
+    for (const TVR_LoggerInterface* sink = _sinks; sink; sink = sink->_next)
+        taken |= sink->takes();
+    _taken = taken;
 }
 
 void TVR_Logger::setMode(int mode)
@@ -124,8 +118,9 @@ void TVR_Logger::setMode(int mode)
     Auto_Mutex lock(_mutex);
     const Dispatching mark;
     _mode = mode;
-    for (TVR_LoggerInterface* sink : _sinks)
+    for (TVR_LoggerInterface* sink = _sinks; sink; sink = sink->_next)
         mode != 0 ? sink->start() : sink->stop();
+    askSinks();
 }
 
 void TVR_Logger::setLevel(int level)
@@ -138,13 +133,24 @@ void TVR_Logger::clearAll()
 {
     Auto_Mutex lock(_mutex);
     const Dispatching mark;
-    for (TVR_LoggerInterface* sink : _sinks)
+    for (TVR_LoggerInterface* sink = _sinks; sink; sink = sink->_next)
         sink->clearLog();
+    askSinks();
+}
+
+void TVR_Logger::finish()
+{
+    setMode(0);
+    _level = 0;
+    _enabled = 0;
+    _ffdcMode = false;
+    _dataPathResolved = false;
+    _dataFile = FilePath::LogData;
 }
 
 TVR_FileLogger* TVR_Logger::fileSink() const
 {
-    for (TVR_LoggerInterface* sink : _sinks)
+    for (TVR_LoggerInterface* sink = _sinks; sink; sink = sink->_next)
         if (auto* fileLogger = dynamic_cast<TVR_FileLogger*>(sink))
             return fileLogger;
     return nullptr;
@@ -167,6 +173,12 @@ int startLogging(TVR_FileLogger& fileSink)
     if (status != 0)
         TVR_LOG(TVR_ERR, "validateAndSetPath() failed");
     return status;
+}
+
+void finishLogging()
+{
+    TVR_Logger::instance().finish();
+    forgetRootFileSystem();
 }
 
 } // namespace cimple

@@ -9,6 +9,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
 
 namespace cimple
@@ -78,7 +79,7 @@ void logFault(const LogData& data, const char* path)
 LogData parseLogData(std::string_view text)
 {
     LogData data;
-    LineReader lines(text);
+    Line_Reader lines(text);
     data.fault = parseParameters(lines.next(logDataFirstLine).value_or(""), data);
     if (data.fault != LogDataFault::None || !modeWritesFile(data.mode))
         return data;
@@ -130,22 +131,37 @@ void TVR_Logger::readDataFile()
     {
         Auto_Mutex lock(_mutex);
         TVR_FileLogger* sink = fileSink();
-        if (sink && sink->validateAndSetPath(data.path.c_str(), _ffdcMode) != 0)
+        if (sink && sink->setPath(data.path.c_str(), _ffdcMode) != 0)
             return;
     }
     setLevel(data.level);
     setMode(data.mode);
 }
 
-void TVR_Logger::writeDataFile()
+std::string TVR_Logger::dataText()
 {
-    const File file = openForWriting(dataPath().c_str(), WriteMode::Truncate);
-    if (!file)
-        return TVR_LOG(TVR_ERR, "Unable to open dump file\n");
-    std::fprintf(file.get(), "%d,%d,%d\n", getMode(), getLevel(), isEnabled() ? 1 : 0);
+    char parameters[64];
+    std::snprintf(parameters, sizeof parameters, "%d,%d,%d\n", getMode(), getLevel(), isEnabled() ? 1 : 0);
+    std::string text = parameters;
     Auto_Mutex lock(_mutex);
     if (const TVR_FileLogger* sink = fileSink())
-        std::fputs(sink->getPath().c_str(), file.get());
+        text += sink->getPath().c_str();
+    return text;
+}
+
+void TVR_Logger::writeDataFile()
+{
+    const std::string path = dataPath();
+    switch (replaceFile(path.c_str(), dataText()))
+    {
+    case Replacement::NotOpened:
+        return TVR_LOG(TVR_ERR, "Unable to open dump file\n");
+    case Replacement::NotWritten:
+        return TVR_LOG(TVR_ERR, "Unable to write dump file - %s: %s", path.c_str(), std::strerror(errno));
+    case Replacement::Unchanged:
+    case Replacement::Done:
+        return;
+    }
 }
 
 } // namespace cimple

@@ -1,6 +1,11 @@
 #include "foundation/TVR_CIMLogger.h"
 
+#include "runtime/base/Time.h"
+
+#include <algorithm>
 #include <cstdio>
+#include <iterator>
+#include <new>
 
 namespace cimple
 {
@@ -34,28 +39,57 @@ TVR_CIMLogger::~TVR_CIMLogger()
 
 std::vector<TVR_CIMLogEntry> TVR_CIMLogger::entries() const
 {
-    Auto_Mutex lock(_mutex);
-    return _entries;
+    std::vector<Record> records;
+    {
+        Auto_Mutex lock(_mutex);
+        records = _records;
+    }
+    std::vector<TVR_CIMLogEntry> entries;
+    entries.reserve(records.size());
+    for (const Record& record : records)
+    {
+        TVR_CIMLogEntry& entry = entries.emplace_back();
+        entry.level = record.level;
+        entry.timestamp.set(record.usec, record.utc, record.isTimestamp);
+        std::copy(std::begin(record.text), std::end(record.text), entry.text);
+    }
+    return entries;
+}
+
+unsigned TVR_CIMLogger::takes() const
+{
+    return modeWritesRing(TVR_Logger::instance().getMode()) ? levelsUpTo(TVR_ERR) : 0;
 }
 
 void TVR_CIMLogger::logMessage(int level, const char*, unsigned, const char* message)
 {
-    if (!message || level > TVR_ERR || !modeWritesRing(TVR_Logger::instance().getMode()))
+    if (!message || (takes() & levelBit(level)) == 0)
         return;
-    TVR_CIMLogEntry entry{level, Datetime::now(), {}};
-    formatText(entry.text, message);
+    Record record{level, 0, 0, false, {}};
+    record.isTimestamp = time_source().now(record.usec, record.utc);
+    formatText(record.text, message);
     Auto_Mutex lock(_mutex);
-    const std::int32_t index = nextIndex();
-    if (_entries.size() < static_cast<std::size_t>(capacity))
-        _entries.push_back(entry);
-    else
-        _entries[static_cast<std::size_t>(index)] = entry;
+    if (_records.size() == static_cast<std::size_t>(capacity))
+        _records[static_cast<std::size_t>(nextIndex())] = record;
+    else if (append(record))
+        nextIndex();
+}
+
+bool TVR_CIMLogger::append(const Record& record)
+try
+{
+    _records.push_back(record);
+    return true;
+}
+catch (const std::bad_alloc&)
+{
+    return false;
 }
 
 void TVR_CIMLogger::clearLog()
 {
     Auto_Mutex lock(_mutex);
-    _entries.clear();
+    _records.clear();
     _lastIndex = -1;
 }
 

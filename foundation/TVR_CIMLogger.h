@@ -2,7 +2,7 @@
 #pragma once
 
 #include "foundation/Log.h"
-#include "runtime/Datetime.h"
+#include "runtime/values/Datetime.h"
 
 #include <cstdint>
 #include <vector>
@@ -18,7 +18,7 @@ struct TVR_CIMLogEntry
 };
 
 /// A ring of the newest critical messages, warnings and errors; works in modes 1 and 4. Registered with the logger
-/// from construction to destruction.
+/// from construction to destruction. A message that finds no memory is dropped.
 class TVR_CIMLogger final : public TVR_LoggerInterface
 {
 public:
@@ -34,14 +34,26 @@ public:
     void start() override {}
     void stop() override {}
     void clearLog() override;
+    unsigned takes() const override;
 
 private:
-    /// Place of the next record; the mutex is held.
-    std::int32_t nextIndex();
+    /// An entry as long as it is not asked for: without a value that would need memory of its own.
+    struct Record
+    {
+        std::int32_t level;
+        std::uint64_t usec;
+        std::int32_t utc;
+        bool isTimestamp;
+        char text[sizeof TVR_CIMLogEntry::text];
+    };
+
+    // The mutex is held.
+    bool append(const Record& record); ///< false if there is no memory
+    std::int32_t nextIndex();          ///< place of the next record
 
     mutable Mutex _mutex; ///< taken after the logger's
     std::int32_t _lastIndex = -1;
-    std::vector<TVR_CIMLogEntry> _entries;
+    std::vector<Record> _records;
 };
 
 } // namespace cimple

@@ -1,6 +1,7 @@
 #include "foundation/TVR_FileLogger.h"
 
-#include "runtime/Datetime.h"
+#include "runtime/log/LogLine.h"
+#include "runtime/values/Datetime.h"
 
 #include <pthread.h>
 #include <sys/stat.h>
@@ -43,9 +44,16 @@ TVR_FileLogger::~TVR_FileLogger()
 
 int TVR_FileLogger::validateAndSetPath(const char* path, bool errorsOnly)
 {
+    const int status = setPath(path, errorsOnly);
+    TVR_Logger::instance().sinkChanged();
+    return status;
+}
+
+int TVR_FileLogger::setPath(const char* path, bool errorsOnly)
+{
     if (!path || !isWritableOrAbsent(path))
         return -1;
-    File file = openForWriting(path, WriteMode::Append);
+    File_Descriptor file = openForWriting(path, WriteMode::Append);
     if (!file)
         return -1;
     Auto_Mutex lock(_mutex);
@@ -61,19 +69,33 @@ String TVR_FileLogger::getPath() const
     return _path;
 }
 
+unsigned TVR_FileLogger::takes() const
+{
+    Auto_Mutex lock(_mutex);
+    return levels();
+}
+
+unsigned TVR_FileLogger::levels() const
+{
+    if (!_file || !modeWritesFile(TVR_Logger::instance().getMode()))
+        return 0;
+    return _errorsOnly ? levelBit(TVR_CRIT) | levelBit(TVR_ERR) : levelsUpTo(TVR_DBG);
+}
+
 void TVR_FileLogger::logMessage(int level, const char* file, unsigned line, const char* message)
 {
-    if (!modeWritesFile(TVR_Logger::instance().getMode()))
-        return;
     Auto_Mutex lock(_mutex);
-    if (!_file || level > TVR_DBG)
+    if ((levels() & levelBit(level)) == 0)
         return;
-    if (_errorsOnly && level != TVR_CRIT && level != TVR_ERR)
-        return;
+    char time[Datetime::text_room];
+    Datetime::pretty_now(time);
+    Log_Line text(_file.get());
     // The letter after %u is text: readers of the log know it so.
-    std::fprintf(_file.get(), "[threadid =%ul] [%s] [%s:%u][%s] %s\n", static_cast<unsigned>(pthread_self()),
-                 Datetime::now().pretty().c_str(), file, line, levelText(level), message);
-    std::fflush(_file.get());
+    text.appendf("[threadid =%ul] [%s] [", static_cast<unsigned>(pthread_self()), time);
+    text.append(file);
+    text.appendf(":%u][%s] ", line, levelText(level));
+    text.append_message(message);
+    text.append("\n");
 }
 
 void TVR_FileLogger::start()
@@ -89,14 +111,14 @@ void TVR_FileLogger::stop()
     Auto_Mutex lock(_mutex);
     if (!_file)
         return;
-    _file.reset();
+    _file = File_Descriptor();
     _path.clear();
 }
 
 void TVR_FileLogger::clearLog()
 {
     Auto_Mutex lock(_mutex);
-    _file.reset();
+    _file = File_Descriptor();
     if (!_path.empty())
         openForWriting(_path.c_str(), WriteMode::Truncate);
     reopen();
@@ -104,7 +126,7 @@ void TVR_FileLogger::clearLog()
 
 void TVR_FileLogger::reopen()
 {
-    _file.reset();
+    _file = File_Descriptor();
     if (!_path.empty())
         _file = openForWriting(_path.c_str(), WriteMode::Append);
 }

@@ -3,7 +3,7 @@
 
 #include "foundation/File.h"
 #include "foundation/Log.h"
-#include "runtime/String.h"
+#include "runtime/values/String.h"
 
 namespace cimple
 {
@@ -25,13 +25,20 @@ public:
     void start() override;
     void stop() override;
     void clearLog() override;
+    unsigned takes() const override;
 
 private:
-    void reopen(); ///< the mutex is held
+    friend class TVR_Logger;
+
+    /// validateAndSetPath() under the logger's mutex.
+    int setPath(const char* path, bool errorsOnly);
+    // The mutex is held.
+    void reopen();
+    unsigned levels() const;
 
     mutable Mutex _mutex; ///< taken after the logger's
     String _path;
-    File _file;
+    File_Descriptor _file;
     bool _errorsOnly = false;
 };
 

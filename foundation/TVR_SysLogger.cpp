@@ -1,6 +1,7 @@
 #include "foundation/TVR_SysLogger.h"
 
 #include <syslog.h>
+#include <unistd.h>
 
 #include <cstdio>
 #include <cstring>
@@ -19,8 +20,8 @@ bool startsWith(const char* text, const char* start, std::size_t size)
     return std::strncmp(text, start, size) == 0;
 }
 
-/// The C library keeps the identity by its address, so it has to forget it before this library is unmapped, even when
-/// the sink is still there by then.
+/// Of the process to the system log; closed at the end of the process, too, where the sink is still there by then. A
+/// forked child leaves it to its parent.
 class Connection
 {
 public:
@@ -28,16 +29,16 @@ public:
     void open()
     {
         openlog("[TVR][CIM][FC]", LOG_NDELAY | LOG_NOWAIT, LOG_USER);
-        _isOpen = true;
+        _opener = getpid();
     }
     void close()
     {
-        if (_isOpen.exchange(false))
+        if (_opener.exchange(0) == getpid())
             closelog();
     }
 
 private:
-    std::atomic<bool> _isOpen{false};
+    std::atomic<pid_t> _opener{0};
 };
 
 Connection connection;
@@ -58,7 +59,7 @@ TVR_SysLogger::~TVR_SysLogger()
 
 void TVR_SysLogger::write(int level, const char* message)
 {
-    if (level > TVR_INVALID)
+    if ((levels & levelBit(level)) == 0)
         return;
     char buffer[2048];
     std::snprintf(buffer, sizeof buffer, "[%s]\n", message);

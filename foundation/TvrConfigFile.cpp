@@ -5,10 +5,14 @@
 #include "foundation/Text.h"
 
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <cerrno>
 #include <cstdio>
+#include <cstring>
 #include <iterator>
+#include <new>
+#include <utility>
 
 namespace cimple
 {
@@ -66,7 +70,7 @@ const char* flagText(bool flag)
 void parseSettings(std::string_view text, CacheSettings& settings)
 {
     bool isRead[std::size(keys)] = {};
-    LineReader lines(text);
+    Line_Reader lines(text);
     for (std::size_t count = 0; count < maximumLines; ++count)
     {
         const auto next = lines.next(lineBuffer);
@@ -103,53 +107,65 @@ void TvrConfigFile::load(const char* path)
     if (!path)
         return;
     _path = path;
+    _loader = getpid();
     struct stat status;
     errno = 0;
     stat(path, &status);
-    if (errno == ENOENT)
-        return;
-    const auto text = readTextFile(path, maximumLines * lineBuffer);
+    const bool isMissing = errno == ENOENT;
+    const auto text = isMissing ? std::optional(std::string()) : readTextFile(path, maximumLines * lineBuffer);
     if (!text)
         return TVR_LOG(TVR_ERR, "Unable to open provider config setting file - %s", path);
     Auto_Mutex lock(_mutex);
     parseSettings(*text, _settings);
+    _isPending = true;
 }
 
-void TvrConfigFile::save() const
+std::optional<CacheSettings> TvrConfigFile::takePending()
 {
-    const File file = openForWriting(_path.c_str(), WriteMode::Truncate);
-    if (!file)
-        return;
     Auto_Mutex lock(_mutex);
-    std::fputs(formatSettings(_settings).c_str(), file.get());
+    return std::exchange(_isPending, false) ? std::optional(_settings) : std::nullopt;
+}
+
+void TvrConfigFile::save() noexcept
+{
+    if (_loader != getpid()) // in a child the mutex may be held by a thread that only its parent has
+        return;
+    const auto settings = takePending();
+    if (!settings)
+        return;
+    try
+    {
+        if (!failed(replaceFile(_path.c_str(), formatSettings(*settings))))
+            return;
+    }
+    catch (const std::bad_alloc&)
+    {
+        errno = ENOMEM;
+    }
+    TVR_LOG(TVR_ERR, "Unable to write provider config setting file - %s: %s", _path.c_str(), std::strerror(errno));
+}
+
+template <class T> int TvrConfigFile::set(T CacheSettings::*field, T value)
+{
+    Auto_Mutex lock(_mutex);
+    _settings.*field = value;
+    _isPending = true;
+    return 0;
 }
 
 int TvrConfigFile::setCacheTimeout(unsigned minutes)
 {
-    if (!isValidTimeout(minutes))
-        return -1;
-    Auto_Mutex lock(_mutex);
-    _settings.cacheTimeout = static_cast<std::int32_t>(minutes);
-    return 0;
+    return isValidTimeout(minutes) ? set(&CacheSettings::cacheTimeout, static_cast<std::int32_t>(minutes)) : -1;
 }
 
 int TvrConfigFile::setRefreshAdapterData(unsigned value)
 {
-    return setFlag(&CacheSettings::refreshAdapterData, value);
+    return value <= 1 ? set(&CacheSettings::refreshAdapterData, value == 1) : -1;
 }
 
 int TvrConfigFile::setRefreshSANData(unsigned value)
 {
-    return setFlag(&CacheSettings::refreshSANData, value);
-}
-
-int TvrConfigFile::setFlag(bool CacheSettings::*flag, unsigned value)
-{
-    if (value > 1)
-        return -1;
-    Auto_Mutex lock(_mutex);
-    _settings.*flag = value == 1;
-    return 0;
+    return value <= 1 ? set(&CacheSettings::refreshSANData, value == 1) : -1;
 }
 
 template <class T> T TvrConfigFile::get(T CacheSettings::*field) const

@@ -1,9 +1,13 @@
 // The settings of the instance cache and their file.
 #pragma once
 
-#include "runtime/Thread.h"
+#include "runtime/threads/Thread.h"
 
+#include <sys/types.h>
+
+#include <atomic>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -27,7 +31,7 @@ class TvrConfigFile
 {
 public:
     TvrConfigFile() = default;
-    /// Writes the file.
+    /// Saves.
     ~TvrConfigFile() { save(); }
     TvrConfigFile(const TvrConfigFile&) = delete;
     TvrConfigFile& operator=(const TvrConfigFile&) = delete;
@@ -35,8 +39,10 @@ public:
     /// Reads the file and remembers its path; null does nothing. A file that is missing or cannot be read leaves the
     /// settings as they are.
     void load(const char* path);
-    /// Writes the file of load(); silent when there is none or it cannot be opened.
-    void save() const;
+    /// Writes what was loaded or set and not saved yet to the file of load(), where it is missing or has another text.
+    /// On a failure the log says so, and the file stays as it is. A file that load() could not read is left alone
+    /// unless a setting was changed; a child that was forked after load() writes nothing.
+    void save() noexcept;
 
     // The setters return 0, or non-zero with nothing changed: the timeout takes 1 to 30, the flags 0 and 1.
     int setCacheTimeout(unsigned minutes);
@@ -48,12 +54,15 @@ public:
     bool getRefreshSANData() const;
 
 private:
-    int setFlag(bool CacheSettings::*flag, unsigned value);
+    std::optional<CacheSettings> takePending();
+    template <class T> int set(T CacheSettings::*field, T value);
     template <class T> T get(T CacheSettings::*field) const;
 
     CacheSettings _settings;
+    bool _isPending = false; ///< something was loaded or set since save()
     std::string _path;
-    mutable Mutex _mutex; ///< guards _settings
+    std::atomic<pid_t> _loader{0}; ///< the process of load()
+    mutable Mutex _mutex;          ///< guards _settings and _isPending
 };
 
 } // namespace cimple

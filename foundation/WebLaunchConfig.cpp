@@ -27,7 +27,7 @@ std::string_view withoutLineEnd(std::string_view line)
 
 String parseWebLaunchUrl(std::string_view text)
 {
-    LineReader lines(text);
+    Line_Reader lines(text);
     while (const auto next = lines.next(lineBuffer))
     {
         const std::string_view line = withoutLineEnd(*next);

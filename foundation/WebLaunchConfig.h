@@ -1,7 +1,7 @@
 // The URL of the management page that the instance model publishes as a remote access point.
 #pragma once
 
-#include "runtime/String.h"
+#include "runtime/values/String.h"
 
 #include <string_view>
 
