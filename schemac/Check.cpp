@@ -60,9 +60,7 @@ public:
             resolve_members(c);
             check_class(c);
             for (const Feature& feature : c.features)
-            {
                 check_feature(c, feature);
-            }
         }
         return std::move(_refusals);
     }
@@ -75,13 +73,9 @@ private:
     void resolve_superclass(Class& c)
     {
         if (_schema.find_class(c.name) != &c)
-        {
             refuse(c.place, "class " + in_quotes(c.name) + " is declared twice");
-        }
         if (c.superclass_name.empty())
-        {
             return;
-        }
         const Class* superclass = _schema.find_class(c.superclass_name);
         if (!superclass)
         {
@@ -107,9 +101,7 @@ private:
             if (member == c.members.end())
             {
                 if (find(feature.qualifiers, "Override"))
-                {
                     refuse(feature.place, in_quotes(feature.name) + " overrides nothing");
-                }
                 c.members.push_back({&feature, &c});
             }
             else if (member->declared_by == &c)
@@ -123,10 +115,8 @@ private:
             }
         }
         for (std::size_t i = 0; i < c.members.size(); ++i)
-        {
             if (is_set(c.members[i].feature->qualifiers, "Key"))
                 c.keys.push_back(i);
-        }
     }
 
     void check_override(const Class& c, const Feature& feature, const Feature& base)
@@ -134,13 +124,9 @@ private:
         const std::string what = in_quotes(feature.name);
         const std::string* overridden = text_of(feature.qualifiers, "Override");
         if (!overridden)
-        {
             refuse(feature.place, what + " stands in a superclass of " + in_quotes(c.name) + " and has no Override");
-        }
         else if (*overridden != feature.name || base.name != feature.name)
-        {
             refuse(feature.place, what + " must override " + in_quotes(base.name) + ", in this spelling");
-        }
         if (feature.kind != base.kind || feature.embedded != base.embedded)
         {
             refuse(feature.place, what + " changes its kind from " + kind_name(base) + " to " + kind_name(feature));
@@ -155,9 +141,7 @@ private:
                                       " with a class that does not derive from it");
         }
         if (is_set(base.qualifiers, "Key") && !is_set(feature.qualifiers, "Key"))
-        {
             refuse(feature.place, what + " overrides a key and does not repeat Key");
-        }
     }
 
     /// True if the first class is the second or derives from it, or if one is unknown, which is refused apart.
@@ -168,17 +152,11 @@ private:
         const Class* c = _schema.find_class(name);
         const Class* base = _schema.find_class(base_name);
         if (!c || !base)
-        {
             return true;
-        }
         for (std::size_t steps = 0; c && steps <= _schema.classes.size();
              c = _schema.find_class(c->superclass_name), steps++)
-        {
             if (c == base)
-            {
                 return true;
-            }
-        }
         return false;
     }
 
@@ -187,25 +165,15 @@ private:
     void check_class(const Class& c)
     {
         for (const char* qualifier : {"Association", "Aggregation"})
-        {
             check_kind_is_repeated(c, qualifier);
-        }
         const bool association = is_set(c.qualifiers, "Association");
         if (association && c.superclass && !is_set(c.superclass->qualifiers, "Association"))
-        {
             refuse(c.place, "association " + in_quotes(c.name) + " derives from a class that is none");
-        }
         for (const char* qualifier : {"Aggregation", "Composition"})
-        {
             if (is_set(c.qualifiers, qualifier) && !association)
-            {
                 refuse(c.place, in_quotes(c.name) + " has " + qualifier + " and is no association");
-            }
-        }
         if (association && count_references(c) < 2)
-        {
             refuse(c.place, "association " + in_quotes(c.name) + " has fewer than two references");
-        }
         check_new_keys(c);
     }
 
@@ -213,9 +181,7 @@ private:
     void check_kind_is_repeated(const Class& c, const char* qualifier)
     {
         if (c.superclass && is_set(c.superclass->qualifiers, qualifier) && !is_set(c.qualifiers, qualifier))
-        {
             refuse(c.place, in_quotes(c.name) + " does not repeat " + qualifier + " of its superclass");
-        }
     }
 
     static std::size_t count_references(const Class& c)
@@ -231,9 +197,7 @@ private:
     void check_new_keys(const Class& c)
     {
         if (c.superclass && !c.superclass->keys.empty() && c.keys.size() > c.superclass->keys.size())
-        {
             refuse(c.place, "class " + in_quotes(c.name) + " adds keys to those of its superclass");
-        }
     }
 
     // --- features ---
@@ -249,9 +213,7 @@ private:
         case FeatureKind::Reference:
             check_reference(feature);
             if (feature.embedded == Embedded::No)
-            {
                 check_association_end(c, feature);
-            }
             break;
         case FeatureKind::Method:
             check_method(feature);
@@ -263,9 +225,7 @@ private:
     void check_name(const Feature& feature)
     {
         if (is_reserved(feature.name))
-        {
             refuse(feature.place, in_quotes(feature.name) + " is a reserved name");
-        }
     }
 
     void check_property(const Feature& feature)
@@ -290,26 +250,18 @@ private:
                           std::all_of(value.items.begin(), value.items.end(),
                                       [&](const Literal& item) { return !cpp_value(type, item).empty(); });
         if (!fits)
-        {
             refuse(feature.place, "the default of " + in_quotes(feature.name) + " is no value of its type");
-        }
     }
 
     void check_reference(const Feature& feature)
     {
         const std::string what = std::string(kind_name(feature)) + " " + in_quotes(feature.name);
         if (feature.embedded != Embedded::No && !same_name(feature.type, "string"))
-        {
             refuse(feature.place, what + " is not declared as a string");
-        }
         if (feature.embedded != Embedded::Object && !is_known(feature.class_name))
-        {
             refuse(feature.place, what + " is of the unknown class " + in_quotes(feature.class_name));
-        }
         if (feature.default_value)
-        {
             refuse(feature.place, what + " has a default");
-        }
     }
 
     /// The generated code uses the name as it is written.
@@ -322,31 +274,21 @@ private:
     void check_association_end(const Class& c, const Feature& feature)
     {
         if (!is_set(c.qualifiers, "Association"))
-        {
             refuse(feature.place, "reference " + in_quotes(feature.name) + " in a class without Association");
-        }
         if (feature.subscript != 0)
-        {
             refuse(feature.place, "reference " + in_quotes(feature.name) + " is an array");
-        }
         if (is_set(feature.qualifiers, "Aggregate") && !is_set(c.qualifiers, "Aggregation"))
-        {
             refuse(feature.place, "aggregate " + in_quotes(feature.name) + " in a class without Aggregation");
-        }
     }
 
     /// A key must compare and print exactly: no lists, no embedded instances, no reals.
     void check_key(const Feature& feature)
     {
         if (!is_set(feature.qualifiers, "Key"))
-        {
             return;
-        }
         const TypeRow* type = find_type(feature.type);
         if (feature.subscript != 0 || feature.embedded != Embedded::No || (type && type->type_class == TypeClass::Real))
-        {
             refuse(feature.place, "key " + in_quotes(feature.name) + " is of a type that cannot be a key");
-        }
     }
 
     // --- methods ---
@@ -359,13 +301,9 @@ private:
                    "method " + in_quotes(method.name) + " returns the unsupported type " + in_quotes(method.type));
         }
         if (text_of(method.qualifiers, "EmbeddedInstance") || is_set(method.qualifiers, "EmbeddedObject"))
-        {
             refuse(method.place, "method " + in_quotes(method.name) + " returns an embedded instance");
-        }
         for (const Feature& parameter : method.parameters)
-        {
             check_parameter(method, parameter);
-        }
     }
 
     void check_parameter(const Feature& method, const Feature& parameter)
@@ -373,26 +311,16 @@ private:
         const auto first = std::find_if(method.parameters.begin(), method.parameters.end(),
                                         [&](const Feature& x) { return same_name(x.name, parameter.name); });
         if (&*first != &parameter)
-        {
             refuse(parameter.place, "parameter " + in_quotes(parameter.name) + " is declared twice");
-        }
         if (same_name(parameter.name, "return_value"))
-        {
             refuse(parameter.place, "\"return_value\" is a reserved name");
-        }
         check_name(parameter);
         if (parameter_flags(parameter).find("META_IN") == std::string::npos && !is_set(parameter.qualifiers, "Out"))
-        {
             refuse(parameter.place, "parameter " + in_quotes(parameter.name) + " is neither In nor Out");
-        }
         if (parameter.kind == FeatureKind::Property)
-        {
             check_property(parameter);
-        }
         else
-        {
             check_reference(parameter);
-        }
     }
 
     Schema& _schema;

@@ -17,16 +17,12 @@ public:
     std::vector<std::string> run()
     {
         for (const QualifierDeclaration& declaration : _schema.qualifiers)
-        {
             check_declaration(declaration);
-        }
         for (const Class& c : _schema.classes)
         {
             check_uses(c.qualifiers, class_scopes(c));
             for (const Feature& feature : c.features)
-            {
                 check_feature(feature);
-            }
         }
         return std::move(_refusals);
     }
@@ -37,9 +33,7 @@ private:
     void check_declaration(const QualifierDeclaration& declaration)
     {
         if (_schema.find_qualifier(declaration.name) != &declaration)
-        {
             refuse(declaration.place, "qualifier \"" + declaration.name + "\" is declared twice");
-        }
         if (!find_type(declaration.type))
         {
             refuse(declaration.place,
@@ -55,9 +49,7 @@ private:
     static std::vector<std::string> class_scopes(const Class& c)
     {
         if (is_set(c.qualifiers, "Association"))
-        {
             return {"association"};
-        }
         return is_set(c.qualifiers, "Indication") ? std::vector<std::string>{"class", "indication"}
                                                   : std::vector<std::string>{"class"};
     }
@@ -75,9 +67,7 @@ private:
         case FeatureKind::Method:
             check_uses(feature.qualifiers, {"method"});
             for (const Feature& parameter : feature.parameters)
-            {
                 check_uses(parameter.qualifiers, {"parameter"});
-            }
         }
     }
 
@@ -93,13 +83,9 @@ private:
                 continue;
             }
             if (find(uses, use.name) != &use)
-            {
                 refuse(use.place, what + " stands there twice");
-            }
             if (!allowed(*declaration, scopes))
-            {
                 refuse(use.place, what + " is not allowed on a " + scopes.back());
-            }
             check_use(*declaration, use);
         }
     }
@@ -118,13 +104,9 @@ private:
     void check_use(const QualifierDeclaration& declaration, const Qualifier& use)
     {
         if (use.value)
-        {
             check_value(declaration, *use.value, use.place);
-        }
         else if (!same_name(declaration.type, "boolean") || declaration.is_array)
-        {
             refuse(use.place, "qualifier \"" + use.name + "\" needs a value");
-        }
     }
 
     void check_value(const QualifierDeclaration& declaration, const Value& value, const Place& place)

@@ -43,9 +43,7 @@ bool is_set(const Qualifiers& qualifiers, std::string_view name)
 {
     const Qualifier* qualifier = find(qualifiers, name);
     if (!qualifier || !qualifier->value)
-    {
         return qualifier;
-    }
     const std::vector<Literal>& items = qualifier->value->items;
     return !items.empty() && items.front().kind != Literal::Kind::Null && items.front().text != "false";
 }
@@ -54,9 +52,7 @@ const std::string* text_of(const Qualifiers& qualifiers, std::string_view name)
 {
     const Qualifier* qualifier = find(qualifiers, name);
     if (!qualifier || !qualifier->value || qualifier->value->items.size() != 1)
-    {
         return nullptr;
-    }
     const Literal& literal = qualifier->value->items.front();
     return literal.kind == Literal::Kind::String ? &literal.text : nullptr;
 }
@@ -64,12 +60,8 @@ const std::string* text_of(const Qualifiers& qualifiers, std::string_view name)
 bool is_or_derives_from(const Class* descendant, const Class* ancestor)
 {
     for (; descendant; descendant = descendant->superclass)
-    {
         if (descendant == ancestor)
-        {
             return true;
-        }
-    }
     return false;
 }
 

@@ -46,9 +46,7 @@ std::string braced(const Value& value, const std::string& indent)
 {
     std::vector<std::string> items;
     for (const Literal& item : value.items)
-    {
         items.push_back(mof_of(item));
-    }
     return "{ " + listed(items, indent) + " }";
 }
 
@@ -60,9 +58,7 @@ std::string mof_of(const Value& value, const std::string& indent)
 std::string mof_of(const Qualifier& qualifier, const std::string& indent)
 {
     if (!qualifier.value)
-    {
         return qualifier.name;
-    }
     const std::string value = mof_of(*qualifier.value, indent + "   ");
     return qualifier.name + (qualifier.value->is_array ? " " + value : " ( " + value + " )");
 }
@@ -72,18 +68,14 @@ std::string mof_of(const Qualifiers& qualifiers, const std::string& indent)
 {
     std::vector<std::string> items;
     for (const Qualifier& qualifier : qualifiers)
-    {
         items.push_back(mof_of(qualifier, indent));
-    }
     return items.empty() ? "" : indent + "[" + listed(items, indent + " ") + "]\n";
 }
 
 std::string subscript_of(const Feature& feature)
 {
     if (feature.subscript == 0)
-    {
         return "";
-    }
     return feature.subscript < 0 ? "[]" : "[" + std::to_string(feature.subscript) + "]";
 }
 
@@ -101,15 +93,11 @@ std::string mof_of(const Feature& feature)
     {
         text += "(";
         for (std::size_t i = 0; i < feature.parameters.size(); i++)
-        {
             text += (i == 0 ? "\n" : ",\n") + declaration(feature.parameters[i], "      ");
-        }
         text += ")";
     }
     if (feature.default_value)
-    {
         text += " = " + mof_of(*feature.default_value, "      ");
-    }
     return text + ";\n";
 }
 
@@ -119,14 +107,10 @@ std::string mof_of(const QualifierDeclaration& declaration)
 {
     std::string text = "Qualifier " + declaration.name + " : " + declaration.type + (declaration.is_array ? "[]" : "");
     if (declaration.default_value)
-    {
         text += " = " + mof_of(*declaration.default_value, "   ");
-    }
     text += ",\n    Scope(" + listed(declaration.scopes, "    ") + ")";
     if (!declaration.flavors.empty())
-    {
         text += ",\n    Flavor(" + listed(declaration.flavors, "    ") + ")";
-    }
     return text + ";\n";
 }
 
@@ -135,9 +119,7 @@ std::string mof_of(const Class& c)
     std::string text = mof_of(c.qualifiers, "") + "class " + c.name +
                        (c.superclass_name.empty() ? "" : " : " + c.superclass_name) + " {\n";
     for (const Feature& feature : c.features)
-    {
         text += mof_of(feature);
-    }
     return text + "};\n";
 }
 

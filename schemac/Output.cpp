@@ -24,17 +24,13 @@ void save(const OutputFiles& files, const std::filesystem::path& folder)
     {
         const std::filesystem::path path = folder / file.name;
         if (holds_already(path, file.text))
-        {
             continue;
-        }
         std::filesystem::create_directories(path.parent_path());
         std::ofstream out(path, std::ios::binary);
         out << file.text;
         out.close();
         if (!out)
-        {
             throw std::runtime_error("cannot write " + path.string());
-        }
     }
 }
 

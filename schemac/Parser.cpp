@@ -22,16 +22,10 @@ public:
     void file()
     {
         while (_token.kind != Token::Kind::End)
-        {
             if (at_word("Qualifier"))
-            {
                 _schema.qualifiers.push_back(qualifier_declaration());
-            }
             else
-            {
                 _schema.classes.push_back(class_declaration());
-            }
-        }
     }
 
 private:
@@ -54,44 +48,34 @@ private:
     {
         const bool there = at_mark(mark);
         if (there)
-        {
             advance();
-        }
         return there;
     }
 
     void expect(char mark)
     {
         if (!accept(mark))
-        {
             refuse_expected(std::string("\"") + mark + "\"");
-        }
     }
 
     bool accept_word(const char* word)
     {
         const bool there = at_word(word);
         if (there)
-        {
             advance();
-        }
         return there;
     }
 
     void expect_word(const char* word)
     {
         if (!accept_word(word))
-        {
             refuse_expected(std::string("\"") + word + "\"");
-        }
     }
 
     std::string name(const char* what)
     {
         if (_token.kind != Token::Kind::Name)
-        {
             refuse_expected(what);
-        }
         std::string text = std::move(_token.text);
         advance();
         return text;
@@ -114,13 +98,9 @@ private:
             return string_literal();
         default:
             if (at_word("true") || at_word("false"))
-            {
                 result = {Literal::Kind::Boolean, at_word("true") ? "true" : "false"};
-            }
             else if (!at_word("null"))
-            {
                 refuse_expected("a value");
-            }
         }
         advance();
         return result;
@@ -215,9 +195,7 @@ private:
             result.is_array = true;
         }
         if (accept('='))
-        {
             result.default_value = value();
-        }
         expect(',');
         expect_word("Scope");
         result.scopes = names_in_parentheses();
@@ -240,14 +218,10 @@ private:
         expect_word("class");
         result.name = name("the name of a class");
         if (accept(':'))
-        {
             result.superclass_name = name("the name of a superclass");
-        }
         expect('{');
         while (!accept('}'))
-        {
             result.features.push_back(feature());
-        }
         expect(';');
         return result;
     }
@@ -263,9 +237,7 @@ private:
         {
             result.subscript = subscript();
             if (accept('='))
-            {
                 result.default_value = value();
-            }
             classify(result);
         }
         expect(';');
@@ -295,14 +267,10 @@ private:
     void make_method(Feature& method)
     {
         if (method.kind == FeatureKind::Reference)
-        {
             throw SyntaxError(method.place, "method \"" + method.name + "\" returns a reference");
-        }
         method.kind = FeatureKind::Method;
         if (accept(')'))
-        {
             return;
-        }
         do
         {
             Feature parameter = typed_name();
@@ -316,18 +284,14 @@ private:
     int subscript()
     {
         if (!accept('['))
-        {
             return 0;
-        }
         int size = -1;
         if (_token.kind == Token::Kind::Integer)
         {
             const char* end = _token.text.data() + _token.text.size();
             const auto parsed = std::from_chars(_token.text.data(), end, size);
             if (parsed.ec != std::errc() || parsed.ptr != end || size < 1 || size > max_subscript)
-            {
                 refuse_expected("the size of an array");
-            }
             advance();
         }
         expect(']');
@@ -348,9 +312,7 @@ private:
             feature.embedded = Embedded::Object;
         }
         if (feature.embedded != Embedded::No)
-        {
             feature.kind = FeatureKind::Reference;
-        }
     }
 
     Lexer _lexer;

@@ -33,9 +33,7 @@ void collect_targets(const std::vector<Feature>& features, std::set<std::string>
     for (const Feature& feature : features)
     {
         if (feature.kind == FeatureKind::Reference && feature.subscript == 0 && feature.embedded != Embedded::Object)
-        {
             targets.insert(feature.class_name);
-        }
         collect_targets(feature.parameters, targets);
     }
 }
@@ -50,22 +48,16 @@ std::string class_record(const Class& c)
 {
     std::string slots;
     for (const Feature& feature : c.features)
-    {
         if (feature.kind != FeatureKind::Method && !find(feature.qualifiers, "Override"))
-        {
             slots += slot(feature);
-        }
-    }
     return record(c.name, c.superclass ? c.superclass->name : "Instance", slots, "Meta_Class static_meta_class");
 }
 
 std::string method_record(const Class& c, const Feature& method)
 {
-    std::string slots;
+    std::string slots = "    using Class = " + c.name + ";\n";
     for (const Feature& parameter : method.parameters)
-    {
         slots += slot(parameter);
-    }
     slots += slot(return_value_of(method));
     return "\n" + record(method_record_name(c, method), "Instance", slots, "Meta_Method static_meta_method");
 }
@@ -73,23 +65,17 @@ std::string method_record(const Class& c, const Feature& method)
 OutputFile class_header(const Class& c)
 {
     std::string text = banner(c.place.file) + "#pragma once\n\n#include \"" +
-                       (c.superclass ? header_name(*c.superclass) : "runtime/Instance.h") +
+                       (c.superclass ? header_name(*c.superclass) : "runtime/meta/Instance.h") +
                        "\"\n\nnamespace cimple\n{\n\n";
     std::set<std::string> targets;
     collect_targets(c.features, targets);
     targets.erase(c.name);
     for (const std::string& target : targets)
-    {
         text += "class " + target + ";\n";
-    }
     text += (targets.empty() ? "" : "\n") + class_record(c);
     for (const Feature& feature : c.features)
-    {
         if (feature.kind == FeatureKind::Method)
-        {
             text += method_record(c, feature);
-        }
-    }
     return {header_name(c), text + "\n} // namespace cimple\n"};
 }
 
@@ -103,9 +89,7 @@ OutputFiles write_records(const Schema& schema)
     {
         files.push_back(class_header(c));
         if (is_served(c))
-        {
             all += "#include \"" + header_name(c) + "\"\n";
-        }
     }
     files.push_back({"schema/AllClasses.h", all});
     return files;

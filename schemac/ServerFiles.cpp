@@ -41,12 +41,8 @@ public:
     explicit DependencyOrder(const Schema& schema) : _schema(schema)
     {
         for (const Class& c : schema.classes)
-        {
             if (is_served(c))
-            {
                 visit(&c);
-            }
-        }
     }
 
     const std::vector<const Class*>& classes() const { return _order; }
@@ -55,9 +51,7 @@ private:
     void visit(const Class* c)
     {
         if (!c || !_seen.insert(c).second)
-        {
             return;
-        }
         visit(c->superclass);
         visit_targets(c->features);
         _order.push_back(c);
@@ -68,9 +62,7 @@ private:
         for (const Feature& feature : features)
         {
             if (!feature.class_name.empty())
-            {
                 visit(_schema.find_class(feature.class_name));
-            }
             visit_targets(feature.parameters);
         }
     }
@@ -84,9 +76,7 @@ OutputFile qualifier_file(const Schema& schema)
 {
     std::string text = banner("the schema");
     for (const QualifierDeclaration& declaration : schema.qualifiers)
-    {
         text += "\n" + mof_of(declaration);
-    }
     return {"qualifiers.mof", text};
 }
 
@@ -94,12 +84,8 @@ OutputFile class_file(const std::string& name, const DependencyOrder& order, boo
 {
     std::string text = banner("the schema");
     for (const Class* c : order.classes())
-    {
         if (is_served(*c) == served)
-        {
             text += "\n" + mof_of(*c);
-        }
-    }
     return {name, text};
 }
 

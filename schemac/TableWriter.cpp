@@ -55,9 +55,7 @@ std::string offset_of(const std::string& record, const std::string& slot)
 std::string layout_check(const std::string& record, const Feature& feature)
 {
     if (feature.kind == FeatureKind::Reference && feature.subscript == 0)
-    {
         return "static_assert(sizeof(" + record + "::" + feature.name + ") == sizeof(void*));\n";
-    }
     const std::string width = feature.subscript == 0 ? width_of(*find_type(feature.type)) : "sizeof(void*)";
     return "static_assert(" + offset_of(record, feature.name + ".null") + " == " + offset_of(record, feature.name) +
            " + " + width + ");\n";
@@ -68,17 +66,13 @@ std::string default_value(const std::string& name, const Feature& feature, std::
 {
     const std::optional<Value>& value = feature.default_value;
     if (!value)
-    {
         return "nullptr";
-    }
     const TypeRow& type = *find_type(feature.type);
     const bool is_text = type.type_class == TypeClass::Text || type.type_class == TypeClass::Datetime;
     const std::string cpp = is_text ? "const char* const " : std::string("const ") + type.cpp + " ";
     std::vector<std::string> items;
     for (const Literal& item : value->items)
-    {
         items.push_back(cpp_value(type, item));
-    }
     if (!value->is_array)
     {
         text += "static constinit " + cpp + name + "_default = " + items.front() + ";\n";
@@ -86,9 +80,7 @@ std::string default_value(const std::string& name, const Feature& feature, std::
     }
     const bool empty = items.empty();
     if (!empty)
-    {
         text += "static constinit " + cpp + name + "_default_items[] = " + braced(items, 8) + ";\n";
-    }
     text += "static constinit const Array_Default " + name + "_default = {" +
             (empty ? "nullptr" : name + "_default_items") + ", " + std::to_string(items.size()) + "};\n";
     return "&" + name + "_default";
@@ -182,9 +174,7 @@ std::string tables_of(const Class& c)
         }
         features += feature_record("", record_name(c, feature), c.name, feature, feature_flags(feature));
         if (!find(feature.qualifiers, "Override"))
-        {
             features += layout_check(c.name, feature);
-        }
     }
     return "// --- " + c.name + " ---\n\n" +
            (features.empty() ? "" : "namespace features\n{\n" + features + "} // namespace features\n\n") + methods +
@@ -194,8 +184,8 @@ std::string tables_of(const Class& c)
 /// Declarations of the records of properties and references, which tables of subclasses share.
 OutputFile feature_declarations(const Schema& schema)
 {
-    std::string text =
-        banner("the schema") + "#pragma once\n\n#include \"runtime/Meta.h\"\n" + "\nnamespace cimple::features\n{\n\n";
+    std::string text = banner("the schema") + "#pragma once\n\n#include \"runtime/meta/Meta.h\"\n" +
+                       "\nnamespace cimple::features\n{\n\n";
     for (const Class& c : schema.classes)
     {
         for (const Feature& feature : c.features)
@@ -216,9 +206,7 @@ void collect_headers(const Schema& schema, const std::vector<Feature>& features,
     for (const Feature& feature : features)
     {
         if (feature.kind == FeatureKind::Reference && feature.embedded != Embedded::Object)
-        {
             headers.insert(header_name(*schema.find_class(feature.class_name)));
-        }
         collect_headers(schema, feature.parameters, headers);
     }
 }
@@ -236,9 +224,7 @@ OutputFile chunk(const Schema& schema, std::size_t number, std::size_t begin, st
     }
     std::string text = banner("the schema");
     for (const std::string& header : headers)
-    {
         text += "#include \"" + header + "\"\n";
-    }
     text +=
         "\n#include <cstddef>\n\n"
         "// Records have a base class and are therefore no standard-layout types; their layout is nevertheless fixed.\n"
@@ -249,7 +235,7 @@ OutputFile chunk(const Schema& schema, std::size_t number, std::size_t begin, st
 OutputFiles repository(const Schema& schema)
 {
     const std::string header =
-        banner("the schema") + "#pragma once\n\n#include \"runtime/Meta.h\"\n" + namespace_begin +
+        banner("the schema") + "#pragma once\n\n#include \"runtime/meta/Meta.h\"\n" + namespace_begin +
         "/// All classes, in the order of the schema sources: a class stands after its superclass.\n"
         "extern const Meta_Repository the_repository;\n" +
         namespace_end;
@@ -274,9 +260,7 @@ OutputFiles write_tables(const Schema& schema, std::size_t chunks)
     files.push_back(feature_declarations(schema));
     const std::size_t count = schema.classes.size();
     for (std::size_t i = 0; i < chunks; i++)
-    {
         files.push_back(chunk(schema, i, count * i / chunks, count * (i + 1) / chunks));
-    }
     return files;
 }
 

@@ -69,12 +69,8 @@ constexpr FlagRow flag_rows[] = {
 std::string joined(std::string flags, const Qualifiers& qualifiers)
 {
     for (const FlagRow& row : flag_rows)
-    {
         if (is_set(qualifiers, row.qualifier))
-        {
             flags += (flags.empty() ? "" : " | ") + std::string(row.flag);
-        }
-    }
     return flags;
 }
 
@@ -108,9 +104,7 @@ std::optional<Integer> parse_integer(std::string_view text)
 {
     Integer result{text.starts_with('-'), 0};
     if (text.starts_with('-') || text.starts_with('+'))
-    {
         text.remove_prefix(1);
-    }
     int base = 10;
     if (text.starts_with("0x") || text.starts_with("0X"))
     {
@@ -123,9 +117,7 @@ std::optional<Integer> parse_integer(std::string_view text)
     }
     const auto parsed = std::from_chars(text.data(), text.data() + text.size(), result.magnitude, base);
     if (parsed.ec != std::errc() || parsed.ptr != text.data() + text.size())
-    {
         return std::nullopt;
-    }
     return result;
 }
 
@@ -133,20 +125,14 @@ std::string cpp_integer(const TypeRow& type, const Literal& literal)
 {
     const auto value = literal.kind == Literal::Kind::Integer ? parse_integer(literal.text) : std::nullopt;
     if (!value)
-    {
         return "";
-    }
     const bool is_signed = type.type_class == TypeClass::Signed;
     const std::uint64_t half = std::uint64_t(1) << (type.bits - 1);
     const std::uint64_t largest = is_signed ? half - 1 : half - 1 + half;
     if (!value->negative)
-    {
         return value->magnitude <= largest ? std::to_string(value->magnitude) + (is_signed ? "" : "u") : "";
-    }
     if (!is_signed || value->magnitude > half)
-    {
         return "";
-    }
     // The smallest number has no literal of its own: its magnitude does not fit.
     return value->magnitude == 0 ? "0" : "-" + std::to_string(value->magnitude - 1) + " - 1";
 }
@@ -165,16 +151,10 @@ std::string cpp_real(const TypeRow& type, const Literal& literal)
 bool is_datetime(std::string_view text)
 {
     if (text.size() != 25 || text[14] != '.' || std::string_view("+-:").find(text[21]) == std::string_view::npos)
-    {
         return false;
-    }
     for (std::size_t i = 0; i < text.size(); i++)
-    {
         if (i != 14 && i != 21 && !std::isdigit(static_cast<unsigned char>(text[i])))
-        {
             return false;
-        }
-    }
     return text[21] != ':' || text.substr(22) == "000";
 }
 
@@ -201,9 +181,7 @@ std::string as_string_literal(std::string_view text)
     {
         const std::size_t which = special.find(c);
         if (which != std::string_view::npos)
-        {
             result += '\\';
-        }
         result += which != std::string_view::npos ? letters[which] : c;
     }
     return result + '"';
@@ -237,9 +215,7 @@ std::string feature_flags(const Feature& feature)
 {
     std::string flags = kind_flag(feature.kind);
     if (feature.kind == FeatureKind::Property && holds(feature.qualifiers, "Read"))
-    {
         flags += " | META_READ";
-    }
     return joined(flags, feature.qualifiers);
 }
 
@@ -247,9 +223,7 @@ std::string parameter_flags(const Feature& parameter)
 {
     std::string flags = kind_flag(parameter.kind);
     if (holds(parameter.qualifiers, "In"))
-    {
         flags += " | META_IN";
-    }
     return joined(flags, parameter.qualifiers);
 }
 

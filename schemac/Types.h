@@ -25,7 +25,7 @@ enum class TypeClass
 struct TypeRow
 {
     const char* name; ///< in MOF
-    const char* code; ///< enumerator in runtime/Meta.h
+    const char* code; ///< enumerator in runtime/meta/Meta.h
     const char* cpp;  ///< type of the value in a slot
     TypeClass type_class;
     unsigned bits; ///< of a number
@@ -44,7 +44,7 @@ std::string cpp_value(const TypeRow& type, const Literal& literal);
 /// Text as a C++ (and MOF) string literal.
 std::string as_string_literal(std::string_view text);
 
-/// Flags of a record as an expression of the enumerators in runtime/Meta.h.
+/// Flags of a record as an expression of the enumerators in runtime/meta/Meta.h.
 std::string class_flags(const Class& c);
 std::string feature_flags(const Feature& feature);
 std::string parameter_flags(const Feature& parameter);

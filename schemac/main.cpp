@@ -22,9 +22,7 @@ void read_source(const std::string& path, schemac::Schema& schema)
 {
     std::ifstream in(path, std::ios::binary);
     if (!in)
-    {
         throw std::runtime_error("cannot read " + path);
-    }
     schemac::parse(std::string(std::istreambuf_iterator<char>(in), {}), path, schema);
 }
 
@@ -32,14 +30,10 @@ void read_source(const std::string& path, schemac::Schema& schema)
 bool read_schema(const std::vector<std::string>& paths, schemac::Schema& schema)
 {
     for (const std::string& path : paths)
-    {
         read_source(path, schema);
-    }
     const std::vector<std::string> refusals = schemac::check(schema);
     for (const std::string& refusal : refusals)
-    {
         std::cerr << refusal << '\n';
-    }
     return refusals.empty();
 }
 
@@ -69,13 +63,9 @@ int run(const std::vector<std::string>& arguments)
     }
     schemac::Schema schema;
     if (!read_schema({arguments.begin() + num_options, arguments.end()}, schema))
-    {
         return 1;
-    }
     if (writes)
-    {
         write(schema, mode, arguments[1], arguments[2]);
-    }
     return 0;
 }
 

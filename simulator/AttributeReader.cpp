@@ -8,7 +8,7 @@ namespace
 
 Attribute attributeOf(const AttributeRow& row, const JsonNode& value)
 {
-    if (value.value().is_null())
+    if (value.isNull())
         return {row.id, AttributeForm::absent, {}};
     switch (row.form)
     {

@@ -1,5 +1,7 @@
 #include "simulator/JsonNode.h"
 
+#include <nlohmann/json.hpp>
+
 #include <algorithm>
 #include <charconv>
 
@@ -49,6 +51,11 @@ void JsonNode::fail(const std::string& expected) const
 void JsonNode::failWith(const std::string& message) const
 {
     throw ScenarioError(_file + ": " + (_path.empty() ? "/" : _path) + ": " + message);
+}
+
+bool JsonNode::isNull() const
+{
+    return _value.is_null();
 }
 
 std::uint64_t JsonNode::asNumber(std::uint64_t maximum) const

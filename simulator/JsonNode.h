@@ -3,7 +3,7 @@
 
 #include "simulator/Wwn.h"
 
-#include <nlohmann/json.hpp>
+#include <nlohmann/json_fwd.hpp>
 
 #include <concepts>
 #include <cstdint>
@@ -11,6 +11,7 @@
 #include <span>
 #include <stdexcept>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace tvrsim
@@ -37,7 +38,6 @@ class JsonNode
 public:
     JsonNode(const nlohmann::json& value, std::string path, const std::string& file);
 
-    const nlohmann::json& value() const { return _value; }
     const std::string& path() const { return _path; }
 
     /// Throws ScenarioError for this place.
@@ -47,6 +47,7 @@ public:
 
     // The value itself.
 
+    bool isNull() const;
     std::uint64_t asNumber(std::uint64_t maximum) const; ///< a number, or its text such as "0x1F"
     bool asFlag() const;
     std::string asText(std::size_t maximum) const;

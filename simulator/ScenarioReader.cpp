@@ -3,6 +3,8 @@
 #include "simulator/Generator.h"
 #include "simulator/ScenarioParts.h"
 
+#include <nlohmann/json.hpp>
+
 #include <fstream>
 #include <iterator>
 #include <set>
