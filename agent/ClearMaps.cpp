@@ -1,10 +1,7 @@
-// Emptying the maps of the two groups that the refresh rebuilds.
+// Emptying the maps that the refresh rebuilds: those of the adapters, and those of the SAN.
 #include "agent/ClassCatalog.h"
-#include "agent/ModelStages.h"
+#include "agent/LogText.h"
 #include "agent/ProviderAgent.h"
-#include "foundation/Log.h"
-
-#include <cstring>
 
 namespace cimple
 {
@@ -12,30 +9,24 @@ namespace cimple
 namespace
 {
 
-enum class Theme
+/// A group that the adapter refresh empties, with what the log says before and after.
+struct Clearing
 {
-    RecordLog,
-    SoftwareUpdate,
-    SoftwareUpdateAssociations,
-    Other,
+    MapGroup group;
+    LogText before = {};
+    LogText after = {};
 };
 
-/// The log marks the clearing of three themes; which rows belong to them shows in their names.
-Theme themeOf(const ClassRow& row)
-{
-    if (std::strstr(row.name, "RecordLog") || std::strstr(row.name, "UseOfLog"))
-        return Theme::RecordLog;
-    if (std::strstr(row.name, "Install"))
-        return row.association ? Theme::SoftwareUpdateAssociations : Theme::SoftwareUpdate;
-    return Theme::Other;
-}
-
-void clearTheme(ProviderAgent& agent, Theme theme)
-{
-    for (const ClassRow& row : classCatalog())
-        if (row.group == MapGroup::Adapter && themeOf(row) == theme)
-            (agent.*row.map).clear();
-}
+constexpr Clearing adapterClearing[] = {
+    {MapGroup::Adapter},
+    {MapGroup::Dump},
+    {MapGroup::RecordLog, {TVR_DBG, "Clearing Record Log maps"}},
+    {MapGroup::SoftwareUpdate, {TVR_DBG, "Clearing SoftwareUpdate maps"}},
+    {MapGroup::SoftwareUpdateAssociations, {TVR_DBG, "Clearing Software Update maps"}},
+    {MapGroup::DriverLog},
+    {MapGroup::PortVirtualization},
+    {MapGroup::Diagnostics, {TVR_DBG, "Clearing TVR CDM maps"}, {TVR_DBG, "Done with Clearing CDM maps"}},
+};
 
 } // namespace
 
@@ -44,20 +35,12 @@ void ProviderAgent::clearAdapterMaps()
     TVR_LOG(TVR_DBG, "PERF: Entered clearAdapterMaps()");
     try
     {
-        m_CIM_ComputerSystem_map.clear();
-        m_CIM_Chassis_map.clear();
-        clearTheme(*this, Theme::Other);
-        TVR_LOG(TVR_DBG, "Clearing Record Log maps");
-        clearTheme(*this, Theme::RecordLog);
-        TVR_LOG(TVR_DBG, "Clearing SoftwareUpdate maps");
-        clearTheme(*this, Theme::SoftwareUpdate);
-        TVR_LOG(TVR_DBG, "Clearing Software Update maps");
-        clearTheme(*this, Theme::SoftwareUpdateAssociations);
-        modelStages.clearDriverLogMaps(*this);
-        modelStages.clearPortVirtualizationMaps(*this);
-        TVR_LOG(TVR_DBG, "Clearing TVR CDM maps");
-        modelStages.clearDiagnosticMaps(*this);
-        TVR_LOG(TVR_DBG, "Done with Clearing CDM maps");
+        for (const Clearing& row : adapterClearing)
+        {
+            row.before.log();
+            clearGroup(*this, row.group);
+            row.after.log();
+        }
     }
     catch (...)
     {
@@ -71,9 +54,7 @@ void ProviderAgent::clearSANMaps()
     TVR_LOG(TVR_DBG, "PERF: Entered clearSANMaps()");
     try
     {
-        for (const ClassRow& row : classCatalog())
-            if (row.group == MapGroup::San)
-                (this->*row.map).clear();
+        clearGroup(*this, MapGroup::San);
     }
     catch (...)
     {

@@ -1,5 +1,7 @@
 #include "agent/EnumerationForms.h"
 
+#include "agent/Reading.h"
+
 #include "foundation/Log.h"
 
 namespace cimple
@@ -7,10 +9,7 @@ namespace cimple
 
 int loadProvider()
 {
-    if (!ProviderAgent::instance()->m_bLoaded)
-        return LOAD_FAILED;
-    ProviderAgent::addRef();
-    return 0;
+    return ProviderAgent::join() ? 0 : LOAD_FAILED;
 }
 
 int unloadProvider(const char* providerName)
@@ -23,37 +22,36 @@ int unloadProvider(const char* providerName)
 namespace
 {
 
-/// Clones the cached instances into `local`; false if one was refused. The caller holds m_DataMutex.
-bool copyMap(const Instance_Map& cached, Instance_Map& local)
-{
-    for (std::size_t i = 0;; i++)
-    {
-        Ref<> copied(cached.clone_at(i));
-        if (!copied)
-            return true;
-        if (local.insert(copied.get()) == -1)
-            return TVR_LOG(TVR_CRIT, "Insert failed for %zu", i), false;
-        copied.release();
-    }
-}
-
-/// Copies a map once its stage is complete; what is then sent to the broker holds no lock.
-bool copyWhenReady(ProviderAgent& agent, const RefreshStage& stage, const Instance_Map& cached, Instance_Map& local)
+/// Copies once the stage of the map is complete.
+void copyWhenReady(ProviderAgent& agent, const RefreshStage& stage, Reading& reading)
 {
     Auto_Mutex stageLock(stage.mutex);
     stage.waitIfNotReady();
     Auto_Mutex dataLock(agent.m_DataMutex);
-    return copyMap(cached, local);
+    reading.copy(stage);
 }
 
-void deliver(const Instance_Map& local, const char* providerName, Instance_Handler handler, void* client)
+/// The same for the SAN maps. An adapter refresh may have taken them down since they were asked for, and does not build
+/// them unasked: then they are asked for again.
+void copyFabricWhenReady(ProviderAgent& agent, Reading& reading)
 {
-    local.for_each(handler, client);
-    TVR_LOG(TVR_DBG, "%s::enum_instances()", providerName);
+    const RefreshStage stage = agent.sanMaps();
+    for (;;)
+    {
+        Auto_Mutex stageLock(stage.mutex);
+        if (stage.ready || agent.m_bSANRefresh || agent.m_bSANRefreshPending)
+        {
+            stage.waitIfNotReady();
+            Auto_Mutex dataLock(agent.m_DataMutex);
+            return reading.copy(stage);
+        }
+        agent.m_bSANRefreshPending = true;
+        stageLock.unlock();
+        agent.BuildCimpleInfo();
+    }
 }
 
-bool copyAfterLiveRefresh(ProviderAgent& agent, Mutex& classMutex, LiveRefresh refresh, const Instance_Map& cached,
-                          Instance_Map& local)
+void copyAfterLiveRefresh(ProviderAgent& agent, Mutex& classMutex, LiveRefresh refresh, Reading& reading)
 {
     Auto_Mutex adapterDataLock(agent.m_AdapterDataReadyMutex);
     agent.adapterData().waitIfNotReady();
@@ -64,29 +62,32 @@ bool copyAfterLiveRefresh(ProviderAgent& agent, Mutex& classMutex, LiveRefresh r
         Auto_Mutex classLock(classMutex);
         refresh(agent);
     }
-    return copyMap(cached, local);
+    reading.copy(agent.adapterMaps());
 }
 
 } // namespace
 
-int enumeratePlain(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client)
+int enumeratePlain(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client,
+                   const Selection& selection)
 {
     try
     {
         ProviderAgent& agent = *ProviderAgent::instance();
         agent.BuildCimpleInfo();
-        Instance_Map local((agent.*map).meta_class);
-        if (copyWhenReady(agent, agent.adapterMaps(), agent.*map, local))
-            deliver(local, providerName, handler, client);
+        Reading reading(agent.*map, selection);
+        copyWhenReady(agent, agent.adapterMaps(), reading);
+        reading.deliver(providerName, handler, client);
     }
     catch (...)
     {
         TVR_LOG(TVR_ERR, "Exception in CIM Provider Enumeration - do nothing");
+        Reading::cutShort(handler, client);
     }
     return 0;
 }
 
-int enumerateSan(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client)
+int enumerateSan(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client,
+                 const Selection& selection)
 {
     try
     {
@@ -97,60 +98,40 @@ int enumerateSan(Instance_Map InstanceCache::*map, const char* providerName, Ins
                 agent.m_bSANRefreshPending = true;
         }
         agent.BuildCimpleInfo();
-        Instance_Map local((agent.*map).meta_class);
-        if (copyWhenReady(agent, agent.sanMaps(), agent.*map, local))
-            deliver(local, providerName, handler, client);
+        Reading reading(agent.*map, selection);
+        copyFabricWhenReady(agent, reading);
+        reading.deliver(providerName, handler, client);
     }
     catch (...)
     {
         TVR_LOG(TVR_ERR, "Exception in SAN CIM Provider Enumeration - do nothing");
+        Reading::cutShort(handler, client);
     }
     return 0;
 }
 
 int enumerateActive(Instance_Map InstanceCache::*map, const char* providerName, Mutex& classMutex, LiveRefresh refresh,
-                    Instance_Handler handler, void* client)
+                    Instance_Handler handler, void* client, const Selection& selection)
 {
     try
     {
         ProviderAgent& agent = *ProviderAgent::instance();
         if (!agent.m_bLoaded)
-            return TVR_LOG(TVR_DBG, "RM Init failed for %s", providerName), 0;
+        {
+            TVR_LOG(TVR_DBG, "RM Init failed for %s", providerName);
+            return 0;
+        }
         agent.BuildCimpleInfo();
-        Instance_Map local((agent.*map).meta_class);
-        if (copyAfterLiveRefresh(agent, classMutex, refresh, agent.*map, local))
-            deliver(local, providerName, handler, client);
+        Reading reading(agent.*map, selection);
+        copyAfterLiveRefresh(agent, classMutex, refresh, reading);
+        reading.deliver(providerName, handler, client);
     }
     catch (...)
     {
         TVR_LOG(TVR_ERR, "Exception in Active CIM Provider Enumeration - do nothing");
+        Reading::cutShort(handler, client);
     }
     return 0;
 }
-
-MethodGuard::Ready::Ready(ProviderAgent& agent)
-{
-    agent.BuildCimpleInfo();
-    {
-        Auto_Mutex lock(agent.m_AdapterDataReadyMutex);
-        if (!agent.m_bIsAdapterDataReady)
-        {
-            TVR_LOG(TVR_DBG, "PERF: Waiting for m_AdapterDataReadyMutex");
-            agent.adapterData().waitIfNotReady();
-            TVR_LOG(TVR_DBG, "PERF: Woken up from wait for m_AdapterDataReadyMutex");
-        }
-    }
-    {
-        Auto_Mutex lock(agent.m_AdapterMapsReadyMutex);
-        if (!agent.m_bAdapterMapsReady)
-        {
-            TVR_LOG(TVR_DBG, "PERF: Waiting for m_AdapterMapsReadyMutex");
-            agent.adapterMaps().waitIfNotReady();
-            TVR_LOG(TVR_DBG, "PERF: Woken up from wait for m_AdapterMapsReadyMutex");
-        }
-    }
-}
-
-MethodGuard::MethodGuard(ProviderAgent& agent) : _ready(agent), _dataLock(agent.m_DataMutex) {}
 
 } // namespace cimple

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "agent/ProviderAgent.h"
-#include "runtime/Provider.h"
+#include "runtime/adapter/Provider.h"
 
 namespace cimple
 {
@@ -12,34 +12,21 @@ int loadProvider();
 /// Gives the reference back; returns 0.
 int unloadProvider(const char* providerName);
 
-/// Copies the map under the locks, then hands a clone of each instance to the handler. Every failure leaves a log
-/// line and ends the enumeration with what was sent; the status is always 0.
-int enumeratePlain(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client);
+/// Copies what is selected of the map under the locks, then gives the copies to the handler. Every failure leaves a log
+/// line and ends the enumeration with what was sent; the status is always 0. A handler that must know whether it was
+/// given everything is told by a null instance with ENUM_INSTANCES_FAILED.
+int enumeratePlain(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client,
+                   const Selection& selection);
 
 /// The same for SAN classes, whose maps are built when one of them is asked for.
-int enumerateSan(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client);
+int enumerateSan(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client,
+                 const Selection& selection);
 
 /// Updates a map from the hardware; the caller holds all locks of the refresh.
 using LiveRefresh = void (*)(ProviderAgent& agent);
 
 /// The same after a live refresh, serialised by the class's own mutex.
 int enumerateActive(Instance_Map InstanceCache::*map, const char* providerName, Mutex& classMutex, LiveRefresh refresh,
-                    Instance_Handler handler, void* client);
-
-/// What every extrinsic method stands on: asks for a refresh if one is due, waits for the adapter data and maps, and
-/// holds m_DataMutex for the method's length.
-class MethodGuard
-{
-public:
-    explicit MethodGuard(ProviderAgent& agent);
-
-private:
-    struct Ready
-    {
-        explicit Ready(ProviderAgent& agent);
-    };
-    Ready _ready;
-    Auto_Mutex _dataLock;
-};
+                    Instance_Handler handler, void* client, const Selection& selection);
 
 } // namespace cimple

@@ -1,9 +1,10 @@
 #include "agent/Instance_Map.h"
 
-#include "runtime/InstanceSlots.h"
+#include "runtime/meta/InstanceSlots.h"
 
 #include <algorithm>
 #include <cstring>
+#include <utility>
 
 namespace cimple
 {
@@ -11,7 +12,7 @@ namespace cimple
 namespace
 {
 
-/// FNV-1a over bytes, folded eight at a time for long texts.
+/// Multiplies and folds, eight bytes at a time.
 std::uint64_t mix(std::uint64_t hash, std::uint64_t word)
 {
     hash = (hash ^ word) * 0x9E3779B97F4A7C15ULL;
@@ -30,15 +31,6 @@ std::uint64_t hashBytes(std::uint64_t hash, const void* data, std::size_t size)
     std::uint64_t tail = 0;
     std::memcpy(&tail, bytes, size);
     return mix(hash, tail ^ (static_cast<std::uint64_t>(size) << 56));
-}
-
-std::vector<const Meta_Feature*> keysOf(const Meta_Class* mc)
-{
-    std::vector<const Meta_Feature*> keys;
-    for (const Meta_Feature* feature : features_of(mc))
-        if (feature->flags & META_KEY)
-            keys.push_back(feature);
-    return keys;
 }
 
 /// Adds a property to the hash. Reals add nothing: their equality is not that of their bytes.
@@ -83,10 +75,16 @@ bool hashKey(std::uint64_t& hash, const Instance* instance, const Meta_Feature* 
 
 bool hashKeys(std::uint64_t& hash, const Instance* instance, const Meta_Class* as)
 {
-    for (const Meta_Feature* feature : features_of(as))
-        if ((feature->flags & META_KEY) && !hashKey(hash, instance, feature))
-            return false;
-    return true;
+    return all_keys(as, [&](std::size_t index) { return hashKey(hash, instance, features_of(as)[index]); });
+}
+
+/// 32 bits of the instance's keys, those of `as` alone; nothing when they cannot be reduced safely.
+std::optional<std::uint32_t> reduce(const Instance* instance, const Meta_Class* as)
+{
+    std::uint64_t hash = 0x243F6A8885A308D3ULL;
+    if (!hashKeys(hash, instance, as))
+        return std::nullopt;
+    return static_cast<std::uint32_t>(hash ^ (hash >> 32));
 }
 
 /// Index of the first element from `from` on that equals `print`, or `size`.
@@ -114,21 +112,11 @@ Instance_Map::~Instance_Map()
     clear();
 }
 
-std::optional<Instance_Map::Fingerprint> Instance_Map::fingerprint(const Instance* instance,
-                                                                   const std::vector<const Meta_Feature*>& keys)
-{
-    std::uint64_t hash = 0x243F6A8885A308D3ULL;
-    for (const Meta_Feature* key : keys)
-        if (!hashKey(hash, instance, key))
-            return std::nullopt;
-    return static_cast<Fingerprint>(hash ^ (hash >> 32));
-}
-
 std::optional<Instance_Map::Fingerprint> Instance_Map::fingerprintLocked(const Instance* keys) const
 {
     if (!_printed || keys->__meta_class != _keyClass)
         return std::nullopt;
-    return fingerprint(keys, _keyFeatures);
+    return reduce(keys, _keyClass);
 }
 
 std::ptrdiff_t Instance_Map::findLocked(const Instance* keys, std::optional<Fingerprint> print) const
@@ -155,19 +143,15 @@ std::ptrdiff_t Instance_Map::insert(Instance* instance)
     if (_entries.size() == 0)
     {
         _printed = true;
-        if (_keyClass != instance->__meta_class)
-        {
-            _keyClass = instance->__meta_class;
-            _keyFeatures = keysOf(_keyClass);
-        }
+        _keyClass = instance->__meta_class;
+        _roles.clear();
     }
     const std::optional<Fingerprint> print = fingerprintLocked(instance);
     if (findLocked(instance, print) != -1)
         return -1;
 
     const std::size_t index = _entries.size();
-    if (index == _entries.capacity())
-        _entries.reserve(2 * index);
+    reserveOneMore(); // all that may throw: until here the instance is the caller's
     _entries.append(instance);
     if (print)
         _prints.push_back(*print);
@@ -177,6 +161,15 @@ std::ptrdiff_t Instance_Map::insert(Instance* instance)
         _prints.clear();
     }
     return static_cast<std::ptrdiff_t>(index);
+}
+
+void Instance_Map::reserveOneMore()
+{
+    constexpr std::size_t first = 8;
+    if (_entries.size() == _entries.capacity())
+        _entries.reserve(std::max(first, 2 * _entries.size()));
+    if (_printed && _prints.size() == _prints.capacity())
+        _prints.reserve(std::max(first, 2 * _prints.size()));
 }
 
 std::ptrdiff_t Instance_Map::find(const Instance* keys) const
@@ -225,6 +218,7 @@ int Instance_Map::modify(const Instance* instance, const Instance* model)
     const std::ptrdiff_t index = findLocked(instance, fingerprintLocked(instance));
     if (index == -1)
         return MODIFY_INSTANCE_NOT_FOUND;
+    _roles.clear(); // what it refers to may change
     copy(_entries[static_cast<std::size_t>(index)], instance, model);
     return 0;
 }
@@ -254,6 +248,9 @@ Instance* Instance_Map::takeLocked(std::size_t index)
     _entries.remove(index);
     if (_printed)
         _prints.erase(_prints.begin() + static_cast<std::ptrdiff_t>(index));
+    for (Role& role : _roles)
+        if (index < role.prints.size())
+            role.prints.erase(role.prints.begin() + static_cast<std::ptrdiff_t>(index));
     return instance;
 }
 
@@ -264,16 +261,153 @@ int Instance_Map::for_each(Instance_Handler proc, void* client) const
     return 0;
 }
 
+// --- selections -------------------------------------------------------------------------------------------
+
+bool Instance_Map::reduceEndsLocked(Role& role) const
+{
+    const Meta_Class* declared = role.reference->meta_class;
+    for (std::size_t i = role.prints.size(); role.reducible && i < _entries.size(); i++)
+    {
+        const Instance* end = reference_slot(_entries[i], role.reference);
+        if (end && !role.as)
+            role.as = declared->num_keys != 0 ? declared : end->__meta_class;
+        const auto print = !end                                      ? Fingerprint{}
+                           : is_subclass(role.as, end->__meta_class) ? reduce(end, role.as)
+                                                                     : std::optional<Fingerprint>();
+        role.reducible = print.has_value();
+        if (print)
+            role.prints.push_back(*print);
+    }
+    return role.reducible;
+}
+
+std::optional<std::vector<Instance_Map::Cursor>> Instance_Map::cursorsLocked(const Instance* end) const
+{
+    if (!_printed)
+        return std::nullopt;
+    if (_roles.empty())
+    {
+        std::vector<Role> all; // where memory runs out on the way, the next search begins anew
+        for (const Meta_Feature* mf : features_of(_keyClass))
+            if (const Meta_Reference* reference = as_single_reference(mf))
+                all.push_back({reference, nullptr, {}, true});
+        _roles = std::move(all);
+    }
+    std::vector<Cursor> cursors;
+    for (Role& role : _roles)
+    {
+        if (!is_subclass(role.reference->meta_class, end->__meta_class))
+            continue; // it never refers to such an instance
+        if (!reduceEndsLocked(role))
+            return std::nullopt;
+        if (!role.as)
+            continue; // it refers to nothing
+        const auto print = is_subclass(role.as, end->__meta_class) ? reduce(end, role.as) : std::nullopt;
+        if (!print)
+            return std::nullopt;
+        cursors.push_back({&role.prints, *print, 0});
+    }
+    return cursors;
+}
+
+/// Calls `use(index)` for each entry that refers to `end`, until it answers false.
+template <class Use> void Instance_Map::eachWithEndLocked(const Instance* end, Use use) const
+{
+    const auto passes = [&](std::size_t i) { return !references_match(end, _entries[i], nullptr) || use(i); };
+    const std::size_t size = _entries.size();
+    auto cursors = size != 0 ? cursorsLocked(end) : std::nullopt;
+    if (!cursors)
+    {
+        for (std::size_t i = 0; i < size && passes(i); i++)
+            continue;
+        return;
+    }
+    std::size_t from = 0;
+    for (;;)
+    {
+        std::size_t next = size;
+        for (Cursor& cursor : *cursors)
+        {
+            if (cursor.at < from || from == 0)
+                cursor.at = scan(cursor.prints->data(), from, size, cursor.print);
+            next = std::min(next, cursor.at);
+        }
+        if (next == size || !passes(next))
+            return;
+        from = next + 1;
+    }
+}
+
+std::optional<std::size_t> Instance_Map::copy_to(Instance_Map& local, const Selection& selection) const
+{
+    Auto_Mutex lock(_lock);
+    std::optional<std::size_t> refused;
+    Ref<> blank;
+    const auto copy = [&](std::size_t i)
+    {
+        const Instance* entry = _entries[i];
+        Ref<> copied(selection.names ? clone_keys(entry, blank) : clone_sharing_referents(entry));
+        if (local.insert(copied.get()) == -1)
+            return refused = i, false;
+        copied.release();
+        return true;
+    };
+    if (selection.keys)
+    {
+        const std::ptrdiff_t index = findLocked(selection.keys, fingerprintLocked(selection.keys));
+        if (index != -1)
+            copy(static_cast<std::size_t>(index));
+    }
+    else if (selection.end)
+        eachWithEndLocked(selection.end, copy);
+    else
+        for (std::size_t i = 0; i < _entries.size() && copy(i); i++)
+            continue;
+    return refused;
+}
+
+// --- all entries ------------------------------------------------------------------------------------------
+
+namespace
+{
+
+/// What was taken out of a map.
+struct Taken
+{
+    Array<Instance*> entries;
+
+    Taken() = default;
+    ~Taken()
+    {
+        for (Instance* instance : entries)
+            unref(instance);
+    }
+    Taken(const Taken&) = delete;
+    Taken& operator=(const Taken&) = delete;
+};
+
+} // namespace
+
+void Instance_Map::takeAll(Array<Instance*>& entries)
+{
+    Auto_Mutex lock(_lock);
+    entries.swap(_entries);
+    _prints.clear();
+    _roles.clear();
+}
+
 void Instance_Map::clear()
 {
-    Array<Instance*> gone;
-    {
-        Auto_Mutex lock(_lock);
-        gone.swap(_entries);
-        _prints.clear();
-    }
-    for (Instance* instance : gone)
-        unref(instance);
+    Taken gone;
+    takeAll(gone.entries);
+}
+
+void Instance_Map::give_away(Instance_Handler proc, void* client)
+{
+    Taken given;
+    takeAll(given.entries);
+    for (Instance*& instance : given.entries)
+        proc(std::exchange(instance, nullptr), 0, client);
 }
 
 std::size_t Instance_Map::size() const

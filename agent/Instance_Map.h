@@ -1,9 +1,9 @@
 // The cache's container: a vector of instances searched by key.
 #pragma once
 
-#include "runtime/Instance.h"
-#include "runtime/Provider.h"
-#include "runtime/Thread.h"
+#include "runtime/adapter/Provider.h"
+#include "runtime/meta/Instance.h"
+#include "runtime/threads/Thread.h"
 
 #include <cstdint>
 #include <optional>
@@ -17,6 +17,10 @@ namespace cimple
 /// While all entries and the searched keys are of one class, a pass over 32-bit fingerprints of the keys stands
 /// before key_eq, so that an insert into a large map touches four bytes an entry. A fingerprint only filters:
 /// equal keys have equal fingerprints, and what passes is still compared.
+///
+/// The same of the ends of associations, from when somebody first asks for those of one instance.
+///
+/// Nobody changes the keys of an entry, nor those of the instances that it refers to.
 ///
 /// A leaf lock guards the structure, so that readers and the threads that fill a map can meet in it. It is never
 /// held while calling out. Pointers that lookup() and at() return stay valid until the entry is removed: callers
@@ -32,7 +36,8 @@ public:
     /// The class this map is for.
     const Meta_Class* meta_class;
 
-    /// Takes ownership and returns the index, or -1 when equal keys are there: the caller then still owns it.
+    /// Takes ownership and returns the index, or -1 when equal keys are there: the caller then still owns it, as
+    /// when std::bad_alloc is thrown.
     std::ptrdiff_t insert(Instance* instance);
     /// Index or -1.
     std::ptrdiff_t find(const Instance* keys) const;
@@ -52,6 +57,12 @@ public:
     int for_each(Instance_Handler proc, void* client) const;
     void clear();
 
+    /// Inserts copies of what is selected, in the order of the entries, for a reader: they share what they refer to
+    /// with the entries, and nobody writes there. Stops at the first that `local` refuses and returns its index.
+    std::optional<std::size_t> copy_to(Instance_Map& local, const Selection& selection) const;
+    /// Empties the map and gives each entry to `proc` with status 0; its answer is not looked at.
+    void give_away(Instance_Handler proc, void* client);
+
     std::size_t size() const;
     /// The stored instance, not counted; null when out of range.
     Instance* at(std::size_t index) const;
@@ -61,19 +72,38 @@ public:
 private:
     using Fingerprint = std::uint32_t;
 
-    /// Nothing when the instance's keys cannot be reduced safely.
-    static std::optional<Fingerprint> fingerprint(const Instance* instance,
-                                                  const std::vector<const Meta_Feature*>& keys);
+    /// The ends that the entries have in one of their references.
+    struct Role
+    {
+        const Meta_Reference* reference;
+        const Meta_Class* as;            ///< the keys of this class stand for an end; null before the first end
+        std::vector<Fingerprint> prints; ///< of as many entries as were there when they were last looked at
+        bool reducible;                  ///< every end is of the class `as`
+    };
+    /// A pass over the fingerprints of a role.
+    struct Cursor
+    {
+        const std::vector<Fingerprint>* prints;
+        Fingerprint print;
+        std::size_t at;
+    };
+
     std::ptrdiff_t findLocked(const Instance* keys, std::optional<Fingerprint> print) const;
     std::optional<Fingerprint> fingerprintLocked(const Instance* keys) const;
     Instance* takeLocked(std::size_t index);
+    void reserveOneMore();
+    void takeAll(Array<Instance*>& entries);
+    bool reduceEndsLocked(Role& role) const;
+    /// One for each role that may refer to `end`; nothing when fingerprints do not tell.
+    std::optional<std::vector<Cursor>> cursorsLocked(const Instance* end) const;
+    template <class Use> void eachWithEndLocked(const Instance* end, Use use) const;
 
     mutable Mutex _lock;
     Array<Instance*> _entries;
-    std::vector<Fingerprint> _prints;              ///< parallel to _entries while _printed
-    const Meta_Class* _keyClass = nullptr;         ///< class of all entries while _printed
-    std::vector<const Meta_Feature*> _keyFeatures; ///< keys of _keyClass
+    std::vector<Fingerprint> _prints;      ///< parallel to _entries while _printed
+    const Meta_Class* _keyClass = nullptr; ///< class of all entries while _printed
     bool _printed = true;
+    mutable std::vector<Role> _roles; ///< while _printed; empty before somebody asks for ends
 };
 
 } // namespace cimple

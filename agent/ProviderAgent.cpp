@@ -1,16 +1,19 @@
 #include "agent/ProviderAgent.h"
 
-#include "agent/ModelStages.h"
+#include "agent/RefreshSteps.h"
 #include "agent/SignalTrace.h"
 #include "device/Bindings.h"
 #include "device/Loader.h"
 #include "foundation/FilePaths.h"
 #include "foundation/HostInformation.h"
 #include "foundation/Log.h"
-#include "runtime/Thread_Context.h"
+#include "runtime/base/Immortal.h"
+#include "runtime/log/Shielded.h"
+#include "runtime/threads/Thread_Context.h"
 
 #include <csignal>
 #include <exception>
+#include <string>
 #include <unistd.h>
 
 namespace cimple
@@ -21,14 +24,16 @@ namespace cimple
 namespace
 {
 
-Mutex singletonMutex;
+Immortal<Mutex> singletonMutex;
 std::atomic<ProviderAgent*> singleton{nullptr};
 std::int32_t references = 0;
+std::int32_t failedLoads = 0; ///< since the agent was made
 
 } // namespace
 
-/// Ends an agent that is still alive when the library is closed or the process exits: brokers do not always call as
-/// many cleanups as they made providers. The object itself stays, for threads that may still be inside it.
+/// Ends an agent that is still alive when the process exits: brokers do not always call as many cleanups as they made
+/// providers. The object itself stays, for threads that may still be inside it. The module's image is never unmapped
+/// before, so that this does not run inside dlclose, under the loader's lock, which a refresh may need to end.
 class AgentEnd
 {
 public:
@@ -37,17 +42,14 @@ public:
     ~AgentEnd()
     {
         if (ProviderAgent* agent = singleton.load())
-        {
             agent->finish();
-            agent->m_config.save();
-        }
     }
 };
 
 namespace
 {
 
-AgentEnd agentEnd; // after the singleton's mutex, so that it is destroyed before it
+AgentEnd agentEnd;
 
 } // namespace
 
@@ -55,7 +57,12 @@ ProviderAgent* ProviderAgent::instance()
 {
     if (ProviderAgent* agent = singleton.load())
         return agent;
-    Auto_Mutex lock(singletonMutex);
+    Auto_Mutex lock(*singletonMutex);
+    return makeLocked();
+}
+
+ProviderAgent* ProviderAgent::makeLocked()
+{
     if (!singleton.load())
         singleton = new ProviderAgent();
     return singleton.load();
@@ -63,25 +70,46 @@ ProviderAgent* ProviderAgent::instance()
 
 void ProviderAgent::addRef()
 {
-    Auto_Mutex lock(singletonMutex);
+    Auto_Mutex lock(*singletonMutex);
+    addRefLocked();
+}
+
+void ProviderAgent::addRefLocked()
+{
     TVR_LOG(TVR_DBG, "ProviderAgent::addRef[%d]", references);
     references++;
 }
 
+bool ProviderAgent::join()
+{
+    Auto_Mutex lock(*singletonMutex);
+    const bool loaded = shielded(
+        false, [] { return makeLocked()->m_bLoaded.load(); },
+        [](const char*) { TVR_LOG(TVR_ERR, "Tavrin CIM Provider load failure"); });
+    if (loaded)
+        addRefLocked();
+    else
+        failedLoads++;
+    return loaded;
+}
+
 void ProviderAgent::releaseRef()
 {
-    Auto_Mutex lock(singletonMutex);
+    Auto_Mutex lock(*singletonMutex);
     TVR_LOG(TVR_DBG, "ProviderAgent::releaseRef[%d]", references);
-    if (--references == 0)
-    {
-        delete singleton.load();
-        singleton = nullptr;
-    }
+    if (--references + failedLoads != 0)
+        return;
+    if (singleton.load() && singleton.load()->m_process != getpid())
+        return;
+    delete singleton.load();
+    singleton = nullptr;
+    references = 0;
+    failedLoads = 0;
 }
 
 // --- start ---------------------------------------------------------------------------------------------
 
-ProviderAgent::ProviderAgent()
+ProviderAgent::ProviderAgent() : m_process(getpid())
 {
     try
     {
@@ -110,6 +138,8 @@ void ProviderAgent::start()
         TVR_LOG(TVR_ERR, "Error : In Loading Library ");
     resolveAllEntries();
     m_pMethodWrapper = std::make_unique<TVR_MethodWrapper>();
+    std::string libraryVersion;
+    TVR_MethodWrapper::GetLibraryVersion(&libraryVersion); // for its log line
     m_pData = std::make_unique<Data>();
     TVR_LOG(TVR_INFO, "Tavrin Provider v%d.%d.%d-%d Loaded[%d]", providerVersion[0], providerVersion[1],
             providerVersion[2], providerVersion[3], getpid());
@@ -131,12 +161,15 @@ ProviderAgent::~ProviderAgent()
 
 void ProviderAgent::finish()
 {
-    if (m_bFinished.exchange(true))
+    if (getpid() != m_process || m_bFinished.exchange(true))
         return;
     try
     {
         TVR_LOG(TVR_DBG, "Entering dtor ~ProviderAgent()");
-        joinThreads();
+        const bool joined = joinThreads();
+        m_config.save(); // while a failure can still be logged
+        if (!joined)
+            return m_pMethodWrapper.reset(); // the locks of the refresh that ends the process are its own
         deleteData();
         HBA_FreeLibrary();
         ClearMaps();
@@ -149,9 +182,11 @@ void ProviderAgent::finish()
     {
         TVR_LOG(TVR_ERR, "Error in ProviderAgent unload. Just continue");
     }
+    finishLogging();
 }
 
-void ProviderAgent::joinThreads()
+/// False on the refresh's own thread, where a library of the hardware or the resolver called exit().
+bool ProviderAgent::joinThreads()
 {
     void* value = nullptr;
     if (m_bDportThreadRunning)
@@ -169,8 +204,7 @@ void ProviderAgent::joinThreads()
     m_ThreadMutex.unlock();
     if (running)
         TVR_LOG(TVR_DBG, "PERF: Clearing the previous thread...with join");
-    if (joinable)
-        Thread::join(m_dataFetchThread, value);
+    return !joinable || Thread::join(m_dataFetchThread, value) == 0;
 }
 
 void ProviderAgent::deleteData()
@@ -210,12 +244,12 @@ void ProviderAgent::ClearMaps()
 
 std::uint32_t ProviderAgent::updateAdapterMaps()
 {
-    return modelStages.updateAdapterMaps(*this);
+    return buildAdapterMaps(*this);
 }
 
 std::uint32_t ProviderAgent::updateSANMaps()
 {
-    return modelStages.updateSANMaps(*this);
+    return buildSANMaps(*this);
 }
 
 } // namespace cimple

@@ -8,18 +8,26 @@
 #include "foundation/TVR_FileLogger.h"
 #include "foundation/TVR_SysLogger.h"
 #include "foundation/TvrConfigFile.h"
-#include "runtime/Datetime.h"
-#include "runtime/Thread.h"
+#include "runtime/threads/Thread.h"
+#include "runtime/values/Datetime.h"
 
 #include <atomic>
 #include <cstdint>
 #include <memory>
+#include <sys/types.h>
 
 namespace cimple
 {
 
 /// The version that the module reports.
 inline constexpr int providerVersion[4] = {10, 2, 261, 13};
+
+/// What an up-call for an instance of the platform gave.
+struct PlatformAnswer
+{
+    bool answered = false; ///< the broker enumerated the class
+    Ref<> found;           ///< the instance to take, in its own namespace; null when there is none
+};
 
 /// A stage of the refresh that readers wait for: the flags are written under the mutex.
 struct RefreshStage
@@ -28,6 +36,8 @@ struct RefreshStage
     Condition& cond;
     std::atomic<bool>& ready;
     std::atomic<bool>& building;
+    /// The stage ended early or left something out: what a reader does not find may be there all the same.
+    std::atomic<bool>& incomplete;
 
     /// Waits once, with no timeout, if the stage is not ready; the mutex is held. A spurious wake-up goes on:
     /// what the caller reads next is safe whatever the flag says.
@@ -47,7 +57,10 @@ public:
     /// The agent, made on first call under the singleton mutex.
     static ProviderAgent* instance();
     static void addRef();
-    /// Deletes the agent when the count reaches 0.
+    /// instance() and addRef() in one, for a provider's load. False if there is no agent or it is not loaded: then no
+    /// reference is taken, but the unload that will give one back all the same is reckoned with.
+    static bool join();
+    /// Deletes the agent when as many references came back as loads were made; that of a parent process stays.
     static void releaseRef();
 
     /// Starts a refresh if one is due; returns 0 at once.
@@ -86,10 +99,12 @@ public:
     Condition m_AdapterDataReadyCond;
     std::atomic<bool> m_bAdapterMapsReady{false};
     std::atomic<bool> m_bAdapterMapsBuilding{false};
+    std::atomic<bool> m_bAdapterMapsIncomplete{false};
     Mutex m_AdapterMapsReadyMutex;
     Condition m_AdapterMapsReadyCond;
     std::atomic<bool> m_bSANMapsReady{false};
     std::atomic<bool> m_bSANMapsBuilding{false};
+    std::atomic<bool> m_bSANMapsIncomplete{false};
     Mutex m_SANMapsReadyMutex;
     Condition m_SANMapsReadyCond;
     RefreshStage adapterData();
@@ -102,7 +117,9 @@ public:
     String m_osExtendedInfo;
     String m_hostName;
     String m_ipAddress;
-    bool m_bOwnComputerSystem = false; ///< the computer system was generated here
+    bool m_bOwnComputerSystem = false;       ///< the computer system was generated here
+    PlatformAnswer m_platformComputerSystem; ///< both of the refresh's thread
+    PlatformAnswer m_platformChassis;
 
     // --- status thread of the D-Port test
     Thread m_dportThread;
@@ -114,16 +131,24 @@ private:
 
     ProviderAgent();
     ~ProviderAgent();
+    /// Both under the singleton mutex.
+    static ProviderAgent* makeLocked();
+    static void addRefLocked();
 
     void start();
     void readSettings();
-    /// Stops the threads and gives back all that is not memory, once; the agent stays and answers empty.
+    /// Stops the threads and gives back all that is not memory, once; the agent stays and answers empty. In another
+    /// process than the agent's, such as a child of a fork, nothing is ended: it is all the parent's.
     void finish();
-    void joinThreads();
+    bool joinThreads();
     void deleteData();
 
+    void takeDownIncomplete();
+    void giveUpRefresh(int error);
     static void* DataFetch_Handler(void* agent);
     void refresh();
+    bool isFabricAwaited() const;
+    void askPlatform();
     void adapterStage();
     void sanStage();
 
@@ -132,7 +157,10 @@ private:
     Mutex m_ThreadMutex;            ///< m_bThreadRunning, m_lastLoadTime and the decision to start
     bool m_bThreadRunning = false;  ///< started and not finished
     bool m_bThreadJoinable = false; ///< started and not joined
+    bool m_bPlatformAsked = false;  ///< of the refresh's thread
+    bool m_bSANMapsBuilt = false;   ///< of the refresh's thread: the SAN maps were complete once
     std::atomic<bool> m_bFinished{false};
+    const pid_t m_process;
 };
 
 } // namespace cimple

@@ -1,18 +1,12 @@
 // The provider procedure of every class: one template over its provider.
 #pragma once
 
+#include "agent/Namespaces.h"
 #include "agent/ProviderExtension.h"
-#include "runtime/Provider.h"
+#include "runtime/adapter/Provider.h"
 
 namespace cimple
 {
-
-/// Namespaces in which the module's classes are served and its profiles registered.
-inline constexpr const char* providerNamespace = "root/tavrin";
-inline constexpr const char* interopNamespace = "root/pg_interop";
-/// Where the schema of the classes was taken from, and the platform classes that the module asks the broker for.
-inline constexpr const char* schemaDirectory = "/tmp/tvr_ibm/schema/cim_schema_2.26.0Experimental-MOFs";
-inline constexpr const char* platformClasses = "IBMSD_ComputerSystem IBMSD_Chassis PG_RegisteredProfile";
 
 /// Unknown names give -1, methods of the schema without a body 131.
 template <class Provider> int invokeMethod(const Instance* reference, Instance* record)
@@ -21,8 +15,9 @@ template <class Provider> int invokeMethod(const Instance* reference, Instance* 
     if constexpr (HasMethods<Provider>)
     {
         for (const MethodRow& row : Provider::methods())
-            if (eqi(row.name, name))
-                return row.call(reference, record);
+            if (eqi(row.method->name, name)) // one of a superclass has slots of its own
+                return static_cast<const void*>(row.method) == record->__meta_class ? row.call(reference, record)
+                                                                                    : INVOKE_METHOD_FAILED;
     }
     const bool known = find_feature(&Provider::Record::static_meta_class, name, META_METHOD) != nullptr;
     return known ? INVOKE_METHOD_UNSUPPORTED : NO_SUCH_OPERATION;
@@ -35,7 +30,7 @@ template <class Provider> int associationAnswer(int unsupported)
 }
 
 template <class Provider>
-int providerProc(const Registration*, int operation, void* arg0, void* arg1, void* arg2, void* arg3, void*, void*,
+int providerProc(const Registration*, int operation, void* arg0, void* arg1, void* arg2, void* arg3, void* arg4, void*,
                  void*, void*)
 {
     auto* provider = static_cast<Provider*>(arg0);
@@ -62,17 +57,32 @@ int providerProc(const Registration*, int operation, void* arg0, void* arg1, voi
     case OP_ENUM_INSTANCES:
     {
         auto handler = reinterpret_cast<Instance_Handler>(arg2);
-        const int status = provider->enum_instances(static_cast<const Instance*>(arg1), handler, arg3);
+        const auto* selection = static_cast<const Selection*>(arg4);
+        const int status = provider->enum_instances(static_cast<const Instance*>(arg1), handler, arg3,
+                                                    selection ? *selection : Selection());
         handler(nullptr, status, arg3);
         return status;
     }
     case OP_CREATE_INSTANCE:
+        if constexpr (HasCreateInstance<Provider>)
+            return arg1 ? changeOutcome(CREATE_INSTANCE_FAILED,
+                                        [&] { return provider->create_instance(static_cast<Instance*>(arg1)); })
+                        : CREATE_INSTANCE_INVALID_PARAMETER;
         return CREATE_INSTANCE_UNSUPPORTED;
     case OP_DELETE_INSTANCE:
+        if constexpr (HasDeleteInstance<Provider>)
+            return arg1 ? changeOutcome(DELETE_INSTANCE_FAILED,
+                                        [&] { return provider->delete_instance(static_cast<const Instance*>(arg1)); })
+                        : DELETE_INSTANCE_FAILED;
         return DELETE_INSTANCE_UNSUPPORTED;
     case OP_MODIFY_INSTANCE:
         if constexpr (HasModifyInstance<Provider>)
-            return provider->modify_instance(static_cast<const Instance*>(arg1), static_cast<const Instance*>(arg2));
+            return arg1 ? changeOutcome(MODIFY_INSTANCE_FAILED,
+                                        [&] {
+                                            return provider->modify_instance(static_cast<const Instance*>(arg1),
+                                                                             static_cast<const Instance*>(arg2));
+                                        })
+                        : MODIFY_INSTANCE_INVALID_PARAMETER;
         return MODIFY_INSTANCE_UNSUPPORTED;
     case OP_INVOKE_METHOD:
         return invokeMethod<Provider>(static_cast<const Instance*>(arg1), static_cast<Instance*>(arg2));

@@ -1,6 +1,9 @@
 // The refresh: who starts it, and the thread that rebuilds device data and maps.
 #include "agent/ProviderAgent.h"
+#include "agent/RefreshSteps.h"
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
+#include "runtime/log/Shielded.h"
 
 namespace cimple
 {
@@ -20,17 +23,19 @@ void RefreshStage::complete() const
 
 RefreshStage ProviderAgent::adapterData()
 {
-    return {m_AdapterDataReadyMutex, m_AdapterDataReadyCond, m_bIsAdapterDataReady, m_bAdapterDataBuilding};
+    return {m_AdapterDataReadyMutex, m_AdapterDataReadyCond, m_bIsAdapterDataReady, m_bAdapterDataBuilding,
+            m_bAdapterMapsIncomplete};
 }
 
 RefreshStage ProviderAgent::adapterMaps()
 {
-    return {m_AdapterMapsReadyMutex, m_AdapterMapsReadyCond, m_bAdapterMapsReady, m_bAdapterMapsBuilding};
+    return {m_AdapterMapsReadyMutex, m_AdapterMapsReadyCond, m_bAdapterMapsReady, m_bAdapterMapsBuilding,
+            m_bAdapterMapsIncomplete};
 }
 
 RefreshStage ProviderAgent::sanMaps()
 {
-    return {m_SANMapsReadyMutex, m_SANMapsReadyCond, m_bSANMapsReady, m_bSANMapsBuilding};
+    return {m_SANMapsReadyMutex, m_SANMapsReadyCond, m_bSANMapsReady, m_bSANMapsBuilding, m_bSANMapsIncomplete};
 }
 
 int ProviderAgent::BuildCimpleInfo()
@@ -41,26 +46,78 @@ int ProviderAgent::BuildCimpleInfo()
 
     Auto_Mutex lock(m_ThreadMutex);
     if (!isTimeOut() && !m_bAdapterRefreshPending && !m_bSANRefreshPending)
-        return TVR_LOG(TVR_DBG, "PERF: ---No timeout BuildCimpleInfo END---"), 0;
+    {
+        TVR_LOG(TVR_DBG, "PERF: ---No timeout BuildCimpleInfo END---");
+        return 0;
+    }
     if (m_bDiagnosticsRunning)
-        return TVR_LOG(TVR_DBG, "Diagnostics is running.. Skip the internal refresh till it ends"), 0;
+    {
+        TVR_LOG(TVR_DBG, "Diagnostics is running.. Skip the internal refresh till it ends");
+        return 0;
+    }
     if (m_bThreadRunning)
-        return TVR_LOG(TVR_DBG, "DataFetch_Handler thread already running-BuildCimpleInfo"), 0;
+    {
+        TVR_LOG(TVR_DBG, "DataFetch_Handler thread already running-BuildCimpleInfo");
+        return 0;
+    }
     if (m_bFinished)
         return 0;
     m_bThreadRunning = true;
-    if (!(m_lastLoadTime == Datetime()))
+    if (m_bThreadJoinable)
     {
         TVR_LOG(TVR_DBG, "PERF: Clearing the previous thread...with join");
         void* value = nullptr;
         Thread::join(m_dataFetchThread, value);
+        m_bThreadJoinable = false;
     }
     if (!m_bSANRefreshPending)
         m_bAdapterRefreshPending = true;
+    takeDownIncomplete();
     // The new thread ends its run under m_ThreadMutex, so its handle is stored by then.
-    m_bThreadJoinable = Thread::create_joinable(m_dataFetchThread, &ProviderAgent::DataFetch_Handler, this) == 0;
+    const int error = Thread::create_joinable(m_dataFetchThread, &ProviderAgent::DataFetch_Handler, this);
+    if (error != 0)
+    {
+        giveUpRefresh(error);
+        return 0;
+    }
+    m_bThreadJoinable = true;
     TVR_LOG(TVR_DBG, "PERF: ---Created DataFetch_Handler thread -- BuildCimpleInfo END---");
     return 0;
+}
+
+/// Readers wait for the stages that are built anew because the last refresh left something out, or could not start.
+void ProviderAgent::takeDownIncomplete()
+{
+    if (m_bAdapterMapsIncomplete)
+    {
+        m_bAdapterRefreshPending = true;
+        for (const RefreshStage& stage : {adapterData(), adapterMaps()})
+        {
+            Auto_Mutex lock(stage.mutex);
+            stage.ready = false;
+        }
+    }
+    if (m_bSANMapsIncomplete)
+    {
+        m_bSANRefreshPending = true;
+        Auto_Mutex lock(m_SANMapsReadyMutex);
+        m_bSANMapsReady = false;
+    }
+}
+
+/// Readers go on with what the maps hold. What is pending stays so: the next request tries again.
+void ProviderAgent::giveUpRefresh(int error)
+{
+    TVR_LOG(TVR_ERR, "Could not create the DataFetch_Handler thread, error %d", error);
+    m_bThreadRunning = false;
+    for (const RefreshStage& stage : {adapterData(), adapterMaps(), sanMaps()})
+    {
+        Auto_Mutex lock(stage.mutex);
+        if (stage.ready)
+            continue;
+        stage.incomplete = true;
+        stage.complete();
+    }
 }
 
 bool ProviderAgent::isTimeOut()
@@ -74,8 +131,12 @@ bool ProviderAgent::isTimeOut()
     const std::uint64_t elapsed = now.usec() - m_lastLoadTime.usec();
     const std::uint32_t limit = m_cacheTimeout * static_cast<std::uint32_t>(Datetime::minute);
     if (elapsed >> 32 == 0 && static_cast<std::uint32_t>(elapsed) < limit)
-        return TVR_LOG(TVR_DBG, "PERF: Refresh Not yet required"), false;
-    return TVR_LOG(TVR_DBG, "PERF: TimeOut"), true;
+    {
+        TVR_LOG(TVR_DBG, "PERF: Refresh Not yet required");
+        return false;
+    }
+    TVR_LOG(TVR_DBG, "PERF: TimeOut");
+    return true;
 }
 
 void* ProviderAgent::DataFetch_Handler(void* arg)
@@ -87,6 +148,35 @@ void* ProviderAgent::DataFetch_Handler(void* arg)
     return nullptr;
 }
 
+namespace
+{
+
+/// One stage of the refresh. What is thrown ends a part of it alone: the readers that wait are woken all the same.
+class StageRun
+{
+public:
+    template <class Work> void contain(const char* part, Work work)
+    {
+        _thrown |= !shielded(
+            false, [&] { return work(), true; },
+            [&](const char* what) { TVR_LOG(TVR_ERR, "Exception in the refresh of %s: %s", part, what); });
+    }
+    /// Whether all that the host has was built.
+    bool isWhole() const { return !_thrown && left_out_for_memory == _leftOutBefore; }
+
+private:
+    const unsigned _leftOutBefore = left_out_for_memory;
+    bool _thrown = false;
+};
+
+} // namespace
+
+/// A reader of the fabric that came after its stage was passed found this thread running, and may be the last to come.
+bool ProviderAgent::isFabricAwaited() const
+{
+    return m_bSANRefreshPending && !m_bSANMapsReady;
+}
+
 void ProviderAgent::refresh()
 {
     if (m_bAdapterRefresh || m_bAdapterRefreshPending)
@@ -94,14 +184,36 @@ void ProviderAgent::refresh()
     if (m_bSANRefresh || m_bSANRefreshPending)
         sanStage();
 
-    Auto_Mutex lock(m_ThreadMutex);
+    m_ThreadMutex.lock();
+    while (isFabricAwaited())
+    {
+        m_ThreadMutex.unlock();
+        sanStage();
+        m_ThreadMutex.lock();
+    }
     m_bThreadRunning = false;
-    m_lastLoadTime = Datetime::now();
+    StageRun().contain("the time of the load", [&] { m_lastLoadTime = Datetime::now(); });
+    m_ThreadMutex.unlock();
+}
+
+/// A server may let one up-call through at a time. A reader that holds this channel, and waits in an up-call of its own
+/// for a class whose maps are down, waits for this thread: so the broker is asked only while all maps that were ever
+/// complete still answer. Otherwise the former answers stand. (SAN maps that were never complete have no instance that
+/// an association could lead to.)
+void ProviderAgent::askPlatform()
+{
+    const bool mapsAnswer = m_bAdapterMapsReady && (m_bSANMapsReady || !m_bSANMapsBuilt);
+    if (!m_bLoaded || (m_bPlatformAsked && !mapsAnswer))
+        return;
+    m_bPlatformAsked = true;
+    StageRun().contain("the platform", [&] { refreshSteps.askPlatform(*this); });
 }
 
 void ProviderAgent::adapterStage()
 {
     TVR_LOG(TVR_DBG, "PERF: Building Adapter Data...");
+    askPlatform();
+    StageRun run;
     {
         Auto_Mutex lock(m_AdapterDataReadyMutex);
         m_bAdapterRefreshPending = false;
@@ -111,7 +223,7 @@ void ProviderAgent::adapterStage()
         if (m_bLoaded)
         {
             Auto_Mutex dataLock(m_DataMutex);
-            m_pData->buildAdapterData();
+            run.contain("the adapter data", [&] { m_pData->buildAdapterData(); });
         }
         adapterData().complete();
     }
@@ -126,8 +238,11 @@ void ProviderAgent::adapterStage()
         {
             TVR_LOG(TVR_DBG, "PERF: Updating Adapter Maps...");
             Auto_Mutex dataLock(m_DataMutex);
-            updateAdapterMaps();
+            run.contain("the adapter maps", [&] { updateAdapterMaps(); });
         }
+        m_bAdapterMapsIncomplete = !m_bLoaded || !run.isWhole();
+        if (!run.isWhole())
+            m_bAdapterRefreshPending = true; // the next request tries again
         adapterMaps().complete();
     }
 }
@@ -137,12 +252,13 @@ void ProviderAgent::sanStage()
     Auto_Mutex adapterDataLock(m_AdapterDataReadyMutex);
     m_bSANRefreshPending = false;
     m_bSANMapsReady = false;
+    StageRun run;
     adapterData().waitIfNotReady();
     if (m_bLoaded)
     {
         Auto_Mutex dataLock(m_DataMutex);
         TVR_LOG(TVR_DBG, "PERF: Building SAN Data...");
-        m_pData->buildSANData();
+        run.contain("the SAN data", [&] { m_pData->buildSANData(); });
     }
     Auto_Mutex adapterMapsLock(m_AdapterMapsReadyMutex);
     adapterMaps().waitIfNotReady();
@@ -152,9 +268,13 @@ void ProviderAgent::sanStage()
     {
         Auto_Mutex dataLock(m_DataMutex);
         TVR_LOG(TVR_DBG, "PERF: Updating SAN Maps...");
-        updateSANMaps();
+        run.contain("the SAN maps", [&] { updateSANMaps(); });
     }
+    m_bSANMapsIncomplete = !m_bLoaded || !run.isWhole();
+    if (!run.isWhole())
+        m_bSANRefreshPending = true;
     sanMaps().complete();
+    m_bSANMapsBuilt = true;
 }
 
 } // namespace cimple

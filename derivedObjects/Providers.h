@@ -5,7 +5,10 @@
 #include "agent/EnumerationForms.h"
 #include "agent/ProviderExtension.h"
 #include "model/LiveRefresh.h"
+#include "runtime/base/Immortal.h"
 #include "schema/AllClasses.h"
+
+#include <type_traits>
 
 namespace cimple
 {
@@ -13,52 +16,82 @@ namespace cimple
 /// Joining and leaving the agent, for the provider of one class.
 template <class Class> struct ProviderBase
 {
-    using Record = typename Class::Record;
+    using Record = Class;
     int load() { return loadProvider(); }
-    int unload() { return unloadProvider(Class::providerName); }
+    int unload() { return unloadProvider(CatalogRow<Class>::providerName); }
 };
 
 template <class Class> struct PlainForm : ProviderBase<Class>
 {
-    int enum_instances(const Instance*, Instance_Handler handler, void* client)
+    int enum_instances(const Instance*, Instance_Handler handler, void* client, const Selection& selection)
     {
-        return enumeratePlain(Class::map, Class::providerName, handler, client);
+        return enumeratePlain(MapPlace<Class>::map, CatalogRow<Class>::providerName, handler, client, selection);
     }
 };
 
 template <class Class> struct SanForm : ProviderBase<Class>
 {
-    int enum_instances(const Instance*, Instance_Handler handler, void* client)
+    int enum_instances(const Instance*, Instance_Handler handler, void* client, const Selection& selection)
     {
-        return enumerateSan(Class::map, Class::providerName, handler, client);
+        return enumerateSan(MapPlace<Class>::map, CatalogRow<Class>::providerName, handler, client, selection);
     }
 };
 
 template <class Class> struct ActiveForm : ProviderBase<Class>
 {
-    int enum_instances(const Instance*, Instance_Handler handler, void* client)
+    int enum_instances(const Instance*, Instance_Handler handler, void* client, const Selection& selection)
     {
-        static Mutex classMutex(true);
-        return enumerateActive(Class::map, Class::providerName, classMutex, &liveRefresh<typename Class::Record>,
-                               handler, client);
+        static Immortal<Mutex> classMutex(true);
+        return enumerateActive(MapPlace<Class>::map, CatalogRow<Class>::providerName, *classMutex, &liveRefresh<Class>,
+                               handler, client, selection);
     }
 };
 
-/// Classes that build their instances at each enumeration serve their map until their provider is written.
-template <class Class> struct OwnForm : PlainForm<Class>
+/// A class of this form has its enumeration in its Extended.
+template <class Class> struct OwnForm : ProviderBase<Class>
 {};
 
-/// What the forms know of a class, and its provider.
-#define TVR_CLASS(name, form, group)                                                                                   \
-    struct TVRHBA_##name##_Row                                                                                         \
-    {                                                                                                                  \
-        using Record = TVRHBA_##name;                                                                                  \
-        static constexpr const char* providerName = "TVRHBA_" #name "_Provider";                                       \
-        static constexpr Instance_Map InstanceCache::*map = &InstanceCache::m_TVRHBA_##name##_map;                     \
-    };                                                                                                                 \
-    class TVRHBA_##name##_Provider : public Extended<TVRHBA_##name, form##Form<TVRHBA_##name##_Row>>                   \
-    {};
-#define TVR_ASSOCIATION(name, form, group) TVR_CLASS(name, form, group)
+// Nothing builds instances of these but the steps of the refresh: they serve what is in their map.
+template <>
+struct Extended<TVRHBA_RegisteredProfile, OwnForm<TVRHBA_RegisteredProfile>> : PlainForm<TVRHBA_RegisteredProfile>
+{};
+template <>
+struct Extended<TVRHBA_ReferencedProfile, OwnForm<TVRHBA_ReferencedProfile>> : PlainForm<TVRHBA_ReferencedProfile>
+{};
+template <>
+struct Extended<TVRHBA_BaseServerReferencedProfile, OwnForm<TVRHBA_BaseServerReferencedProfile>>
+    : PlainForm<TVRHBA_BaseServerReferencedProfile>
+{};
+template <> struct Extended<TVRHBA_LogEntry, OwnForm<TVRHBA_LogEntry>> : PlainForm<TVRHBA_LogEntry>
+{};
+template <>
+struct Extended<TVRHBA_RecordLogManagesRecord, OwnForm<TVRHBA_RecordLogManagesRecord>>
+    : PlainForm<TVRHBA_RecordLogManagesRecord>
+{};
+template <>
+struct Extended<TVRHBA_FCDriverLogEntry, OwnForm<TVRHBA_FCDriverLogEntry>> : PlainForm<TVRHBA_FCDriverLogEntry>
+{};
+template <>
+struct Extended<TVRHBA_DriverRecordLogManagesRecord, OwnForm<TVRHBA_DriverRecordLogManagesRecord>>
+    : PlainForm<TVRHBA_DriverRecordLogManagesRecord>
+{};
+
+/// The code of a provider does what its row says, no more and no less: a misspelt function, or the header of an
+/// Extended that is not included, does not build.
+template <class Provider, class Form> constexpr bool keepsItsRow()
+{
+    using Row = CatalogRow<typename Provider::Record>;
+    if constexpr (Row::enumeration != EnumerationForm::Own)
+        static_assert(std::is_same_v<decltype(&Provider::enum_instances), decltype(&Form::enum_instances)>,
+                      "an enumeration of its own, which the row does not say");
+    static_assert(duties<Provider> == Row::duties, "the provider does not do what its row says");
+    return true;
+}
+
+#define TVR_CLASS(name, form, group, does)                                                                             \
+    class TVRHBA_##name##_Provider : public Extended<TVRHBA_##name, form##Form<TVRHBA_##name>>                         \
+    {};                                                                                                                \
+    static_assert(keepsItsRow<TVRHBA_##name##_Provider, form##Form<TVRHBA_##name>>());
 #include "agent/ClassCatalog.def"
 
 } // namespace cimple

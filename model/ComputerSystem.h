@@ -1,23 +1,25 @@
 // The host and its chassis: found by up-call, or generated.
 #pragma once
 
-#include "agent/ProviderAgent.h"
-#include "schema/CIM_Chassis.h"
-#include "schema/CIM_ComputerSystem.h"
+#include "agent/RefreshContext.h"
+
+#include <cstdint>
 
 namespace cimple
 {
 
-/// Finds the host's computer system by up-call, or generates one, and puts it in its map. True when it is there.
-bool createComputerSystem(ProviderAgent& agent);
+/// Up-calls for the host's computer system and chassis; the answers stay in the agent.
+void askPlatform(ProviderAgent& agent);
 
-/// The computer system of this refresh; null before createComputerSystem().
-CIM_ComputerSystem* computerSystem(const ProviderAgent& agent);
+// --- steps; each returns a BuildStatus
 
-/// The host's chassis by up-call, or null.
-Ref<CIM_Chassis> findChassis();
+/// Puts the platform's computer system, or a generated one, in its map.
+std::uint32_t createComputerSystem(HostContext& host);
 
-/// A chassis for a host that has none.
-Ref<CIM_Chassis> generateChassis();
+/// Holds the platform's chassis, if it has one.
+std::uint32_t takePlatformChassis(HostContext& host);
+
+/// Puts a generated chassis in its map where the platform has none.
+std::uint32_t createChassis(HostContext& host);
 
 } // namespace cimple

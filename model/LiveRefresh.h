@@ -2,12 +2,17 @@
 #pragma once
 
 #include "agent/ProviderAgent.h"
+#include "schema/AllClasses.h"
 
 namespace cimple
 {
 
-/// Updates the map of one active class in place; the caller holds all locks of the refresh. A class specialises it
-/// when its live data are read; until then its map is served as it is.
-template <class Record> void liveRefresh(ProviderAgent&) {}
+/// Updates the map of one class of the Active form in place; the caller holds all locks of the refresh.
+template <class Record> void liveRefresh(ProviderAgent& agent);
+
+template <> void liveRefresh<TVRHBA_FCPort>(ProviderAgent& agent);
+template <> void liveRefresh<TVRHBA_FCPortStatistics>(ProviderAgent& agent);
+template <> void liveRefresh<TVRHBA_DriverParams>(ProviderAgent& agent);
+template <> void liveRefresh<TVRHBA_DriverParamGlobal>(ProviderAgent& agent);
 
 } // namespace cimple

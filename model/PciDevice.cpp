@@ -1,17 +1,12 @@
 // The PCI device of a port, from the registers that the RM library reads.
+#include "agent/Build.h"
 #include "device/Bindings.h"
 #include "device/TVR_MethodWrapper.h"
-#include "model/Build.h"
-#include "model/ComputerSystem.h"
 #include "model/PhysicalModel.h"
-#include "model/Slices.h"
-#include "schema/TVRHBA_ElementVPD.h"
 #include "schema/TVRHBA_PCIDevice.h"
 #include "schema/TVRHBA_PCIElementConformsToProfile.h"
+#include "schema/TVRHBA_RegisteredProfile.h"
 #include "schema/TVRHBA_SystemDevice.h"
-#include "schema/TVRHBA_VitalProductData.h"
-
-#include <cstring>
 
 namespace cimple
 {
@@ -205,86 +200,75 @@ RM_PciRegisters readRegisters(const HBA_WWN& wwpn)
     return registers;
 }
 
-void fillDevice(Device& device, ProviderAgent& agent, unsigned adapterIndex, const FCPort& port,
-                const FCAdapterAttributes& attributes, const RM_PciRegisters& registers)
+Ref<Device> makeDevice(const PortContext& port, const RM_PciRegisters& registers)
 {
-    const CIM_ComputerSystem* system = computerSystem(agent);
+    Ref<Device> made = fresh<Device>();
+    const CIM_ComputerSystem* system = port.host.system;
+    const FCAdapterAttributes& attributes = port.on.attributes;
     const unsigned pciDeviceId = wordAt(registers, 2);
-    device.SystemCreationClassName.set(system->CreationClassName.value);
-    device.SystemName.set(system->Name.value);
-    device.CreationClassName.set(className<Device>());
-    device.DeviceID.set(formatText("%s:0x%04X", port.name.c_str(), pciDeviceId));
-    device.ElementName.set(formatText("Tavrin:FCAdapter%d", static_cast<int>(adapterIndex)));
-    device.HealthState.set(5);
-    device.EnabledState.set(5);
-    device.RequestedState.set(5);
-    device.PrimaryStatus.set(5);
-    device.FunctionNumber.set(static_cast<std::uint8_t>(attributes.pciFunctionNumber));
-    device.BusNumber.set(static_cast<std::uint8_t>(attributes.pciBusNumber));
-    fillHeader(device, registers);
-    fillArea(device, registers);
+    made->SystemCreationClassName.set(system->CreationClassName.value);
+    made->SystemName.set(system->Name.value);
+    made->CreationClassName.set(className<Device>());
+    made->DeviceID.set(formatText("%s:0x%04X", port.port.name.c_str(), pciDeviceId));
+    made->ElementName.set(formatText("Tavrin:FCAdapter%d", static_cast<int>(port.on.index)));
+    made->HealthState.set(5);
+    made->EnabledState.set(5);
+    made->RequestedState.set(5);
+    made->PrimaryStatus.set(5);
+    made->FunctionNumber.set(static_cast<std::uint8_t>(attributes.pciFunctionNumber));
+    made->BusNumber.set(static_cast<std::uint8_t>(attributes.pciBusNumber));
+    fillHeader(*made, registers);
+    fillArea(*made, registers);
+    return made;
 }
 
-std::uint32_t associateDevice(ProviderAgent& agent, const Device* device, const TVRHBA_RegisteredProfile* profile)
+std::uint32_t associateDevice(HostContext& host, const Device* device)
 {
     using Conforms = TVRHBA_PCIElementConformsToProfile;
-    auto conforms = associate<Conforms>(&Conforms::ConformantStandard, profile, &Conforms::ManagedElement, device);
-    if (!conforms)
-        return TVR_LOG(TVR_CRIT, "Failed to create TVRHBA_PCIElementConformsToProfile"), BUILD_NO_INSTANCE;
-    if (!insert(agent.m_TVRHBA_PCIElementConformsToProfile_map, conforms,
-                "Insert Failed : m_TVRHBA_PCIElementConformsToProfile_map"))
+    switch (join<Conforms>(host.agent, &Conforms::ConformantStandard, host.profiles.find("PCI Device"),
+                           &Conforms::ManagedElement, device,
+                           "Insert Failed : m_TVRHBA_PCIElementConformsToProfile_map"))
+    {
+    case Joined::Made:
+        break;
+    case Joined::Refused:
         return BUILD_FAILED;
+    default:
+        return failed("Failed to create TVRHBA_PCIElementConformsToProfile", BUILD_NO_INSTANCE);
+    }
 
     using OfSystem = TVRHBA_SystemDevice;
-    auto ofSystem =
-        associate<OfSystem>(&OfSystem::GroupComponent, computerSystem(agent), &OfSystem::PartComponent, device);
-    if (!ofSystem)
-        return TVR_LOG(TVR_CRIT, "Failed to create TVRHBA_SystemDevice"), BUILD_NO_INSTANCE;
-    if (!insert(agent.m_TVRHBA_SystemDevice_map, ofSystem, "Insert Failed : m_TVRHBA_SystemDevice_map"))
+    switch (join<OfSystem>(host.agent, &OfSystem::GroupComponent, host.system, &OfSystem::PartComponent, device,
+                           "Insert Failed : m_TVRHBA_SystemDevice_map"))
+    {
+    case Joined::Made:
+        return BUILD_DONE;
+    case Joined::Refused:
         return BUILD_FAILED;
-    return BUILD_DONE;
-}
-
-/// Relates the device to the port's vital product data; the device stands without it.
-void associateVpd(ProviderAgent& agent, const Device* device, const FCPort& port)
-{
-    const auto* vpd = findFirst<TVRHBA_VitalProductData>(
-        agent.m_TVRHBA_VitalProductData_map,
-        [&](const auto& known) { return std::strstr(known.InstanceID.value.c_str(), port.name.c_str()) != nullptr; });
-    using OfElement = TVRHBA_ElementVPD;
-    if (auto ofElement = associate<OfElement>(&OfElement::SettingData, vpd, &OfElement::ManagedElement, device))
-        insert(agent.m_TVRHBA_ElementVPD_map, ofElement, "Insert Failed : m_TVRHBA_ElementVPD_map");
+    default:
+        return failed("Failed to create TVRHBA_SystemDevice", BUILD_NO_INSTANCE);
+    }
 }
 
 } // namespace
 
-std::uint32_t createPCIDeviceInstance(ProviderAgent& agent, unsigned adapterIndex, unsigned portIndex,
-                                      const FCPort& port, const FCAdapter& adapter,
-                                      const TVRHBA_RegisteredProfile* pciDeviceProfile)
+std::uint32_t createPCIDeviceInstance(PortContext& port)
 {
-    TVR_LOG(TVR_DBG, "MAC address in std::string format = %s and size = %zu", port.name.c_str(), port.name.size());
+    const std::string& name = port.port.name;
+    TVR_LOG(TVR_DBG, "MAC address in std::string format = %s and size = %zu", name.c_str(), name.size());
     char hbaName[24];
     HBA_WWN wwpn;
-    if (TVR_MethodWrapper::Id2HBAName(hbaName, port.name.c_str()) != 0)
-        return TVR_LOG(TVR_DBG, "TVRHBA_PCIPort Id2HBAName failed"), BUILD_FAILED;
+    if (TVR_MethodWrapper::Id2HBAName(hbaName, name.c_str()) != 0)
+        return failed({TVR_DBG, "TVRHBA_PCIPort Id2HBAName failed"});
     if (TVR_MethodWrapper::str2HBAName(&wwpn, hbaName) != 0)
-        return TVR_LOG(TVR_ERR, "::str2HBAName failed"), BUILD_FAILED;
+        return failed({TVR_ERR, "::str2HBAName failed"});
     const RM_PciRegisters registers = readRegisters(wwpn);
 
-    Ref<Device> made(create<Device>(true));
+    const Ref<Device> made = unlessOutOfMemory([&] { return makeDevice(port, registers); });
     if (!made)
-        return TVR_LOG(TVR_CRIT, "Failed to create TVRHBA_PCIDevice"), BUILD_NO_INSTANCE;
-    fillDevice(*made, agent, adapterIndex, port, attributesOf(adapter), registers);
-    const Device* device = insert(agent.m_TVRHBA_PCIDevice_map, made, "Insert Failed : m_TVRHBA_PCIDevice_map");
-    if (!device)
-        return BUILD_FAILED;
-    if (const std::uint32_t status = associateDevice(agent, device, pciDeviceProfile); status != BUILD_DONE)
-        return status;
-
-    if (CreateVPD(agent, adapterIndex, portIndex, port) != BUILD_DONE)
-        TVR_LOG(TVR_DBG, "FC port %s CreateVPD failed", port.name.c_str());
-    associateVpd(agent, device, port);
-    return BUILD_DONE;
+        return failed("Failed to create TVRHBA_PCIDevice", BUILD_NO_INSTANCE);
+    const Device* device = mapOf<Device>(port.host.agent).insert(made, "Insert Failed : m_TVRHBA_PCIDevice_map");
+    return device ? associateDevice(port.host, device) : BUILD_FAILED;
 }
 
 } // namespace cimple

@@ -1,19 +1,24 @@
 #include "model/PhysicalModel.h"
 
-#include "model/Build.h"
-#include "model/ComputerSystem.h"
+#include "agent/Build.h"
+#include "schema/TVRHBA_Card.h"
 #include "schema/TVRHBA_CardConformsToProfile.h"
 #include "schema/TVRHBA_CardContainsChip.h"
 #include "schema/TVRHBA_CardContainsConnector.h"
 #include "schema/TVRHBA_ChassisContainsCard.h"
+#include "schema/TVRHBA_Chip.h"
 #include "schema/TVRHBA_ConnectorDependsOnChip.h"
 #include "schema/TVRHBA_HostedCollection.h"
 #include "schema/TVRHBA_InstallServiceAffectsChip.h"
+#include "schema/TVRHBA_LogicalPortGroup.h"
+#include "schema/TVRHBA_PhysicalConnector.h"
+#include "schema/TVRHBA_Product.h"
 #include "schema/TVRHBA_ProductPhysicalComponent.h"
 #include "schema/TVRHBA_ProductPhysicalConnector.h"
 #include "schema/TVRHBA_ProviderElementSoftwareIdentity.h"
-
-#include <stdexcept>
+#include "schema/TVRHBA_RegisteredProfile.h"
+#include "schema/TVRHBA_SoftwareIdentity.h"
+#include "schema/TVRHBA_SoftwareInstallationService.h"
 
 namespace cimple
 {
@@ -38,7 +43,7 @@ struct HardwareTexts
 Ref<TVRHBA_Product> makeProduct(const FCAdapterAttributes& attributes)
 {
     const HardwareTexts texts(attributes);
-    Ref<TVRHBA_Product> product(create<TVRHBA_Product>(true));
+    Ref<TVRHBA_Product> product = fresh<TVRHBA_Product>();
     product->Description.set(texts.modelDescription);
     product->ElementName.set(attributes.nodeSymbolicName);
     product->Name.set(texts.model);
@@ -51,7 +56,7 @@ Ref<TVRHBA_Product> makeProduct(const FCAdapterAttributes& attributes)
 Ref<TVRHBA_LogicalPortGroup> makePortGroup(const FCAdapterAttributes& attributes)
 {
     const String nodeWWN(attributes.nodeWWN);
-    Ref<TVRHBA_LogicalPortGroup> group(create<TVRHBA_LogicalPortGroup>(true));
+    Ref<TVRHBA_LogicalPortGroup> group = fresh<TVRHBA_LogicalPortGroup>();
     group->InstanceID.set(formatText("TVR FC HBA:%s", nodeWWN.c_str()));
     group->Description.set("The Fibre Channel ports of the HBA.");
     group->Name.set(nodeWWN);
@@ -63,7 +68,7 @@ Ref<TVRHBA_LogicalPortGroup> makePortGroup(const FCAdapterAttributes& attributes
 Ref<TVRHBA_Card> makeCard(const FCAdapterAttributes& attributes)
 {
     const HardwareTexts texts(attributes);
-    Ref<TVRHBA_Card> card(create<TVRHBA_Card>(true));
+    Ref<TVRHBA_Card> card = fresh<TVRHBA_Card>();
     card->CreationClassName.set(className<TVRHBA_Card>());
     card->Tag.set(texts.serialNumber);
     card->OtherIdentifyingInfo.set(texts.serialNumber);
@@ -103,7 +108,7 @@ String chipTag(const FCAdapterAttributes& attributes)
 Ref<TVRHBA_Chip> makeChip(const FCAdapterAttributes& attributes)
 {
     const HardwareTexts texts(attributes);
-    Ref<TVRHBA_Chip> chip(create<TVRHBA_Chip>(true));
+    Ref<TVRHBA_Chip> chip = fresh<TVRHBA_Chip>();
     chip->CreationClassName.set(className<TVRHBA_Chip>());
     chip->Tag.set(chipTag(attributes));
     chip->Name.set(texts.model);
@@ -124,17 +129,22 @@ Ref<TVRHBA_Chip> makeChip(const FCAdapterAttributes& attributes)
     return chip;
 }
 
-Ref<TVRHBA_PhysicalConnector> makeConnector(const FCAdapterAttributes& attributes)
+/// An adapter object has its own port as port 0; further ports of the same object are told apart by their own WWPNs.
+String connectorTag(const PortContext& port)
+{
+    return String(port.index == 0 ? port.on.attributes.port0WWPN : port.port.name);
+}
+
+Ref<TVRHBA_PhysicalConnector> makeConnector(const FCAdapterAttributes& attributes, const String& tag)
 {
     const HardwareTexts texts(attributes);
-    const String port0WWPN(attributes.port0WWPN);
     const auto port = static_cast<int>(attributes.portNumber);
-    Ref<TVRHBA_PhysicalConnector> connector(create<TVRHBA_PhysicalConnector>(true));
+    Ref<TVRHBA_PhysicalConnector> connector = fresh<TVRHBA_PhysicalConnector>();
     connector->CreationClassName.set(className<TVRHBA_PhysicalConnector>());
-    connector->Tag.set(port0WWPN);
+    connector->Tag.set(tag);
     connector->InstanceID.set(formatText("%s:%d", texts.serialNumber.c_str(), port));
     connector->OtherIdentifyingInfo.set(formatText("LocalPhysicalPort:%d,Transceiver:SFP", port));
-    connector->Name.set(port0WWPN);
+    connector->Name.set(tag);
     connector->Manufacturer.set(texts.manufacturer);
     connector->Model.set(texts.model);
     connector->Description.set(texts.modelDescription);
@@ -146,144 +156,123 @@ Ref<TVRHBA_PhysicalConnector> makeConnector(const FCAdapterAttributes& attribute
 
 } // namespace
 
-const FCAdapterAttributes& attributesOf(const FCAdapter& adapter)
+std::uint32_t createPackageInstances(AdapterContext& on)
 {
-    const auto* attributes = dynamic_cast<const FCAdapterAttributes*>(adapter.getAttributes());
-    if (!attributes)
-        throw std::runtime_error("FC adapter without attributes");
-    return *attributes;
-}
-
-std::uint32_t createPackageInstances(ProviderAgent& agent, const FCAdapter& adapter, TVRHBA_Product*& product,
-                                     TVRHBA_LogicalPortGroup*& group)
-{
-    const FCAdapterAttributes& attributes = attributesOf(adapter);
-    const String serialNumber(attributes.serialNumber);
-    product = findFirst<TVRHBA_Product>(agent.m_TVRHBA_Product_map, [&](const auto& known)
-                                        { return known.IdentifyingNumber.value == serialNumber; });
-    if (!product)
-        product = insert(agent.m_TVRHBA_Product_map, makeProduct(attributes), "Insert Failed : m_TVRHBA_Product_map");
-    if (!product)
+    ProviderAgent& agent = on.host.agent;
+    const String serialNumber(on.attributes.serialNumber);
+    on.product = mapOf<TVRHBA_Product>(agent).findFirst([&](const auto& known)
+                                                        { return known.IdentifyingNumber.value == serialNumber; });
+    if (!on.product)
+        on.product =
+            mapOf<TVRHBA_Product>(agent).insert(makeProduct(on.attributes), "Insert Failed : m_TVRHBA_Product_map");
+    if (!on.product)
         return BUILD_FAILED;
 
-    Ref<TVRHBA_LogicalPortGroup> made = makePortGroup(attributes);
-    group = findFirst<TVRHBA_LogicalPortGroup>(agent.m_TVRHBA_LogicalPortGroup_map, [&](const auto& known)
-                                               { return known.InstanceID.value == made->InstanceID.value; });
-    if (group)
+    Ref<TVRHBA_LogicalPortGroup> made = makePortGroup(on.attributes);
+    on.group = mapOf<TVRHBA_LogicalPortGroup>(agent).withKeysOf(made.get());
+    if (on.group)
         return BUILD_DONE;
-    group = insert(agent.m_TVRHBA_LogicalPortGroup_map, made, "Insert Failed : m_TVRHBA_LogicalPortGroup_map");
-    if (!group)
+    on.group = mapOf<TVRHBA_LogicalPortGroup>(agent).insert(made, "Insert Failed : m_TVRHBA_LogicalPortGroup_map");
+    if (!on.group)
         return BUILD_FAILED;
     using Hosted = TVRHBA_HostedCollection;
-    auto hosted = associate<Hosted>(&Hosted::Antecedent, computerSystem(agent), &Hosted::Dependent, group);
-    if (hosted && !insert(agent.m_TVRHBA_HostedCollection_map, hosted, "Insert Failed : m_TVRHBA_HostedCollection_map"))
-        return BUILD_FAILED;
-    return BUILD_DONE;
+    const Joined hosted = join<Hosted>(agent, &Hosted::Antecedent, on.host.system, &Hosted::Dependent, on.group,
+                                       "Insert Failed : m_TVRHBA_HostedCollection_map");
+    return hosted == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
 }
 
-std::uint32_t createCardInstances(ProviderAgent& agent, const FCAdapter& adapter, TVRHBA_Card*& card, bool& isNew)
+std::uint32_t createCardInstances(AdapterContext& on)
 {
-    const FCAdapterAttributes& attributes = attributesOf(adapter);
-    const String serialNumber(attributes.serialNumber);
-    card = findLast<TVRHBA_Card>(agent.m_TVRHBA_Card_map,
-                                 [&](const auto& known) { return known.TVRSerialNumber.value == serialNumber; });
-    isNew = !card;
-    if (isNew)
-        card = insert(agent.m_TVRHBA_Card_map, makeCard(attributes), "Insert Failed : m_TVRHBA_Card_map");
-    return card ? BUILD_DONE : BUILD_FAILED;
+    ProviderAgent& agent = on.host.agent;
+    const String serialNumber(on.attributes.serialNumber);
+    on.card = mapOf<TVRHBA_Card>(agent).findLast([&](const auto& known)
+                                                 { return known.TVRSerialNumber.value == serialNumber; });
+    on.cardIsNew = !on.card;
+    if (on.cardIsNew)
+        on.card = mapOf<TVRHBA_Card>(agent).insert(makeCard(on.attributes), "Insert Failed : m_TVRHBA_Card_map");
+    return on.card ? BUILD_DONE : BUILD_FAILED;
 }
 
-std::uint32_t createCardAssociations(ProviderAgent& agent, const TVRHBA_Card* card, const CardSurroundings& around)
+std::uint32_t createCardAssociations(PortContext& port)
 {
+    if (!port.on.cardIsNew)
+        return BUILD_DONE;
+    TVR_LOG(TVR_DBG, "Card is created. Creating the associations");
+    HostContext& host = port.host;
+    const TVRHBA_Card* card = port.on.card;
+
     using Component = TVRHBA_ProductPhysicalComponent;
-    auto component = associate<Component>(&Component::GroupComponent, around.product, &Component::PartComponent, card);
-    if (component && !insert(agent.m_TVRHBA_ProductPhysicalComponent_map, component,
-                             "Insert Failed : m_TVRHBA_ProductPhysicalComponent_map"))
+    if (join<Component>(host.agent, &Component::GroupComponent, port.on.product, &Component::PartComponent, card,
+                        "Insert Failed : m_TVRHBA_ProductPhysicalComponent_map") == Joined::Refused)
         return BUILD_FAILED;
 
     using Identity = TVRHBA_ProviderElementSoftwareIdentity;
-    auto identity = associate<Identity>(&Identity::Antecedent, around.providerIdentity, &Identity::Dependent, card);
-    if (identity)
-    {
-        identity->ElementSoftwareStatus.set({2, 6});
-        if (!insert(agent.m_TVRHBA_ProviderElementSoftwareIdentity_map, identity,
-                    "Insert Failed (CNA): m_TVRHBA_ProviderElementSoftwareIdentity_map"))
-            return BUILD_FAILED;
-    }
+    if (join<Identity>(host.agent, &Identity::Antecedent, host.providerIdentity, &Identity::Dependent, card,
+                       "Insert Failed (CNA): m_TVRHBA_ProviderElementSoftwareIdentity_map",
+                       [](Identity& identity) {
+                           identity.ElementSoftwareStatus.set({2, 6});
+                       }) == Joined::Refused)
+        return BUILD_FAILED;
 
     using Conforms = TVRHBA_CardConformsToProfile;
-    auto conforms =
-        associate<Conforms>(&Conforms::ConformantStandard, around.physicalAsset, &Conforms::ManagedElement, card);
-    if (conforms && !insert(agent.m_TVRHBA_CardConformsToProfile_map, conforms,
-                            "Insert Failed : m_TVRHBA_CardConformsToProfile_map"))
+    if (join<Conforms>(host.agent, &Conforms::ConformantStandard, host.profiles.find("Physical Asset"),
+                       &Conforms::ManagedElement, card,
+                       "Insert Failed : m_TVRHBA_CardConformsToProfile_map") == Joined::Refused)
         return BUILD_FAILED;
 
     using Contains = TVRHBA_ChassisContainsCard;
-    auto contains = associate<Contains>(&Contains::GroupComponent, around.chassis, &Contains::PartComponent, card);
-    if (contains &&
-        !insert(agent.m_TVRHBA_ChassisContainsCard_map, contains, "Insert Failed:TVRHBA_ChassisContainsCard"))
-        return BUILD_FAILED;
-    return BUILD_DONE;
+    const Joined contained = join<Contains>(host.agent, &Contains::GroupComponent, host.chassis.get(),
+                                            &Contains::PartComponent, card, "Insert Failed:TVRHBA_ChassisContainsCard");
+    return contained == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
 }
 
-std::uint32_t createChipInstances(ProviderAgent& agent, const FCAdapter& adapter, const TVRHBA_Card* card,
-                                  const TVRHBA_SoftwareInstallationService* installService, TVRHBA_Chip*& chip,
-                                  ChipKind& kind)
+std::uint32_t createChipInstances(PortContext& port)
 {
-    const FCAdapterAttributes& attributes = attributesOf(adapter);
-    kind = chipKind(attributes);
+    ProviderAgent& agent = port.host.agent;
+    const FCAdapterAttributes& attributes = port.on.attributes;
+    port.chipKind = chipKind(attributes);
     const String tag = chipTag(attributes);
-    chip = findLast<TVRHBA_Chip>(agent.m_TVRHBA_Chip_map, [&](const auto& known) { return known.Tag.value == tag; });
-    if (chip)
+    port.chip = mapOf<TVRHBA_Chip>(agent).findLast([&](const auto& known) { return known.Tag.value == tag; });
+    if (port.chip)
         return BUILD_DONE;
-    chip = insert(agent.m_TVRHBA_Chip_map, makeChip(attributes), "Insert Failed : m_TVRHBA_Chip_map");
-    if (!chip)
+    port.chip = mapOf<TVRHBA_Chip>(agent).insert(makeChip(attributes), "Insert Failed : m_TVRHBA_Chip_map");
+    if (!port.chip)
         return BUILD_FAILED;
 
     using Contains = TVRHBA_CardContainsChip;
-    auto contains = associate<Contains>(&Contains::GroupComponent, card, &Contains::PartComponent, chip);
-    if (contains && !insert(agent.m_TVRHBA_CardContainsChip_map, contains, "Insert Failed : TVRHBA_Container"))
+    if (join<Contains>(agent, &Contains::GroupComponent, port.on.card, &Contains::PartComponent, port.chip,
+                       "Insert Failed : TVRHBA_Container") == Joined::Refused)
         return BUILD_FAILED;
 
     using Affects = TVRHBA_InstallServiceAffectsChip;
-    auto affects = associate<Affects>(&Affects::AffectingElement, installService, &Affects::AffectedElement, chip);
-    if (affects)
-    {
-        affects->ElementEffects.set({5});
-        insert(agent.m_TVRHBA_InstallServiceAffectsChip_map, affects, "Insert Failed:TVRHBA_InstallServiceAffectsChip");
-    }
+    join<Affects>(agent, &Affects::AffectingElement, port.host.installationService, &Affects::AffectedElement,
+                  port.chip, "Insert Failed:TVRHBA_InstallServiceAffectsChip",
+                  [](Affects& affects) { affects.ElementEffects.set({5}); });
     return BUILD_DONE;
 }
 
-std::uint32_t createPhysicalConnectorInstances(ProviderAgent& agent, const FCAdapter& adapter, const TVRHBA_Chip* chip,
-                                               const TVRHBA_Card* card, const TVRHBA_Product* product,
-                                               TVRHBA_PhysicalConnector*& connector)
+std::uint32_t createPhysicalConnectorInstances(PortContext& port)
 {
-    connector = insert(agent.m_TVRHBA_PhysicalConnector_map, makeConnector(attributesOf(adapter)),
-                       "Insert Failed (HBA): m_TVRHBA_PhysicalConnector");
-    if (!connector)
-        return BUILD_FAILED;
+    ProviderAgent& agent = port.host.agent;
+    port.connector = mapOf<TVRHBA_PhysicalConnector>(agent).insert(
+        makeConnector(port.on.attributes, connectorTag(port)), "Insert Failed (HBA): m_TVRHBA_PhysicalConnector");
+    if (!port.connector)
+        return BUILD_NO_INSTANCE;
 
     using OfProduct = TVRHBA_ProductPhysicalConnector;
-    auto ofProduct = associate<OfProduct>(&OfProduct::GroupComponent, product, &OfProduct::PartComponent, connector);
-    if (ofProduct && !insert(agent.m_TVRHBA_ProductPhysicalConnector_map, ofProduct,
-                             "Insert Failed (HBA): TVRHBA_ProductPhysicalConnector"))
-        return BUILD_FAILED;
-    if (!card || !chip)
-        return BUILD_DONE;
+    if (join<OfProduct>(agent, &OfProduct::GroupComponent, port.on.product, &OfProduct::PartComponent, port.connector,
+                        "Insert Failed (HBA): TVRHBA_ProductPhysicalConnector") == Joined::Refused)
+        return BUILD_NO_INSTANCE;
 
     using OnCard = TVRHBA_CardContainsConnector;
-    auto onCard = associate<OnCard>(&OnCard::GroupComponent, card, &OnCard::PartComponent, connector);
-    if (onCard &&
-        !insert(agent.m_TVRHBA_CardContainsConnector_map, onCard, "Insert Failed (HBA): TVRHBA_CardContainsConnector"))
-        return BUILD_FAILED;
+    if (join<OnCard>(agent, &OnCard::GroupComponent, port.on.card, &OnCard::PartComponent, port.connector,
+                     "Insert Failed (HBA): TVRHBA_CardContainsConnector") == Joined::Refused)
+        return BUILD_NO_INSTANCE;
 
     using OnChip = TVRHBA_ConnectorDependsOnChip;
-    auto onChip = associate<OnChip>(&OnChip::Antecedent, connector, &OnChip::Dependent, chip);
-    if (onChip && !insert(agent.m_TVRHBA_ConnectorDependsOnChip_map, onChip,
-                          "Insert Failed (CNA): TVRHBA_ConnectorDependsOnChip"))
-        return BUILD_FAILED;
-    return BUILD_DONE;
+    const Joined onChip = join<OnChip>(agent, &OnChip::Antecedent, port.connector, &OnChip::Dependent, port.chip,
+                                       "Insert Failed (CNA): TVRHBA_ConnectorDependsOnChip");
+    return onChip == Joined::Refused ? BUILD_NO_INSTANCE : BUILD_DONE;
 }
 
 } // namespace cimple

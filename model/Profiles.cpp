@@ -1,8 +1,6 @@
 #include "model/Profiles.h"
 
-#include "agent/ProviderProc.h"
-#include "model/Build.h"
-#include "model/ComputerSystem.h"
+#include "agent/Build.h"
 #include "schema/TVRHBA_ComputerSystemConformsToProfile.h"
 
 namespace cimple
@@ -36,39 +34,36 @@ constexpr ProfileRow hostProfiles[] = {
 
 } // namespace
 
-TVRHBA_RegisteredProfile* findProfile(const ProviderAgent& agent, const char* name)
-{
-    const String id = formatText("TVR:%s", name);
-    return findFirst<TVRHBA_RegisteredProfile>(agent.m_TVRHBA_RegisteredProfile_map,
-                                               [&](const auto& profile) { return profile.InstanceID.value == id; });
-}
-
-TVRHBA_RegisteredProfile* createRegisteredProfile(ProviderAgent& agent, const char* name, std::uint16_t organization,
+TVRHBA_RegisteredProfile* createRegisteredProfile(HostContext& host, const char* name, std::uint16_t organization,
                                                   const char* version)
 {
     TVR_LOG(TVR_DBG, "Generating TVRHBA_RegisteredProfile (%s)", name);
-    if (TVRHBA_RegisteredProfile* existing = findProfile(agent, name))
+    if (TVRHBA_RegisteredProfile* existing = host.profiles.find(name))
     {
         TVR_LOG(TVR_DBG, "Got TVRHBA_RegisteredProfile in the map (%s)", name);
         return existing;
     }
-    Ref<TVRHBA_RegisteredProfile> profile(create<TVRHBA_RegisteredProfile>(true));
-    profile->__name_space = interopNamespace;
-    profile->Description.set(formatText("Tavrin %s", name));
-    profile->ElementName.set(formatText("Tavrin Registered %s", name));
-    profile->RegisteredOrganization.set(organization);
-    profile->RegisteredName.set(name);
-    profile->RegisteredVersion.set(version);
-    profile->InstanceID.set(formatText("TVR:%s", name));
-    profile->AdvertiseTypes.set({3});
-    profile->AdvertiseTypeDescriptions.set({"SLP"});
-    return insert(agent.m_TVRHBA_RegisteredProfile_map, profile, "Insert Failed : m_TVRHBA_RegisteredProfile_map");
+    Ref<TVRHBA_RegisteredProfile> made = fresh<TVRHBA_RegisteredProfile>();
+    made->__name_space = interopNamespace;
+    made->Description.set(formatText("Tavrin %s", name));
+    made->ElementName.set(formatText("Tavrin Registered %s", name));
+    made->RegisteredOrganization.set(organization);
+    made->RegisteredName.set(name);
+    made->RegisteredVersion.set(version);
+    made->InstanceID.set(formatText("TVR:%s", name));
+    made->AdvertiseTypes.set({3});
+    made->AdvertiseTypeDescriptions.set({"SLP"});
+    TVRHBA_RegisteredProfile* profile =
+        mapOf<TVRHBA_RegisteredProfile>(host.agent).insert(made, "Insert Failed : m_TVRHBA_RegisteredProfile_map");
+    if (profile)
+        host.profiles.add(name, profile);
+    return profile;
 }
 
-void createComputerSystemConformsToProfile(ProviderAgent& agent, const TVRHBA_RegisteredProfile* profile)
+void createComputerSystemConformsToProfile(HostContext& host, const TVRHBA_RegisteredProfile* profile)
 {
     TVR_LOG(TVR_DBG, "inside createComputerSystemConformsToProfile");
-    if (!agent.m_bOwnComputerSystem)
+    if (!host.agent.m_bOwnComputerSystem)
     {
         TVR_LOG(TVR_DBG, "This is IBM/VMWare comp Sys - do nothing");
         return;
@@ -78,17 +73,16 @@ void createComputerSystemConformsToProfile(ProviderAgent& agent, const TVRHBA_Re
     TVR_LOG(TVR_DBG, "Generating TVRHBA_ComputerSystemConformsToProfile (Computer System,%s)",
             profile->InstanceID.value.c_str());
     using Conforms = TVRHBA_ComputerSystemConformsToProfile;
-    if (auto conforms = associate<Conforms>(&Conforms::ConformantStandard, profile, &Conforms::ManagedElement,
-                                            computerSystem(agent)))
-        insert(agent.m_TVRHBA_ComputerSystemConformsToProfile_map, conforms,
-               "Insert Failed : m_TVRHBA_ComputerSystemConformsToProfile_map");
+    join<Conforms>(host.agent, &Conforms::ConformantStandard, profile, &Conforms::ManagedElement, host.system,
+                   "Insert Failed : m_TVRHBA_ComputerSystemConformsToProfile_map");
 }
 
-void createProfiles(ProviderAgent& agent)
+std::uint32_t createProfiles(HostContext& host)
 {
     for (const ProfileRow& row : hostProfiles)
-        createComputerSystemConformsToProfile(agent,
-                                              createRegisteredProfile(agent, row.name, row.organization, row.version));
+        createComputerSystemConformsToProfile(host,
+                                              createRegisteredProfile(host, row.name, row.organization, row.version));
+    return BUILD_DONE;
 }
 
 } // namespace cimple

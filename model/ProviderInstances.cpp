@@ -1,13 +1,12 @@
 #include "model/ProviderInstances.h"
 
-#include "agent/ModelStages.h"
-#include "model/Build.h"
-#include "model/ComputerSystem.h"
-#include "model/Profiles.h"
+#include "agent/Build.h"
 #include "schema/TVRHBA_InstalledSoftwareIdentity.h"
 #include "schema/TVRHBA_ProviderConfigSetting.h"
 #include "schema/TVRHBA_ProviderSoftwareIdentity.h"
+#include "schema/TVRHBA_RegisteredProfile.h"
 #include "schema/TVRHBA_SoftwareConformsToProfile.h"
+#include "schema/TVRHBA_SoftwareIdentity.h"
 
 namespace cimple
 {
@@ -25,7 +24,7 @@ String providerIdentityId()
 
 Ref<TVRHBA_SoftwareIdentity> makeProviderIdentity()
 {
-    Ref<TVRHBA_SoftwareIdentity> identity(create<TVRHBA_SoftwareIdentity>(true));
+    Ref<TVRHBA_SoftwareIdentity> identity = fresh<TVRHBA_SoftwareIdentity>();
     identity->InstanceID.set(providerIdentityId());
     identity->Name.set("Tavrin CMPI HBA Provider");
     identity->ElementName.set("Tavrin CMPI HBA Provider");
@@ -64,7 +63,7 @@ constexpr SettingRow settings[] = {
 
 Ref<TVRHBA_ProviderConfigSetting> makeSetting(const SettingRow& row, std::uint32_t current)
 {
-    Ref<TVRHBA_ProviderConfigSetting> setting(create<TVRHBA_ProviderConfigSetting>(true));
+    Ref<TVRHBA_ProviderConfigSetting> setting = fresh<TVRHBA_ProviderConfigSetting>();
     setting->InstanceID.set(row.id);
     setting->Description.set(row.description);
     setting->paramname.set(row.name);
@@ -77,45 +76,36 @@ Ref<TVRHBA_ProviderConfigSetting> makeSetting(const SettingRow& row, std::uint32
 
 } // namespace
 
-TVRHBA_SoftwareIdentity* findProviderSoftwareIdentity(const ProviderAgent& agent)
+std::uint32_t createProviderSoftwareIdentity(HostContext& host)
 {
-    const String id = providerIdentityId();
-    return findFirst<TVRHBA_SoftwareIdentity>(agent.m_TVRHBA_SoftwareIdentity_map,
-                                              [&](const auto& identity) { return identity.InstanceID.value == id; });
-}
-
-std::uint32_t createProviderSoftwareIdentity(ProviderAgent& agent)
-{
-    const TVRHBA_SoftwareIdentity* identity = insert(agent.m_TVRHBA_SoftwareIdentity_map, makeProviderIdentity(),
-                                                     "Insert Failed : m_TVRHBA_SoftwareIdentity_map");
+    ProviderAgent& agent = host.agent;
+    TVRHBA_SoftwareIdentity* identity = mapOf<TVRHBA_SoftwareIdentity>(agent).insert(
+        makeProviderIdentity(), "Insert Failed : m_TVRHBA_SoftwareIdentity_map");
     if (!identity)
         return BUILD_FAILED;
-    const CIM_ComputerSystem* system = computerSystem(agent);
+    host.providerIdentity = identity;
 
     using OfHost = TVRHBA_ProviderSoftwareIdentity;
-    if (auto ofHost = associate<OfHost>(&OfHost::Antecedent, identity, &OfHost::Dependent, system))
-        insert(agent.m_TVRHBA_ProviderSoftwareIdentity_map, ofHost,
-               "Insert Failed : m_TVRHBA_ProviderSoftwareIdentity_map");
+    join<OfHost>(agent, &OfHost::Antecedent, identity, &OfHost::Dependent, host.system,
+                 "Insert Failed : m_TVRHBA_ProviderSoftwareIdentity_map");
     using Installed = TVRHBA_InstalledSoftwareIdentity;
-    if (auto installed = associate<Installed>(&Installed::System, system, &Installed::InstalledSoftware, identity))
-        insert(agent.m_TVRHBA_InstalledSoftwareIdentity_map, installed,
-               "Insert Failed : m_TVRHBA_InstalledSoftwareIdentity_map");
+    join<Installed>(agent, &Installed::System, host.system, &Installed::InstalledSoftware, identity,
+                    "Insert Failed : m_TVRHBA_InstalledSoftwareIdentity_map");
     TVR_LOG(TVR_DBG, "Generating TVRHBA_SoftwareConformsToProfile (CMPI HBA Provider, Software)");
     using Conforms = TVRHBA_SoftwareConformsToProfile;
-    if (auto conforms = associate<Conforms>(&Conforms::ConformantStandard, findProfile(agent, "Software"),
-                                            &Conforms::ManagedElement, identity))
-        insert(agent.m_TVRHBA_SoftwareConformsToProfile_map, conforms,
-               "Insert Failed : m_TVRHBA_SoftwareConformsToProfile_map");
+    join<Conforms>(agent, &Conforms::ConformantStandard, host.profiles.find("Software"), &Conforms::ManagedElement,
+                   identity, "Insert Failed : m_TVRHBA_SoftwareConformsToProfile_map");
     return BUILD_DONE;
 }
 
-std::uint32_t createProviderConfigSettings(ProviderAgent& agent)
+std::uint32_t createProviderConfigSettings(HostContext& host)
 {
+    ProviderAgent& agent = host.agent;
     const std::uint32_t current[] = {static_cast<std::uint32_t>(agent.m_config.getCacheTimeout()),
                                      agent.m_config.getRefreshAdapterData(), agent.m_config.getRefreshSANData()};
     for (std::size_t i = 0; i < std::size(settings); i++)
-        if (!insert(agent.m_TVRHBA_ProviderConfigSetting_map, makeSetting(settings[i], current[i]),
-                    "Insert Failed : m_TVRHBA_ProviderConfigSetting_map"))
+        if (!mapOf<TVRHBA_ProviderConfigSetting>(agent).insert(makeSetting(settings[i], current[i]),
+                                                               "Insert Failed : m_TVRHBA_ProviderConfigSetting_map"))
             return BUILD_FAILED;
     return BUILD_DONE;
 }

@@ -1,15 +1,13 @@
 // The record log that publishes the module's own log, as an instance.
-#include "agent/ModelStages.h"
-#include "model/Build.h"
-#include "model/ComputerSystem.h"
+#include "agent/Build.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
-#include "model/Slices.h"
 #include "schema/TVRHBA_EnabledRecordLogCapabilities.h"
 #include "schema/TVRHBA_ProviderUseOfLog.h"
 #include "schema/TVRHBA_RecordLog.h"
 #include "schema/TVRHBA_RecordLogCapabilities.h"
 #include "schema/TVRHBA_RecordLogConformsToProfile.h"
+#include "schema/TVRHBA_SoftwareIdentity.h"
 
 namespace cimple
 {
@@ -17,12 +15,12 @@ namespace cimple
 namespace
 {
 
-Ref<TVRHBA_RecordLog> makeProviderLog(ProviderAgent& agent)
+Ref<TVRHBA_RecordLog> makeProviderLog(const HostContext& host)
 {
     const TVR_Logger& logger = TVR_Logger::instance();
-    const String id = formatText("TVRHBA:ProviderLog:%s", computerSystem(agent)->Name.value.c_str());
+    const String id = formatText("TVRHBA:ProviderLog:%s", host.system->Name.value.c_str());
     const bool enabled = logger.isEnabled();
-    Ref<TVRHBA_RecordLog> log(create<TVRHBA_RecordLog>(true));
+    Ref<TVRHBA_RecordLog> log = fresh<TVRHBA_RecordLog>();
     log->InstanceID.set(id);
     log->ElementName.set(id);
     log->Name.set("Record logs for Tavrin CIM Provider");
@@ -36,13 +34,13 @@ Ref<TVRHBA_RecordLog> makeProviderLog(ProviderAgent& agent)
     log->EnabledState.set(enabled ? 2 : 3);
     log->LogLevel.set(static_cast<std::uint16_t>(logger.getLevel()));
     log->LogMode.set(static_cast<std::uint16_t>(logger.getMode()));
-    log->TracePath.set(agent.m_fileLogger.getPath());
+    log->TracePath.set(host.agent.m_fileLogger.getPath());
     return log;
 }
 
 Ref<TVRHBA_EnabledRecordLogCapabilities> makeCapabilities()
 {
-    Ref<TVRHBA_EnabledRecordLogCapabilities> capabilities(create<TVRHBA_EnabledRecordLogCapabilities>(true));
+    Ref<TVRHBA_EnabledRecordLogCapabilities> capabilities = fresh<TVRHBA_EnabledRecordLogCapabilities>();
     capabilities->InstanceID.set("TVRHBA provider log capabilities");
     capabilities->ElementName.set("TVRHBA provider log capabilities");
     capabilities->RequestedStatesSupported.set({2, 3});
@@ -51,70 +49,66 @@ Ref<TVRHBA_EnabledRecordLogCapabilities> makeCapabilities()
     return capabilities;
 }
 
-std::uint32_t associateProfile(ProviderAgent& agent, const TVRHBA_RecordLog* log)
+std::uint32_t associateProfile(HostContext& host, const TVRHBA_RecordLog* log)
 {
-    const TVRHBA_RegisteredProfile* profile = createRegisteredProfile(agent, "Record Log", DMTF, "1.0.1");
-    createComputerSystemConformsToProfile(agent, profile);
-    if (!findProfile(agent, "Profile Registration"))
-        return TVR_LOG(TVR_CRIT, "Missing Profile Registration Profile instance"), BUILD_FAILED;
+    const TVRHBA_RegisteredProfile* profile = createRegisteredProfile(host, "Record Log", DMTF, "1.0.1");
+    createComputerSystemConformsToProfile(host, profile);
+    if (!host.profiles.find("Profile Registration"))
+        return failed("Missing Profile Registration Profile instance");
     using Conforms = TVRHBA_RecordLogConformsToProfile;
-    if (auto conforms = associate<Conforms>(&Conforms::ConformantStandard, profile, &Conforms::ManagedElement, log))
-    {
-        TVR_LOG(TVR_DBG, "%s conformant to %s profile", log->InstanceID.value.c_str(),
-                profile->RegisteredName.value.c_str());
-        insert(agent.m_TVRHBA_RecordLogConformsToProfile_map, conforms,
-               "Insert Failed : m_TVRHBA_RecordLogConformsToProfile_map");
-    }
+    join<Conforms>(host.agent, &Conforms::ConformantStandard, profile, &Conforms::ManagedElement, log,
+                   "Insert Failed : m_TVRHBA_RecordLogConformsToProfile_map",
+                   [&](Conforms&)
+                   {
+                       TVR_LOG(TVR_DBG, "%s conformant to %s profile", log->InstanceID.value.c_str(),
+                               profile->RegisteredName.value.c_str());
+                   });
     return BUILD_DONE;
 }
 
-std::uint32_t associateCapabilities(ProviderAgent& agent, const TVRHBA_RecordLog* log)
+std::uint32_t associateCapabilities(HostContext& host, const TVRHBA_RecordLog* log)
 {
-    const auto* capabilities = insert(agent.m_TVRHBA_EnabledRecordLogCapabilities_map, makeCapabilities(),
-                                      "Insert Failed : m_TVRHBA_TVRHBA_EnabledRecordLogCapabilities_map");
+    const auto* capabilities =
+        mapOf<TVRHBA_EnabledRecordLogCapabilities>(host.agent)
+            .insert(makeCapabilities(), "Insert Failed : m_TVRHBA_TVRHBA_EnabledRecordLogCapabilities_map");
     if (!capabilities)
         return BUILD_FAILED;
     using Capabilities = TVRHBA_RecordLogCapabilities;
-    if (auto association =
-            associate<Capabilities>(&Capabilities::ManagedElement, log, &Capabilities::Capabilities, capabilities))
-    {
-        TVR_LOG(TVR_DBG, "%s : Logging capabilities", log->InstanceID.value.c_str());
-        insert(agent.m_TVRHBA_RecordLogCapabilities_map, association,
-               "Insert Failed : m_TVRHBA_RecordLogCapabilities_map");
-    }
+    join<Capabilities>(host.agent, &Capabilities::ManagedElement, log, &Capabilities::Capabilities, capabilities,
+                       "Insert Failed : m_TVRHBA_RecordLogCapabilities_map",
+                       [&](Capabilities&)
+                       { TVR_LOG(TVR_DBG, "%s : Logging capabilities", log->InstanceID.value.c_str()); });
     return BUILD_DONE;
 }
 
-std::uint32_t associateProvider(ProviderAgent& agent, const TVRHBA_RecordLog* log)
+std::uint32_t associateProvider(HostContext& host, const TVRHBA_RecordLog* log)
 {
-    const TVRHBA_SoftwareIdentity* identity = findProviderSoftwareIdentity(agent);
+    const TVRHBA_SoftwareIdentity* identity = host.providerIdentity;
     if (!identity)
-        return TVR_LOG(TVR_DBG, "Missing Provider Software Identity"), BUILD_FAILED;
+        return failed({TVR_DBG, "Missing Provider Software Identity"});
     using Use = TVRHBA_ProviderUseOfLog;
-    if (auto use = associate<Use>(&Use::Antecedent, log, &Use::Dependent, identity))
-    {
-        TVR_LOG(TVR_DBG, "%s uses log : %s", identity->InstanceID.value.c_str(), log->InstanceID.value.c_str());
-        insert(agent.m_TVRHBA_ProviderUseOfLog_map, use, "Insert Failed : m_TVRHBA_ProviderUseOfLog_map");
-    }
+    join<Use>(
+        host.agent, &Use::Antecedent, log, &Use::Dependent, identity, "Insert Failed : m_TVRHBA_ProviderUseOfLog_map",
+        [&](Use&)
+        { TVR_LOG(TVR_DBG, "%s uses log : %s", identity->InstanceID.value.c_str(), log->InstanceID.value.c_str()); });
     return BUILD_DONE;
 }
 
 } // namespace
 
-std::uint32_t createProviderRecordLog(ProviderAgent& agent)
+std::uint32_t createProviderRecordLog(HostContext& host)
 {
-    Ref<TVRHBA_RecordLog> made = makeProviderLog(agent);
+    const Ref<TVRHBA_RecordLog> made = unlessOutOfMemory([&] { return makeProviderLog(host); });
     if (!made)
         return BUILD_DONE;
     const TVRHBA_RecordLog* log =
-        insert(agent.m_TVRHBA_RecordLog_map, made, "Insert Failed : m_TVRHBA_TVRHBA_RecordLog_map");
+        mapOf<TVRHBA_RecordLog>(host.agent).insert(made, "Insert Failed : m_TVRHBA_TVRHBA_RecordLog_map");
     if (!log)
         return BUILD_FAILED;
-    if (const std::uint32_t status = associateProfile(agent, log); status != BUILD_DONE)
-        return status;
-    if (const std::uint32_t status = associateCapabilities(agent, log); status != BUILD_DONE)
-        return status;
-    return associateProvider(agent, log);
+    for (auto* associate : {associateProfile, associateCapabilities, associateProvider})
+        if (const std::uint32_t status = associate(host, log); status != BUILD_DONE)
+            return status;
+    return BUILD_DONE;
 }
 
 } // namespace cimple

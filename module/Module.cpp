@@ -2,7 +2,7 @@
 // and the head of the registration list. All of it derives from the class catalog.
 #include "agent/ProviderProc.h"
 #include "derivedObjects/Providers.h"
-#include "runtime/CMPI_Adapter.h"
+#include "runtime/adapter/CMPI_Adapter.h"
 #include "runtime/cmpi/Cmpi.h"
 
 #include <iterator>
@@ -20,8 +20,7 @@ constexpr const char* moduleName = "tavrin_fc_provider_Module";
 /// Place of each class in the registration list.
 enum Place : std::size_t
 {
-#define TVR_CLASS(name, form, group) PLACE_##name,
-#define TVR_ASSOCIATION(name, form, group) PLACE_##name,
+#define TVR_CLASS(name, form, group, does) PLACE_##name,
 #include "agent/ClassCatalog.def"
     NUM_CLASSES
 };
@@ -34,12 +33,20 @@ constexpr const Registration* linkedBefore(Place place)
 }
 
 const Registration registrations[NUM_CLASSES] = {
-#define TVR_CLASS(name, form, group)                                                                                   \
-    {moduleName, TVRHBA_##name##_Row::providerName, &providerProc<TVRHBA_##name##_Provider>,                           \
+#define TVR_CLASS(name, form, group, does)                                                                             \
+    {moduleName, CatalogRow<TVRHBA_##name>::providerName, &providerProc<TVRHBA_##name##_Provider>,                     \
      &TVRHBA_##name::static_meta_class, linkedBefore(PLACE_##name)},
-#define TVR_ASSOCIATION(name, form, group) TVR_CLASS(name, form, group)
 #include "agent/ClassCatalog.def"
 };
+
+/// Records, and the ports that jobs and records name, stay in their associations when they are cleared or gone.
+constexpr Lasting_End lastingEnds[] = {
+    {nullptr, "CIM_RecordForLog"},
+    {"CIM_AffectedJobElement", "CIM_PortController"},
+    {"CIM_RecordAppliesToElement", "CIM_PortController"},
+};
+
+constinit const Module_Info moduleInfo = {&registrations[NUM_CLASSES - 1], lastingEnds};
 
 /// The object that the broker sees for each class.
 Static_Adapter_Data adapters[NUM_CLASSES];
@@ -49,7 +56,7 @@ template <class MI> MI* makeMI(Place place, char type, const CMPIBroker* broker,
 {
     void* mi = nullptr;
     cimple_cmpi_adapter(&adapters[place], &registrations[place], broker, context, registrations[place].provider_name,
-                        type, &mi);
+                        type, &mi, &moduleInfo);
     return static_cast<MI*>(mi);
 }
 
@@ -77,10 +84,10 @@ TVR_EXPORT const Registration* cimple_module()
         return TVRHBA_##name##_Provider_Create_##kind##MI(broker, context);                                            \
     }
 
-#define TVR_CLASS(name, form, group)                                                                                   \
+#define TVR_CLASS(name, form, group, does)                                                                             \
     TVR_FACTORY(name, Instance, 'I')                                                                                   \
     TVR_FACTORY(name, Method, 'M')
-#define TVR_ASSOCIATION(name, form, group)                                                                             \
-    TVR_CLASS(name, form, group)                                                                                       \
+#define TVR_ASSOCIATION(name, form, group, does)                                                                       \
+    TVR_CLASS(name, form, group, does)                                                                                 \
     TVR_FACTORY(name, Association, 'A')
 #include "agent/ClassCatalog.def"

@@ -1,21 +1,24 @@
-#include "model/Build.h"
+#include "agent/Build.h"
 
 #include <cstdarg>
 #include <cstdio>
-#include <cstring>
 #include <string>
 
 namespace cimple
 {
 
-Instance* insertInstance(Instance_Map& map, Instance* instance, const InsertFailure& failure)
+Instance* insertInstance(Instance_Map& map, Ref<> instance, const LogText& failure)
 {
-    if (instance && map.insert(instance) != -1)
-        return instance;
-    const char* slash = std::strrchr(failure.file, '/');
-    TVR_Logger::instance().log(slash ? slash + 1 : failure.file, &failure.line, TVR_CRIT, "%s", failure.text);
-    unref(instance);
+    if (instance && map.insert(instance.get()) != -1)
+        return instance.release();
+    failure.log();
     return nullptr;
+}
+
+const String& moduleNamespace()
+{
+    static Immortal<const String> name(providerNamespace);
+    return *name;
 }
 
 String formatText(const char* format, ...)

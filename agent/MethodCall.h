@@ -1,0 +1,91 @@
+// The head of every method, and of what changes an instance.
+#pragma once
+
+#include "agent/Maps.h"
+#include "agent/MethodOutcome.h"
+#include "agent/ProviderAgent.h"
+#include "device/TVR_MethodWrapper.h"
+
+#include <cstdint>
+
+namespace cimple
+{
+
+/// What methods, changes of instances and enumerations of their own stand on: asks for a refresh if one is due, waits
+/// for the adapter data and maps, and holds m_DataMutex as long as it lives.
+class MethodGuard
+{
+public:
+    explicit MethodGuard(ProviderAgent& agent);
+
+private:
+    struct Ready
+    {
+        explicit Ready(ProviderAgent& agent);
+    };
+    Ready _ready;
+    Auto_Mutex _dataLock;
+};
+
+/// What a service says when it is called wrongly, and how its methods, or the changes of its instances, then end.
+struct ServiceTexts
+{
+    LogText wrongService = {};  ///< called on an instance that is not the service
+    LogText noTarget = {};      ///< without a target
+    LogText unknownTarget = {}; ///< with a target that is not in the model
+    LogText noPlainName = {};   ///< Id2HBAName failed for its name
+    LogText noWwn = {};         ///< str2HBAName failed
+    MethodEnd ofService = {33068};
+    MethodEnd ofTarget = {32968};
+    MethodEnd ofName = {32968};
+    bool anyServiceWithoutOne = false; ///< with no service in the cache, each instance passes for it
+};
+
+/// Logs the entry, asks for a refresh if one is due, waits for the adapter data and maps, and holds the data lock as
+/// long as it lives. What it then looks up is there, or it ends the method with the service's text and value.
+class MethodCall
+{
+public:
+    explicit MethodCall(const LogText& entry) : _agent(enter(entry)), _guard(_agent) {}
+
+    ProviderAgent& agent() { return _agent; }
+
+    /// The service in the cache that the method was called on; null where the texts let any pass.
+    template <class Service> Service* self(const Instance* reference, const ServiceTexts& texts)
+    {
+        const TypedMap<Service> services = mapOf<Service>(_agent);
+        Service* service = services.withKeysOf(reference);
+        if (!service && !(texts.anyServiceWithoutOne && services.size() == 0))
+            end(texts.wrongService, texts.ofService);
+        return service;
+    }
+
+    /// The port, or port controller, in the cache that a parameter refers to by its DeviceID.
+    template <class Target> Target& target(const Target* reference, const ServiceTexts& texts)
+    {
+        if (!reference)
+            end(texts.noTarget, texts.ofTarget);
+        Target* found = mapOf<Target>(_agent).findFirst(
+            [&](const Target& known) {
+                return !known.DeviceID.null && !reference->DeviceID.null &&
+                       known.DeviceID.value == reference->DeviceID.value;
+            });
+        if (!found)
+            end(texts.unknownTarget, texts.ofTarget);
+        return *found;
+    }
+
+    /// The WWPN that a port's DeviceID is the text of.
+    HBA_WWN wwpn(const String& deviceId, const ServiceTexts& texts);
+
+    /// Logs the text and ends the method.
+    [[noreturn]] static void end(const LogText& why, const MethodEnd& with);
+
+private:
+    static ProviderAgent& enter(const LogText& entry);
+
+    ProviderAgent& _agent;
+    MethodGuard _guard;
+};
+
+} // namespace cimple

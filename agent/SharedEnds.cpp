@@ -1,0 +1,32 @@
+#include "agent/SharedEnds.h"
+
+#include <utility>
+
+namespace cimple
+{
+
+namespace
+{
+
+thread_local SharedEnds* current = nullptr;
+
+} // namespace
+
+SharedEnds::SharedEnds() : _outer(std::exchange(current, this)) {}
+
+SharedEnds::~SharedEnds()
+{
+    current = _outer;
+}
+
+Ref<> SharedEnds::of(const Instance* instance)
+{
+    if (!current || !instance)
+        return Ref<>(clone(instance));
+    Ref<>& end = current->_ends[instance];
+    if (!end || !identical(end.get(), instance)) // the instance has changed, or another one has its place
+        end.reset(clone(instance));
+    return end;
+}
+
+} // namespace cimple

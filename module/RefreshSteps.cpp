@@ -1,0 +1,67 @@
+// The refresh of the module: which steps it has, in which order, and what a failure of each does.
+#include "agent/RefreshSteps.h"
+
+#include "model/ComputerSystem.h"
+#include "model/PhysicalModel.h"
+#include "model/Profiles.h"
+#include "model/ProviderInstances.h"
+
+namespace cimple
+{
+
+namespace
+{
+
+constexpr OnFailure Stop = OnFailure::Stop;
+constexpr OnFailure GoOn = OnFailure::GoOn;
+
+std::uint32_t checkDeviceData(HostContext& host)
+{
+    return host.agent.m_pData ? BUILD_DONE : BUILD_FAILED;
+}
+
+constexpr HostStep hostSteps[] = {
+    {createComputerSystem, Stop, "Could not create the Computer System Instance"},
+    {takePlatformChassis, GoOn, {}},
+    {createProfiles, GoOn, {}},
+    {checkDeviceData, Stop, "Could not locate the data pointer - Serious issue"},
+    {createChassis, Stop, "Could not create the Chassis Instance"},
+};
+
+constexpr HostStep cardSteps[] = {
+    {createProviderSoftwareIdentity, Stop, "TVRHBA_SoftwareIdentity provider creation failed"},
+    {createProviderConfigSettings, Stop, {}},
+    {buildAdapters, Stop, {}},
+    mark({TVR_DBG, "Done with the Driver Parameter fetching"}),
+    mark({TVR_DBG, "Calling FC_CreateDumpClasses"}),
+};
+
+constexpr AdapterStep adapterSteps[] = {
+    {createPackageInstances, Stop, "CreatePackageInstances failed"},
+    {createCardInstances, Stop, "CreateCardInstances failed"},
+};
+
+constexpr PortStep portSteps[] = {
+    {createCardAssociations, GoOn, {}},
+    {createChipInstances, Stop, "CreateChipInstances failed"},
+    {createPCIDeviceInstance, Stop, "CreatePCIDeviceInstance failed"},
+    {createPhysicalConnectorInstances, Stop, "CreatePhysicalConnectorInstances failed"},
+};
+
+constexpr HostStep closingSteps[] = {
+    {createProviderRecordLog, Stop, {}},
+    mark({TVR_DBG, "Create the Diagnostic classes"}),
+};
+
+} // namespace
+
+const RefreshSteps refreshSteps = {
+    .askPlatform = askPlatform,
+    .host = hostSteps,
+    .cards = cardSteps,
+    .adapter = adapterSteps,
+    .port = portSteps,
+    .closing = closingSteps,
+};
+
+} // namespace cimple
