@@ -3,6 +3,7 @@
 #include "simulator/Control.h"
 #include "tests/module/HostNames.h"
 
+#include <cstdlib>
 #include <dlfcn.h>
 #include <filesystem>
 #include <stdexcept>
@@ -34,6 +35,11 @@ std::size_t threads()
 BenchHost::BenchHost(HostSize size, Logging logging) : _host(scenario(size))
 {
     module_test::setHostNames({}); // no name server is asked
+    if (size.cards != 0)
+    {
+        _host.options.module = TVR_LARGE_MODULE_FILE;
+        setenv("TVR_BENCH_CARDS", std::to_string(size.cards).c_str(), 1);
+    }
     const std::string logFile = (_host.root() / "provider.log").string();
     _host.write("/etc/tavrin_fc_provider.dmp", logging == Logging::off ? "0,5,1\n" : "2,5,1\n" + logFile);
     // One stage at a time: adapters are refreshed alone, and the SAN when one of its classes is asked for.

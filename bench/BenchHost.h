@@ -14,9 +14,11 @@ struct HostSize
     std::uint32_t adapters = 1;
     std::uint32_t targetsPerPort = 1;
     std::uint32_t unitsPerTarget = 1;
+    /// Not 0: the module's model stands aside for one with so many cards (bench/LargeModel.cpp).
+    std::uint32_t cards = 0;
 };
 
-/// Whether the module writes its log file. Messages are formatted in any case.
+/// Whether the module writes its log file.
 enum class Logging
 {
     off,

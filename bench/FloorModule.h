@@ -1,8 +1,8 @@
 // The floor of the client's operations: a provider that answers with constants, through the same broker.
 #pragma once
 
-#include "broker/ModuleImage.h"
-#include "broker/Value.h"
+#include "broker/core/ModuleImage.h"
+#include "broker/values/Value.h"
 #include "runtime/cmpi/Cmpi.h"
 
 #include <string>

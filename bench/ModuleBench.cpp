@@ -1,12 +1,14 @@
 // Loading of the module, and the client's operations on it.
 #include "bench/BenchHost.h"
 #include "bench/Beside.h"
-#include "bench/FloorModule.h"
+#include "bench/HostAndFloor.h"
 #include "schema/TVRHBA_Card.h"
 #include "schema/TVRHBA_ProductPhysicalComponent.h"
 
 #include <dlfcn.h>
 #include <stdexcept>
+#include <sys/wait.h>
+#include <unistd.h>
 
 using namespace bench;
 
@@ -15,15 +17,28 @@ namespace
 
 // --- loading --------------------------------------------------------------------------------------------
 
+/// In a child process: the module stays mapped where it was opened once.
 double nanosecondsToOpen(const char* file)
 {
-    void* library = nullptr;
-    const double took = nanosecondsOf([&] { library = dlopen(file, RTLD_NOW | RTLD_LOCAL); });
-    if (!library)
-        throw std::runtime_error(dlerror());
-    dlclose(library);
-    if (dlopen(file, RTLD_NOW | RTLD_NOLOAD))
-        throw std::runtime_error(std::string(file) + " stays loaded");
+    int ends[2];
+    if (dlopen(file, RTLD_NOW | RTLD_NOLOAD) || pipe(ends) != 0)
+        throw std::runtime_error(std::string(file) + " is open already, or no pipe is to be had");
+    const pid_t child = fork();
+    if (child == 0)
+    {
+        void* library = nullptr;
+        const double took = nanosecondsOf([&] { library = dlopen(file, RTLD_NOW | RTLD_LOCAL); });
+        const bool told = library && write(ends[1], &took, sizeof took) == sizeof took;
+        _exit(told ? 0 : 1);
+    }
+    close(ends[1]);
+    double took = 0;
+    const bool heard = child > 0 && read(ends[0], &took, sizeof took) == sizeof took;
+    close(ends[0]);
+    if (child > 0)
+        waitpid(child, nullptr, 0);
+    if (!heard)
+        throw std::runtime_error(std::string(file) + " cannot be opened");
     return took;
 }
 
@@ -85,44 +100,41 @@ bool sameAnswer(const broker::NamesReply& a, const broker::NamesReply& b)
 ///
 /// `objects(broker)` is what the floor knows; `operation(broker, objects)` is measured.
 template <class Objects, class Operation>
-void runOperation(benchmark::State& state, const cimple::Meta_Class& floorClass, Objects objects, Operation operation)
+void runOperation(benchmark::State& state, HostSize size, const cimple::Meta_Class& floorClass, Objects objects,
+                  Operation operation)
 {
-    BenchHost host({.adapters = static_cast<std::uint32_t>(state.range(0))});
-    const std::vector<broker::Object> known = objects(host);
-    BenchHost::awaitEndOfRefresh();
-    broker::Options options;
-    options.image = std::make_shared<FloorModule>(floorClass, known, host.broker().servedClasses());
-    broker::Broker floor(options);
-
-    const auto answer = operation(host.broker(), known);
-    const auto floorAnswer = operation(floor, known);
+    HostAndFloor both(size, floorClass, objects);
+    const auto answer = operation(both.host(), both.known());
+    const auto floorAnswer = operation(both.floor(), both.known());
     if (!answer.ok() || !floorAnswer.ok())
         return state.SkipWithError(("refused: " + answer.message + floorAnswer.message).c_str());
     if (!sameAnswer(answer, floorAnswer))
         return state.SkipWithError("the floor answers something else");
     runBeside(
-        state, [&] { benchmark::DoNotOptimize(operation(host.broker(), known)); },
-        [&] { benchmark::DoNotOptimize(operation(floor, known)); });
+        state, [&] { benchmark::DoNotOptimize(operation(both.host(), both.known())); },
+        [&] { benchmark::DoNotOptimize(operation(both.floor(), both.known())); });
 }
 
-constexpr const char* cardClass = "TVRHBA_Card";
-constexpr const char* associationClass = "TVRHBA_ProductPhysicalComponent";
-
-std::vector<broker::Object> cards(BenchHost& host)
+HostSize hostOf(const benchmark::State& state)
 {
-    return host.enumerate(cardClass);
+    return {.adapters = static_cast<std::uint32_t>(state.range(0))};
+}
+
+HostSize largeHostOf(const benchmark::State& state)
+{
+    return {.cards = static_cast<std::uint32_t>(state.range(0))};
 }
 
 void EnumerateCards(benchmark::State& state)
 {
-    runOperation(state, cimple::TVRHBA_Card::static_meta_class, cards,
+    runOperation(state, hostOf(state), cimple::TVRHBA_Card::static_meta_class, cardsOf,
                  [](broker::Broker& broker, const auto&)
                  { return broker.enumerateInstances(benchNamespace, cardClass); });
 }
 
 void EnumerateCardNames(benchmark::State& state)
 {
-    runOperation(state, cimple::TVRHBA_Card::static_meta_class, cards,
+    runOperation(state, hostOf(state), cimple::TVRHBA_Card::static_meta_class, cardsOf,
                  [](broker::Broker& broker, const auto&)
                  { return broker.enumerateInstanceNames(benchNamespace, cardClass); });
 }
@@ -130,14 +142,14 @@ void EnumerateCardNames(benchmark::State& state)
 /// The first card. The floor makes it at once, the module looks through its cards.
 void GetCard(benchmark::State& state)
 {
-    runOperation(state, cimple::TVRHBA_Card::static_meta_class, cards,
+    runOperation(state, hostOf(state), cimple::TVRHBA_Card::static_meta_class, cardsOf,
                  [](broker::Broker& broker, const auto& known) { return broker.getInstance(known.front().path); });
 }
 
 void EnumerateAssociations(benchmark::State& state)
 {
     runOperation(
-        state, cimple::TVRHBA_ProductPhysicalComponent::static_meta_class,
+        state, hostOf(state), cimple::TVRHBA_ProductPhysicalComponent::static_meta_class,
         [](BenchHost& host) { return host.enumerate(associationClass); },
         [](broker::Broker& broker, const auto&)
         { return broker.enumerateInstances(benchNamespace, associationClass); });
@@ -149,10 +161,10 @@ template <class Operation> void runAssociators(benchmark::State& state, Operatio
 {
     broker::Path product;
     runOperation(
-        state, cimple::TVRHBA_ProductPhysicalComponent::static_meta_class,
+        state, hostOf(state), cimple::TVRHBA_ProductPhysicalComponent::static_meta_class,
         [&](BenchHost& host)
         {
-            product = host.enumerate("TVRHBA_Product").front().path;
+            product = productsOf(host).front().path;
             return host.broker().associators(product, {.assocClass = associationClass}).objects;
         },
         [&](broker::Broker& broker, const auto&) { return operation(broker, product); });
@@ -170,6 +182,27 @@ void AssociatorNamesOfProduct(benchmark::State& state)
                    { return broker.associatorNames(product, {.assocClass = associationClass}); });
 }
 
+/// One of many cards, and the way from it to its product: what grows with the size is the search.
+void GetCardOfMany(benchmark::State& state)
+{
+    runOperation(state, largeHostOf(state), cimple::TVRHBA_Card::static_meta_class, lastCardOf,
+                 [](broker::Broker& broker, const auto& known) { return broker.getInstance(known.front().path); });
+}
+
+void AssociatorNamesOfCardOfMany(benchmark::State& state)
+{
+    broker::Path card;
+    runOperation(
+        state, largeHostOf(state), cimple::TVRHBA_ProductPhysicalComponent::static_meta_class,
+        [&](BenchHost& host)
+        {
+            card = lastCardOf(host).front().path;
+            return productsOf(host);
+        },
+        [&](broker::Broker& broker, const auto&)
+        { return broker.associatorNames(card, {.assocClass = associationClass}); });
+}
+
 void onHostsOfSizes(benchmark::internal::Benchmark* benchmark)
 {
     benchmark->UseManualTime()->Arg(2)->Arg(16)->Arg(64);
@@ -180,5 +213,7 @@ BENCHMARK(GetCard)->Apply(onHostsOfSizes);
 BENCHMARK(EnumerateAssociations)->Apply(onHostsOfSizes);
 BENCHMARK(AssociatorsOfProduct)->Apply(onHostsOfSizes);
 BENCHMARK(AssociatorNamesOfProduct)->Apply(onHostsOfSizes);
+BENCHMARK(GetCardOfMany)->UseManualTime()->Arg(128)->Arg(1024)->Arg(16384);
+BENCHMARK(AssociatorNamesOfCardOfMany)->UseManualTime()->Arg(128)->Arg(1024)->Arg(16384);
 
 } // namespace

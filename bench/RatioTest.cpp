@@ -1,5 +1,7 @@
 // The figures that must hold on any machine: each is a ratio of two measured in the same run, best of several rounds.
+#include "bench/HostAndFloor.h"
 #include "bench/Workloads.h"
+#include "schema/TVRHBA_Card.h"
 
 #include <gtest/gtest.h>
 
@@ -79,7 +81,64 @@ TEST(Ratio, CloneCostsWhatItCannotAvoid)
     const bench::CloneFloor floor(card.get());
     const double least = nanoseconds(1000, [&] { floor.run(); });
     const double cloned = nanoseconds(1000, [&] { unref(clone(card.get())); });
-    EXPECT_LE(cloned, 2 * least) << cloned << " ns against " << least << " ns";
+    // 1.3 to 2.2 on the machines that were measured; what this must catch is an allocation for each text, at 5 and more.
+    EXPECT_LE(cloned, 3 * least) << cloned << " ns against " << least << " ns";
+}
+
+// --- a client's operations --------------------------------------------------------------------------------
+
+TEST(Ratio, GetAmong64CostsAtMostTwiceItsFloor)
+{
+    bench::HostAndFloor both({.adapters = 64}, TVRHBA_Card::static_meta_class, bench::cardsOf);
+    const broker::Path& card = both.known().back().path;
+    const auto nanosecondsAt = [&](broker::Broker& broker)
+    {
+        EXPECT_TRUE(broker.getInstance(card).ok());
+        return nanoseconds(100, [&] { keep(broker.getInstance(card).objects.size()); });
+    };
+    const double floor = nanosecondsAt(both.floor());
+    const double got = nanosecondsAt(both.host());
+    EXPECT_LE(got, 2 * floor) << got << " ns against " << floor << " ns";
+}
+
+TEST(Ratio, NamesCostLittleMoreThanTheirFloor)
+{
+    bench::HostAndFloor both({.adapters = 64}, TVRHBA_Card::static_meta_class, bench::cardsOf);
+    const auto nanosecondsAt = [&](broker::Broker& broker)
+    {
+        EXPECT_EQ(broker.enumerateInstanceNames(bench::benchNamespace, bench::cardClass).paths.size(), 64u);
+        return nanoseconds(
+            10, [&] { keep(broker.enumerateInstanceNames(bench::benchNamespace, bench::cardClass).paths.size()); });
+    };
+    const double floor = nanosecondsAt(both.floor());
+    const double names = nanosecondsAt(both.host());
+    EXPECT_LE(names, 1.8 * floor) << names << " ns against " << floor << " ns";
+}
+
+struct SearchTimes
+{
+    double get, associatorNames;
+};
+
+SearchTimes searchAmong(std::uint32_t cards)
+{
+    bench::BenchHost host({.cards = cards});
+    const broker::Path card = bench::lastCardOf(host).front().path;
+    const broker::AssociationFilter filter{.assocClass = bench::associationClass};
+    EXPECT_EQ(host.broker().associatorNames(card, filter).paths.size(), 1u);
+    return {
+        nanoseconds(100, [&] { keep(host.broker().getInstance(card).objects.size()); }),
+        nanoseconds(100, [&] { keep(host.broker().associatorNames(card, filter).paths.size()); }),
+    };
+}
+
+TEST(Ratio, SearchesInALargeMapAreOneTightPass)
+{
+    const SearchTimes small = searchAmong(128);
+    const SearchTimes large = searchAmong(16384);
+    EXPECT_LE(large.get, 3 * small.get) << large.get << " ns against " << small.get << " ns";
+    EXPECT_LE(large.associatorNames, 3 * small.associatorNames)
+        << large.associatorNames << " ns against " << small.associatorNames << " ns";
 }
 
 } // namespace

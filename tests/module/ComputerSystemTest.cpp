@@ -2,7 +2,7 @@
 #include "tests/module/Describe.h"
 #include "tests/module/HostNames.h"
 
-#include "broker/ValueText.h"
+#include "broker/values/ValueText.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -91,6 +91,15 @@ INSTANTIATE_TEST_SUITE_P(
                  {"short", HostAddress{"long", {255, 128, 0, 254}}},
                  "long",
                  {"[TVR_DBG] Host Name : short", "[TVR_DBG] Host ipAddress : 255.128.0.254"}},
+        NamesRow{"ManyAliases",
+                 {"tavrin-host", HostAddress{"long", {192, 0, 2, 1}}, 100'000},
+                 "long",
+                 {"[TVR_DBG] Host Name : tavrin-host", "[TVR_DBG] Host ipAddress : 192.0.2.1"}},
+        NamesRow{"AliasesWithoutEnd",
+                 {"tavrin-host", HostAddress{"long", {192, 0, 2, 1}}, 1'000'000'000},
+                 "tavrin-host",
+                 {"[TVR_DBG] Host Name : tavrin-host",
+                  "[TVR_ERR] Error! gethostbyname() failed, using 'unknown' for IP address."}},
         NamesRow{"Unresolved",
                  {"tavrin-host", std::nullopt},
                  "tavrin-host",

@@ -1,6 +1,6 @@
 #include "tests/module/Describe.h"
 
-#include "broker/ValueText.h"
+#include "broker/values/ValueText.h"
 
 #include <gtest/gtest.h>
 

@@ -1,10 +1,12 @@
 // What the shared object shows to a broker and to tools: its symbols, its libraries and its registration records.
-#include "broker/ModuleImage.h"
+#include "broker/core/ModuleImage.h"
+#include "tests/support/Sanitized.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <cstdio>
+#include <dlfcn.h>
 #include <initializer_list>
 #include <set>
 #include <sstream>
@@ -15,14 +17,6 @@ using namespace cimple;
 
 namespace
 {
-
-#if defined(__has_feature)
-#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
-#define TVR_SANITIZED
-#endif
-#elif defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-#define TVR_SANITIZED
-#endif
 
 using Names = std::set<std::string>;
 
@@ -44,7 +38,7 @@ std::vector<std::string> linesOf(const std::string& tool)
 class Exports : public testing::Test
 {
 protected:
-    Exports() : image(broker::openModule(TVR_MODULE_FILE, false))
+    Exports() : image(broker::openModule(TVR_MODULE_FILE, RTLD_NOW))
     {
         for (const Registration* record = image->registrations(); record; record = record->next)
             records.insert(records.begin(), record);
@@ -85,7 +79,7 @@ TEST_F(Exports, AreTheFactoriesOfTheRegisteredClassesAndTheModuleFunction)
 
 TEST_F(Exports, NeedOnlyTheLanguagesOwnLibraries)
 {
-#ifdef TVR_SANITIZED
+#if TVR_SANITIZED
     GTEST_SKIP() << "the sanitizers' run-time libraries are linked in this build";
 #endif
     const Names allowed = {"libc.so.6",      "libm.so.6",       "libgcc_s.so.1",

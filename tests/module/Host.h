@@ -1,7 +1,7 @@
 // A process with a simulated host, files of its own and the module: what every module test stands on.
 #pragma once
 
-#include "broker/Broker.h"
+#include "broker/core/Broker.h"
 #include "simulator/Control.h"
 
 #include <filesystem>
@@ -33,10 +33,15 @@ public:
 
     /// The broker with the module in it, made on first use.
     broker::Broker& broker();
-    /// Options of the broker, for changes before its first use.
+    /// Options of the broker, for changes before its first use. It plays the server that the environment variable
+    /// TVR_BROKER_PERSONALITY names, the strict one without it.
     broker::Options options;
     /// Unloads the module and checks that it left nothing behind.
     void unload();
+    /// Ends the broker alone: the next use makes another one.
+    void closeBroker() { _broker.reset(); }
+    /// The same with the former broker alive, as a server is for threads of a library that it closed.
+    void setBrokerAside() { _former = std::move(_broker); }
 
     broker::Reply enumerate(const std::string& className);
     std::vector<broker::Object> instancesOf(const std::string& className);
@@ -64,6 +69,7 @@ public:
 private:
     std::filesystem::path _root;
     std::vector<void*> _libraries;
+    std::unique_ptr<broker::Broker> _former;
     std::unique_ptr<broker::Broker> _broker;
 };
 

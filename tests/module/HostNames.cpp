@@ -51,9 +51,11 @@ extern "C"
     {
         using namespace module_test;
         *result = nullptr;
+        if (answers.resolving)
+            answers.resolving();
         if (!answers.address)
             return *error = HOST_NOT_FOUND, 0; // a name that is not found is no error of the call
-        if (size < sizeof(Work))
+        if (size < std::max(sizeof(Work), answers.room))
             return ERANGE;
         Work work = {};
         std::copy(answers.address->address.begin(), answers.address->address.end(), work.address);

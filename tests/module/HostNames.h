@@ -3,6 +3,7 @@
 
 #include <array>
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <string>
 
@@ -21,6 +22,10 @@ struct HostNames
     std::optional<std::string> shortName = "tavrin-host";
     /// Answer for any name; nothing resolves without one.
     std::optional<HostAddress> address = HostAddress{"tavrin-host.example.net", {192, 0, 2, 17}};
+    /// Bytes that the answer takes, for hosts with many aliases.
+    std::size_t room = 0;
+    /// Runs inside the resolver, such as the loading of one of its modules; may throw.
+    std::function<void()> resolving = {};
 };
 
 /// Until the first call the answers are those of a HostNames{}: no test depends on the machine's resolver.

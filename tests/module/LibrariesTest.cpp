@@ -1,11 +1,9 @@
 // Hosts on which one or more of the hardware libraries are absent.
 #include "tests/module/Host.h"
-#include "tests/module/Process.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <optional>
 #include <ostream>
 
 using namespace module_test;
@@ -47,9 +45,6 @@ class AbsentLibraries : public testing::TestWithParam<Row>
 TEST_P(AbsentLibraries, LeaveTheRestOfTheHostServed)
 {
     const Row& row = GetParam();
-    std::optional<LeftBehind> agentWithoutReferences;
-    if (!row.loads)
-        agentWithoutReferences.emplace();
     Host host("default", row.libraries);
     EXPECT_EQ(host.instancesOf("TVRHBA_Card").size(), row.cards);
     ASSERT_TRUE(host.awaitRefresh());

@@ -1,14 +1,19 @@
 // The agent's life: when it refreshes, how it ends, and what it leaves behind.
 #include "tests/module/Clock.h"
 #include "tests/module/Host.h"
+#include "tests/module/HostNames.h"
 #include "tests/module/Process.h"
+#include "tests/module/RefreshLines.h"
+#include "tests/support/Sanitized.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <atomic>
 #include <dlfcn.h>
 #include <fstream>
+#include <functional>
 #include <future>
 #include <optional>
 #include <sys/inotify.h>
@@ -21,11 +26,7 @@ namespace
 {
 
 constexpr const char* settingsFile = "/etc/tavrin_fc_provider.conf";
-constexpr const char* created = "[TVR_DBG] PERF: ---Created DataFetch_Handler thread -- BuildCimpleInfo END---";
 constexpr const char* notDue = "[TVR_DBG] PERF: ---No timeout BuildCimpleInfo END---";
-constexpr const char* running = "[TVR_DBG] DataFetch_Handler thread already running-BuildCimpleInfo";
-constexpr const char* begun = "[TVR_DBG] PERF: DataFetch_Handler Thread BEGIN";
-constexpr const char* ended = "[TVR_DBG] PERF: DataFetch_Handler Thread END";
 constexpr const char* joining = "[TVR_DBG] PERF: Clearing the previous thread...with join";
 
 constexpr const char* defaultSettings = "##################################################\n"
@@ -154,19 +155,37 @@ TEST(Refresh, FabricIsScannedWhenTheSettingOrAReaderAsksForIt)
     host.unload();
 }
 
+/// A reader that asks for the fabric when the running refresh has passed its stage may be the last to come.
+TEST(Refresh, FabricIsScannedForAReaderThatComesLate)
+{
+    stopClock();
+    Host host;
+    host.write(settingsFile, "TVR_PROVIDER_REFRESH_SANDATA = FALSE");
+    host.broker();
+    for (unsigned round = 0; round < 60; ++round)
+    {
+        advanceClock(10min);
+        auto card = countInBackground(host, "TVRHBA_Card");
+        auto disk = countInBackground(host, "TVRHBA_LogicalDisk");
+        card.get();
+        ASSERT_EQ(disk.wait_for(20s), std::future_status::ready) << "round " << round;
+    }
+    host.unload();
+}
+
 TEST(Life, SettingsAreWrittenOnceAtTheEndAndReadAgainAtTheNextLoad)
 {
     Host host;
-    FolderWatch written(host.root() / "etc", IN_CLOSE_WRITE);
+    FolderWatch written(host.root() / "etc", IN_MOVED_TO | IN_CLOSE_WRITE);
     host.instancesOf("TVRHBA_Card");
     EXPECT_FALSE(std::filesystem::exists(host.root().string() + settingsFile));
     host.unload();
     EXPECT_EQ(host.read(settingsFile), defaultSettings);
     EXPECT_TRUE(written.wait(0));
     EXPECT_EQ(written.changes("tavrin_fc_provider.conf"), 1u);
-    EXPECT_FALSE(isMapped());
+    EXPECT_TRUE(isMapped()) << "threads that are inside it could not be waited for in dlclose";
 
-    // Cleaned up by a server that keeps the library: the next use starts anew all the same.
+    // Cleaned up by a server that keeps the library open: the next use starts anew all the same.
     for (const char* minutes : {"3", "20"})
     {
         host.write(settingsFile, std::string("TVR_PROVIDER_CACHE_TIMEOUT=") + minutes);
@@ -175,13 +194,11 @@ TEST(Life, SettingsAreWrittenOnceAtTheEndAndReadAgainAtTheNextLoad)
                                         { return line.ends_with(std::string("cache timeout = ") + minutes); }));
         host.broker().cleanup("", true);
         EXPECT_THAT(host.read(settingsFile), testing::HasSubstr(std::string("TIMEOUT = ") + minutes + "\n"));
-        EXPECT_TRUE(isMapped());
     }
     EXPECT_EQ(host.logged("[TVR_INFO] Tavrin Provider v10.2.261-13 Loaded[" + std::to_string(getpid()) + "]"), 3u);
     EXPECT_EQ(host.calls("LRM_InitLib"), 3u);
     EXPECT_EQ(host.calls("LRM_ExitLib"), 0u);
     host.unload();
-    EXPECT_FALSE(isMapped());
 }
 
 TEST(Life, CountOfReferencesIsThatOfTheLoadedClasses)
@@ -207,7 +224,7 @@ class HeldRefresh
 public:
     explicit HeldRefresh(Host& host) : _host(host) {}
 
-    /// Loads the module and holds its second refresh at a gate, which opens once the end of the module waits for it.
+    /// Loads the module and holds its second refresh at a gate.
     void begin()
     {
         EXPECT_EQ(_host.instancesOf("TVRHBA_Chip").size(), 2u);
@@ -215,14 +232,19 @@ public:
         ASSERT_TRUE(_host.awaitRefresh());
         _host.openGate("adapters"); // the control function is at hand from now on
         bool held = false;
-        for (std::size_t attempt = 1; attempt <= 10 && !held; ++attempt)
+        for (std::size_t attempt = 1; attempt <= 100 && !held; ++attempt)
             held = startRefresh(attempt + 1);
         ASSERT_TRUE(held) << "every reader came after the refresh that it had started";
-        opener = std::thread(
-            [this, joins = _host.logged(joining) + 1]
+    }
+
+    /// Opens the gate in the background, once the end of the module waits for the refresh.
+    std::thread openWhenJoined()
+    {
+        return std::thread(
+            [&host = _host, joins = _host.logged(joining) + 1]
             {
-                EXPECT_TRUE(_host.awaitLog(joining, joins));
-                _host.openGate("adapters");
+                EXPECT_TRUE(host.awaitLog(joining, joins));
+                host.openGate("adapters");
             });
     }
 
@@ -238,8 +260,6 @@ public:
         EXPECT_EQ(_host.read(settingsFile), defaultSettings);
     }
 
-    std::thread opener;
-
 private:
     /// True if the reader that starts the refresh has its copy before the refresh locks the data.
     bool startRefresh(std::size_t refresh)
@@ -248,7 +268,7 @@ private:
         advanceClock(10min);
         auto reader = countInBackground(_host, "TVRHBA_Chip");
         EXPECT_TRUE(_host.awaitGate("adapters"));
-        if (reader.wait_for(2s) == std::future_status::ready)
+        if (reader.wait_for(100ms) == std::future_status::ready)
             return true;
         _host.openGate("adapters");
         reader.get();
@@ -259,39 +279,69 @@ private:
     Host& _host;
 };
 
-TEST(Life, UnloadWaitsForTheRefreshHoweverManyCleanupsTheServerCalls)
+TEST(Life, LastCleanupWaitsForTheRefresh)
 {
-    for (const auto cleanups : {broker::CleanupCalls::each, broker::CleanupCalls::last_of_kind})
-    {
-        std::optional<LeftBehind> without;
-        if (cleanups != broker::CleanupCalls::each)
-            without.emplace();
-        Host host;
-        host.options.cleanupCalls = cleanups;
-        FolderWatch written(host.root() / "etc", IN_CLOSE_WRITE);
-        HeldRefresh held(host);
-        ASSERT_NO_FATAL_FAILURE(held.begin());
-        host.unload();
-        held.opener.join();
-        held.expectCleanEnd(getpid());
-        EXPECT_TRUE(written.wait(0));
-        EXPECT_EQ(written.changes("tavrin_fc_provider.conf"), 1u);
-        EXPECT_FALSE(isMapped());
-    }
+    Host host;
+    FolderWatch written(host.root() / "etc", IN_MOVED_TO | IN_CLOSE_WRITE);
+    HeldRefresh held(host);
+    ASSERT_NO_FATAL_FAILURE(held.begin());
+    std::thread opener = held.openWhenJoined();
+    host.unload();
+    opener.join();
+    held.expectCleanEnd(getpid());
+    EXPECT_TRUE(written.wait(0));
+    EXPECT_EQ(written.changes("tavrin_fc_provider.conf"), 1u);
+}
+
+/// A server that calls fewer cleanups than it made providers closes the library while a refresh stands in it, and the
+/// refresh needs the loader to end. The module lives on, serves on when it is opened again, and ends with the process.
+TEST(Life, LibraryClosedWithFewerCleanupsServesOnAndEndsWithTheProcess)
+{
+    Host host;
+    EXPECT_EQ(inChild(
+                  [&]
+                  {
+                      std::ofstream(host.root() / "pid") << getpid();
+                      host.options.personality.cleanupCalls = broker::CleanupCalls::last_of_kind;
+                      setHostNames(
+                          {.resolving = [] { EXPECT_NE(dlopen("libresolv.so.2", RTLD_NOW), nullptr) << dlerror(); }});
+                      HeldRefresh held(host);
+                      ASSERT_NO_FATAL_FAILURE(held.begin());
+                      std::thread opener(
+                          [&]
+                          {
+                              EXPECT_TRUE(host.awaitLog("[TVR_DBG] ProviderAgent::releaseRef"));
+                              host.openGate("adapters");
+                          });
+                      host.broker().unload();
+                      opener.join();
+                      ASSERT_TRUE(host.awaitRefresh(2));
+                      EXPECT_FALSE(std::filesystem::exists(host.root().string() + settingsFile));
+                      host.setBrokerAside();
+
+                      EXPECT_EQ(host.instancesOf("TVRHBA_Card").size(), 2u);
+                      EXPECT_EQ(host.calls("LRM_InitLib"), 1u);
+                      EXPECT_EQ(semaphoresOf(getpid()), 2u);
+                  }),
+              0);
+    int process = 0;
+    std::ifstream(host.root() / "pid") >> process;
+    EXPECT_EQ(semaphoresOf(process), 0u);
+    EXPECT_EQ(host.read(settingsFile), defaultSettings);
 }
 
 TEST(Life, ProcessThatExitsWithTheAgentAliveEndsIt)
 {
     Host host;
     HeldRefresh held(host);
-    FolderWatch written(host.root() / "etc", IN_CLOSE_WRITE);
+    FolderWatch written(host.root() / "etc", IN_MOVED_TO | IN_CLOSE_WRITE);
     EXPECT_EQ(inChild(
                   [&]
                   {
                       std::ofstream(host.root() / "pid") << getpid();
                       ASSERT_NO_FATAL_FAILURE(held.begin());
                       EXPECT_EQ(semaphoresOf(getpid()), 2u);
-                      held.opener.detach();
+                      held.openWhenJoined().detach();
                   }),
               0);
     int process = 0;
@@ -301,34 +351,105 @@ TEST(Life, ProcessThatExitsWithTheAgentAliveEndsIt)
     EXPECT_EQ(written.changes("tavrin_fc_provider.conf"), 1u);
 }
 
-#if defined(__has_feature)
-#define TVR_HAS_FEATURE(name) __has_feature(name)
-#else
-#define TVR_HAS_FEATURE(name) 0
-#endif
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__) || TVR_HAS_FEATURE(address_sanitizer) ||             \
-    TVR_HAS_FEATURE(thread_sanitizer)
-constexpr bool sanitized = true;
+/// A library of the hardware, or a module of the resolver, that gives up the process ends it on the refresh's own
+/// thread.
+TEST(Life, RefreshThreadMayExit)
+{
+    Host host;
+    EXPECT_EQ(inChild(
+                  [&]
+                  {
+                      alarm(60); // a child that hangs is ended by it
+                      std::ofstream(host.root() / "pid") << getpid();
+                      setHostNames({.resolving = [] { std::exit(0); }});
+                      host.enumerate("TVRHBA_Card");
+                  }),
+              0);
+    int process = 0;
+    std::ifstream(host.root() / "pid") >> process;
+    EXPECT_EQ(semaphoresOf(process), 0u);
+    EXPECT_EQ(host.read(settingsFile), defaultSettings);
+}
+
+TEST(Life, ProcessMayExitWithClientsInside)
+{
+    for (unsigned round = 0; round < 3; ++round)
+    {
+        Host host;
+        EXPECT_EQ(inChild(
+                      [&]
+                      {
+                          alarm(60);
+                          host.broker();
+                          std::atomic<unsigned> answers{0};
+                          for (unsigned client = 0; client < 8; ++client)
+                              std::thread(
+                                  [&]
+                                  {
+                                      for (;; ++answers)
+                                          host.enumerate(answers % 2 ? "TVRHBA_FCPort" : "TVRHBA_Card");
+                                  })
+                                  .detach();
+                          while (answers < 200)
+                              std::this_thread::yield();
+                          std::exit(0);
+                      }),
+                  0);
+        EXPECT_EQ(host.read(settingsFile), defaultSettings);
+    }
+}
+
+/// Servers fork helpers, which end by exit() as often as not.
+TEST(Life, ChildOfAForkEndsNothingOfItsParent)
+{
+    stopClock();
+    Host host;
+    HeldRefresh held(host);
+    ASSERT_NO_FATAL_FAILURE(held.begin());
+    const std::function<void()> children[] = {[] {}, [&] { host.broker().unload(); }};
+    for (const auto& child : children)
+    {
+        EXPECT_EQ(inChild(
+                      [&]
+                      {
+                          alarm(60); // a child that hangs is ended by it
+                          passOverLeaks();
+                          child();
+                      }),
+                  0);
+        EXPECT_EQ(semaphoresOf(getpid()), 2u);
+        EXPECT_FALSE(std::filesystem::exists(host.root().string() + settingsFile));
+    }
+    host.openGate("adapters");
+    ASSERT_TRUE(host.awaitLog(ended, host.logged(begun)));
+    EXPECT_EQ(host.instancesOf("TVRHBA_Card").size(), 2u);
+    host.unload();
+    EXPECT_EQ(host.read(settingsFile), defaultSettings);
+}
+
+constexpr bool sanitized = TVR_SANITIZED;
+#if TVR_SANITIZED
 constexpr unsigned rounds = 40;
 #elif defined(__OPTIMIZE__)
-constexpr bool sanitized = false;
 constexpr unsigned rounds = 1000;
 #else
-constexpr bool sanitized = false;
 constexpr unsigned rounds = 250;
 #endif
 
 /// Loads and unloads the library itself every time: a thousand times when optimised, 250 times when not, 40 times under
-/// a sanitizer.
+/// a sanitizer. All logs are on, the runtime's too.
 TEST(Life, AThousandRoundsLeaveTheProcessAsItWas)
 {
     Host host;
-    host.write("/etc/tavrin_fc_provider.dmp", "0,5,1\n");
+    host.write("/.cimplerc", "LOG_LEVEL = DBG\n");
+    setenv("CIMPLE_HOME", host.root().c_str(), 1);
+    const std::string log = (host.root() / "provider.log").string();
     const auto round = [&]
     {
+        host.write("/etc/tavrin_fc_provider.dmp", "4,5,1\n" + log);
+        std::ofstream(log).close(); // empty, or it would grow over all rounds
         ASSERT_EQ(host.instancesOf("TVRHBA_Card").size(), 2u);
         host.unload();
-        ASSERT_FALSE(isMapped());
     };
     for (unsigned i = 0; i < 20; ++i)
         ASSERT_NO_FATAL_FAILURE(round());
@@ -343,11 +464,11 @@ TEST(Life, AThousandRoundsLeaveTheProcessAsItWas)
     EXPECT_LT(after.heap, before.heap + std::max(rounds * 24, 20000u));
     EXPECT_TRUE(sanitized || after.resident < before.resident + (2u << 20))
         << before.resident << " to " << after.resident;
+    EXPECT_GT(std::filesystem::file_size(host.root() / ".cimple" / "messages"), 0u);
 }
 
 TEST(Life, LibraryThatDoesNotInitialiseGivesAnEmptyModule)
 {
-    const LeftBehind agentWithoutReferences;
     Host host;
     host.addFault(R"({"function": "LRM_InitLib", "status": 1, "to": 1})");
     EXPECT_TRUE(host.instancesOf("TVRHBA_Card").empty());
@@ -367,7 +488,6 @@ TEST(Life, LibraryThatDoesNotInitialiseGivesAnEmptyModule)
     EXPECT_EQ(host.calls("HBA_GetNumberOfAdapters"), 0u);
     EXPECT_EQ(semaphoresOf(getpid()), 0u);
     host.unload();
-    EXPECT_FALSE(isMapped());
     EXPECT_EQ(host.read(settingsFile), defaultSettings);
 
     // The library recovers, the server loads again.

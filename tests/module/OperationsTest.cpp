@@ -1,5 +1,6 @@
 // Association operations against a naive filter over all association instances.
 #include "tests/module/Describe.h"
+#include "tests/module/RefreshLines.h"
 #include "tests/module/Walk.h"
 
 #include <gmock/gmock.h>
@@ -17,13 +18,11 @@ using broker::Path;
 namespace
 {
 
-/// The broker names the adapter's own class when the client names none, or it names nothing.
-class Associations : public testing::TestWithParam<broker::Fanout>
+class Associations : public testing::Test
 {
 protected:
     Associations()
     {
-        host.options.fanout = GetParam();
         addPlatform(broker());
         for (const std::string& className : broker().servedClasses())
             if (broker().classes().find(className)->isAssociation())
@@ -98,10 +97,6 @@ private:
     std::map<std::string, std::set<const Object*>> _atEnd; ///< by the identities of their ends
 };
 
-INSTANTIATE_TEST_SUITE_P(Brokers, Associations, testing::Values(broker::Fanout::null_class, broker::Fanout::own_class),
-                         [](const auto& info)
-                         { return info.param == broker::Fanout::null_class ? "NamingNoClass" : "NamingTheOwnClass"; });
-
 /// Path and content of instances, sorted.
 std::vector<std::string> whole(const std::vector<Object>& objects)
 {
@@ -153,7 +148,7 @@ const Values values = {
     {"", "GroupComponent", "partcomponent", "Antecedent", "NoSuchRole"},
 };
 
-TEST_P(Associations, NamesAreThoseOfTheNaiveFilter)
+TEST_F(Associations, NamesAreThoseOfTheNaiveFilter)
 {
     std::size_t found = 0;
     for (const std::string className : {"TVRHBA_Card", "TVRHBA_Chip", "TVRHBA_PhysicalConnector"})
@@ -180,7 +175,7 @@ TEST_P(Associations, NamesAreThoseOfTheNaiveFilter)
     host.unload();
 }
 
-TEST_P(Associations, InstancesAreThoseThatTheBrokerServes)
+TEST_F(Associations, InstancesAreThoseThatTheBrokerServes)
 {
     const std::vector<std::string> list = {"CreationClassName", "Tag"};
     for (const std::string className : {"TVRHBA_Card", "TVRHBA_Chip", "TVRHBA_PhysicalConnector", "TVRHBA_Product"})
@@ -215,7 +210,7 @@ TEST_P(Associations, InstancesAreThoseThatTheBrokerServes)
 }
 
 /// Profiles live in the interop namespace, whatever namespace an association was asked in.
-TEST_P(Associations, EndsKeepTheirNamespace)
+TEST_F(Associations, EndsKeepTheirNamespace)
 {
     std::size_t profiles = 0;
     for (const Object& object : all)
@@ -242,7 +237,7 @@ TEST_P(Associations, EndsKeepTheirNamespace)
 }
 
 /// A host without a platform: the module makes chassis and computer system, but no provider serves them.
-TEST(Operations, AnEndThatNobodyServesFailsAssociators)
+TEST(Operations, AnEndThatNobodyServesComesFromTheAssociation)
 {
     Host host;
     const Path card = host.instancesOf("TVRHBA_Card").at(0).path;
@@ -251,7 +246,55 @@ TEST(Operations, AnEndThatNobodyServesFailsAssociators)
     ASSERT_TRUE(names.ok());
     ASSERT_EQ(names.paths.size(), 1u);
     EXPECT_EQ(names.paths[0].className, "CIM_Chassis");
-    EXPECT_EQ(host.broker().associators(card, filter).status, CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(host.broker().getInstance(names.paths[0]).status, CMPI_RC_ERR_NOT_FOUND);
+
+    const broker::Reply whole = host.broker().associators(card, filter);
+    ASSERT_TRUE(whole.ok());
+    ASSERT_EQ(whole.objects.size(), 1u);
+    EXPECT_EQ(identity(whole.objects[0].path), identity(names.paths[0]));
+    EXPECT_GT(whole.objects[0].properties.size(), 2u) << "the instance, and not only its keys";
+    const broker::Reply cut = host.broker().associators(card, filter, std::vector<std::string>{"Tag"});
+    ASSERT_TRUE(cut.ok());
+    EXPECT_EQ(cut.objects.at(0).properties.size(), 1u);
+    host.unload();
+}
+
+/// What a search logs is what the enumeration logs that it stands for: locks, waits and refreshes are the same.
+TEST(Operations, SearchesAreEnumerationsToTheLog)
+{
+    Host host;
+    const Path card = host.instancesOf("TVRHBA_Card").at(0).path;
+    const auto logOf = [&](auto operation)
+    {
+        const std::size_t before = host.log().size();
+        operation();
+        std::vector<std::string> lines = host.log();
+        lines.erase(lines.begin(), lines.begin() + static_cast<std::ptrdiff_t>(before));
+        std::erase_if(lines, [](const std::string& line) { return line.find("currenttime") != line.npos; });
+        return lines;
+    };
+    const AssociationFilter filter{"TVRHBA_CardContainsChip", "", "", ""};
+    host.enumerate("TVRHBA_CardContainsChip"); // loads its provider
+    ASSERT_TRUE(host.awaitRefresh());
+    const auto cards = logOf([&] { host.enumerate("TVRHBA_Card"); });
+    const auto chips = logOf([&] { host.enumerate("TVRHBA_CardContainsChip"); });
+    EXPECT_THAT(cards, testing::Contains("[TVR_DBG] TVRHBA_Card_Provider::enum_instances()"));
+    EXPECT_EQ(logOf([&] { EXPECT_TRUE(host.broker().getInstance(card).ok()); }), cards);
+    EXPECT_EQ(logOf([&] { host.broker().enumerateInstanceNames("root/tavrin", "TVRHBA_Card"); }), cards);
+    EXPECT_EQ(logOf([&] { EXPECT_EQ(host.broker().associatorNames(card, filter).paths.size(), 1u); }), chips);
+    EXPECT_EQ(logOf([&] { EXPECT_EQ(host.broker().references(card, filter).objects.size(), 1u); }), chips);
+
+    // of the fabric, and refreshed live
+    for (const char* className : {"TVRHBA_LogicalDisk", "TVRHBA_FCPort"})
+    {
+        host.enumerate(className); // loads its provider, and brings about the refresh that it needs
+        ASSERT_TRUE(host.awaitRefresh(host.logged(created)));
+        const auto all = logOf([&] { host.enumerate(className); });
+        Path absent{"root/tavrin", className, {}};
+        for (const char* key : {"SystemCreationClassName", "SystemName", "CreationClassName", "DeviceID"})
+            absent.setKey(key, broker::Value::string("none"));
+        EXPECT_EQ(logOf([&] { EXPECT_EQ(host.broker().getInstance(absent).status, CMPI_RC_ERR_NOT_FOUND); }), all);
+    }
     host.unload();
 }
 

@@ -1,8 +1,8 @@
 // What operations answer that have no result, and the life of a class's adapter, seen at the CMPI boundary itself.
-#include "broker/BrokerTables.h"
-#include "broker/Core.h"
-#include "broker/Marshal.h"
-#include "runtime/CMPI_Adapter.h"
+#include "broker/core/Core.h"
+#include "broker/tables/BrokerTables.h"
+#include "broker/tables/Marshal.h"
+#include "runtime/adapter/CMPI_Adapter.h"
 #include "tests/module/Walk.h"
 
 #include <gmock/gmock.h>
@@ -10,6 +10,7 @@
 
 #include <cstdlib>
 #include <functional>
+#include <set>
 
 using namespace module_test;
 using broker::Path;
@@ -311,6 +312,13 @@ TEST_F(Boundary, AssociationClassesAreThoseOfTheAdapterOrOfTheEnds)
 
 // --- the runtime's log ---------------------------------------------------------------------------------
 
+/// "FILE(LINE)" of the log's first line with this message.
+std::string placeOf(const std::string& log, const std::string& message)
+{
+    const std::size_t end = log.find(": " + message + "\n");
+    return end == std::string::npos ? "" : log.substr(0, end).substr(log.rfind(' ', end) + 1);
+}
+
 TEST(RuntimeLog, TracesOperationsWithTheirStatus)
 {
     Host host;
@@ -336,6 +344,14 @@ TEST(RuntimeLog, TracesOperationsWithTheirStatus)
         at = log.find(text, at);
         ASSERT_NE(at, std::string::npos) << text << " is missing or out of order in\n" << log;
     }
+
+    // Each operation is shown at its own line, on the way in and out.
+    EXPECT_EQ(placeOf(log, "enter: getInstance()"), placeOf(log, "return: getInstance(): CMPI_RC_ERR_NOT_FOUND"));
+    std::set<std::string> places;
+    for (const char* name : {"enumInstances", "getInstance", "deleteInstance", "createInstance"})
+        places.insert(placeOf(log, "enter: " + std::string(name) + "()"));
+    EXPECT_THAT(places,
+                testing::AllOf(testing::SizeIs(4), testing::Each(testing::StartsWith("CMPI_AdapterInstances.cpp("))));
 }
 
 TEST_F(Boundary, TheRuntimeLogShowsAClassThatAssociationsPassOver)

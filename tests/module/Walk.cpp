@@ -1,6 +1,6 @@
 #include "tests/module/Walk.h"
 
-#include "broker/PathText.h"
+#include "broker/values/PathText.h"
 
 #include <gtest/gtest.h>
 

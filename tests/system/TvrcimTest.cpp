@@ -1,14 +1,22 @@
 // The command-line tool as a person or a script uses it: a process of its own, its output and its exit code.
+#include "tests/support/Eventually.h"
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
+#include <fcntl.h>
+#include <filesystem>
 #include <fstream>
+#include <poll.h>
 #include <string>
 #include <sys/wait.h>
 #include <unistd.h>
+#include <utility>
 #include <vector>
 
 using testing::HasSubstr;
@@ -82,6 +90,18 @@ TEST(Tvrcim, FollowsAssociations)
     EXPECT_EQ(json("assoc " + card + " --result-class CIM_Chip --role PartComponent --names").size(), 0u);
 }
 
+TEST(Tvrcim, PlaysTheServersThatItKnows)
+{
+    for (const std::string server : {"strict", "small-footprint", "open-group"})
+    {
+        const std::string profiles = " enum TVRHBA_RegisteredProfile --namespace ";
+        EXPECT_GE(json("--server " + server + profiles + "root/PG_InterOp").size(), 13u) << server;
+        EXPECT_EQ(tvrcim("--server " + server + profiles + "root/interop").exitCode, server == "open-group" ? 1 : 0);
+        EXPECT_THAT(tvrcim("--server " + server + " enum TVRHBA_Card --namespace root/PG_InterOp").err,
+                    HasSubstr("CIM_ERR_INVALID_CLASS"));
+    }
+}
+
 TEST(Tvrcim, KnowsAllClasses)
 {
     EXPECT_EQ(json("classes").size(), 159u);
@@ -120,6 +140,150 @@ TEST(Tvrcim, ErrorsNameTheStatusOrTheArgument)
         EXPECT_EQ(run.out, "") << row.arguments;
     }
     std::remove(wrongScenario.c_str());
+}
+
+// --- the end by a signal -------------------------------------------------------------------------------
+
+/// A folder that the tool takes for that of temporary files; it must be empty in the end.
+class TemporaryFolder
+{
+public:
+    TemporaryFolder()
+    {
+        EXPECT_TRUE(mkdtemp(_path.data()));
+        setenv("TMPDIR", _path.c_str(), 1);
+    }
+    ~TemporaryFolder()
+    {
+        unsetenv("TMPDIR");
+        std::filesystem::remove_all(_path);
+    }
+    bool empty() const { return std::filesystem::is_empty(_path); }
+
+private:
+    std::string _path = testing::TempDir() + "tvrcim-XXXXXX";
+};
+
+std::size_t semaphoresOf(pid_t process)
+{
+    const std::string ending = "_" + std::to_string(process);
+    return static_cast<std::size_t>(
+        std::ranges::count_if(std::filesystem::directory_iterator("/dev/shm"), std::filesystem::directory_iterator(),
+                              [&](const std::filesystem::directory_entry& entry)
+                              {
+                                  const std::string name = entry.path().filename();
+                                  return name.starts_with("sem.TVR") && name.ends_with(ending);
+                              }));
+}
+
+/// The tool at work, with its output in a pipe that holds a page.
+class Running
+{
+public:
+    explicit Running(std::vector<const char*> words)
+    {
+        words.insert(words.begin(), TVR_TVRCIM);
+        words.push_back(nullptr);
+        int ends[2];
+        EXPECT_EQ(pipe2(ends, O_CLOEXEC), 0);
+        fcntl(ends[1], F_SETPIPE_SZ, 4096);
+        _process = fork();
+        if (_process == 0)
+        {
+            dup2(ends[1], STDOUT_FILENO);
+            execv(words[0], const_cast<char* const*>(words.data()));
+            _exit(127);
+        }
+        close(ends[1]);
+        _output = ends[0];
+    }
+    ~Running()
+    {
+        close(_output);
+        if (_process > 0)
+        {
+            kill(_process, SIGKILL);
+            waitpid(_process, nullptr, 0);
+        }
+    }
+    Running(const Running&) = delete;
+    Running& operator=(const Running&) = delete;
+
+    pid_t process() const { return _process; }
+    bool awaitOutput() const
+    {
+        pollfd ready{_output, POLLIN, 0};
+        return poll(&ready, 1, 20000) == 1;
+    }
+    /// Its exit code after the signal; -1 when that killed it.
+    int endBy(int signal)
+    {
+        kill(_process, signal);
+        return exitCode();
+    }
+
+    /// Its exit code after all of its output.
+    int readAll()
+    {
+        char buffer[4096];
+        while (read(_output, buffer, sizeof buffer) > 0)
+            continue;
+        return exitCode();
+    }
+
+private:
+    int exitCode()
+    {
+        int status = 0;
+        waitpid(std::exchange(_process, -1), &status, 0);
+        return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    }
+
+    pid_t _process;
+    int _output;
+};
+
+/// A signal finds the tool between two operations, or inside one that never ends: what it says about itself in the
+/// system is gone afterwards all the same.
+TEST(Tvrcim, EndsCleanlyBySignals)
+{
+    for (const int signal : {SIGHUP, SIGINT, SIGTERM})
+    {
+        const TemporaryFolder temporary;
+        Running tool({"enum", "CIM_ManagedElement", "--format", "json"});
+        ASSERT_TRUE(tool.awaitOutput()); // more of it than the pipe holds
+        const pid_t process = tool.process();
+        EXPECT_GT(semaphoresOf(process), 0u);
+        EXPECT_FALSE(temporary.empty());
+        EXPECT_EQ(tool.endBy(signal), 128 + signal);
+        EXPECT_EQ(semaphoresOf(process), 0u);
+        EXPECT_TRUE(temporary.empty());
+    }
+}
+
+TEST(Tvrcim, EndsCleanlyInAnOperationThatHangs)
+{
+    const std::string scenario = testing::TempDir() + "hanging-" + std::to_string(getpid()) + ".json";
+    std::ofstream(scenario) << R"({"faults": [{"function": "HBA_GetNumberOfAdapters", "gate": "never opened"}]})";
+    const TemporaryFolder temporary;
+    Running tool({"--scenario", scenario.c_str(), "enum", "TVRHBA_Card"});
+    const pid_t process = tool.process();
+    ASSERT_TRUE(test_support::eventually([&] { return semaphoresOf(process) > 0; }));
+    EXPECT_EQ(tool.endBy(SIGTERM), 128 + SIGTERM);
+    EXPECT_EQ(semaphoresOf(process), 0u);
+    EXPECT_TRUE(temporary.empty());
+    std::remove(scenario.c_str());
+}
+
+/// A signal that whoever started the tool ignores, as nohup does, does not end it.
+TEST(Tvrcim, IgnoredSignalsStayIgnored)
+{
+    std::signal(SIGHUP, SIG_IGN);
+    Running tool({"enum", "CIM_ManagedElement", "--format", "json"});
+    std::signal(SIGHUP, SIG_DFL);
+    ASSERT_TRUE(tool.awaitOutput());
+    kill(tool.process(), SIGHUP);
+    EXPECT_EQ(tool.readAll(), 0);
 }
 
 } // namespace

@@ -1,7 +1,7 @@
 // A small provider module inside the test: a few classes, and providers that do what a test scripts.
 #pragma once
 
-#include "broker/Broker.h"
+#include "broker/core/Broker.h"
 
 #include <functional>
 #include <map>

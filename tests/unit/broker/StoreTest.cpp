@@ -1,7 +1,7 @@
 // The store of platform instances, by itself and behind the broker.
 #include "tests/unit/broker/FakeModule.h"
 
-#include "broker/Store.h"
+#include "broker/core/Store.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

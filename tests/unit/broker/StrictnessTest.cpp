@@ -325,7 +325,8 @@ TEST(ProviderThreads, MarksAreCountedWhereTheyAreOffered)
         EXPECT_EQ(table->release(call.mb, mark).rc, CMPI_RC_OK);
         table->mark(call.mb, nullptr);
     };
-    EXPECT_EQ(breachesOf(takeMark, {.marks = true}), "outside of a call: 1 marks were never released\n");
+    EXPECT_EQ(breachesOf(takeMark, {.personality = smallFootprint}),
+              "outside of a call: 1 marks were never released\n");
     EXPECT_EQ(breachesOf([](const Call& call) { EXPECT_EQ(cimple::broker_memory(call.mb), nullptr); }), "");
 }
 

@@ -7,6 +7,7 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
 
 #include <fstream>
 #include <sstream>
@@ -33,6 +34,8 @@ TEST(CommandLineTest, OptionsStandBeforeOrBehindTheCommand)
     ASSERT_TRUE(line.proceed);
     EXPECT_EQ(line.settings.nameSpace, "root/x");
     EXPECT_EQ(line.settings.format, Format::json);
+    EXPECT_STREQ(line.settings.personality.name, "strict");
+    EXPECT_STREQ(parse({"enum", "A", "--server", "open-group"}).settings.personality.name, "open-group");
     EXPECT_EQ(line.settings.command.name, "enum");
     EXPECT_EQ(line.settings.command.target, "TST_Base");
     EXPECT_THAT(line.settings.command.properties.value(), ElementsAre("a", "b"));
@@ -54,6 +57,7 @@ TEST(CommandLineTest, UsageErrorsExitWithTwo)
                                                   {"enum"},
                                                   {"set", "P.k=1"},
                                                   {"--format", "xml", "classes"},
+                                                  {"--server", "another", "classes"},
                                                   {"--scenario", "/nonexistent", "classes"},
                                                   {"enum", "A", "--unknown"}})
     {
@@ -107,6 +111,20 @@ TEST(Commands, InstancesGoThroughTheirLife)
     EXPECT_EQ(tool.run({"delete", tool.path}), "deleted " + tool.path + "\n");
     EXPECT_THROW(tool.run({"get", tool.path}), CimError);
     EXPECT_EQ(tool.run({"enum", "IBMSD_ComputerSystem"}), "");
+}
+
+TEST(Commands, PathsInJsonLeadBackWhateverTheirBytes)
+{
+    Tool tool;
+    tool.run({"create", "IBMSD_ComputerSystem", "", {"CreationClassName=C", "Name=caf\xe9\n"}});
+    const Json names =
+        Json::parse(tool.run({.name = "enum", .target = "IBMSD_ComputerSystem", .names = true}, Format::json));
+    ASSERT_EQ(names.size(), 2U);
+    for (const Json& name : names)
+    {
+        const Json found = Json::parse(tool.run({"get", name["path"]}, Format::json));
+        EXPECT_EQ(found["path"], name["path"]);
+    }
 }
 
 TEST(Commands, WrongArgumentsAreNamed)

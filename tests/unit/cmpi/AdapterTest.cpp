@@ -1,7 +1,7 @@
-#include "runtime/CMPI_Adapter.h"
+#include "runtime/adapter/CMPI_Adapter.h"
 
-#include "runtime/Thread_Context.h"
-#include "runtime/cimom.h"
+#include "runtime/threads/Thread_Context.h"
+#include "runtime/threads/cimom.h"
 #include "tests/unit/cmpi/FakeProvider.h"
 
 #include <gtest/gtest.h>
@@ -287,6 +287,87 @@ TEST_F(Adapter, maps_creation_deletion_and_queries)
               CMPI_RC_ERR_NOT_FOUND);
     EXPECT_EQ(mi->ft->execQuery(mi, broker.context(), broker.result(results), path(nullptr), "q", "l").rc,
               CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+/// One server crashes in its own getters when a client put text into a number.
+TEST_F(Adapter, refuses_changes_that_a_class_has_not_before_it_reads_them)
+{
+    const CMPIInstance unreadable{};
+    const auto rcs = [&](CMPIObjectPath* of, const CMPIInstance* inst)
+    {
+        CMPIResult* result = broker.result(results);
+        return std::vector<CMPIrc>{mi->ft->createInstance(mi, broker.context(), result, of, inst).rc,
+                                   mi->ft->modifyInstance(mi, broker.context(), result, of, inst, nullptr).rc,
+                                   mi->ft->deleteInstance(mi, broker.context(), result, of).rc};
+    };
+    EXPECT_EQ(rcs(path("d0"), &unreadable), std::vector<CMPIrc>(3, CMPI_RC_ERR_NOT_SUPPORTED));
+    EXPECT_EQ(rcs(path("d0", "T_Nothing"), &unreadable), std::vector<CMPIrc>(3, CMPI_RC_ERR_FAILED));
+    EXPECT_FALSE(provider.received) << "the provider was asked with nothing to act on";
+
+    const CMPIInstance* inst = broker.instance(path("d0"), {});
+    provider.answers[OP_CREATE_INSTANCE] = CREATE_INSTANCE_INVALID_PARAMETER;
+    provider.answers[OP_MODIFY_INSTANCE] = MODIFY_INSTANCE_INVALID_PARAMETER;
+    provider.answers[OP_DELETE_INSTANCE] = DELETE_INSTANCE_FAILED;
+    EXPECT_EQ(rcs(path("d0"), inst),
+              (std::vector<CMPIrc>{CMPI_RC_ERR_INVALID_PARAMETER, CMPI_RC_ERR_INVALID_PARAMETER, CMPI_RC_ERR_FAILED}));
+    EXPECT_TRUE(provider.received);
+}
+
+TEST_F(Adapter, refuses_requests_with_handles_missing)
+{
+    auto* method = provider.make<CMPIMethodMI>(broker, 'M');
+    auto* association = provider.make<CMPIAssociationMI>(broker, 'A');
+    auto* indication = provider.make<CMPIIndicationMI>(broker, 'N');
+    const CMPIInstanceMIFT& i = *mi->ft;
+    const CMPIAssociationMIFT& a = *association->ft;
+    const CMPIIndicationMIFT& n = *indication->ft;
+    const CMPIResult* result = broker.result(results);
+    const CMPIContext* context = broker.context();
+    CMPIObjectPath* of = path("d0");
+    const CMPIInstance* inst = broker.instance(of, {});
+    CMPIArgs* args = broker.args();
+    const char* none = nullptr;
+    const auto invoke = [&](const CMPIObjectPath* target, const char* name, const CMPIArgs* in, CMPIArgs* out)
+    { return method->ft->invokeMethod(method, context, result, target, name, in, out); };
+
+    const CMPIStatus answers[] = {
+        i.enumerateInstanceNames(nullptr, context, result, of),
+        i.enumerateInstanceNames(mi, nullptr, result, of),
+        i.enumerateInstanceNames(mi, context, nullptr, of),
+        i.enumerateInstanceNames(mi, context, result, nullptr),
+        i.enumerateInstances(mi, context, result, nullptr, nullptr),
+        i.getInstance(mi, context, result, nullptr, nullptr),
+        i.getInstance(mi, context, nullptr, of, nullptr),
+        i.createInstance(mi, context, result, of, nullptr),
+        i.createInstance(mi, context, result, nullptr, inst),
+        i.modifyInstance(mi, context, result, of, nullptr, nullptr),
+        i.modifyInstance(mi, context, result, nullptr, inst, nullptr),
+        i.deleteInstance(mi, context, result, nullptr),
+        i.deleteInstance(mi, context, nullptr, of),
+        i.cleanup(nullptr, context, 0),
+        a.associators(association, context, result, nullptr, none, none, none, none, nullptr),
+        a.associatorNames(association, context, result, nullptr, none, none, none, none),
+        a.references(association, context, result, nullptr, none, none, nullptr),
+        a.referenceNames(association, context, nullptr, of, none, none),
+        invoke(nullptr, "Reset", args, args),
+        invoke(of, nullptr, args, args),
+        invoke(of, "Reset", nullptr, args),
+        invoke(of, "Reset", args, nullptr),
+        n.activateFilter(indication, context, nullptr, "", of, 0),
+        n.deActivateFilter(indication, context, nullptr, "", of, 0),
+        n.enableIndications(indication, nullptr),
+        n.disableIndications(nullptr, context),
+    };
+    for (const CMPIStatus& answer : answers)
+        EXPECT_EQ(answer.rc, CMPI_RC_ERR_INVALID_PARAMETER) << &answer - answers;
+}
+
+TEST_F(Adapter, takes_null_texts_of_a_path)
+{
+    CMPIObjectPath* of = path("d0");
+    named(of).texts_are_null = true;
+    EXPECT_EQ(get(of), CMPI_RC_ERR_FAILED);
+    EXPECT_EQ(names(of), CMPI_RC_ERR_FAILED);
 }
 
 // --- methods ------------------------------------------------------------------------------------------------------

@@ -1,3 +1,4 @@
+#include "runtime/adapter/CMPI_AdapterFrame.h"
 #include "tests/unit/cmpi/FakeProvider.h"
 
 #include <gtest/gtest.h>
@@ -56,6 +57,8 @@ struct Association : testing::Test
     }
     static std::string end_name(const Named& found)
     {
+        if (found.entries.empty())
+            return end_name(named(found.path));
         if (const CMPIData* name = found.find("Name"))
             return text(name->value.string);
         return end_name(named(found.find("Antecedent")->value.ref)) +
@@ -105,6 +108,25 @@ TEST_F(Association, references_return_whole_associations)
     EXPECT_EQ(end_name(named(results.instances[0])), "xa ");
 }
 
+TEST_F(Association, references_keep_null_what_is_null)
+{
+    auto& association = static_cast<T_SubLink&>(*provider.instances[0]);
+    association.Note.set_null();
+    const auto note = [&](const char** properties) -> const CMPIData*
+    {
+        results = Results();
+        mi->ft->references(mi, broker.context(), broker.result(results), path("b", "T_Disk"), nullptr, nullptr,
+                           properties);
+        EXPECT_EQ(results.instances.size(), 1u);
+        return named(results.instances.at(0)).find("Note");
+    };
+    EXPECT_EQ(note(nullptr), nullptr) << "all properties, and none made up";
+    association.Note.set("text");
+    EXPECT_NE(note(nullptr), nullptr);
+    const char* others[] = {"Antecedent", nullptr};
+    EXPECT_EQ(note(others), nullptr);
+}
+
 TEST_F(Association, associator_names_pass_every_filter)
 {
     EXPECT_EQ(associator_names(), "bcx");
@@ -129,6 +151,53 @@ TEST_F(Association, associators_are_served_by_their_own_providers)
     broker.events.clear();
     EXPECT_EQ(associators(), std::to_string(CMPI_RC_ERR_ACCESS_DENIED));
     EXPECT_EQ(broker.events.size(), 1u) << "the first failure ends the up-calls";
+}
+
+/// Ends of classes that the module does not serve, like those of a platform that has gone or was never there.
+TEST_F(Association, associators_hold_the_ends_that_nobody_serves)
+{
+    Provider disks(T_Disk::static_meta_class), bases(T_Base::static_meta_class);
+    bases.registration.next = &disks.registration;
+    const Lasting_End lasting[] = {{"T_Odd", nullptr}, {"t_link", "t_base"}};
+    const Module_Info only_disks = {&disks.registration, {}};
+    const Module_Info both = {&bases.registration, {}};
+    const Module_Info both_lasting = {&bases.registration, lasting};
+    const auto in_module = [&](const Module_Info& module, const char** properties = nullptr)
+    {
+        mi->ft->cleanup(mi, broker.context(), 1);
+        provider.module = &module;
+        mi = provider.make<CMPIAssociationMI>(broker, 'A');
+        return associators(properties);
+    };
+    const std::string not_found = std::to_string(CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(in_module(only_disks), "bc");
+    EXPECT_EQ(results.instances[1], broker.stored[0]) << "the broker has it";
+
+    broker.stored.erase(broker.stored.begin()); // c
+    const char* wanted[] = {"Caption", nullptr};
+    EXPECT_EQ(in_module(only_disks, wanted), "bc");
+    EXPECT_EQ(named(results.instances[1]).filter, std::vector<std::string>{"Caption"});
+    EXPECT_EQ(named(named(results.instances[1]).path).name_space, "root/a");
+    EXPECT_EQ(in_module(both), not_found) << "served, and gone";
+    EXPECT_EQ(in_module(both_lasting), "bc") << "served, and kept";
+
+    broker.stored.clear(); // b, which is a disk as well as a base
+    EXPECT_EQ(in_module(only_disks), not_found);
+    broker.upcall_answer = CMPI_RC_ERR_ACCESS_DENIED;
+    EXPECT_EQ(in_module(both_lasting), std::to_string(CMPI_RC_ERR_ACCESS_DENIED)) << "only what is gone is kept";
+    provider.instances.erase(provider.instances.begin());
+    EXPECT_EQ(in_module(only_disks), "c") << "whatever the failure";
+}
+
+TEST_F(Association, statuses_of_the_broker_alone_fail_the_request)
+{
+    for (CMPIrc foreign : {CMPI_RC_ERROR_SYSTEM, CMPI_RC_ERROR})
+    {
+        broker.upcall_answer = foreign;
+        EXPECT_EQ(associators(), std::to_string(CMPI_RC_ERR_FAILED));
+    }
+    EXPECT_EQ(Outcome(CMPI_RC_ERROR_SYSTEM).logged, CMPI_RC_ERROR_SYSTEM);
+    EXPECT_EQ(Outcome(CMPI_RC_ERR_INVALID_DATA_TYPE).rc, CMPI_RC_ERR_INVALID_DATA_TYPE);
 }
 
 TEST_F(Association, associators_with_properties_go_first)

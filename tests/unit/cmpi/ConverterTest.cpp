@@ -1,6 +1,6 @@
-#include "runtime/Converter.h"
+#include "runtime/cmpi/Converter.h"
 
-#include "runtime/CmpiContainers.h"
+#include "runtime/cmpi/CmpiContainers.h"
 #include "tests/unit/cmpi/FakeBroker.h"
 #include "tests/unit/runtime/Records.h"
 
@@ -106,6 +106,7 @@ TEST_F(Converter, gives_the_filter_the_names_of_the_keys)
     const CMPIInstance* inst = to_cmpi(make_disk().get(), wanted);
     EXPECT_EQ(named(inst).filter, std::vector<std::string>{"Caption"});
     EXPECT_EQ(named(inst).filter_keys, (std::vector<std::string>{"System", "Name"}));
+    EXPECT_EQ(broker.faults, std::vector<std::string>());
 }
 
 TEST_F(Converter, drops_only_what_does_not_fit)
@@ -149,6 +150,27 @@ TEST_F(Converter, survives_references_nested_without_end)
 }
 
 // --- keys -------------------------------------------------------------------------------------------------------
+
+/// One broker makes null of an empty text, with or without the type.
+TEST_F(Converter, reads_a_null_string_key_as_empty)
+{
+    for (const CMPIData& null : {null_of(CMPI_string), string_of(nullptr), null_of(CMPI_null)})
+    {
+        const Ref<T_Typed> typed = keys({{"Text", null}, {"U8", null_of(CMPI_uint64)}});
+        EXPECT_FALSE(typed->Text.is_null());
+        EXPECT_TRUE(typed->Text.value.empty());
+        EXPECT_TRUE(typed->U8.is_null()) << "not so a number";
+
+        CMPIObjectPath* owner = broker.path("T_Base", {{"System", string("h")}, {"Name", null}});
+        const Ref<T_Typed> owned = keys({{"Owner", data_of(CMPI_ref, CMPIValue{.ref = owner})}});
+        ASSERT_TRUE(owned->Owner);
+        EXPECT_FALSE(owned->Owner->Name.is_null()) << "inside of a reference";
+        EXPECT_TRUE(owned->Text.is_null()) << "a key that is not there stays null";
+    }
+    const CMPIInstance* inst = broker.instance(broker.path("T_Base"), {{"Name", null_of(CMPI_string)}});
+    EXPECT_TRUE(static_cast<const T_Base&>(*from_cmpi(T_Base::static_meta_class, inst)).Name.is_null())
+        << "nor a property";
+}
 
 TEST_F(Converter, narrows_integer_keys_that_fit)
 {
@@ -248,6 +270,7 @@ TEST_F(Method, ignores_out_arguments_and_takes_any_null_for_an_instance_array)
     EXPECT_TRUE(call->Answer.is_null());
     EXPECT_EQ(call->Parts.null, 1);
     EXPECT_EQ(call->Parts.value.size(), 0u);
+    EXPECT_EQ(read({})->Parts.null, 1) << "an array that was not sent";
 }
 
 TEST_F(Method, returns_out_arguments_and_the_return_value_apart)
@@ -286,7 +309,16 @@ TEST(Value, refuses_another_tag_without_touching_the_target)
     EXPECT_EQ(value.get(out, Value::CHAR16), 0);
     EXPECT_EQ(out, 77);
     EXPECT_STREQ(Value::type_name(Value::NONE), "none");
-    EXPECT_STREQ(Value::type_name(Value::SINT64_ARRAY), "sint64_array");
+    for (std::uint32_t type = 0; type < num_types; ++type)
+    {
+        std::string name = type_name(type);
+        for (char& c : name)
+            c = static_cast<char>(std::toupper(c));
+        EXPECT_EQ(Value::type_name(static_cast<Value::Type>(type)), name);
+        EXPECT_EQ(Value::type_name(static_cast<Value::Type>(type | Value::array_bit)), name + "_ARRAY");
+    }
+    EXPECT_STREQ(Value::type_name(Value::INSTANCE), "INSTANCE");
+    EXPECT_STREQ(Value::type_name(Value::INSTANCE_ARRAY), "INSTANCE_ARRAY");
 }
 
 TEST_F(Converter, codes_of_types_come_back)

@@ -24,6 +24,7 @@ struct List
 struct Cursor
 {
     std::vector<CMPIData> elements;
+    CMPIrc answer = CMPI_RC_OK;
     std::size_t next = 0;
 };
 struct Context
@@ -132,7 +133,7 @@ CMPIBoolean has_next(const CMPIEnumeration* en, CMPIStatus* rc)
 CMPIData get_next(const CMPIEnumeration* en, CMPIStatus* rc)
 {
     Cursor& cursor = content<Cursor>(en);
-    set(rc, CMPI_RC_OK);
+    set(rc, cursor.answer);
     return cursor.elements.at(cursor.next++);
 }
 const CMPIEnumerationFT enumeration_table = {.ftVersion = 1,
@@ -207,13 +208,13 @@ CMPIString* get_name_space(const CMPIObjectPath* path, CMPIStatus* rc)
 {
     set(rc, CMPI_RC_OK);
     const Named_Object& self = content<Named_Object>(path);
-    return make_string(*self.broker, self.named.name_space);
+    return self.named.texts_are_null ? nullptr : make_string(*self.broker, self.named.name_space);
 }
 CMPIString* get_class_name(const CMPIObjectPath* path, CMPIStatus* rc)
 {
     set(rc, CMPI_RC_OK);
     const Named_Object& self = content<Named_Object>(path);
-    return make_string(*self.broker, self.named.class_name);
+    return self.named.texts_are_null ? nullptr : make_string(*self.broker, self.named.class_name);
 }
 const CMPIObjectPathFT path_table = []
 {
@@ -246,7 +247,16 @@ CMPIStatus set_property_filter(CMPIInstance* instance, const char** properties, 
     Named& self = content<Named_Object>(instance).named;
     self.filter = texts(properties);
     self.filter_keys = texts(keys);
+    self.kept_keys = keys;
     return status(CMPI_RC_OK);
+}
+/// Looks at the filter with each property.
+CMPIStatus set_property(const CMPIInstance* instance, const char* name, const CMPIValue* value, CMPIType type)
+{
+    const Named_Object& self = content<Named_Object>(instance);
+    if (texts(self.named.kept_keys) != self.named.filter_keys)
+        self.broker->fault("the key list of a filter is gone");
+    return add_entry(instance, name, value, type);
 }
 const CMPIInstanceFT instance_table = {.ftVersion = 1,
                                        .release = refuse_release<CMPIInstance>,
@@ -254,7 +264,7 @@ const CMPIInstanceFT instance_table = {.ftVersion = 1,
                                        .getProperty = entry_of<CMPIInstance>,
                                        .getPropertyAt = entry_at<CMPIInstance>,
                                        .getPropertyCount = count_of<CMPIInstance>,
-                                       .setProperty = add_entry<const CMPIInstance>,
+                                       .setProperty = set_property,
                                        .getObjectPath = get_object_path,
                                        .setPropertyFilter = set_property_filter,
                                        .setObjectPath = nullptr};
@@ -355,7 +365,7 @@ const CMPIBrokerEncFT factory_table = []
 CMPIContext* prepare_attach(const CMPIBroker* mb, const CMPIContext*)
 {
     broker_of(mb).note("prepare");
-    return broker_of(mb).make_context();
+    return broker_of(mb).prepares ? broker_of(mb).make_context() : nullptr;
 }
 CMPIStatus attach(const CMPIBroker* mb, const CMPIContext* context)
 {
@@ -363,7 +373,7 @@ CMPIStatus attach(const CMPIBroker* mb, const CMPIContext* context)
     if (context == broker.context())
         broker.fault("attached with the context of a request");
     broker.note("attach");
-    return status(CMPI_RC_OK);
+    return status(broker.attach_answer);
 }
 CMPIStatus detach(const CMPIBroker* mb, const CMPIContext*)
 {
@@ -409,8 +419,9 @@ CMPIEnumeration* enumerate_instances(const CMPIBroker* mb, const CMPIContext*, c
     if (broker.upcall_answer != CMPI_RC_OK)
         return nullptr;
     Cursor cursor;
+    cursor.answer = broker.fetched_answer;
     for (CMPIInstance* instance : broker.stored)
-        cursor.elements.push_back(data_of(CMPI_instance, CMPIValue{.inst = instance}));
+        cursor.elements.push_back({CMPI_instance, broker.fetched_state, CMPIValue{.inst = instance}});
     return broker.make<CMPIEnumeration>(cursor, &enumeration_table);
 }
 CMPIObjectPath* create_instance(const CMPIBroker* mb, const CMPIContext*, const CMPIObjectPath* path,
@@ -461,7 +472,7 @@ const CMPIBrokerFT upcall_table = []
 void* mark(const CMPIBroker* mb, CMPIStatus*)
 {
     broker_of(mb).note("mark");
-    return mb->hdl;
+    return broker_of(mb).marks ? mb->hdl : nullptr;
 }
 CMPIStatus release_mark(const CMPIBroker* mb, const void* mark)
 {
@@ -595,6 +606,11 @@ CMPIData data_of(CMPIType type, CMPIValue value)
 CMPIData null_of(CMPIType type)
 {
     return CMPIData{type, CMPI_nullValue, {}};
+}
+
+Named& named(CMPIObjectPath* path)
+{
+    return content<Named_Object>(path).named;
 }
 
 const Named& named(const CMPIObjectPath* path)

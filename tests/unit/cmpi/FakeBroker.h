@@ -29,9 +29,11 @@ struct Named
     std::string name_space;
     std::string class_name;
     std::vector<Entry> entries;
+    bool texts_are_null = false;          // of an object path: namespace and class name
     CMPIObjectPath* path = nullptr;       // of an instance
     std::vector<std::string> filter;      // of an instance
     std::vector<std::string> filter_keys; // likewise
+    const char** kept_keys = nullptr;     // likewise: the list itself, as one broker keeps it
 
     const CMPIData* find(std::string_view name) const;
 };
@@ -68,7 +70,12 @@ public:
     // What up-calls find and leave.
     std::vector<CMPIInstance*> stored;
     CMPIrc upcall_answer = CMPI_RC_OK;
+    CMPIValueState fetched_state = CMPI_goodValue; // of an enumeration's data
+    CMPIrc fetched_answer = CMPI_RC_OK;            // likewise
     CMPIData principal{};
+    bool prepares = true; // for a thread to attach
+    CMPIrc attach_answer = CMPI_RC_OK;
+    bool marks = true; // or gives null for a mark
     int delivered = 0;
     std::vector<std::string> events; // prepare, attach, mark, release, detach, and up-calls by name
     std::vector<std::string> faults;
@@ -103,6 +110,7 @@ inline CMPIData string_of(CMPIString* string)
 }
 
 /// Content of an object of the fake.
+Named& named(CMPIObjectPath* path);
 const Named& named(const CMPIObjectPath* path);
 const Named& named(const CMPIInstance* instance);
 const Named& named(const CMPIArgs* args);

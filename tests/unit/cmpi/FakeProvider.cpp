@@ -51,6 +51,8 @@ int Provider::enumerate(const Instance* with_model, Instance_Handler handler, vo
         if (!handler(clone(instance.get()), PROVIDER_OK, client))
             break;
     }
+    if (cut_short)
+        handler(nullptr, ENUM_INSTANCES_FAILED, client);
     handler(nullptr, answers[OP_ENUM_INSTANCES], client);
     return answers[OP_ENUM_INSTANCES];
 }

@@ -1,7 +1,7 @@
 // A provider of T_Disk or T_Link instances behind a real adapter: answers as told and counts what it is asked.
 #pragma once
 
-#include "runtime/CMPI_Adapter.h"
+#include "runtime/adapter/CMPI_Adapter.h"
 #include "tests/unit/cmpi/FakeBroker.h"
 #include "tests/unit/runtime/Records.h"
 
@@ -19,6 +19,7 @@ public:
     ~Provider();
 
     std::vector<Ref<>> instances;           // what an enumeration gives, as clones
+    bool cut_short = false;                 // the enumeration could not give the rest
     std::array<std::atomic<int>, 17> asked; // by operation
     std::array<int, 17> answers;            // preset to "unsupported" where there is such a number
     std::function<void(Instance* record)> method = [](Instance*) {};
@@ -29,12 +30,13 @@ public:
 
     Registration registration;
     Static_Adapter_Data data;
+    const Module_Info* module = nullptr; // of the factory
 
     /// Through the factory, as the broker would.
     template <class MI> MI* make(const Broker& broker, char type)
     {
         void* mi = nullptr;
-        cimple_cmpi_adapter(&data, &registration, broker.handle(), broker.context(), "T_Provider", type, &mi);
+        cimple_cmpi_adapter(&data, &registration, broker.handle(), broker.context(), "T_Provider", type, &mi, module);
         return static_cast<MI*>(mi);
     }
 

@@ -1,4 +1,4 @@
-#include "runtime/StatusMap.h"
+#include "runtime/adapter/StatusMap.h"
 
 #include <gtest/gtest.h>
 

@@ -1,11 +1,15 @@
-#include "runtime/Thread.h"
+#include "runtime/threads/Thread.h"
 
-#include "runtime/CMPI_Thread_Context.h"
-#include "runtime/cimom.h"
+#include "runtime/adapter/CMPI_Thread_Context.h"
+#include "runtime/threads/cimom.h"
+#include "tests/support/NoMemory.h"
 #include "tests/unit/cmpi/FakeBroker.h"
 #include "tests/unit/runtime/Records.h"
 
+#include <cerrno>
+#include <csignal>
 #include <gtest/gtest.h>
+#include <stdexcept>
 #include <thread>
 
 namespace cimple
@@ -14,6 +18,7 @@ namespace
 {
 
 using namespace fake;
+using test_support::withEachAllocationFailing;
 
 void* return_top(void*)
 {
@@ -63,6 +68,74 @@ TEST(Threads, keep_their_broker_objects_between_mark_and_release)
     EXPECT_EQ(run([](void* arg) -> void* { Thread::exit(arg); }, &number), &number);
     EXPECT_EQ(broker.events, whole) << "an early end runs the exit hook once";
     EXPECT_EQ(broker.faults, Events());
+}
+
+TEST(Threads, leave_the_signals_of_the_host_to_the_host)
+{
+    sigset_t before, after;
+    pthread_sigmask(SIG_SETMASK, nullptr, &before);
+    sigset_t seen;
+    run([](void* mask) -> void*
+        { return pthread_sigmask(SIG_SETMASK, nullptr, static_cast<sigset_t*>(mask)), nullptr; },
+        &seen);
+    for (int host : {SIGTERM, SIGINT, SIGHUP, SIGCHLD, SIGPIPE, SIGUSR1, SIGALRM, SIGRTMIN})
+        EXPECT_EQ(sigismember(&seen, host), 1) << host;
+    for (int fault : {SIGSEGV, SIGBUS, SIGFPE, SIGILL, SIGTRAP, SIGSYS, SIGABRT})
+        EXPECT_EQ(sigismember(&seen, fault), 0) << fault;
+    pthread_sigmask(SIG_SETMASK, nullptr, &after);
+    for (int number = 1; number < SIGRTMAX; ++number)
+        EXPECT_EQ(sigismember(&after, number), sigismember(&before, number)) << number;
+}
+
+TEST(Threads, that_throw_end_alone)
+{
+    EXPECT_EQ(run([](void*) -> void* { throw std::runtime_error("thread"); }), nullptr);
+    Broker broker(200);
+    CMPI_Thread_Context context(broker.handle(), broker.context(), nullptr);
+    const Pushed_Context pushed(context);
+    EXPECT_EQ(run([](void*) -> void* { throw 1; }), nullptr);
+    EXPECT_EQ(broker.events, (Events{"prepare", "attach", "mark", "release", "detach"}));
+}
+
+TEST(Threads, that_cannot_be_made_are_an_error_number)
+{
+    Broker broker;
+    CMPI_Thread_Context context(broker.handle(), broker.context(), nullptr);
+    const Pushed_Context pushed(context);
+    Thread thread;
+    int error = 0;
+    const auto create = [&]
+    {
+        error = -1; // should it throw
+        error = Thread::create_joinable(thread, return_top, nullptr);
+    };
+    const auto check = [&](bool failed)
+    {
+        EXPECT_TRUE(failed ? error == ENOMEM || error == EAGAIN : error == 0) << error;
+        void* top = nullptr;
+        EXPECT_TRUE(error != 0 || Thread::join(thread, top) == 0);
+        EXPECT_EQ(top != nullptr, error == 0);
+    };
+    EXPECT_GE(withEachAllocationFailing(create, check), 3u) << "the record, the context, the thread";
+
+    broker.prepares = false;
+    EXPECT_EQ(Thread::create_joinable(thread, return_top, nullptr), EAGAIN);
+}
+
+TEST(Threads, go_without_a_broker_that_does_not_attach_them)
+{
+    Broker broker(200);
+    CMPI_Thread_Context context(broker.handle(), broker.context(), nullptr);
+    const Pushed_Context pushed(context);
+    broker.attach_answer = CMPI_RC_ERR_FAILED;
+    EXPECT_EQ(run(return_top), nullptr);
+    EXPECT_EQ(broker.events, (Events{"prepare", "attach"}));
+
+    broker.attach_answer = CMPI_RC_OK;
+    broker.marks = false;
+    broker.events.clear();
+    EXPECT_NE(run(return_top), nullptr);
+    EXPECT_EQ(broker.events, (Events{"prepare", "attach", "mark", "detach"})) << "nothing to release";
 }
 
 TEST(Threads, contexts_nest)
@@ -151,6 +224,28 @@ TEST_F(Upcall, instances_go_to_the_broker_and_come_back)
     EXPECT_EQ(cimom::delete_instance("root/a", disk.get()), -1);
     EXPECT_EQ(cimom::enum_instances("root/a", disk.get(), instances), -1);
     EXPECT_EQ(cimom::get_instance("root/a", nullptr), nullptr);
+}
+
+/// One broker marks the data of an enumeration as null, and leaves its status as it was.
+TEST_F(Upcall, enumerations_end_where_the_instances_end)
+{
+    broker.fetched_state = CMPI_nullValue;
+    broker.fetched_answer = CMPI_RC_ERR_FAILED;
+    const auto count = [&]
+    {
+        int found = 0;
+        Instance_Enumerator instances;
+        EXPECT_EQ(cimom::enum_instances("root/a", disk.get(), instances), 0);
+        for (; instances.more(); instances.next())
+            ++found;
+        return found;
+    };
+    EXPECT_EQ(count(), 0);
+    ASSERT_EQ(cimom::create_instance("root/a", disk.get()), 0);
+    ASSERT_EQ(cimom::create_instance("root/a", disk.get()), 0);
+    EXPECT_EQ(count(), 2);
+    broker.stored.insert(broker.stored.begin() + 1, nullptr);
+    EXPECT_EQ(count(), 1) << "no instance in the data is the end";
 }
 
 TEST_F(Upcall, methods_send_their_arguments_and_bring_the_return_value)

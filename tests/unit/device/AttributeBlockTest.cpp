@@ -52,12 +52,27 @@ TEST_F(AttributeBlockTest, TextIsCutAt255Bytes)
     EXPECT_EQ(text, std::string(255, 'x'));
 }
 
-TEST_F(AttributeBlockTest, AWrongLengthOrAMissingValueLeavesTheField)
+TEST_F(AttributeBlockTest, LengthsMayBeRoundedUp)
 {
-    fill({{1, "abc"}, {2, counter(1)}, {3, number(1)}});
+    fill({{1, number(42) + "...."},
+          {2, counter(1ull << 40) + "..."},
+          {3, std::string("\x00\x90\xfa\x01\x02\xff..", 8)}});
+    std::uint32_t word = 0;
+    EXPECT_EQ(block.number(1, word), RM_OK);
+    EXPECT_EQ(word, 42u);
+    std::uint64_t count = 0;
+    EXPECT_EQ(block.counter(2, count), RM_OK);
+    EXPECT_EQ(count, 1ull << 40);
+    std::string text;
+    EXPECT_EQ(readMacAddress(block, 3, "mac", text), RM_OK);
+    EXPECT_EQ(text, "00:90:fa:01:02:ff");
+}
+
+TEST_F(AttributeBlockTest, AShortLengthOrAMissingValueLeavesTheField)
+{
+    fill({{1, "abc"}, {3, number(1)}});
     std::uint32_t word = 77;
     EXPECT_EQ(block.number(1, word), RM_ERROR);
-    EXPECT_EQ(block.number(2, word), RM_ERROR);
     EXPECT_EQ(block.number(9, word), RM_ERROR_NOT_SUPPORTED);
     EXPECT_EQ(word, 77u);
     std::uint64_t count = 77;

@@ -8,7 +8,6 @@
 #include <gmock/gmock.h>
 
 using namespace cimple;
-using testing::Contains;
 using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::IsSupersetOf;
@@ -48,6 +47,17 @@ TEST_F(DataTest, EmptyHost)
                                        "5 freeAllData: cleanExit", "5 buildAdapterData - with hbaapi",
                                        "5 Number of Adapters detected = 0",
                                        "1 HBAAPI reports that there are NO HBAs in the system."));
+}
+
+TEST_F(DataTest, WhatTheLoadedLibrariesDefineIsFound)
+{
+    host.addAdapter(1);
+    host.absentSymbols = {"HBA_GetNumberOfAdapters"};
+    resolveAllEntries();
+    host.onCall["HBA_LoadLibrary"] = [&] { host.absentSymbols.clear(); };
+    Data other;
+    other.buildAdapterData();
+    EXPECT_EQ(other.adapterCount, 1u);
 }
 
 TEST_F(DataTest, TreeOfAdaptersAndPorts)
@@ -258,6 +268,10 @@ TEST_F(DataTest, AdapterAttributesOfTheRmLibrary)
     EXPECT_THAT(log.lines,
                 IsSupersetOf({"5 _BootCodeEnabled: [ 1 ]", "5 INITIAL_FW_LOAD : [ text 545 ]",
                               "5 Operational Firmware : [ text 528 ]", "5 FC_X86_BIOSVersion : [ text 588 ]"}));
+    const auto driverType = std::find(log.lines.begin(), log.lines.end(), "5 _DriverType: [ 3 ]");
+    ASSERT_NE(driverType, log.lines.end());
+    EXPECT_EQ(driverType[-1], "5 _ModelID: [ 527000 ]");
+    EXPECT_EQ(driverType[1], "5 _DiagVersion: [ 544000 ]");
 }
 
 TEST_F(DataTest, AStalePortIsReadAgainAndABadOneLeftOut)

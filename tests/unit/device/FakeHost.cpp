@@ -268,12 +268,16 @@ HBA_HANDLE HBA_OpenAdapter(char* name)
         return 0;
     for (std::size_t i = 0; i < host->adapters.size(); ++i)
         if (host->adapters[i].name == std::string(name))
+        {
+            ++host->openHandles;
             return static_cast<HBA_HANDLE>(i + 1);
+        }
     return 0;
 }
 
 void HBA_CloseAdapter(HBA_HANDLE)
 {
+    --host->openHandles;
     host->enter("HBA_CloseAdapter");
 }
 
@@ -390,7 +394,7 @@ void* openFile(const char* file, int)
 void* findSymbol(void* library, const char* name)
 {
     host->loaderCalls.push_back("symbol " + fileOf(library) + " " + name);
-    if (!library || host->absentSymbols.count(name))
+    if (host->absentSymbols.count(name) || (!library && !host->globalSymbols.count(name)))
         return nullptr;
     const std::string key = name;
     // The fallback library has its functions under their RM_ names only.
@@ -428,6 +432,8 @@ FakeHost::~FakeHost()
 int FakeHost::enter(const std::string& function)
 {
     ++calls[function];
+    if (const auto hook = onCall.find(function); hook != onCall.end())
+        hook->second();
     auto& next = statuses[function];
     if (next.empty())
         return 0;

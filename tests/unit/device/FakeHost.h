@@ -40,6 +40,9 @@ public:
     /// Statuses of the next calls of a function by name. 0 lets the function do its work, as an empty queue does.
     std::map<std::string, std::deque<int>> statuses;
     std::map<std::string, int> calls;
+    /// What a function of this name does besides; it may throw.
+    std::map<std::string, std::function<void()>> onCall;
+    int openHandles = 0;
 
     // What the RM library answers beside attributes.
     std::map<std::uint32_t, std::string> serverAttributes;
@@ -66,6 +69,7 @@ public:
     // The dynamic loader.
     std::set<std::string> files = {"libHBAAPI.so.2", "liblrmapi.so"}; ///< that open
     std::set<std::string> absentSymbols;
+    std::set<std::string> globalSymbols;  ///< that the global scope of the process has, too
     std::vector<std::string> loaderCalls; ///< "open FILE", "symbol FILE NAME", "close FILE"
     bool closeFails = false;
 

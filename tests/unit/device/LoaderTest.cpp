@@ -54,7 +54,7 @@ TEST(EntryPoints, NamesAreUniqueAndFitTheirFamily)
         {
             EXPECT_TRUE(name.starts_with("HBA_")) << name;
         }
-        if (row.family == Family::vendorQos)
+        if (row.family == Family::vendorQos || row.family == Family::vendorClose)
         {
             EXPECT_TRUE(name.starts_with("CPQFC_")) << name;
         }
@@ -64,7 +64,8 @@ TEST(EntryPoints, NamesAreUniqueAndFitTheirFamily)
                                             {Family::lrmOnly, 6},
                                             {Family::rmOnly, 17},
                                             {Family::hbaApi, 14},
-                                            {Family::vendorQos, 9}}));
+                                            {Family::vendorQos, 8},
+                                            {Family::vendorClose, 1}}));
 }
 
 TEST(EntryPoints, EveryRowAnswersItsFailureValueWithoutLibraries)
@@ -140,6 +141,49 @@ TEST(EntryPoints, AreNotLookedUpAgainOnceAllAreResolved)
         EXPECT_THAT(host.loaderCalls, testing::IsEmpty());
         unloadAllLibraries();
     }
+}
+
+TEST(EntryPoints, AbsentOnesAreAskedForAgain)
+{
+    for (const std::string rm : {"liblrmapi.so", "librmapi.so"})
+    {
+        FakeHost host;
+        host.files = {"libHBAAPI.so.2", rm};
+        host.absentSymbols = {"RM_GetVersion", "HBA_SendReadCapacity", "LRM_InitLib", "RM_InitLib"};
+        loadAllLibraries();
+        host.loaderCalls.clear();
+        resolveAbsentEntries();
+        EXPECT_THAT(host.loaderCalls, IsEmpty()); // while bindings look up for themselves
+        resolveAllEntries();
+        EXPECT_EQ(LRM_InitLib(), 1);
+
+        host.absentSymbols.clear();
+        host.loaderCalls.clear();
+        resolveAbsentEntries();
+        EXPECT_EQ(LRM_InitLib(), 0);
+        for (const std::size_t row : {entryRow("RM_GetVersion"), entryRow("HBA_SendReadCapacity")})
+            EXPECT_NE(resolveEntry(row), nullptr) << entryPoints[row].name;
+        EXPECT_THAT(host.loaderCalls, Contains("symbol " + rm + " RM_GetVersion"));
+        EXPECT_THAT(host.loaderCalls, testing::Not(Contains("symbol " + rm + " RM_StatusString"))); // was there
+
+        // What was found stays, whatever becomes of its name.
+        host.absentSymbols = {"RM_GetVersion"};
+        resolveAbsentEntries();
+        EXPECT_NE(resolveEntry(entryRow("RM_GetVersion")), nullptr);
+    }
+}
+
+TEST(EntryPoints, NothingStaysFoundWhenTheLibrariesHaveGone)
+{
+    FakeHost host;
+    loadAllLibraries();
+    resolveAllEntries();
+    EXPECT_EQ(LRM_InitLib(), 0);
+    unloadAllLibraries();
+    host.files.clear();
+    loadAllLibraries();
+    resolveAllEntries();
+    EXPECT_EQ(LRM_InitLib(), 1);
 }
 
 struct LoadCase
@@ -260,6 +304,27 @@ TEST(Loader, FallbackServesTheHbaApi)
     Binding<entryRow("CPQFC_CloseAdapter"), void()>{}();
     EXPECT_THAT(host.loaderCalls,
                 ElementsAre("symbol librmapi.so CPQFC_CloseAdapter", "symbol librmapi.so CPQFC_CloseAdapter"));
+}
+
+TEST(Loader, BesideTheLocalLibraryTheGlobalScopeIsSearchedInTheFallbacksPlace)
+{
+    constexpr Binding<entryRow("CPQFC_CloseAdapter"), void()> closeVendorAdapter;
+    FakeHost host;
+    host.addAdapter(1);
+    host.files = {"liblrmapi.so"};
+    host.globalSymbols = {"HBA_GetNumberOfAdapters"};
+    loadAllLibraries();
+    host.loaderCalls.clear();
+    EXPECT_EQ(cimple::HBA_GetNumberOfAdapters(), 1u);
+    closeVendorAdapter();
+    EXPECT_THAT(host.loaderCalls, ElementsAre("symbol global HBA_GetNumberOfAdapters",
+                                              "symbol global CPQFC_CloseAdapter", "symbol global CPQFC_CloseAdapter"));
+
+    unloadAllLibraries();
+    host.loaderCalls.clear();
+    EXPECT_EQ(cimple::HBA_GetNumberOfAdapters(), 0u);
+    closeVendorAdapter();
+    EXPECT_THAT(host.loaderCalls, IsEmpty());
 }
 
 TEST(Loader, UnloadingMakesEveryCallAbsentUntilTheNextLoad)

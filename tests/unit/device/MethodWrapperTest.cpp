@@ -5,10 +5,16 @@
 #include <cstring>
 #include <fcntl.h>
 #include <filesystem>
+#include <fstream>
 #include <gmock/gmock.h>
 #include <memory>
 #include <rapidcheck.h>
 #include <semaphore.h>
+#include <semaphore>
+#include <stdexcept>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
 #include <thread>
 #include <unistd.h>
 
@@ -20,6 +26,8 @@ using testing::IsEmpty;
 namespace
 {
 
+namespace fs = std::filesystem;
+
 using W = TVR_MethodWrapper;
 
 const HBA_WWN port = wwn(0x1000112233123456);
@@ -29,13 +37,31 @@ std::string initName()
     return "/TVR_RM_INIT_LIB_" + std::to_string(getpid());
 }
 
+std::string doneName()
+{
+    return "/TVR_RM_INIT_LIB_DONE_" + std::to_string(getpid());
+}
+
+/// The file behind a semaphore.
+fs::path fileOf(const std::string& name)
+{
+    return "/dev/shm/sem." + name.substr(1);
+}
+
 bool semaphoreExists(const std::string& name)
 {
+    return fs::exists(fileOf(name));
+}
+
+int valueOf(const std::string& name)
+{
+    int value = -1;
     sem_t* semaphore = sem_open(name.c_str(), 0);
     if (semaphore == SEM_FAILED)
-        return false;
+        return value;
+    sem_getvalue(semaphore, &value);
     sem_close(semaphore);
-    return true;
+    return value;
 }
 
 std::size_t openFiles()
@@ -46,6 +72,12 @@ std::size_t openFiles()
 class MethodWrapperTest : public testing::Test
 {
 protected:
+    ~MethodWrapperTest() override
+    {
+        for (const std::string& name : {initName(), doneName()})
+            fs::remove_all(fileOf(name));
+    }
+
     LoadedHost host;
     LogCapture log;
 };
@@ -59,11 +91,10 @@ TEST_F(MethodWrapperTest, TheFirstObjectInitialisesTheLibrary)
     }
     EXPECT_EQ(host.calls["LRM_InitLib"], 1);
     EXPECT_FALSE(semaphoreExists(initName()));
-    EXPECT_FALSE(semaphoreExists("/TVR_RM_INIT_LIB_DONE_" + std::to_string(getpid())));
-    const std::string done = "/TVR_RM_INIT_LIB_DONE_" + std::to_string(getpid());
+    EXPECT_FALSE(semaphoreExists(doneName()));
     EXPECT_THAT(log.lines, ElementsAre("5 TVR_MethodWrapper::Constructor", "5 Setting Up for FIFO.. ",
                                        "5 Aquired Semaphore.. Running RM_InitLib " + initName() + " ",
-                                       "5 Aquired Completed Semaphore.. Running RM_InitLib " + done,
+                                       "5 Aquired Completed Semaphore.. Running RM_InitLib " + doneName(),
                                        "5 Signalling Completed Semaphore.. Running RM_InitLib",
                                        "5 Signaled Completed Semaphore.. Running RM_InitLib",
                                        "5 RM Library initialized", "5 TVR_MethodWrapper::Destructor",
@@ -87,30 +118,162 @@ TEST_F(MethodWrapperTest, ARefusedOrAbsentInitialisationThrowsAndLeavesNoSemapho
     EXPECT_NO_THROW(W());
 }
 
-TEST_F(MethodWrapperTest, ASecondObjectWaitsForTheFirst)
+TEST_F(MethodWrapperTest, ASecondObjectWaitsForTheFirstHoweverThatEnds)
 {
-    // The state while another object initialises: one unit taken.
-    sem_t* semaphore = sem_open(initName().c_str(), O_CREAT, 0644, 1);
-    ASSERT_NE(semaphore, SEM_FAILED);
-    std::atomic<bool> constructed{false};
-    std::thread second(
-        [&]
+    const std::function<void()> endings[] = {
+        [] {},
+        [&] { host.statuses["LRM_InitLib"] = {1}; },
+        [] { throw std::runtime_error("out of the library"); },
+    };
+    for (const auto& ending : endings)
+    {
+        std::binary_semaphore entered{0};
+        std::binary_semaphore mayGo{0};
+        std::atomic<bool> constructed{false};
+        host.calls.clear();
+        host.onCall["LRM_InitLib"] = [&]
+        {
+            entered.release();
+            mayGo.acquire();
+            ending();
+        };
+        std::thread first(
+            []
+            {
+                try
+                {
+                    const W wrapper;
+                }
+                catch (const std::exception&)
+                {}
+            });
+        entered.acquire();
+        std::thread second(
+            [&]
+            {
+                const W wrapper;
+                constructed = true;
+            });
+        while (valueOf(initName()) != 0)
+            std::this_thread::yield();
+        EXPECT_FALSE(constructed);
+        mayGo.release();
+        first.join();
+        second.join();
+        EXPECT_EQ(host.calls["LRM_InitLib"], 1);
+        EXPECT_FALSE(semaphoreExists(initName()));
+        EXPECT_FALSE(semaphoreExists(doneName()));
+    }
+    EXPECT_EQ(log.count("5 Recieved signal on Completed Semaphore.. To issue RM Calls"), std::ssize(endings));
+}
+
+TEST_F(MethodWrapperTest, TheNameIsTheOneOfTheLatestObject)
+{
+    auto first = std::make_unique<W>();
+    auto second = std::make_unique<W>();
+    first.reset();
+    EXPECT_FALSE(semaphoreExists(initName()));
+    auto third = std::make_unique<W>();
+    second.reset();
+    EXPECT_TRUE(semaphoreExists(initName()));
+    third.reset();
+    EXPECT_FALSE(semaphoreExists(initName()));
+}
+
+TEST_F(MethodWrapperTest, WhatStandsUnderTheNamesIsRemovedUnopened)
+{
+    const fs::path elsewhere = fs::path(testing::TempDir()) / ("elsewhere." + std::to_string(getpid()));
+    const std::function<void(const std::string&)> left[] = {
+        [](const std::string& name) { std::ofstream(fileOf(name)) << ""; },
+        [](const std::string& name) { sem_close(sem_open(name.c_str(), O_CREAT, 0666, 0)); },
+        [](const std::string& name) { sem_close(sem_open(name.c_str(), O_CREAT, 0666, 1)); },
+        [&](const std::string& name) { fs::create_symlink(elsewhere, fileOf(name)); },
+        [](const std::string& name) { fs::create_symlink("nowhere", fileOf(name)); },
+        [](const std::string& name) { mkfifo(fileOf(name).c_str(), 0666); },
+    };
+    std::ofstream(elsewhere) << "text";
+    for (const auto& leave : left)
+    {
+        leave(initName());
+        leave(doneName());
+        host.calls.clear();
         {
             const W wrapper;
-            constructed = true;
-        });
-    int value = 1;
-    while (value != 0)
-    {
-        std::this_thread::yield();
-        sem_getvalue(semaphore, &value);
+            EXPECT_EQ(host.calls["LRM_InitLib"], 1);
+            for (const std::string& name : {initName(), doneName()})
+            {
+                EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(fileOf(name))));
+                EXPECT_EQ(fs::status(fileOf(name)).permissions() & fs::perms::others_write, fs::perms::none);
+            }
+            EXPECT_EQ(valueOf(initName()), 2);
+        }
+        EXPECT_FALSE(semaphoreExists(initName()));
+        EXPECT_FALSE(semaphoreExists(doneName()));
     }
-    EXPECT_FALSE(constructed);
-    sem_post(semaphore);
-    second.join();
-    sem_close(semaphore);
-    EXPECT_EQ(host.calls["LRM_InitLib"], 0);
-    EXPECT_EQ(log.count("5 Recieved signal on Completed Semaphore.. To issue RM Calls"), 1);
+    EXPECT_EQ(fs::file_size(elsewhere), 4u);
+    EXPECT_THAT(log.notable(), IsEmpty());
+    fs::remove(elsewhere);
+}
+
+TEST_F(MethodWrapperTest, WithoutANameTheSemaphoresWorkAllTheSame)
+{
+    fs::create_directory(fileOf(initName()));
+    {
+        const W wrapper;
+        EXPECT_EQ(host.calls["LRM_InitLib"], 1);
+    }
+    EXPECT_THAT(log.notable(), ElementsAre(testing::StartsWith("3 Semaphore " + initName() + " cannot be made: ")));
+    EXPECT_THAT(log.lines, Contains("5 Value of Sem in destructor=3"));
+    EXPECT_TRUE(fs::is_directory(fileOf(initName())));
+    fs::remove(fileOf(initName()));
+
+    rlimit limit;
+    getrlimit(RLIMIT_NOFILE, &limit);
+    const rlimit none{0, limit.rlim_max};
+    setrlimit(RLIMIT_NOFILE, &none);
+    {
+        const W wrapper;
+        EXPECT_EQ(host.calls["LRM_InitLib"], 2);
+    }
+    setrlimit(RLIMIT_NOFILE, &limit);
+    EXPECT_EQ(log.count("3 Semaphore " + doneName() +
+                        " cannot be made: Too many open files. One without a name takes its place."),
+              1);
+}
+
+TEST_F(MethodWrapperTest, AChildLeavesTheParentsObjectAlone)
+{
+    auto wrapper = std::make_unique<W>();
+    const std::string parents = initName();
+    const pid_t child = fork();
+    if (child == 0)
+    {
+        auto own = std::make_unique<W>();
+        const bool hasOwn = valueOf(initName()) == 2 && initName() != parents;
+        wrapper.reset();
+        const bool keepsOwn = semaphoreExists(initName());
+        own.reset();
+        _exit(hasOwn && keepsOwn && !semaphoreExists(initName()) && !semaphoreExists(doneName()) ? 0 : 1);
+    }
+    int status = -1;
+    ASSERT_EQ(waitpid(child, &status, 0), child);
+    EXPECT_EQ(status, 0);
+    EXPECT_EQ(valueOf(initName()), 2);
+    EXPECT_TRUE(semaphoreExists(doneName()));
+    wrapper.reset();
+    EXPECT_FALSE(semaphoreExists(initName()));
+}
+
+TEST_F(MethodWrapperTest, WhatTheInitialisationLoadsIsFound)
+{
+    host.absentSymbols = {"RM_GetVersion"};
+    resolveAllEntries();
+    host.onCall["LRM_InitLib"] = [&] { host.absentSymbols.clear(); };
+    std::string version;
+    EXPECT_EQ(W::GetLibraryVersion(&version), 1);
+    const W wrapper;
+    EXPECT_EQ(W::GetLibraryVersion(&version), 0);
+    EXPECT_EQ(log.count("5 LIBVersion: 7.1"), 1);
 }
 
 TEST_F(MethodWrapperTest, RoundsLeaveNothingBehind)

@@ -1,6 +1,10 @@
 #include "tests/unit/foundation/LogFixture.h"
 
 #include "foundation/HostInformation.h"
+#include "foundation/TVR_FileLogger.h"
+#include "tests/support/NoMemory.h"
+
+#include <sys/stat.h>
 
 namespace cimple
 {
@@ -91,9 +95,53 @@ TEST_F(Host, IsUnknownWhereAFileIsMissing)
     EXPECT_EQ(distribution, "Unknown");
     EXPECT_EQ(sink.take(TVR_ERR).back().message, "Unable to open the /etc/issue file to get OSDistribution Name");
 
-    std::filesystem::create_directory(root / "etc/issue"); // opens, and tells an absurd size
+    ASSERT_EQ(mkfifo((root / "etc/issue").c_str(), 0600), 0); // opening it the plain way would wait for a writer
     EXPECT_NE(getOSInformation(name, distribution), 0);
-    EXPECT_EQ(sink.take(TVR_ERR).back().message, "Unable to allocate the memory to store OSDistributionName");
+    EXPECT_EQ(sink.take(TVR_ERR).back().message, "Unable to open the /etc/issue file to get OSDistribution Name");
+}
+
+TEST_F(Host, KeepsItsKernelLineWhereItsBannerFindsNoMemory)
+{
+    writeFile(root / "proc/version", "Linux\n");
+    writeFile(root / "etc/issue", std::string(5'000, 'i'));
+    logger.setMode(2);
+    TVR_FileLogger file;
+    ASSERT_EQ(file.validateAndSetPath((root / "log").c_str(), true), 0);
+    logger.removeSink(&sink); // it needs memory itself
+    std::size_t told = 0;
+    int status = 0;
+    const auto ask = [&]
+    {
+        status = -1; // should it throw
+        status = getOSInformation(name, distribution);
+    };
+    const auto check = [&](bool failed)
+    {
+        EXPECT_TRUE(status == 0 || failed);
+        if (status == 1)
+        {
+            ++told;
+            EXPECT_EQ(name, "Linux");
+            EXPECT_EQ(distribution, "Unknown");
+        }
+        name = distribution = String();
+    };
+    test_support::withEachAllocationFailing(ask, check);
+    EXPECT_GE(told, 3u) << "the file's name, its content, the text";
+    std::size_t lines = 0;
+    std::ifstream log(root / "log");
+    for (std::string line; std::getline(log, line); ++lines)
+        EXPECT_THAT(line, testing::EndsWith("[TVR_ERR] Unable to allocate the memory to store OSDistributionName"));
+    EXPECT_EQ(lines, told);
+}
+
+TEST_F(Host, BannerOfAGigabyteIsCutToWhatClientsCanUse)
+{
+    writeFile(root / "proc/version", "Linux\n");
+    writeFile(root / "etc/issue", std::string(65'535, 'i') + "end");
+    std::filesystem::resize_file(root / "etc/issue", 1 << 30);
+    EXPECT_EQ(getOSInformation(name, distribution), 0);
+    EXPECT_EQ(distribution, (std::string(65'535, 'i') + "e").c_str());
 }
 
 } // namespace

@@ -198,6 +198,25 @@ TEST_F(LogDataFile, IsWrittenWithoutAPathWhereThereIsNone)
     EXPECT_THAT(sink.take(TVR_ERR), ElementsAre(LogLine{TVR_ERR, "Unable to open dump file\n"}));
 }
 
+TEST_F(LogDataFile, StaysAsItIsWhereItCannotBeWritten)
+{
+    write("2,5,1\n/old");
+    logger.setMode(1);
+    const int status = inChild(
+        [&]
+        {
+            limitFiles(4);
+            logger.writeDataFile();
+            return sink.take(TVR_ERR) ==
+                           std::vector{LogLine{TVR_ERR, "Unable to write dump file - " + dataFile + ": File too large"}}
+                       ? 0
+                       : 1;
+        });
+    EXPECT_EQ(status, 0);
+    EXPECT_EQ(fileText(dataFile), "2,5,1\n/old");
+    EXPECT_THAT(namesIn(root / "etc"), ElementsAre("tavrin_fc_provider.dmp"));
+}
+
 TEST_F(LogDataFile, MovesOffAReadOnlyRoot)
 {
     logger.readDataFile(); // fails, and thus looks at the root file system anew next time
@@ -244,6 +263,29 @@ TEST_F(LogDataFile, MakesLoggingFallBackToFirstFailuresWhenMissing)
     TVR_LOG(TVR_WARN, "a warning");
     TVR_LOG(TVR_CRIT, "a critical message");
     EXPECT_THAT(fileText(fallback), testing::AllOf(HasSubstr("a critical message"), Not(HasSubstr("a warning"))));
+}
+
+TEST_F(LogDataFile, MeetsAFreshLoggerAfterTheEnd)
+{
+    // As in a process in which the module ends and starts again: first without a data file on a read-only root, ...
+    setStatvfs(readOnlyRoot);
+    EXPECT_EQ(startLogging(file), 0);
+    TVR_LOG(TVR_CRIT, "of the first life");
+    finishLogging();
+    EXPECT_EQ(logger.getMode(), 0);
+    EXPECT_EQ(logger.getLevel(), 0);
+    EXPECT_FALSE(logger.isEnabled());
+    EXPECT_FALSE(logger.isFfdcMode());
+    TVR_LOG(TVR_CRIT, "between");
+
+    // ... then with one on a root that was mounted anew.
+    setStatvfs(writableRoot);
+    write("2,5,1\n" + path);
+    EXPECT_EQ(startLogging(file), 0);
+    EXPECT_EQ(file.getPath(), path.c_str());
+    TVR_LOG(TVR_DBG, "of the second life");
+    EXPECT_THAT(fileText(path), HasSubstr("of the second life")) << "not for errors only";
+    EXPECT_THAT(fileText(path), Not(HasSubstr("between")));
 }
 
 TEST_F(LogDataFile, FailsTheStartWithoutAnyLogFile)

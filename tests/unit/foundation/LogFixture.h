@@ -8,8 +8,13 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <sys/resource.h>
 #include <sys/statvfs.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
+#include <algorithm>
+#include <csignal>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -56,6 +61,34 @@ inline std::string fileText(const std::string& path)
 {
     std::ifstream file(path);
     return {std::istreambuf_iterator<char>(file), {}};
+}
+
+inline std::vector<std::string> namesIn(const std::string& folder)
+{
+    std::vector<std::string> names;
+    for (const auto& entry : std::filesystem::directory_iterator(folder))
+        names.push_back(entry.path().filename());
+    std::sort(names.begin(), names.end());
+    return names;
+}
+
+/// Exit status of a forked child that runs the body and ends without the ends of static objects.
+template <class Body> int inChild(Body body)
+{
+    const pid_t child = fork();
+    if (child == 0)
+        _exit(body());
+    int status = 0;
+    waitpid(child, &status, 0);
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+/// As on a disk with room for so much of each file.
+inline void limitFiles(rlim_t size)
+{
+    signal(SIGXFSZ, SIG_IGN);
+    const rlimit limit{size, size};
+    setrlimit(RLIMIT_FSIZE, &limit);
 }
 
 struct LogLine

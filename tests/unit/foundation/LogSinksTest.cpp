@@ -77,6 +77,33 @@ TEST_F(FileSink, WritesALinePerMessage)
                              "\\[LogSinksTest.cpp:[0-9]+\\]\\[TVR_INFO\\] port 3 is up\n"));
 }
 
+TEST_F(FileSink, KeepsALineALine)
+{
+    // Foreign text, as a library gives it, and what the line says of it.
+    const std::pair<const char*, std::string> rows[] = {
+        {"a\n[threadid =1l] forged", "a\\n[threadid =1l] forged"},
+        {"\t\r\x1b[2J\x01\x7f", "\\t\\r\\x1b[2J\\x01\\x7f"},
+        {"caf\u00e9 \x80\xff \\n", "caf\u00e9 \x80\xff \\n"}, // only control characters
+        {"ends with one\n", "ends with one\n"},               // as some messages of the program do
+        {"with two\n\n", "with two\\n\n"},
+        {"\n", "\n"},
+        {"", ""},
+    };
+    for (const auto& [text, written] : rows)
+    {
+        ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+        logger.clearAll();
+        TVR_LOG(TVR_INFO, "%s", text);
+        EXPECT_THAT(fileText(path), testing::EndsWith("[TVR_INFO] " + written + "\n"));
+    }
+    const std::string controls(20'000, '\x02'); // more than the room for a line
+    std::string escaped;
+    while (escaped.size() < 4 * controls.size())
+        escaped += "\\x02";
+    TVR_LOG(TVR_INFO, "%s", controls.c_str());
+    EXPECT_THAT(fileText(path), testing::EndsWith("] " + escaped + "\n"));
+}
+
 TEST_F(FileSink, NamesEveryLevelAndDropsThoseAbove)
 {
     ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
@@ -201,6 +228,12 @@ TEST_F(RingSink, StoresTheThreeErrorLevelsInBrackets)
     }
 }
 
+TEST_F(RingSink, KeepsTheTextAsItIsForClients)
+{
+    TVR_LOG(TVR_ERR, "%s", "two\nlines\x1b");
+    EXPECT_STREQ(ring.entries().at(0).text, "[two\nlines\x1b]");
+}
+
 TEST_F(RingSink, OverwritesTheOldestRecordWhenFull)
 {
     for (int i = 0; i < 1025; ++i)
@@ -269,7 +302,9 @@ TEST_F(SystemLogSink, PassesTheRestOnAsPlainBoundedText)
     const TVR_SysLogger sink;
     TVR_LOG(0, "%s", "100% %n %s");
     TVR_LOG(-5, "%s", std::string(5000, 'x').c_str());
-    ASSERT_EQ(sysLogCalls.size(), 2u);
+    TVR_LOG(0, "%s", "two\nlines");
+    ASSERT_EQ(sysLogCalls.size(), 3u);
+    EXPECT_EQ(sysLogCalls[2].text, "[two\nlines]\n") << "the system log escapes";
     EXPECT_EQ(sysLogCalls[0].priority, -1);
     EXPECT_EQ(sysLogCalls[0].text, "[100% %n %s]\n");
     EXPECT_EQ(sysLogCalls[1].text.size(), 2047u);

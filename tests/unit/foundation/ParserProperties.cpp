@@ -145,7 +145,7 @@ TEST(LineLaws, PiecesAreBoundedAndMakeUpTheText)
         {
             const std::string text = *rc::gen::container<std::string>(rc::gen::elementOf(std::string("ab\n\n")));
             const std::size_t limit = *rc::gen::inRange<std::size_t>(2, 10);
-            LineReader lines(text);
+            Line_Reader lines(text);
             std::string all;
             while (const auto line = lines.next(limit))
             {

@@ -1,10 +1,16 @@
 // The settings of the instance cache and the URL of the management page, as texts and as files.
 #include "tests/unit/foundation/LogFixture.h"
 
+#include "foundation/TVR_FileLogger.h"
 #include "foundation/TvrConfigFile.h"
 #include "foundation/WebLaunchConfig.h"
+#include "tests/support/NoMemory.h"
+
+#include <sys/stat.h>
 
 #include <cerrno>
+#include <functional>
+#include <tuple>
 
 namespace cimple
 {
@@ -151,6 +157,163 @@ TEST_F(SettingsFile, IsNamedWhenItExistsAndDoesNotOpen)
     config.load(below.c_str());
     EXPECT_THAT(sink.lines, ElementsAre(LogLine{TVR_ERR, "Unable to open provider config setting file - " + below}));
     EXPECT_EQ(config.getCacheTimeout(), 10);
+}
+
+TEST_F(SettingsFile, IsLeftAloneWhereItSaysTheSame)
+{
+    writeFile(path, defaultText);
+    struct stat before;
+    ASSERT_EQ(stat(path.c_str(), &before), 0);
+    {
+        TvrConfigFile config;
+        config.load(path.c_str());
+        config.setCacheTimeout(12);
+        config.setCacheTimeout(10);
+    }
+    struct stat after;
+    ASSERT_EQ(stat(path.c_str(), &after), 0);
+    EXPECT_EQ(after.st_ino, before.st_ino);
+    EXPECT_EQ(after.st_mtim.tv_nsec, before.st_mtim.tv_nsec);
+}
+
+TEST_F(SettingsFile, IsWrittenOnceAtTheEnd)
+{
+    TvrConfigFile config;
+    config.save(); // nothing was loaded
+    config.load(path.c_str());
+    config.save();
+    EXPECT_EQ(fileText(path), defaultText);
+    writeFile(path, "of another process");
+    config.save();
+    EXPECT_EQ(fileText(path), "of another process");
+    config.setCacheTimeout(11);
+    config.save();
+    EXPECT_THAT(fileText(path), testing::HasSubstr("TIMEOUT = 11\n"));
+}
+
+TEST_F(SettingsFile, IsNotWrittenByAChildOfTheProcessThatReadIt)
+{
+    TvrConfigFile config;
+    config.load(path.c_str());
+    EXPECT_EQ(inChild(
+                  [&]
+                  {
+                      config.save();
+                      return 0;
+                  }),
+              0);
+    EXPECT_FALSE(std::filesystem::exists(path));
+    EXPECT_EQ(inChild(
+                  [&]
+                  {
+                      config.load(path.c_str()); // a child that uses the module itself
+                      config.save();
+                      return 0;
+                  }),
+              0);
+    EXPECT_EQ(fileText(path), defaultText);
+}
+
+TEST_F(SettingsFile, SurvivesProcessesThatStartAndEndTogether)
+{
+    const std::string given = "# by hand\nTVR_PROVIDER_CACHE_TIMEOUT = 17\n"; // to be brought into form
+    for (int round = 0; round < 20; ++round)
+    {
+        writeFile(path, given);
+        int gate[2];
+        ASSERT_EQ(pipe(gate), 0);
+        std::vector<pid_t> children;
+        for (int i = 0; i < 6; ++i)
+        {
+            children.push_back(fork());
+            if (children.back() != 0)
+                continue;
+            char none;
+            close(gate[1]);
+            std::ignore = read(gate[0], &none, 1); // until the parent closes it
+            TvrConfigFile config;
+            config.load(path.c_str());
+            config.save();
+            _exit(0);
+        }
+        close(gate[0]);
+        close(gate[1]);
+        for (const pid_t child : children)
+            waitpid(child, nullptr, 0);
+        ASSERT_THAT(fileText(path), testing::HasSubstr("TIMEOUT = 17\n"));
+    }
+    EXPECT_THAT(namesIn(root / "etc"), ElementsAre("tavrin_fc_provider.conf"));
+}
+
+TEST_F(SettingsFile, IsNamedAndKeptWhenItCannotBeWritten)
+{
+    struct Row
+    {
+        const char* reason;
+        std::function<void()> arrange;
+    };
+    const Row rows[] = {
+        {"File too large", [] { limitFiles(100); }},
+        {"Too many levels of symbolic links",
+         [&]
+         {
+             std::filesystem::rename(path, path + ".real");
+             std::filesystem::create_symlink(path + ".real", path);
+             chmod((root / "etc").c_str(), 01777);
+         }},
+    };
+    for (const Row& row : rows)
+    {
+        writeFile(path, "old");
+        const int status = inChild(
+            [&]
+            {
+                TvrConfigFile config;
+                config.load(path.c_str());
+                row.arrange();
+                config.save();
+                return sink.take(TVR_ERR) == std::vector{LogLine{TVR_ERR, "Unable to write provider config setting "
+                                                                          "file - " +
+                                                                              path + ": " + row.reason}}
+                           ? 0
+                           : 1;
+            });
+        EXPECT_EQ(status, 0) << row.reason;
+        EXPECT_EQ(fileText(path), "old") << row.reason;
+    }
+}
+
+TEST_F(SettingsFile, IsLeftAloneWhereItCouldNotBeRead)
+{
+    ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
+    {
+        TvrConfigFile config;
+        config.load(path.c_str());
+        EXPECT_THAT(sink.take(TVR_ERR),
+                    ElementsAre(LogLine{TVR_ERR, "Unable to open provider config setting file - " + path}));
+        std::filesystem::remove(path); // as if descriptors had run out for the time of the start
+        writeFile(path, "of the administrator");
+    }
+    EXPECT_EQ(fileText(path), "of the administrator");
+    EXPECT_THAT(sink.lines, IsEmpty());
+}
+
+TEST_F(SettingsFile, NeedsNoMemoryToFail)
+{
+    writeFile(path, "old");
+    logger.setMode(2);
+    TVR_FileLogger file;
+    ASSERT_EQ(file.validateAndSetPath((root / "log").c_str(), false), 0);
+    logger.removeSink(&sink); // it needs memory itself
+    TvrConfigFile config;
+    config.load(path.c_str());
+    {
+        const test_support::NoMemory none;
+        config.save();
+    }
+    EXPECT_EQ(fileText(path), "old");
+    EXPECT_THAT(fileText(root / "log"), testing::HasSubstr("Unable to write provider config setting file - " + path +
+                                                           ": Cannot allocate memory\n"));
 }
 
 // --- management page -----------------------------------------------------------------------------------

@@ -1,11 +1,12 @@
 // The adapter half of the cache on a host without libraries: what a client cannot see, and the steps that fail.
-#include "model/AdapterMaps.h"
+#include "agent/RefreshSteps.h"
 #include "model/ComputerSystem.h"
-#include "model/PhysicalModel.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
-#include "model/Slices.h"
-#include "runtime/Print.h"
+#include "runtime/meta/Print.h"
+#include "schema/TVRHBA_RecordLog.h"
+#include "schema/TVRHBA_RecordLogCapabilities.h"
+#include "schema/TVRHBA_RecordLogConformsToProfile.h"
 #include "tests/module/HostNames.h"
 
 #include <gmock/gmock.h>
@@ -14,6 +15,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <optional>
 #include <sstream>
 #include <stdexcept>
 
@@ -50,9 +52,11 @@ protected:
         agent = ProviderAgent::instance();
         ProviderAgent::addRef();
         agent->m_pData = std::make_unique<Data>(); // without libraries there is none
+        host.emplace(*agent);
     }
     ~AdapterMaps() override
     {
+        host.reset();
         ProviderAgent::releaseRef();
         fs::remove_all(root);
     }
@@ -77,6 +81,7 @@ protected:
 
     const fs::path root;
     ProviderAgent* agent;
+    std::optional<HostContext> host; ///< for steps that are run by themselves
 };
 
 /// The declarations and values of all properties that are not null, in the order of the class.
@@ -94,9 +99,9 @@ std::vector<std::string> properties(const Instance* instance)
 
 TEST_F(AdapterMaps, GeneratedComputerSystemHasThesePropertiesAndNoOthers)
 {
-    ASSERT_TRUE(createComputerSystem(*agent));
+    ASSERT_EQ(createComputerSystem(*host), BUILD_DONE);
     EXPECT_THAT(
-        properties(computerSystem(*agent)),
+        properties(host->system),
         UnorderedElementsAre(
             R"(string Description = "Linux version 6.1.0 with Tavrin CMPI HBA Provider v10.2.261-13";)",
             R"(string ElementName = "tavrin-host.example.net";)", R"(string Name = "tavrin-host.example.net";)",
@@ -115,16 +120,17 @@ TEST_F(AdapterMaps, GeneratedComputerSystemHasThesePropertiesAndNoOthers)
 TEST_F(AdapterMaps, UnknownAddressStaysUnknown)
 {
     module_test::setHostNames({"short", std::nullopt});
-    ASSERT_TRUE(createComputerSystem(*agent));
-    EXPECT_STREQ(computerSystem(*agent)->Name.value.c_str(), "short");
-    EXPECT_STREQ(computerSystem(*agent)->OtherIdentifyingInfo.value[0].c_str(), "unknown");
+    ASSERT_EQ(createComputerSystem(*host), BUILD_DONE);
+    EXPECT_STREQ(host->system->Name.value.c_str(), "short");
+    EXPECT_STREQ(host->system->OtherIdentifyingInfo.value[0].c_str(), "unknown");
     EXPECT_STREQ(agent->m_hostName.c_str(), "short");
     EXPECT_STREQ(agent->m_ipAddress.c_str(), "unknown");
 }
 
 TEST_F(AdapterMaps, GeneratedChassisHasThesePropertiesAndNoOthers)
 {
-    EXPECT_THAT(properties(generateChassis().get()),
+    ASSERT_EQ(createChassis(*host), BUILD_DONE);
+    EXPECT_THAT(properties(host->chassis.get()),
                 UnorderedElementsAre(R"(string Tag = "TVR HBA:Chassis";)",
                                      R"(string CreationClassName = "CIM_Chassis";)",
                                      R"(string ElementName = "TVR HBA:Chassis";)", R"(uint16 PackageType = 3;)",
@@ -134,8 +140,8 @@ TEST_F(AdapterMaps, GeneratedChassisHasThesePropertiesAndNoOthers)
 
 TEST_F(AdapterMaps, ProfileIsRegisteredOnce)
 {
-    const TVRHBA_RegisteredProfile* first = createRegisteredProfile(*agent, "Software", SNIA, "1.2.0");
-    EXPECT_EQ(createRegisteredProfile(*agent, "Software", DMTF, "9.9.9"), first);
+    const TVRHBA_RegisteredProfile* first = createRegisteredProfile(*host, "Software", SNIA, "1.2.0");
+    EXPECT_EQ(createRegisteredProfile(*host, "Software", DMTF, "9.9.9"), first);
     EXPECT_EQ(agent->m_TVRHBA_RegisteredProfile_map.size(), 1u);
     EXPECT_STREQ(first->RegisteredVersion.value.c_str(), "1.2.0");
     EXPECT_THAT(log(), Contains("[TVR_DBG] Got TVRHBA_RegisteredProfile in the map (Software)"));
@@ -143,11 +149,11 @@ TEST_F(AdapterMaps, ProfileIsRegisteredOnce)
 
 TEST_F(AdapterMaps, RefusedInsertsStopTheirStepWithTheirText)
 {
-    ASSERT_TRUE(createComputerSystem(*agent));
-    createProfiles(*agent);
+    ASSERT_EQ(createComputerSystem(*host), BUILD_DONE);
+    createProfiles(*host);
     struct Row
     {
-        std::uint32_t (*step)(ProviderAgent&);
+        std::uint32_t (*step)(HostContext&);
         const char* line;
     };
     const Row rows[] = {
@@ -157,25 +163,25 @@ TEST_F(AdapterMaps, RefusedInsertsStopTheirStepWithTheirText)
     };
     for (const Row& row : rows)
     {
-        EXPECT_EQ(row.step(*agent), BUILD_DONE) << row.line;
+        EXPECT_EQ(row.step(*host), BUILD_DONE) << row.line;
         EXPECT_THAT(log(), Not(Contains(row.line)));
-        EXPECT_EQ(row.step(*agent), BUILD_FAILED) << row.line;
+        EXPECT_EQ(row.step(*host), BUILD_FAILED) << row.line;
         EXPECT_THAT(log(), Contains(row.line));
     }
 
     agent->m_TVRHBA_RecordLog_map.clear();
-    EXPECT_EQ(createProviderRecordLog(*agent), BUILD_FAILED);
+    EXPECT_EQ(createProviderRecordLog(*host), BUILD_FAILED);
     EXPECT_THAT(log(), Contains("[TVR_CRIT] Insert Failed : m_TVRHBA_TVRHBA_EnabledRecordLogCapabilities_map"));
     EXPECT_THAT(log(), Contains("[TVR_CRIT] Insert Failed : m_TVRHBA_ComputerSystemConformsToProfile_map"));
 
-    EXPECT_FALSE(createComputerSystem(*agent));
+    EXPECT_EQ(createComputerSystem(*host), BUILD_FAILED);
     EXPECT_THAT(log(), Contains("[TVR_CRIT] Insert Failed : m_TVRHBA_ComputerSystem_map"));
 }
 
 TEST_F(AdapterMaps, RecordLogNeedsTheProfileRegistration)
 {
-    ASSERT_TRUE(createComputerSystem(*agent));
-    EXPECT_EQ(createProviderRecordLog(*agent), BUILD_FAILED);
+    ASSERT_EQ(createComputerSystem(*host), BUILD_DONE);
+    EXPECT_EQ(createProviderRecordLog(*host), BUILD_FAILED);
     EXPECT_THAT(log(), Contains("[TVR_CRIT] Missing Profile Registration Profile instance"));
     EXPECT_EQ(agent->m_TVRHBA_RecordLog_map.size(), 1u);
     EXPECT_EQ(agent->m_TVRHBA_RecordLogConformsToProfile_map.size(), 0u);
@@ -232,6 +238,22 @@ TEST_F(AdapterMaps, WithoutTheDeviceModelTheRefreshStopsBehindTheProfiles)
     EXPECT_EQ(agent->m_TVRHBA_RegisteredProfile_map.size(), 12u);
     EXPECT_EQ(agent->m_CIM_ComputerSystem_map.size(), 1u);
     EXPECT_EQ(agent->m_CIM_Chassis_map.size(), 0u);
+}
+
+TEST_F(AdapterMaps, AssociationsShareCopiesOfTheirEnds)
+{
+    agent->updateAdapterMaps();
+    auto* recordLog = static_cast<TVRHBA_RecordLog*>(agent->m_TVRHBA_RecordLog_map.at(0));
+    const auto* capabilities =
+        static_cast<TVRHBA_RecordLogCapabilities*>(agent->m_TVRHBA_RecordLogCapabilities_map.at(0));
+    const auto* conforms =
+        static_cast<TVRHBA_RecordLogConformsToProfile*>(agent->m_TVRHBA_RecordLogConformsToProfile_map.at(0));
+    const Instance* end = capabilities->ManagedElement;
+    EXPECT_EQ(conforms->ManagedElement, end);
+    EXPECT_NE(recordLog, end);
+    EXPECT_TRUE(identical(recordLog, end));
+    recordLog->ElementName.set("changed");
+    EXPECT_STRNE(capabilities->ManagedElement->ElementName.value.c_str(), "changed");
 }
 
 TEST_F(AdapterMaps, EveryRefreshBeginsWithEmptyMaps)

@@ -1,4 +1,4 @@
-#include "runtime/Array.h"
+#include "runtime/values/Array.h"
 
 #include <gtest/gtest.h>
 #include <rapidcheck/gtest.h>
@@ -216,6 +216,26 @@ TEST(Array, ACopyThatThrowsLeaksNothing)
         Array<Fragile> target;
         EXPECT_THROW(target = source, int);
         EXPECT_EQ(target.size(), 0u);
+
+        // Elements that move by copies: the array keeps what it had.
+        const auto refused = [&](auto change)
+        {
+            Fragile::copies = 0;
+            EXPECT_THROW(change(), int);
+            EXPECT_EQ(source.size(), 3u);
+            EXPECT_EQ(Fragile::alive, 6);
+        };
+        Fragile::copies = -100;
+        refused([&] { source.reserve(100); });
+        refused([&] { source.insert(0, elements[0]); });
+        refused([&] { source.Array_Base::insert(1, elements, 3); });
+        Fragile::copies = 2;
+        EXPECT_THROW(source.remove(0), int);
+        EXPECT_EQ(source.size(), 3u);
+        Fragile::copies = -100;
+        source.remove(1);
+        source.prepend(elements[0]);
+        EXPECT_EQ(source.size(), 3u);
     }
     EXPECT_EQ(Fragile::alive, 0);
 }

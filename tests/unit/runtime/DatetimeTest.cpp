@@ -1,5 +1,5 @@
-#include "runtime/Datetime.h"
-#include "runtime/Time.h"
+#include "runtime/values/Datetime.h"
+#include "runtime/base/Time.h"
 
 #include <gtest/gtest.h>
 #include <rapidcheck/gtest.h>
@@ -64,6 +64,47 @@ RC_GTEST_PROP(DatetimeProperty, TimestampTextGoesBothWays, ())
     const Datetime value = Datetime::timestamp(static_cast<std::uint64_t>(usec), utc);
     RC_ASSERT(value.text().size() == 25u);
     RC_ASSERT(parsed(value.text().c_str()) == value);
+}
+
+/// A text that was printed is read again, and printed as it was.
+void check_text(const Datetime& value)
+{
+    const String text = value.text();
+    RC_ASSERT(text.size() == 25u);
+    Datetime again;
+    RC_ASSERT(again.parse(text.c_str()));
+    RC_ASSERT(again.is_timestamp() == value.is_timestamp());
+    RC_ASSERT(again.text() == text);
+
+    // The pretty form has separators between the digits before the point.
+    const std::string pretty = value.pretty().c_str();
+    const std::size_t point = pretty.find('.');
+    std::string plain = pretty.substr(0, point);
+    std::erase_if(plain, [](char c) { return c < '0' || c > '9'; });
+    RC_ASSERT(plain + pretty.substr(point) == text.c_str());
+}
+
+RC_GTEST_PROP(DatetimeProperty, EveryValueHasATextThatIsRead, (std::uint64_t usec, std::int32_t utc, bool timestamp))
+{
+    const Time_Zone zone(*rc::gen::element(central_europe, "UTC0", "XXX-14", "YYY12"));
+    const auto scaled = usec >> *rc::gen::inRange(0, 64); // of every magnitude
+    const auto either = *rc::gen::arbitrary<bool>() ? scaled : ~scaled;
+    Datetime value;
+    value.set(either, utc, timestamp);
+    check_text(value);
+}
+
+RC_GTEST_PROP(DatetimeProperty, EveryTextOfDigitsIsReadAndPrinted, ())
+{
+    const Time_Zone zone(*rc::gen::element(central_europe, "UTC0"));
+    std::string text = *rc::gen::container<std::string>(25, rc::gen::inRange('0', static_cast<char>('9' + 1)));
+    text[14] = '.';
+    text[21] = *rc::gen::element('+', '-', ':');
+    if (text[21] == ':')
+        text.replace(22, 3, "000");
+    Datetime value;
+    RC_ASSERT(value.parse(text.c_str()));
+    check_text(value);
 }
 
 TEST(Datetime, IntervalsCountTheWholeSpan)
@@ -139,11 +180,34 @@ TEST(Datetime, EqualityLooksAtAllThreeFields)
     EXPECT_FALSE(Datetime::timestamp(1, 0) == Datetime::timestamp(2, 0));
 }
 
-TEST(Datetime, ExtremeOffsetsAreStillPrinted)
+TEST(Datetime, WhatTheDigitsCannotTellReadsAsTheNearest)
 {
     const Time_Zone zone("UTC0");
-    EXPECT_EQ(Datetime::timestamp(0, INT32_MIN).text(), "19700101000000.000000-2147483647");
-    EXPECT_EQ(Datetime::timestamp(static_cast<std::uint64_t>(-1), 0).text(), "19691231235959.999999+000");
+    constexpr auto lowest = static_cast<std::uint64_t>(INT64_MIN);
+    const struct
+    {
+        Datetime value;
+        const char* text;
+    } rows[] = {
+        {Datetime::timestamp(0, INT32_MIN), "19700101000000.000000-999"},
+        {Datetime::timestamp(0, 1000), "19700101000000.000000+999"},
+        {Datetime::timestamp(static_cast<std::uint64_t>(-1), 0), "19691231235959.999999+000"},
+        {Datetime::timestamp(INT64_MAX, 0), "99991231235959.999999+000"},
+        {Datetime::timestamp(lowest, 0), "00000101000000.000000+000"},
+        {Datetime::timestamp(lowest + 1, 0), "00000101000000.000000+000"},
+        {Datetime::interval(UINT64_MAX), "99999999235959.999999:000"},
+        {Datetime::interval(100'000'000 * Datetime::day), "99999999235959.999999:000"},
+        {parsed("99999999259359.999999:000"), "99999999235959.999999:000"},
+        {parsed("99999931235959.999999+000"), "99991231235959.999999+000"},
+        {parsed("00000001000000.000000+000"), "00000101000000.000000+000"},
+        {parsed("20241301000000.000000+000"), "20250101000000.000000+000"},
+    };
+    for (const auto& row : rows)
+    {
+        EXPECT_EQ(row.value.text(), row.text);
+        EXPECT_EQ(parsed(row.text).text(), row.text);
+    }
+    EXPECT_EQ(Datetime::timestamp(lowest, -1000).pretty(), "0000/01/01 00:00:00.000000-999");
 }
 
 bool fixed_now(std::uint64_t& usec, std::int32_t& utc_offset)

@@ -1,5 +1,5 @@
 // Life and content of instances.
-#include "runtime/Print.h"
+#include "runtime/meta/Print.h"
 #include "tests/unit/runtime/Records.h"
 
 #include <gtest/gtest.h>
@@ -91,6 +91,59 @@ TEST(InstanceLife, ACloneIsIdenticalAndItsOwn)
     EXPECT_EQ(disk->Name.value, "sda");
     EXPECT_EQ(disk->Notes.value[0], "x");
     EXPECT_EQ(disk->Twin->Name.value, "sdb");
+}
+
+TEST(InstanceLife, ACopyForReadersSharesWhatItRefersTo)
+{
+    Ref<T_Disk> disk = make_full_disk();
+    const Ref<T_Disk> copy(static_cast<T_Disk*>(clone_sharing_referents(disk.get())));
+    EXPECT_TRUE(identical(disk.get(), copy.get()));
+    EXPECT_EQ(copy->Twin, disk->Twin);
+    EXPECT_EQ(copy->Parts.value[0], disk->Parts.value[0]);
+    EXPECT_EQ(copy->Parts.value[1], nullptr);
+
+    // None of what readers do to a copy reaches its referents.
+    const Ref<T_Disk> untouched(clone_of(disk.get()));
+    const char* wanted[] = {"Size", nullptr};
+    filter_properties(copy.get(), wanted, false);
+    create_ref_children(copy.get());
+    const Ref<T_Disk> other(create<T_Disk>());
+    other->Twin = make_named<T_Base>("host", "sdc");
+    cimple::copy(copy.get(), other.get());
+    EXPECT_EQ(copy->Twin->Name.value, "sdc");
+    EXPECT_TRUE(identical(disk.get(), untouched.get()));
+
+    const Ref<T_Disk> last(static_cast<T_Disk*>(clone_sharing_referents(disk.get())));
+    disk.reset();
+    EXPECT_TRUE(identical(last.get(), untouched.get())) << "outlives what it was made of";
+    EXPECT_EQ(clone_sharing_referents(nullptr), nullptr);
+}
+
+TEST(InstanceLife, ACopyOfTheKeysHasNoneOfTheRest)
+{
+    const Ref<T_Disk> disk = make_full_disk();
+    Ref<> blank;
+    const Ref<T_Disk> names(static_cast<T_Disk*>(clone_keys(disk.get(), blank)));
+    EXPECT_TRUE(key_eq(names.get(), disk.get()));
+    EXPECT_EQ(names->__name_space, "root/x");
+    EXPECT_EQ(names->Twin, nullptr);
+    EXPECT_TRUE(names->Notes.null && names->Notes.value.size() == 0);
+    EXPECT_TRUE(names->Parts.null && names->Parts.value.size() == 0);
+    EXPECT_TRUE(names->Caption.null && names->Caption.value.empty());
+    EXPECT_TRUE(names->Size.null && names->Since.null);
+
+    const Ref<T_Link> link(make_link<T_Link>(clone_of<T_Base>(disk.get()), nullptr));
+    const Ref<T_Link> ends(static_cast<T_Link*>(clone_keys(link.get(), blank)));
+    EXPECT_EQ(ends->Antecedent, link->Antecedent) << "keys share what they refer to";
+    EXPECT_EQ(ends->Dependent, nullptr);
+    EXPECT_EQ(clone_keys(nullptr, blank), nullptr);
+
+    const Ref<T_Odd> odd(create<T_Odd>());
+    odd->When.set(Datetime::timestamp(5, 60));
+    odd->List.set({1, 2});
+    odd->Others.value.append(make_named<T_Base>("h", "a"));
+    const Ref<> all(clone_keys(odd.get(), blank));
+    EXPECT_TRUE(identical(all.get(), odd.get())) << "has nothing but keys";
 }
 
 TEST(InstanceLife, IdenticalSeesEachSlotAndNullByte)

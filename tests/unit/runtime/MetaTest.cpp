@@ -1,6 +1,6 @@
-#include "runtime/Meta.h"
-#include "runtime/Assert.h"
-#include "runtime/MetaDynamic.h"
+#include "runtime/meta/Meta.h"
+#include "runtime/base/Assert.h"
+#include "runtime/meta/MetaDynamic.h"
 #include "tests/unit/runtime/Records.h"
 
 #include <gtest/gtest.h>
@@ -161,12 +161,16 @@ TEST(MetaDynamic, InstancesAndSubclassesKeepTheirClassAlive)
     Meta_Class* base = clone_meta(&T_Base::static_meta_class);
     Meta_Class derived = T_Disk::static_meta_class;
     derived.super_meta_class = base;
+    std::uint16_t keys[] = {1, 2};
+    derived.keys = keys;
     Meta_Class* disk = clone_meta(&derived);
     EXPECT_EQ(base->refs, 2u);
+    keys[0] = keys[1] = 99; // the copy has its own
 
     Instance* instance = create(disk, true);
     Instance* copy = clone(instance);
     EXPECT_EQ(disk->refs, 3u);
+    EXPECT_TRUE(key_eq(instance, copy));
     unref_meta(base);
     unref_meta(disk);
     EXPECT_TRUE(is_subclass(&T_Base::static_meta_class, copy->__meta_class));

@@ -108,7 +108,9 @@ constexpr Meta_Reference link_dependent =
     reference(KEY_REFERENCE, "Dependent", &T_Base::static_meta_class, offsetof(T_Link, Dependent));
 constexpr const Meta_Feature* link_features[] = {&link_antecedent, &link_dependent};
 constexpr std::uint8_t link_locals[] = {1, 1};
-constexpr std::uint8_t sub_link_locals[] = {0, 0};
+constexpr Meta_Property sub_link_note = scalar(READ, "Note", STRING, offsetof(T_SubLink, Note));
+constexpr const Meta_Feature* sub_link_features[] = {&link_antecedent, &link_dependent, &sub_link_note};
+constexpr std::uint8_t sub_link_locals[] = {0, 0, 1};
 
 // T_Typed
 constexpr Meta_Property typed_flag = scalar(KEY, "Flag", BOOLEAN, offsetof(T_Typed, Flag));
@@ -159,8 +161,9 @@ constinit const Meta_Class T_OtherDisk::static_meta_class = meta_class(
     "T_OtherDisk", META_CLASS, other_features, other_locals, sizeof(T_OtherDisk), 2, &T_Base::static_meta_class);
 constinit const Meta_Class T_Link::static_meta_class =
     meta_class("T_Link", META_ASSOCIATION, link_features, link_locals, sizeof(T_Link), 2);
-constinit const Meta_Class T_SubLink::static_meta_class = meta_class(
-    "T_SubLink", META_ASSOCIATION, link_features, sub_link_locals, sizeof(T_SubLink), 2, &T_Link::static_meta_class);
+constinit const Meta_Class T_SubLink::static_meta_class =
+    meta_class("T_SubLink", META_ASSOCIATION, sub_link_features, sub_link_locals, sizeof(T_SubLink), 2,
+               &T_Link::static_meta_class);
 constinit const Meta_Class T_Typed::static_meta_class =
     meta_class("T_Typed", META_CLASS, typed_features, typed_locals, sizeof(T_Typed), 6);
 constinit const Meta_Class T_Odd::static_meta_class =

@@ -4,13 +4,13 @@
 //   T_Disk        : T_Base with one property of every kind, defaults, an embedded instance, a reference array
 //                 and the method Reset
 //   T_OtherDisk   : T_Base with an overriding Name (key) of its own
-//   T_Link        association of two T_Base; T_SubLink derives from it
+//   T_Link        association of two T_Base; T_SubLink derives from it and has a Note
 //   T_Typed       keys of every kind that a model path can hold
 //   T_Odd         keys that it cannot hold: real, datetime, array, reference array
 //   T_Stranger    the keys of T_Base, but Name is a uint32
 #pragma once
 
-#include "runtime/Instance.h"
+#include "runtime/meta/Instance.h"
 
 namespace cimple
 {
@@ -69,6 +69,8 @@ public:
 class T_SubLink : public T_Link
 {
 public:
+    Property<String> Note; // no key
+
     static const Meta_Class static_meta_class;
 };
 

@@ -1,7 +1,7 @@
 // Every class and method of the real schema through the generic operations.
-#include "runtime/Instance.h"
-#include "runtime/InstanceSlots.h"
-#include "runtime/Print.h"
+#include "runtime/meta/Instance.h"
+#include "runtime/meta/InstanceSlots.h"
+#include "runtime/meta/Print.h"
 #include "schema/Repository.h"
 
 #include <gtest/gtest.h>

@@ -1,4 +1,4 @@
-#include "runtime/String.h"
+#include "runtime/values/String.h"
 
 #include <gtest/gtest.h>
 #include <rapidcheck/gtest.h>

@@ -1,6 +1,6 @@
 // Text to value, value to text, and the buffer that assembles text.
-#include "runtime/Buffer.h"
-#include "runtime/TextConversion.h"
+#include "runtime/values/Buffer.h"
+#include "runtime/values/TextConversion.h"
 
 #include <gtest/gtest.h>
 #include <rapidcheck/gtest.h>
@@ -206,6 +206,11 @@ TEST(Buffer, FormatsTextOfAnyLength)
         exact.appendf("%s", std::string(size, 'y').c_str());
         EXPECT_EQ(exact.c_str(), std::string(size, 'y'));
     }
+
+    const std::size_t size = buffer.size();
+    buffer.appendf("and %lc", static_cast<wint_t>(0x7fffffff)); // no character, in a buffer of any size
+    EXPECT_EQ(buffer.size(), size);
+    EXPECT_EQ(buffer.c_str()[size], '\0');
 }
 
 } // namespace

@@ -1,6 +1,6 @@
 // The generated tables as a whole: what generic code relies on holds for every record.
 #include "schema/Repository.h"
-#include "runtime/Instance.h"
+#include "runtime/meta/Instance.h"
 
 #include <gmock/gmock.h>
 

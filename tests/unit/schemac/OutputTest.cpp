@@ -69,6 +69,7 @@ public:
 class TVRHBA_Disk_Erase_method : public Instance
 {
 public:
+    using Class = TVRHBA_Disk;
     TVRHBA_Bay* Target;
     Property<Array<String>> Log;
     Property<std::uint32_t> return_value;
