@@ -14,12 +14,19 @@
 namespace cimple
 {
 
+class TVRHBA_BootBIOSService;
 class TVRHBA_Card;
 class TVRHBA_Chip;
+class TVRHBA_FCHBADriverParamService;
+class TVRHBA_FCHBAWWNService;
+class TVRHBA_FCPort;
+class TVRHBA_FCTagService;
 class TVRHBA_LogicalPortGroup;
 class TVRHBA_PhysicalConnector;
+class TVRHBA_PortController;
 class TVRHBA_Product;
 class TVRHBA_RegisteredProfile;
+class TVRHBA_SCSIProtocolInitiatorEndpoint;
 class TVRHBA_SoftwareIdentity;
 class TVRHBA_SoftwareInstallationService;
 
@@ -52,7 +59,12 @@ struct HostContext
     Ref<CIM_Chassis> chassis; ///< the platform's, or a share of the one in the map
     RegisteredProfiles profiles;
     TVRHBA_SoftwareIdentity* providerIdentity = nullptr;
-    TVRHBA_SoftwareInstallationService* installationService = nullptr; ///< null where no step makes one
+    TVRHBA_SoftwareIdentity* driverIdentity = nullptr;
+    TVRHBA_SoftwareInstallationService* installationService = nullptr;
+    TVRHBA_FCHBAWWNService* wwnService = nullptr;
+    TVRHBA_FCTagService* tagService = nullptr;
+    TVRHBA_BootBIOSService* bootService = nullptr;
+    TVRHBA_FCHBADriverParamService* parameterService = nullptr;
 };
 
 /// Of an adapter.
@@ -89,6 +101,9 @@ struct PortContext
     TVRHBA_Chip* chip = nullptr;
     ChipKind chipKind = ChipKind::Other;
     TVRHBA_PhysicalConnector* connector = nullptr;
+    TVRHBA_FCPort* fcPort = nullptr;
+    TVRHBA_PortController* controller = nullptr;
+    TVRHBA_SCSIProtocolInitiatorEndpoint* endpoint = nullptr;
 };
 
 } // namespace cimple
