@@ -41,6 +41,15 @@ template <class Record> Ref<Record> fresh()
     return instance;
 }
 
+/// The same without defaults: what its builder does not name stays null.
+template <class Record> Ref<Record> empty()
+{
+    Ref<Record> instance(create<Record>());
+    nullify(instance.get(), true, true, 1);
+    instance->__name_space = moduleNamespace();
+    return instance;
+}
+
 /// What `make` gives; null when memory ran out on the way.
 template <class Make> auto unlessOutOfMemory(Make make) -> decltype(make())
 {

@@ -56,6 +56,9 @@ inline constexpr Binding<entryRow("HBA_RefreshInformation"), decltype(::HBA_Refr
 inline constexpr Binding<entryRow("HBA_SendReadCapacity"), decltype(::HBA_SendReadCapacity)> HBA_SendReadCapacity;
 inline constexpr Binding<entryRow("HBA_SendScsiInquiry"), decltype(::HBA_SendScsiInquiry)> HBA_SendScsiInquiry;
 
+inline constexpr Binding<entryRow("LRM_DiagBeacon"), RM_DiagBeacon_t> LRM_DiagBeacon;
+inline constexpr Binding<entryRow("LRM_DiagBeaconState"), RM_DiagBeaconState_t> LRM_DiagBeaconState;
+inline constexpr Binding<entryRow("LRM_DiagGetLoadListParams"), RM_DiagGetLoadListParams_t> LRM_DiagGetLoadListParams;
 inline constexpr Binding<entryRow("LRM_DiagReadPCIRegistersV2"), RM_DiagReadPCIRegistersV2_t>
     LRM_DiagReadPCIRegistersV2;
 inline constexpr Binding<entryRow("LRM_GetDriverType"), RM_GetDriverType_t> LRM_GetDriverType;
@@ -67,6 +70,7 @@ inline constexpr Binding<entryRow("LRM_GetPortAttributes"), RM_GetPortAttributes
 inline constexpr Binding<entryRow("LRM_GetPortStatistics"), RM_GetPortStatistics_t> LRM_GetPortStatistics;
 inline constexpr Binding<entryRow("LRM_GetQoS"), RM_GetQoS_t> LRM_GetQoS;
 inline constexpr Binding<entryRow("LRM_GetServerAttributes"), RM_GetServerAttributes_t> LRM_GetServerAttributes;
+inline constexpr Binding<entryRow("LRM_GetSffData"), RM_GetSffData_t> LRM_GetSffData;
 inline constexpr Binding<entryRow("LRM_GetVMFromVPort"), RM_GetVMFromVPort_t> LRM_GetVMFromVPort;
 inline constexpr Binding<entryRow("LRM_InitLib"), RM_InitLib_t> LRM_InitLib;
 inline constexpr Binding<entryRow("LRM_ScsiInquiry"), RM_ScsiInquiry_t> LRM_ScsiInquiry;

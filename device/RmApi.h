@@ -25,6 +25,7 @@ enum RM_StatusCode : std::int32_t
     RM_ERROR_MORE_DATA = 7,
     RM_ERROR_NO_MEMORY = 8,
     RM_ERROR_CHECK_CONDITION = 9, ///< a SCSI command ended with sense data, as in the HBA API
+    RM_ERROR_DIAGNOSTICS_NOT_AVAILABLE = 63,
     RM_ERROR_WWN_NOT_SUPPORTED = 89,
     RM_ERROR_DUPLICATE_WWN = 91,
     RM_ERROR_WWN_NOT_AVAILABLE = 92,
@@ -192,6 +193,78 @@ extern "C"
     static_assert(offsetof(RM_PciRegisters, pciType) == 316);
 
     typedef RM_STATUS RM_DiagReadPCIRegistersV2_t(HBA_WWN wwpn, RM_PciRegisters* registers);
+
+    /// Beacon of a port's light.
+    enum RM_BeaconState : std::uint32_t
+    {
+        RM_BEACON_NOT_AVAILABLE = 1,
+        RM_BEACON_OFF = 2,
+        RM_BEACON_ON = 3,
+    };
+
+    typedef RM_STATUS RM_DiagBeaconState_t(HBA_WWN wwpn, std::uint32_t* state);
+    typedef RM_STATUS RM_DiagBeacon_t(HBA_WWN wwpn, std::uint32_t state);
+
+    /// Transceiver of a port: what SFF-8472 has in its pages A0h and A2h. Texts need no terminator and may be padded
+    /// with blanks.
+    struct RM_SffData
+    {
+        std::uint8_t identityPresent;    ///< not 0: identifier to waveLength hold
+        std::uint8_t vendorPresent;      ///< not 0: vendorName to dateCode hold
+        std::uint8_t diagnosticsPresent; ///< not 0: measured values and thresholds hold
+        std::uint8_t identifier;         ///< page A0h byte 0: 3 is an SFP
+        std::uint8_t extIdentifier;      ///< byte 1
+        std::uint8_t connector;          ///< byte 2: 7 is LC
+        std::uint16_t waveLength;        ///< bytes 60 and 61: nanometres
+        char vendorName[16];             ///< bytes 20 to 35
+        std::uint8_t oui[3];             ///< bytes 37 to 39
+        char partNumber[16];             ///< bytes 40 to 55
+        char revision[4];                ///< bytes 56 to 59
+        char serialNumber[16];           ///< bytes 68 to 83
+        char dateCode[6];                ///< bytes 84 to 89: digits YYMMDD
+        std::uint8_t reserved[3];
+        float temperature;            ///< degrees Celsius
+        float vcc;                    ///< volts
+        float txBiasCurrent;          ///< milliamperes
+        float txPower;                ///< milliwatts
+        float rxPower;                ///< milliwatts
+        std::uint16_t thresholds[20]; ///< page A2h bytes 0 to 39 in native order: for temperature, voltage, bias
+                                      ///< current, transmitted and received power each high alarm, low alarm, high
+                                      ///< warning, low warning
+    };
+    static_assert(offsetof(RM_SffData, vendorName) == 8 && offsetof(RM_SffData, temperature) == 72);
+    static_assert(offsetof(RM_SffData, thresholds) == 92 && sizeof(RM_SffData) == 132);
+
+    typedef RM_STATUS RM_GetSffData_t(HBA_WWN wwpn, RM_SffData* data);
+
+    /// A program in the flash memory of an adapter.
+    struct RM_FlashRegion
+    {
+        char programType[32];
+        std::uint32_t programId[2];
+        char version[32];
+        char description[64];
+        std::uint32_t startAddress; ///< of the region in the flash memory
+        std::uint32_t length;       ///< bytes
+        std::uint32_t next;         ///< start address of the region behind it, 0 for none
+        std::uint32_t previous;     ///< likewise before it
+        std::uint32_t isWakeup;     ///< not 0: the adapter starts this program
+    };
+    static_assert(sizeof(RM_FlashRegion) == 156);
+
+    enum
+    {
+        RM_MAX_FLASH_REGIONS = 64,
+    };
+
+    struct RM_FlashList
+    {
+        std::uint32_t count; ///< one more than there are regions
+        RM_FlashRegion entry[RM_MAX_FLASH_REGIONS];
+    };
+    static_assert(offsetof(RM_FlashList, entry) == 4);
+
+    typedef RM_STATUS RM_DiagGetLoadListParams_t(HBA_WWN wwpn, RM_FlashList* list);
 
     // Virtual ports.
 

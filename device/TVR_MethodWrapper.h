@@ -78,6 +78,12 @@ public:
     /// Logical units of a target behind a port.
     static RM_STATUS tvrcimGetTargetMapping(const char* deviceId, const char* targetId, std::vector<TargetLun>* luns);
 
+    /// Value of LocationIndicator: 2 for on, 3 for off, 4 where there is no beacon, 0 if the library fails; a port
+    /// whose state is neither leaves it. 0, or 32968 for a null output or a wrong name.
+    static std::uint32_t GetBeaconState(const char* deviceId, std::uint16_t* value);
+    /// `value` is 2 for on or 3 for off. 32968 for any other, else 0, whatever the library says.
+    static std::uint32_t SetBeaconState(const HBA_WWN& wwpn, std::uint16_t value);
+
     // Virtual ports.
 
     static RM_STATUS ListVPorts(const char* deviceId, std::vector<RM_VPortEntry>* vports);

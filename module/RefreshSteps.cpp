@@ -3,6 +3,7 @@
 
 #include "model/ComputerSystem.h"
 #include "model/PhysicalModel.h"
+#include "model/PortModel.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
 
@@ -46,6 +47,13 @@ constexpr PortStep portSteps[] = {
     {createChipInstances, Stop, "CreateChipInstances failed"},
     {createPCIDeviceInstance, Stop, "CreatePCIDeviceInstance failed"},
     {createPhysicalConnectorInstances, Stop, "CreatePhysicalConnectorInstances failed"},
+    {createFCPort, Stop, {}},
+    {createFCPortStatistics, Stop, {}},
+    {createSCSIProtocolController, Stop, {}},
+    {createPortController, Stop, {}},
+    {createPortControllerAssociations, Stop, {}},
+    {createInitiatorEndpoint, Stop, {}},
+    mark<PortContext>({TVR_DBG, "Ending of Software Installation Service"}),
 };
 
 constexpr HostStep closingSteps[] = {
