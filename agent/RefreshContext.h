@@ -4,6 +4,7 @@
 #include "agent/ProviderAgent.h"
 #include "device/FCAdapter.h"
 #include "device/FCPort.h"
+#include "device/Vpd.h"
 #include "schema/CIM_Chassis.h"
 #include "schema/CIM_ComputerSystem.h"
 
@@ -104,6 +105,7 @@ struct PortContext
     TVRHBA_FCPort* fcPort = nullptr;
     TVRHBA_PortController* controller = nullptr;
     TVRHBA_SCSIProtocolInitiatorEndpoint* endpoint = nullptr;
+    std::vector<VpdField> vpd = {}; ///< none if the library does not give them
 };
 
 } // namespace cimple

@@ -72,6 +72,7 @@ inline constexpr Binding<entryRow("LRM_GetQoS"), RM_GetQoS_t> LRM_GetQoS;
 inline constexpr Binding<entryRow("LRM_GetServerAttributes"), RM_GetServerAttributes_t> LRM_GetServerAttributes;
 inline constexpr Binding<entryRow("LRM_GetSffData"), RM_GetSffData_t> LRM_GetSffData;
 inline constexpr Binding<entryRow("LRM_GetVMFromVPort"), RM_GetVMFromVPort_t> LRM_GetVMFromVPort;
+inline constexpr Binding<entryRow("LRM_GetVPD"), RM_GetVPD_t> LRM_GetVPD;
 inline constexpr Binding<entryRow("LRM_InitLib"), RM_InitLib_t> LRM_InitLib;
 inline constexpr Binding<entryRow("LRM_ScsiInquiry"), RM_ScsiInquiry_t> LRM_ScsiInquiry;
 inline constexpr Binding<entryRow("LRM_SetDebugTraces"), RM_SetDebugTraces_t> LRM_SetDebugTraces;

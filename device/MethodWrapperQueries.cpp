@@ -207,6 +207,30 @@ RM_STATUS TVR_MethodWrapper::GetQosInfo(const HBA_WWN& wwpn, RM_QosInfo* info)
     return logged(status);
 }
 
+RM_STATUS TVR_MethodWrapper::GetVPD(const char* deviceId, std::vector<VpdField>* fields)
+try
+{
+    TVR_LOG(TVR_DBG, "TVR_MethodWrapper::GetVPD");
+    if (!fields)
+    {
+        TVR_LOG(TVR_DBG, "Invalid Output pointer");
+        return RM_ERROR;
+    }
+    HBA_WWN wwpn{};
+    if (const int failed = idToWwn(&wwpn, deviceId))
+        return failed;
+    RM_VpdArea area{};
+    const RM_STATUS status = LRM_GetVPD(wwpn, &area);
+    if (status != RM_OK)
+        return logged(status);
+    *fields = walkVpd({area.data, std::min<std::size_t>(area.length, sizeof area.data)});
+    return status;
+}
+catch (...)
+{
+    return thrownStatus();
+}
+
 RM_STATUS TVR_MethodWrapper::getTargetOS_info(const char* deviceId, char* out)
 try
 {

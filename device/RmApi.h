@@ -266,6 +266,16 @@ extern "C"
 
     typedef RM_STATUS RM_DiagGetLoadListParams_t(HBA_WWN wwpn, RM_FlashList* list);
 
+    /// Vital product data of a function as its chip stores them.
+    struct RM_VpdArea
+    {
+        std::uint32_t length;    ///< bytes of `data` in use
+        std::uint8_t data[4092]; ///< resources (PCI Local Bus 3.0, appendix I), from the first on
+    };
+    static_assert(sizeof(RM_VpdArea) == 4096 && offsetof(RM_VpdArea, data) == 4);
+
+    typedef RM_STATUS RM_GetVPD_t(HBA_WWN wwpn, RM_VpdArea* area);
+
     // Virtual ports.
 
     struct RM_VPortEntry

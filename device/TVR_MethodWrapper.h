@@ -4,6 +4,7 @@
 #include "device/ProcessSemaphore.h"
 #include "device/RmApi.h"
 #include "device/ScsiCommand.h"
+#include "device/Vpd.h"
 
 #include <atomic>
 #include <memory>
@@ -73,6 +74,8 @@ public:
     static RM_STATUS SetMILITraceLevel(std::uint32_t level);
     static RM_STATUS GetHBAFeatureList(const HBA_WWN& wwpn, std::vector<RM_Feature>* features);
     static RM_STATUS GetQosInfo(const HBA_WWN& wwpn, RM_QosInfo* info);
+    /// Vital product data of a port.
+    static RM_STATUS GetVPD(const char* deviceId, std::vector<VpdField>* fields);
     /// Name of the host's operating system: at most 40 characters and a zero byte. 8 if there is no memory.
     static RM_STATUS getTargetOS_info(const char* deviceId, char* out);
     /// Logical units of a target behind a port.

@@ -6,6 +6,7 @@
 #include "model/PortModel.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
+#include "model/VitalProductData.h"
 
 namespace cimple
 {
@@ -43,6 +44,7 @@ constexpr AdapterStep adapterSteps[] = {
 };
 
 constexpr PortStep portSteps[] = {
+    {readVitalProductData, GoOn, {}},
     {createCardAssociations, GoOn, {}},
     {createChipInstances, Stop, "CreateChipInstances failed"},
     {createPCIDeviceInstance, Stop, "CreatePCIDeviceInstance failed"},

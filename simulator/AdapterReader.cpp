@@ -112,6 +112,8 @@ Port readPort(JsonNode& node, const std::vector<Target>& targets)
     readAttributes(node, "statistics", statisticsRows, port.statistics);
     if (node.has("pci"))
         port.pci = readPci(node.at("pci"));
+    if (node.has("vpd"))
+        port.vpd = readVpd(node.at("vpd"));
     if (node.has("qos"))
         port.qos = readQos(node.at("qos"));
     port.targets = readTargetNames(node, targets);

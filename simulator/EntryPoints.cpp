@@ -30,6 +30,7 @@ constexpr unsigned recordOut = bit(Hostile::allOnes) | truncatable;
 constexpr unsigned textRecordOut = recordOut | bit(Hostile::unterminatedText);
 constexpr unsigned countedRecordOut = textRecordOut | bit(Hostile::hugeCount);
 constexpr unsigned listOut = bit(Hostile::hugeCount) | bit(Hostile::allOnes) | truncatable;
+constexpr unsigned vpdOut = recordOut | bit(Hostile::hugeLength);
 constexpr unsigned scsiOut = bit(Hostile::hugeLength) | bit(Hostile::allOnes) | truncatable;
 constexpr unsigned attributesOut =
     bit(Hostile::hugeLength) | bit(Hostile::unterminatedText) | bit(Hostile::allOnes) | truncatable;
@@ -49,6 +50,7 @@ constexpr Row rows[] = {
     {"GetQoS", dual, recordOut},
     {"GetServerAttributes", dual, attributesOut},
     {"GetVMFromVPort", dual, textRecordOut},
+    {"GetVPD", dual, vpdOut},
     {"InitLib", dual, statusOnly},
     {"ScsiInquiry", dual, scsiOut},
     {"SetDebugTraces", dual, statusOnly},

@@ -62,6 +62,11 @@ inline void fillCount(HBA_PORTATTRIBUTES& record)
     record.NumberofDiscoveredPorts = 0xFFFF'FFFF;
 }
 
+inline void fillLength(RM_VpdArea& record)
+{
+    record.length = 0xFFFF'FFFF;
+}
+
 /// Makes a record hostile in its way; the kinds that it cannot show leave it alone.
 template <class Record> void deform(Record& record, Hostile kind)
 {
@@ -73,6 +78,9 @@ template <class Record> void deform(Record& record, Hostile kind)
     if constexpr (requires { fillCount(record); })
         if (kind == Hostile::hugeCount)
             fillCount(record);
+    if constexpr (requires { fillLength(record); })
+        if (kind == Hostile::hugeLength)
+            fillLength(record);
 }
 
 } // namespace tvrsim

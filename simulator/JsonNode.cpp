@@ -58,6 +58,11 @@ bool JsonNode::isNull() const
     return _value.is_null();
 }
 
+bool JsonNode::isObject() const
+{
+    return _value.is_object();
+}
+
 std::uint64_t JsonNode::asNumber(std::uint64_t maximum) const
 {
     std::optional<std::uint64_t> number;
@@ -180,18 +185,26 @@ void JsonNode::readNamed(const char* key, std::uint32_t& out, std::span<const Na
         out = at(key).asNamed(names);
 }
 
-std::vector<std::pair<std::uint32_t, JsonNode>> JsonNode::numberedMembers()
+std::vector<std::pair<std::string, JsonNode>> JsonNode::members()
 {
     requireObject();
-    std::vector<std::pair<std::uint32_t, JsonNode>> members;
-    for (const auto& [key, value] : _value.items())
+    std::vector<std::pair<std::string, JsonNode>> members;
+    for (const auto& item : _value.items())
+        members.emplace_back(item.key(), at(item.key().c_str()));
+    return members;
+}
+
+std::vector<std::pair<std::uint32_t, JsonNode>> JsonNode::numberedMembers()
+{
+    std::vector<std::pair<std::uint32_t, JsonNode>> numbered;
+    for (auto& [key, value] : members())
     {
         const std::optional<std::uint64_t> number = parseNumber(key);
         if (!number || *number > std::numeric_limits<std::uint32_t>::max())
             failWith("expected a number as the member's name, found \"" + key + '"');
-        members.emplace_back(static_cast<std::uint32_t>(*number), at(key.c_str()));
+        numbered.emplace_back(static_cast<std::uint32_t>(*number), std::move(value));
     }
-    return members;
+    return numbered;
 }
 
 void JsonNode::finish() const

@@ -48,6 +48,7 @@ public:
     // The value itself.
 
     bool isNull() const;
+    bool isObject() const;
     std::uint64_t asNumber(std::uint64_t maximum) const; ///< a number, or its text such as "0x1F"
     bool asFlag() const;
     std::string asText(std::size_t maximum) const;
@@ -78,7 +79,9 @@ public:
                 use(item);
     }
 
-    /// The members as numbers and values, for an object whose member names are numbers.
+    /// All members, in the order of their names, for an object whose member names are data.
+    std::vector<std::pair<std::string, JsonNode>> members();
+    /// The same as numbers and values, for an object whose member names are numbers.
     std::vector<std::pair<std::uint32_t, JsonNode>> numberedMembers();
 
     void finish() const;

@@ -149,6 +149,18 @@ RM_STATUS SimulatedHost::pciRegisters(Wwn wwpn, RM_PciRegisters& out) const
                   });
 }
 
+RM_STATUS SimulatedHost::vpd(Wwn wwpn, RM_VpdArea& out) const
+{
+    return onPort(wwpn,
+                  [&](const Port& port)
+                  {
+                      if (!port.vpd)
+                          return RM_ERROR_NOT_SUPPORTED;
+                      out = *port.vpd;
+                      return RM_OK;
+                  });
+}
+
 RM_STATUS SimulatedHost::hbaAttributes(Wwn wwpn, AttributeList& out) const
 {
     return onAdapter(wwpn,

@@ -92,6 +92,7 @@ struct Port
     AttributeList attributes; ///< stand above those that follow from the members
     AttributeList statistics;
     std::optional<RM_PciRegisters> pci;
+    std::optional<RM_VpdArea> vpd;
     std::optional<RM_QosInfo> qos;
     std::vector<std::size_t> targets; ///< indexes in Scenario::targets; the position is the SCSI target number
     std::vector<VirtualPort> virtualPorts;

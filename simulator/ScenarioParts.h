@@ -17,6 +17,7 @@ void readAttributeMembers(JsonNode& node, std::span<const AttributeRow> rows, At
 void readAttributes(JsonNode& owner, const char* key, std::span<const AttributeRow> rows, AttributeList& out);
 
 RM_PciRegisters readPci(JsonNode node);
+RM_VpdArea readVpd(JsonNode node);
 Target readTarget(JsonNode& node);
 /// Ports refer to `targets` by name.
 Adapter readAdapter(JsonNode& node, const std::vector<Target>& targets);

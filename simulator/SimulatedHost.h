@@ -46,6 +46,7 @@ public:
     RM_STATUS features(Wwn wwpn, std::vector<RM_Feature>& out) const;
     RM_STATUS qos(Wwn wwpn, RM_QosInfo& out) const;
     RM_STATUS pciRegisters(Wwn wwpn, RM_PciRegisters& out) const;
+    RM_STATUS vpd(Wwn wwpn, RM_VpdArea& out) const;
     RM_STATUS hbaAttributes(Wwn wwpn, AttributeList& out) const;
     RM_STATUS portAttributes(Wwn wwpn, AttributeList& out) const;
     RM_STATUS portStatistics(Wwn wwpn, AttributeList& out) const;

@@ -25,6 +25,7 @@ extern "C"
     TVRSIM_EXPORT RM_GetHBAFeatureList_t DUAL(GetHBAFeatureList);
     TVRSIM_EXPORT RM_GetQoS_t DUAL(GetQoS);
     TVRSIM_EXPORT RM_DiagReadPCIRegistersV2_t DUAL(DiagReadPCIRegistersV2);
+    TVRSIM_EXPORT RM_GetVPD_t DUAL(GetVPD);
     TVRSIM_EXPORT RM_GetLunList_t DUAL(GetLunList);
     TVRSIM_EXPORT RM_ScsiInquiry_t DUAL(ScsiInquiry);
     TVRSIM_EXPORT RM_VPList_t DUAL(VPList);
@@ -107,6 +108,12 @@ extern "C"
     {
         Call call = callOf(__func__, port(wwpn));
         return call.record(registers, [&](auto& record) { return call.host().pciRegisters(fromHba(wwpn), record); });
+    }
+
+    RM_STATUS DUAL(GetVPD)(HBA_WWN wwpn, RM_VpdArea* area)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(area, [&](auto& record) { return call.host().vpd(fromHba(wwpn), record); });
     }
 
     RM_STATUS DUAL(GetLunList)(HBA_WWN wwpn, HBA_WWN target, RM_LunList* list)

@@ -196,6 +196,12 @@ RM_STATUS LRM_GetQoS(HBA_WWN, RM_QosInfo* info)
     return host->enter("LRM_GetQoS");
 }
 
+RM_STATUS LRM_GetVPD(HBA_WWN, RM_VpdArea* area)
+{
+    *area = host->vpd;
+    return host->enter("LRM_GetVPD");
+}
+
 HBA_STATUS writeScsi(const std::string& function, const std::string& answer, void* response, std::uint32_t size,
                      void* sense, std::uint32_t senseSize)
 {
@@ -354,6 +360,7 @@ const std::map<std::string, void*>& symbols()
         {"LRM_GetLunList", address(LRM_GetLunList)},
         {"LRM_GetVMFromVPort", address(LRM_GetVMFromVPort)},
         {"LRM_GetQoS", address(LRM_GetQoS)},
+        {"LRM_GetVPD", address(LRM_GetVPD)},
         {"LRM_VpScsiReportLUNs", address(LRM_VpScsiReportLUNs)},
         {"LRM_VpScsiInquiry", address(LRM_VpScsiInquiry)},
         {"LRM_VpScsiReadCapacity", address(LRM_VpScsiReadCapacity)},

@@ -53,6 +53,7 @@ public:
     std::vector<RM_VPortTarget> vportTargets;
     std::vector<RM_Lun> luns;
     std::string reportLuns;
+    RM_VpdArea vpd{};
     std::string version = "7.1";
 
     // SCSI answers by page; page 0 is the standard Inquiry.

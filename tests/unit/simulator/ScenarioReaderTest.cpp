@@ -79,6 +79,9 @@ TEST(ScenarioReader, ErrorsNameFilePlaceAndExpectation)
         {withPort(R"("virtualPorts": [{"wwpn": "1000000000000001"}])"), "/adapters/0/ports/0/virtualPorts/0",
          "found 10:00:00:00:00:00:00:01 twice"},
         {withPort(R"("pci": {"revision": 256})"), "/adapters/0/ports/0/pci/revision", "a number from 0 to 255"},
+        {withPort(R"("vpd": {"readOnly": {"PNX": "1"}})"), "/adapters/0/ports/0/vpd/readOnly/PNX",
+         "a keyword of two characters"},
+        {withPort(R"("vpd": {"raw": "82", "product": "P"})"), "/adapters/0/ports/0/vpd", "unknown member \"product\""},
         {withUnit(R"("lun": 0)"), "/targets/0/units/1/lun", "expected a number that no other unit of the target has"},
         {withUnit(R"("lun": 16384)"), "/targets/0/units/1/lun", "expected a number from 0 to 16383"},
         {withUnit(R"("lun": 1, "vendor": "NINE CHAR")"), "/targets/0/units/1/vendor", "at most 8 bytes"},
@@ -117,6 +120,21 @@ TEST(ScenarioReader, MembersReachTheModel)
     EXPECT_EQ(pci.header[20], 4) << "little-endian";
     EXPECT_EQ(pci.header[23], 1);
     EXPECT_EQ(pci.area[1], 8u);
+}
+
+TEST(ScenarioReader, VitalProductDataAreLaidOutForTheBus)
+{
+    const auto areaOf = [](const std::string& members)
+    {
+        const RM_VpdArea area = readScenario(withPort(members), "test").adapters.at(0).ports.at(0).vpd.value();
+        return std::string(reinterpret_cast<const char*>(area.data), area.length);
+    };
+    EXPECT_EQ(
+        areaOf(R"("vpd": {"product": "Card", "readOnly": {"SN": "7", "CP": {"value": "01 00"}},
+                                "readWrite": {"YA": "tag"}})"),
+        std::string("\x82\x04\0Card\x90\x0d\0CP\x02\x01\0SN\x01\x37RV\x01K\x91\x0d\0YA\x03tagRW\x04\0\0\0\0x", 40))
+        << "with a checksum";
+    EXPECT_EQ(areaOf(R"("vpd": {"raw": "90 FF FF"})"), "\x90\xff\xff");
 }
 
 TEST(ScenarioReader, ObjectsAreLaidOverTheirTemplates)
