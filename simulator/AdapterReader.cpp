@@ -77,6 +77,9 @@ VirtualPort readVirtualPort(JsonNode& node, const std::vector<Target>& targets)
     return vport;
 }
 
+constexpr NamedNumber beaconStates[] = {
+    {"notAvailable", RM_BEACON_NOT_AVAILABLE}, {"off", RM_BEACON_OFF}, {"on", RM_BEACON_ON}};
+
 RM_QosInfo readQos(JsonNode node)
 {
     RM_QosInfo qos{};
@@ -114,6 +117,17 @@ Port readPort(JsonNode& node, const std::vector<Target>& targets)
         port.pci = readPci(node.at("pci"));
     if (node.has("vpd"))
         port.vpd = readVpd(node.at("vpd"));
+    if (node.has("transceiver"))
+        port.transceiver = readTransceiver(node.at("transceiver"));
+    if (node.has("beacon"))
+        port.beacon = node.at("beacon").asNamed(beaconStates);
+    node.forEach("flash",
+                 [&](JsonNode& item)
+                 {
+                     if (port.flash.size() == RM_MAX_FLASH_REGIONS)
+                         item.failWith("expected at most 64 regions");
+                     port.flash.push_back(readFlashRegion(item));
+                 });
     if (node.has("qos"))
         port.qos = readQos(node.at("qos"));
     port.targets = readTargetNames(node, targets);

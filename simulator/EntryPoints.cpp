@@ -38,6 +38,9 @@ constexpr unsigned attributesOut =
 using enum Family;
 
 constexpr Row rows[] = {
+    {"DiagBeacon", dual, statusOnly},
+    {"DiagBeaconState", dual, numberOut},
+    {"DiagGetLoadListParams", dual, countedRecordOut},
     {"DiagReadPCIRegistersV2", dual, recordOut},
     {"ExitLib", dual, statusOnly},
     {"GetDriverType", dual, numberOut},
@@ -49,6 +52,7 @@ constexpr Row rows[] = {
     {"GetPortStatistics", dual, attributesOut},
     {"GetQoS", dual, recordOut},
     {"GetServerAttributes", dual, attributesOut},
+    {"GetSffData", dual, textRecordOut},
     {"GetVMFromVPort", dual, textRecordOut},
     {"GetVPD", dual, vpdOut},
     {"InitLib", dual, statusOnly},

@@ -52,6 +52,30 @@ inline void fillTexts(RM_VirtualMachine& record)
     fillText(record.uuid);
 }
 
+inline void fillTexts(RM_SffData& record)
+{
+    fillText(record.vendorName);
+    fillText(record.partNumber);
+    fillText(record.revision);
+    fillText(record.serialNumber);
+    fillText(record.dateCode);
+}
+
+inline void fillTexts(RM_FlashList& record)
+{
+    for (RM_FlashRegion& region : record.entry)
+    {
+        fillText(region.programType);
+        fillText(region.version);
+        fillText(region.description);
+    }
+}
+
+inline void fillCount(RM_FlashList& record)
+{
+    record.count = 0xFFFF'FFFF;
+}
+
 inline void fillCount(HBA_ADAPTERATTRIBUTES& record)
 {
     record.NumberOfPorts = 0xFFFF'FFFF;

@@ -23,6 +23,7 @@ constexpr StatusRow statusTexts[] = {
     {RM_ERROR_MORE_DATA, "The buffer is too small for the data"},
     {RM_ERROR_NO_MEMORY, "Out of memory"},
     {RM_ERROR_CHECK_CONDITION, "The SCSI command ended with a check condition"},
+    {RM_ERROR_DIAGNOSTICS_NOT_AVAILABLE, "Diagnostics are not available"},
     {RM_ERROR_WWN_NOT_SUPPORTED, "The WWN operation is not supported"},
     {RM_ERROR_DUPLICATE_WWN, "The WWN is in use"},
     {RM_ERROR_WWN_NOT_AVAILABLE, "WWN management is not available on this adapter"},
@@ -159,6 +160,58 @@ RM_STATUS SimulatedHost::vpd(Wwn wwpn, RM_VpdArea& out) const
                       out = *port.vpd;
                       return RM_OK;
                   });
+}
+
+RM_STATUS SimulatedHost::transceiver(Wwn wwpn, RM_SffData& out) const
+{
+    return onPort(wwpn,
+                  [&](const Port& port)
+                  {
+                      if (!port.transceiver)
+                          return RM_ERROR_NOT_SUPPORTED;
+                      out = *port.transceiver;
+                      return RM_OK;
+                  });
+}
+
+RM_STATUS SimulatedHost::flash(Wwn wwpn, RM_FlashList& out) const
+{
+    return onPort(wwpn,
+                  [&](const Port& port)
+                  {
+                      if (port.flash.empty())
+                          return RM_ERROR_NOT_SUPPORTED;
+                      out.count = static_cast<std::uint32_t>(port.flash.size() + 1);
+                      std::ranges::copy(port.flash, out.entry);
+                      return RM_OK;
+                  });
+}
+
+RM_STATUS SimulatedHost::beacon(Wwn wwpn, std::uint32_t& out) const
+{
+    return onPort(wwpn,
+                  [&](const Port& port)
+                  {
+                      if (!port.beacon)
+                          return RM_ERROR_NOT_SUPPORTED;
+                      out = *port.beacon;
+                      return RM_OK;
+                  });
+}
+
+RM_STATUS SimulatedHost::setBeacon(Wwn wwpn, std::uint32_t state)
+{
+    std::lock_guard lock(_mutex);
+    const auto place = _portByName.find(wwpn);
+    if (place == _portByName.end())
+        return RM_ERROR_INVALID_WWN;
+    std::optional<std::uint32_t>& beacon = _scenario.adapters[place->second.adapter].ports[place->second.port].beacon;
+    if (!beacon)
+        return RM_ERROR_NOT_SUPPORTED;
+    if (state != RM_BEACON_OFF && state != RM_BEACON_ON)
+        return RM_ERROR;
+    beacon = state;
+    return RM_OK;
 }
 
 RM_STATUS SimulatedHost::hbaAttributes(Wwn wwpn, AttributeList& out) const

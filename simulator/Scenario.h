@@ -93,6 +93,9 @@ struct Port
     AttributeList statistics;
     std::optional<RM_PciRegisters> pci;
     std::optional<RM_VpdArea> vpd;
+    std::optional<RM_SffData> transceiver;
+    std::optional<std::uint32_t> beacon; ///< an RM_BeaconState; none means that the port has no light for it
+    std::vector<RM_FlashRegion> flash;   ///< none means that the library cannot read the flash memory
     std::optional<RM_QosInfo> qos;
     std::vector<std::size_t> targets; ///< indexes in Scenario::targets; the position is the SCSI target number
     std::vector<VirtualPort> virtualPorts;

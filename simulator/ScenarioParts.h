@@ -18,6 +18,8 @@ void readAttributes(JsonNode& owner, const char* key, std::span<const AttributeR
 
 RM_PciRegisters readPci(JsonNode node);
 RM_VpdArea readVpd(JsonNode node);
+RM_SffData readTransceiver(JsonNode node);
+RM_FlashRegion readFlashRegion(JsonNode& node);
 Target readTarget(JsonNode& node);
 /// Ports refer to `targets` by name.
 Adapter readAdapter(JsonNode& node, const std::vector<Target>& targets);

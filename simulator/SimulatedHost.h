@@ -47,6 +47,10 @@ public:
     RM_STATUS qos(Wwn wwpn, RM_QosInfo& out) const;
     RM_STATUS pciRegisters(Wwn wwpn, RM_PciRegisters& out) const;
     RM_STATUS vpd(Wwn wwpn, RM_VpdArea& out) const;
+    RM_STATUS transceiver(Wwn wwpn, RM_SffData& out) const;
+    RM_STATUS flash(Wwn wwpn, RM_FlashList& out) const;
+    RM_STATUS beacon(Wwn wwpn, std::uint32_t& out) const;
+    RM_STATUS setBeacon(Wwn wwpn, std::uint32_t state);
     RM_STATUS hbaAttributes(Wwn wwpn, AttributeList& out) const;
     RM_STATUS portAttributes(Wwn wwpn, AttributeList& out) const;
     RM_STATUS portStatistics(Wwn wwpn, AttributeList& out) const;

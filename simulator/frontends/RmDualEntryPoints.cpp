@@ -24,6 +24,10 @@ extern "C"
     TVRSIM_EXPORT RM_GetHBAFeature_t DUAL(GetHBAFeature);
     TVRSIM_EXPORT RM_GetHBAFeatureList_t DUAL(GetHBAFeatureList);
     TVRSIM_EXPORT RM_GetQoS_t DUAL(GetQoS);
+    TVRSIM_EXPORT RM_DiagBeacon_t DUAL(DiagBeacon);
+    TVRSIM_EXPORT RM_DiagBeaconState_t DUAL(DiagBeaconState);
+    TVRSIM_EXPORT RM_DiagGetLoadListParams_t DUAL(DiagGetLoadListParams);
+    TVRSIM_EXPORT RM_GetSffData_t DUAL(GetSffData);
     TVRSIM_EXPORT RM_DiagReadPCIRegistersV2_t DUAL(DiagReadPCIRegistersV2);
     TVRSIM_EXPORT RM_GetVPD_t DUAL(GetVPD);
     TVRSIM_EXPORT RM_GetLunList_t DUAL(GetLunList);
@@ -102,6 +106,30 @@ extern "C"
     {
         Call call = callOf(__func__, port(wwpn));
         return call.record(info, [&](auto& record) { return call.host().qos(fromHba(wwpn), record); });
+    }
+
+    RM_STATUS DUAL(DiagBeacon)(HBA_WWN wwpn, std::uint32_t state)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().setBeacon(fromHba(wwpn), state); });
+    }
+
+    RM_STATUS DUAL(DiagBeaconState)(HBA_WWN wwpn, std::uint32_t* state)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(state, [&](std::uint32_t& out) { return call.host().beacon(fromHba(wwpn), out); });
+    }
+
+    RM_STATUS DUAL(DiagGetLoadListParams)(HBA_WWN wwpn, RM_FlashList* list)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(list, [&](auto& record) { return call.host().flash(fromHba(wwpn), record); });
+    }
+
+    RM_STATUS DUAL(GetSffData)(HBA_WWN wwpn, RM_SffData* data)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(data, [&](auto& record) { return call.host().transceiver(fromHba(wwpn), record); });
     }
 
     RM_STATUS DUAL(DiagReadPCIRegistersV2)(HBA_WWN wwpn, RM_PciRegisters* registers)
