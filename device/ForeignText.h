@@ -15,6 +15,14 @@ template <std::size_t Size> std::string foreignText(const char (&field)[Size])
     return std::string(field, strnlen(field, Size));
 }
 
+/// The same of a field that is filled with blanks.
+template <std::size_t Size> std::string paddedText(const char (&field)[Size])
+{
+    std::string text = foreignText(field);
+    text.erase(text.find_last_not_of(' ') + 1);
+    return text;
+}
+
 /// At most `size` bytes at `bytes`, up to the first zero byte.
 inline std::string foreignText(const std::uint8_t* bytes, std::size_t size)
 {

@@ -87,6 +87,11 @@ public:
     /// `value` is 2 for on or 3 for off. 32968 for any other, else 0, whatever the library says.
     static std::uint32_t SetBeaconState(const HBA_WWN& wwpn, std::uint16_t value);
 
+    static RM_STATUS tvrcimGetDigitalDiagnosticsData(const char* deviceId, std::unique_ptr<RM_SffData>& data);
+    /// Programs in the flash memory behind a port, at most RM_MAX_FLASH_REGIONS: what the library's list has room for
+    /// if its count is none. Throws std::bad_alloc.
+    static RM_STATUS GetFlashContents(const char* deviceId, std::vector<RM_FlashRegion>& regions);
+
     // Virtual ports.
 
     static RM_STATUS ListVPorts(const char* deviceId, std::vector<RM_VPortEntry>* vports);

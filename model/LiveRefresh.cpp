@@ -5,10 +5,6 @@ namespace cimple
 
 // No step puts an instance of these classes in the cache, so there is none to bring up to date.
 
-template <> void liveRefresh<TVRHBA_FCPort>(ProviderAgent&) {}
-
-template <> void liveRefresh<TVRHBA_FCPortStatistics>(ProviderAgent&) {}
-
 template <> void liveRefresh<TVRHBA_DriverParams>(ProviderAgent&) {}
 
 template <> void liveRefresh<TVRHBA_DriverParamGlobal>(ProviderAgent&) {}

@@ -1,5 +1,6 @@
 #include "model/PortFacts.h"
 
+#include "agent/Build.h"
 #include "agent/RefreshContext.h"
 #include "device/TVR_MethodWrapper.h"
 #include "model/PortValues.h"
@@ -70,7 +71,7 @@ void setTimes(TVRHBA_FCPortStatistics& instance, std::uint64_t secondsSinceLastR
 }
 
 /// Adds one value and its description.
-void identify(TVRHBA_FCPort& instance, const String& value, const char* description)
+void identify(TVRHBA_FCPort& instance, const String& value, const String& description)
 {
     instance.OtherIdentifyingInfo.value.append(value);
     instance.IdentifyingDescriptions.value.append(description);
@@ -83,6 +84,10 @@ void setPortIdentifiers(TVRHBA_FCPort& instance, const PortContext& port)
     const FCAdapterAttributes& adapter = port.on.attributes;
     instance.OtherIdentifyingInfo.null = 0;
     instance.IdentifyingDescriptions.null = 0;
+    std::vector<VpdField> fields;
+    TVR_MethodWrapper::GetVPD(port.port.name.c_str(), &fields);
+    for (const VpdField& field : fields)
+        identify(instance, field.value, vpdName(field.keyword));
     identify(instance, port.port.getAttributes()->osDeviceName, "OS Device Name");
     identify(instance, adapter.ieeeAddress, "TAVRIN:IEEE_ADDRESS");
     // A chip is told apart by the same text.

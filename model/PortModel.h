@@ -14,6 +14,10 @@ std::uint32_t createFCPort(PortContext& port);
 std::uint32_t createFCPortStatistics(PortContext& port);
 std::uint32_t createSCSIProtocolController(PortContext& port);
 std::uint32_t createPortController(PortContext& port);
+/// The controller's transceiver; where there is none, nothing.
+std::uint32_t createTransceiver(PortContext& port);
+/// The programs in the flash memory behind the controller.
+std::uint32_t createFlashImages(PortContext& port);
 /// What ties the controller to port, card and system.
 std::uint32_t createPortControllerAssociations(PortContext& port);
 std::uint32_t createInitiatorEndpoint(PortContext& port);

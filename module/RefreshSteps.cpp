@@ -53,6 +53,8 @@ constexpr PortStep portSteps[] = {
     {createFCPortStatistics, Stop, {}},
     {createSCSIProtocolController, Stop, {}},
     {createPortController, Stop, {}},
+    {createTransceiver, Stop, {}},
+    {createFlashImages, GoOn, {}},
     {createPortControllerAssociations, Stop, {}},
     {createInitiatorEndpoint, Stop, {}},
     mark<PortContext>({TVR_DBG, "Ending of Software Installation Service"}),

@@ -1,8 +1,12 @@
-// The beacon of a port.
+// What stands at a port: beacon, transceiver, flash memory.
 #include "device/TVR_MethodWrapper.h"
 
 #include "device/Bindings.h"
 #include "foundation/Log.h"
+
+#include <algorithm>
+#include <new>
+#include <utility>
 
 namespace cimple
 {
@@ -86,6 +90,43 @@ std::uint32_t TVR_MethodWrapper::SetBeaconState(const HBA_WWN& wwpn, std::uint16
     else
         TVR_LOG(TVR_DBG, "Failed to set the beacon state to %d ", state);
     return 0;
+}
+
+RM_STATUS TVR_MethodWrapper::tvrcimGetDigitalDiagnosticsData(const char* deviceId, std::unique_ptr<RM_SffData>& data)
+{
+    HBA_WWN wwpn;
+    if (idToWwn(&wwpn, deviceId) != 0)
+        return RM_ERROR;
+    std::unique_ptr<RM_SffData> buffer(new (std::nothrow) RM_SffData{});
+    if (!buffer)
+    {
+        TVR_LOG(TVR_DBG, "ERROR: tvrcimGetDigitalDiagnosticsData: Error - Unable to allocate buffer.");
+        return RM_ERROR_NO_MEMORY;
+    }
+    const RM_STATUS status = LRM_GetSffData(wwpn, buffer.get());
+    if (status == RM_OK)
+        data = std::move(buffer);
+    else
+        TVR_LOG(TVR_DBG, "Unable to obtain transceiver data for this host bus adapter.");
+    return status;
+}
+
+RM_STATUS TVR_MethodWrapper::GetFlashContents(const char* deviceId, std::vector<RM_FlashRegion>& regions)
+{
+    HBA_WWN wwpn;
+    if (idToWwn(&wwpn, deviceId) != 0)
+        return RM_ERROR;
+    const auto list = std::make_unique<RM_FlashList>();
+    const RM_STATUS status = LRM_DiagGetLoadListParams(wwpn, list.get());
+    if (status != RM_OK)
+    {
+        TVR_LOG(TVR_DBG, "Failed to retrieve the flash contents. Exited with ErrorCode %d", status);
+        return status;
+    }
+    // A count of 0 wraps around, and so is the most that a list has.
+    const std::uint32_t count = std::min<std::uint32_t>(list->count - 1, RM_MAX_FLASH_REGIONS);
+    regions.assign(list->entry, list->entry + count);
+    return RM_OK;
 }
 
 } // namespace cimple
