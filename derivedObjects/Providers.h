@@ -4,6 +4,7 @@
 
 #include "agent/EnumerationForms.h"
 #include "agent/ProviderExtension.h"
+#include "model/FCPortProvider.h"
 #include "model/LiveRefresh.h"
 #include "runtime/base/Immortal.h"
 #include "schema/AllClasses.h"
