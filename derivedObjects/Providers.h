@@ -6,6 +6,7 @@
 #include "agent/ProviderExtension.h"
 #include "model/FCPortProvider.h"
 #include "model/LiveRefresh.h"
+#include "model/ProfileProviders.h"
 #include "runtime/base/Immortal.h"
 #include "schema/AllClasses.h"
 
@@ -53,16 +54,6 @@ template <class Class> struct OwnForm : ProviderBase<Class>
 {};
 
 // Nothing builds instances of these but the steps of the refresh: they serve what is in their map.
-template <>
-struct Extended<TVRHBA_RegisteredProfile, OwnForm<TVRHBA_RegisteredProfile>> : PlainForm<TVRHBA_RegisteredProfile>
-{};
-template <>
-struct Extended<TVRHBA_ReferencedProfile, OwnForm<TVRHBA_ReferencedProfile>> : PlainForm<TVRHBA_ReferencedProfile>
-{};
-template <>
-struct Extended<TVRHBA_BaseServerReferencedProfile, OwnForm<TVRHBA_BaseServerReferencedProfile>>
-    : PlainForm<TVRHBA_BaseServerReferencedProfile>
-{};
 template <> struct Extended<TVRHBA_LogEntry, OwnForm<TVRHBA_LogEntry>> : PlainForm<TVRHBA_LogEntry>
 {};
 template <>

@@ -6,57 +6,34 @@
 namespace cimple
 {
 
-namespace
+Ref<TVRHBA_RegisteredProfile> makeRegisteredProfile(const ProfileRow& row)
 {
-
-struct ProfileRow
-{
-    const char* name;
-    std::uint16_t organization;
-    const char* version;
-};
-
-/// In order of registration.
-constexpr ProfileRow hostProfiles[] = {
-    {"Profile Registration", DMTF, "1.0.0"},
-    {"Software Inventory", DMTF, "1.0.0"},
-    {"Physical Package", SNIA, "1.3.0"},
-    {"Host Discovered Resources", SNIA, "1.2.0"},
-    {"FC HBA", SNIA, "1.2.0"},
-    {"Storage HBA", SNIA, "1.4.0"},
-    {"FC Initiator Ports", SNIA, "1.3.0"},
-    {"Software", SNIA, "1.2.0"},
-    {"Access Points", SNIA, "1.3.0"},
-    {"PCI Device", DMTF, "1.0.0"},
-    {"FCHBA Diagnostics", DMTF, "1.0.0"},
-    {"Physical Asset", DMTF, "1.0.2"},
-};
-
-} // namespace
-
-TVRHBA_RegisteredProfile* createRegisteredProfile(HostContext& host, const char* name, std::uint16_t organization,
-                                                  const char* version)
-{
-    TVR_LOG(TVR_DBG, "Generating TVRHBA_RegisteredProfile (%s)", name);
-    if (TVRHBA_RegisteredProfile* existing = host.profiles.find(name))
-    {
-        TVR_LOG(TVR_DBG, "Got TVRHBA_RegisteredProfile in the map (%s)", name);
-        return existing;
-    }
     Ref<TVRHBA_RegisteredProfile> made = fresh<TVRHBA_RegisteredProfile>();
     made->__name_space = interopNamespace;
-    made->Description.set(formatText("Tavrin %s", name));
-    made->ElementName.set(formatText("Tavrin Registered %s", name));
-    made->RegisteredOrganization.set(organization);
-    made->RegisteredName.set(name);
-    made->RegisteredVersion.set(version);
-    made->InstanceID.set(formatText("TVR:%s", name));
+    made->Description.set(formatText("Tavrin %s", row.name));
+    made->ElementName.set(formatText("Tavrin Registered %s", row.name));
+    made->RegisteredOrganization.set(row.organization);
+    made->RegisteredName.set(row.name);
+    made->RegisteredVersion.set(row.version);
+    made->InstanceID.set(formatText("TVR:%s", row.name));
     made->AdvertiseTypes.set({3});
     made->AdvertiseTypeDescriptions.set({"SLP"});
+    return made;
+}
+
+TVRHBA_RegisteredProfile* createRegisteredProfile(HostContext& host, const ProfileRow& row)
+{
+    TVR_LOG(TVR_DBG, "Generating TVRHBA_RegisteredProfile (%s)", row.name);
+    if (TVRHBA_RegisteredProfile* existing = host.profiles.find(row.name))
+    {
+        TVR_LOG(TVR_DBG, "Got TVRHBA_RegisteredProfile in the map (%s)", row.name);
+        return existing;
+    }
     TVRHBA_RegisteredProfile* profile =
-        mapOf<TVRHBA_RegisteredProfile>(host.agent).insert(made, "Insert Failed : m_TVRHBA_RegisteredProfile_map");
+        mapOf<TVRHBA_RegisteredProfile>(host.agent)
+            .insert(makeRegisteredProfile(row), "Insert Failed : m_TVRHBA_RegisteredProfile_map");
     if (profile)
-        host.profiles.add(name, profile);
+        host.profiles.add(row.name, profile);
     return profile;
 }
 
@@ -79,9 +56,9 @@ void createComputerSystemConformsToProfile(HostContext& host, const TVRHBA_Regis
 
 std::uint32_t createProfiles(HostContext& host)
 {
-    for (const ProfileRow& row : hostProfiles)
-        createComputerSystemConformsToProfile(host,
-                                              createRegisteredProfile(host, row.name, row.organization, row.version));
+    for (const ProfileRow& row : profileRows)
+        if (row.ofHost)
+            createComputerSystemConformsToProfile(host, createRegisteredProfile(host, row));
     return BUILD_DONE;
 }
 

@@ -51,7 +51,7 @@ Ref<TVRHBA_EnabledRecordLogCapabilities> makeCapabilities()
 
 std::uint32_t associateProfile(HostContext& host, const TVRHBA_RecordLog* log)
 {
-    const TVRHBA_RegisteredProfile* profile = createRegisteredProfile(host, "Record Log", DMTF, "1.0.1");
+    const TVRHBA_RegisteredProfile* profile = createRegisteredProfile(host, profileRow("Record Log"));
     createComputerSystemConformsToProfile(host, profile);
     if (!host.profiles.find("Profile Registration"))
         return failed("Missing Profile Registration Profile instance");
