@@ -156,7 +156,7 @@ TEST(Concurrency, ReadersWaitForTheRunThatIsHeld)
     const std::vector<Request> readers = {
         enumeration("TVRHBA_PhysicalConnector"), enumeration("TVRHBA_CardContainsConnector"),
         enumeration("TVRHBA_PCIDevice"),         enumeration("TVRHBA_FCPort"),
-        enumeration("TVRHBA_RegisteredProfile"),
+        enumeration("TVRHBA_PortController"),
     };
     std::vector<std::vector<std::string>> before;
     for (const Request& reader : readers)

@@ -199,6 +199,19 @@ std::uint64_t Host::calls(const std::string& function) const
     return TVR_CONTROL(tvrsim_call_count)(function.c_str());
 }
 
+void Host::setPortState(const char* wwpn, std::uint32_t state)
+{
+    if (!TVR_CONTROL(tvrsim_set_port_state)(wwpn, state))
+        throw std::runtime_error(std::string("no port ") + wwpn);
+}
+
+void Host::setAttribute(const char* wwpn, const char* attribute)
+{
+    char error[1024] = "";
+    if (!TVR_CONTROL(tvrsim_set_attribute)(wwpn, attribute, error, sizeof(error)))
+        throw std::runtime_error(error);
+}
+
 void Host::openGate(const std::string& gate)
 {
     TVR_CONTROL(tvrsim_open_gate)(gate.c_str());

@@ -61,6 +61,9 @@ public:
 
     void addFault(const std::string& row);
     std::uint64_t calls(const std::string& function) const;
+    void setPortState(const char* wwpn, std::uint32_t state);
+    /// One attribute of a port, of its statistics or of its adapter: {"name": value}, as in a scenario.
+    void setAttribute(const char* wwpn, const char* attribute);
     /// Lets calls go on that a fault row holds at a gate.
     void openGate(const std::string& gate);
     /// Waits until so many calls are held at a gate; false if that does not happen in time.

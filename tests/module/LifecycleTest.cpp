@@ -474,7 +474,7 @@ TEST(Life, LibraryThatDoesNotInitialiseGivesAnEmptyModule)
     EXPECT_TRUE(host.instancesOf("TVRHBA_Card").empty());
     ASSERT_TRUE(host.awaitRefresh());
     EXPECT_TRUE(host.instancesOf("TVRHBA_LogicalDisk").empty());
-    EXPECT_TRUE(host.instancesOf("TVRHBA_RegisteredProfile").empty());
+    EXPECT_TRUE(host.instancesOf("TVRHBA_PortController").empty());
     const std::size_t asked = host.logged("[TVR_INFO]  Entering BuildCimpleInfo()");
     EXPECT_TRUE(host.instancesOf("TVRHBA_FCPort").empty());
     EXPECT_EQ(host.logged("[TVR_INFO]  Entering BuildCimpleInfo()"), asked) << "the active form answers at once";

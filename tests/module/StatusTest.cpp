@@ -30,10 +30,8 @@ TEST(Status, InstancesAreNotCreatedChangedOrDeleted)
         const broker::Object object{{"root/tavrin", className, {}}, {}};
         EXPECT_EQ(host.broker().createInstance(object).status, CMPI_RC_ERR_NOT_SUPPORTED);
         EXPECT_EQ(host.broker().deleteInstance(object.path).status, CMPI_RC_ERR_NOT_SUPPORTED);
-        if (className != "TVRHBA_ProviderConfigSetting")
-        {
-            EXPECT_EQ(host.broker().modifyInstance(object).status, CMPI_RC_ERR_NOT_SUPPORTED);
-        }
+        EXPECT_EQ(host.broker().modifyInstance(object).status,
+                  className == "TVRHBA_FCPort" ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_NOT_SUPPORTED);
     }
     host.unload();
 }

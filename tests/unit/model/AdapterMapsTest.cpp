@@ -140,8 +140,8 @@ TEST_F(AdapterMaps, GeneratedChassisHasThesePropertiesAndNoOthers)
 
 TEST_F(AdapterMaps, ProfileIsRegisteredOnce)
 {
-    const TVRHBA_RegisteredProfile* first = createRegisteredProfile(*host, "Software", SNIA, "1.2.0");
-    EXPECT_EQ(createRegisteredProfile(*host, "Software", DMTF, "9.9.9"), first);
+    const TVRHBA_RegisteredProfile* first = createRegisteredProfile(*host, profileRow("Software"));
+    EXPECT_EQ(createRegisteredProfile(*host, profileRow("Software")), first);
     EXPECT_EQ(agent->m_TVRHBA_RegisteredProfile_map.size(), 1u);
     EXPECT_STREQ(first->RegisteredVersion.value.c_str(), "1.2.0");
     EXPECT_THAT(log(), Contains("[TVR_DBG] Got TVRHBA_RegisteredProfile in the map (Software)"));
