@@ -139,6 +139,74 @@ TEST_P(NamespaceWalk, LeadsToTheSystemWhoeverServesIt)
     host.unload();
 }
 
+struct Step
+{
+    const char* association;
+    const char* role; ///< of where the step begins
+    const char* to;
+};
+
+struct WalkRow
+{
+    const char* profile;
+    std::vector<Step> steps;
+};
+
+const Step portOfController = {"TVRHBA_ControlledBy", "Antecedent", "TVRHBA_FCPort"};
+const Step endpointOfPort = {"TVRHBA_DeviceSAPImplementation", "Antecedent", "TVRHBA_SCSIProtocolInitiatorEndpoint"};
+const Step unitOfEndpoint = {"TVRHBA_SCSIInitiatorTargetStorageVolumePath", "Initiator", "TVRHBA_StorageVolume"};
+const Step systemOfPort = {"TVRHBA_FCPortSystemDevice", "PartComponent", nullptr};
+
+/// What implements each profile leads to the logical units behind it, or to the system that all belongs to.
+const WalkRow walks[] = {
+    {"FC HBA",
+     {{"TVRHBA_PortControllerConformsToProfile", "ConformantStandard", "TVRHBA_PortController"},
+      portOfController,
+      endpointOfPort,
+      unitOfEndpoint}},
+    {"Storage HBA",
+     {{"TVRHBA_PortControllerConformsToProfile", "ConformantStandard", "TVRHBA_PortController"},
+      portOfController,
+      systemOfPort}},
+    {"FC Initiator Ports",
+     {{"TVRHBA_FCPortConformsToProfile", "ConformantStandard", "TVRHBA_FCPort"}, endpointOfPort, unitOfEndpoint}},
+    {"Host Discovered Resources",
+     {{"TVRHBA_FCPortConformsToProfile", "ConformantStandard", "TVRHBA_FCPort"}, endpointOfPort, unitOfEndpoint}},
+    {"Access Points", {{"TVRHBA_FCPortConformsToProfile", "ConformantStandard", "TVRHBA_FCPort"}, systemOfPort}},
+    {"Physical Package",
+     {{"TVRHBA_FCPortConformsToProfile", "ConformantStandard", "TVRHBA_FCPort"},
+      {"TVRHBA_FCRealizes", "Dependent", "TVRHBA_PhysicalConnector"},
+      {"TVRHBA_CardContainsConnector", "PartComponent", "TVRHBA_Card"}}},
+    {"PCI Device",
+     {{"TVRHBA_PCIElementConformsToProfile", "ConformantStandard", "TVRHBA_PCIDevice"},
+      {"TVRHBA_SystemDevice", "PartComponent", nullptr}}},
+};
+
+TEST_P(NamespaceWalk, LeadsFromEachProfileToAUnitOrTheSystemAndBack)
+{
+    const std::string system = GetParam() ? "IBMSD_ComputerSystem" : "CIM_ComputerSystem";
+    const std::string platformNamespace = GetParam() ? "root/ibmse" : "root/tavrin";
+    for (const WalkRow& row : walks)
+    {
+        SCOPED_TRACE(row.profile);
+        Path here = profile(row.profile);
+        for (const Step& step : row.steps)
+        {
+            const std::string to = step.to ? step.to : system;
+            const std::string& nameSpace = step.to ? "root/tavrin" : platformNamespace;
+            std::vector<Object> found;
+            for (const AssociationFilter& filter : filters(step.association, step.role))
+                found = follow(here, filter, to, nameSpace);
+            ASSERT_FALSE(found.empty()) << step.association << " leads nowhere";
+            const std::vector<Object> back =
+                follow(found[0].path, {step.association, "", "", ""}, here.className, here.nameSpace);
+            EXPECT_THAT(identities(pathsOf(back)), testing::Contains(identity(here))) << step.association;
+            here = found[0].path;
+        }
+    }
+    host.unload();
+}
+
 INSTANTIATE_TEST_SUITE_P(Hosts, NamespaceWalk, testing::Bool(),
                          [](const auto& row) { return row.param ? "WithPlatform" : "WithoutPlatform"; });
 
