@@ -61,6 +61,8 @@ inline constexpr Binding<entryRow("LRM_DiagBeaconState"), RM_DiagBeaconState_t> 
 inline constexpr Binding<entryRow("LRM_DiagGetLoadListParams"), RM_DiagGetLoadListParams_t> LRM_DiagGetLoadListParams;
 inline constexpr Binding<entryRow("LRM_DiagReadPCIRegistersV2"), RM_DiagReadPCIRegistersV2_t>
     LRM_DiagReadPCIRegistersV2;
+inline constexpr Binding<entryRow("LRM_GetDriverParams"), RM_GetDriverParams_t> LRM_GetDriverParams;
+inline constexpr Binding<entryRow("LRM_GetDriverParamsGlobal"), RM_GetDriverParamsGlobal_t> LRM_GetDriverParamsGlobal;
 inline constexpr Binding<entryRow("LRM_GetDriverType"), RM_GetDriverType_t> LRM_GetDriverType;
 inline constexpr Binding<entryRow("LRM_GetHBAAttributes"), RM_GetHBAAttributes_t> LRM_GetHBAAttributes;
 inline constexpr Binding<entryRow("LRM_GetHBAFeature"), RM_GetHBAFeature_t> LRM_GetHBAFeature;

@@ -128,6 +128,11 @@ DynamicLoader setDynamicLoader(const DynamicLoader& loader)
     return std::exchange(dynamicLoader, loader);
 }
 
+const DynamicLoader& dynamicLoaderInUse()
+{
+    return dynamicLoader;
+}
+
 int loadAllLibraries()
 {
     allResolved = false;

@@ -19,6 +19,9 @@ struct DynamicLoader
 /// Not while another thread is in a binding. Returns the loader that was in use.
 DynamicLoader setDynamicLoader(const DynamicLoader& loader);
 
+/// The loader in use, for libraries that are not behind bindings.
+const DynamicLoader& dynamicLoaderInUse();
+
 /// What the last loadAllLibraries() did not find; clear before the first.
 extern std::atomic<bool> hbaLibMissing; ///< neither form of the HBA API library
 extern std::atomic<bool> lrmLibMissing; ///< the local RM library

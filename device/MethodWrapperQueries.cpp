@@ -5,6 +5,7 @@
 #include "device/Bindings.h"
 #include "device/ForeignText.h"
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
 
 #include <algorithm>
 #include <array>
@@ -28,20 +29,22 @@ constexpr int maxListTries = 3;
 constexpr std::size_t versionSize = 256;
 constexpr std::size_t operatingSystemSize = 40;
 
-/// Reads a list record by `call(list)`, with a buffer that grows when the library has more.
+/// Reads a list record by `call(list)`, with a buffer that grows when the library has more. `noMemory` is logged at
+/// `level` when there is no memory for the buffer.
 template <class List, class Entry, class Call>
-RM_STATUS fetchList(std::vector<Entry>& out, const char* noMemory, const Call& call)
+RM_STATUS fetchList(std::vector<Entry>& out, const char* noMemory, const Call& call, int tries = maxListTries,
+                    int level = TVR_DBG)
 {
     static_assert(sizeof(Entry) == sizeof(List::entry));
     RM_STATUS status = RM_ERROR_MORE_DATA;
     std::uint32_t room = firstListRoom;
-    for (int i = 0; i < maxListTries && status == RM_ERROR_MORE_DATA; ++i)
+    for (int i = 0; i < tries && status == RM_ERROR_MORE_DATA; ++i)
     {
         const std::size_t size = std::max(sizeof(List), offsetof(List, entry) + std::size_t(room) * sizeof(Entry));
         const std::unique_ptr<std::byte[]> buffer(new (std::nothrow) std::byte[size]{});
         if (!buffer)
         {
-            TVR_LOG(TVR_DBG, "%s", noMemory);
+            TVR_LOG(level, "%s", noMemory);
             return RM_ERROR_NO_MEMORY;
         }
         std::uint32_t count = room;
@@ -311,6 +314,58 @@ try
 }
 catch (...)
 {
+    return thrownStatus();
+}
+
+RM_STATUS TVR_MethodWrapper::tvrcimGetDriverParam(const char* deviceId, std::vector<RM_DriverParam>* parameters)
+try
+{
+    TVR_LOG(TVR_DBG, "TVR_MethodWrapper::tvrcimGetDriverParam()");
+    if (!parameters)
+    {
+        TVR_LOG(TVR_DBG, "Invalid input pointer");
+        return RM_ERROR;
+    }
+    HBA_WWN wwpn{};
+    if (deviceId && idToWwn(&wwpn, deviceId) != 0)
+        return RM_ERROR;
+    int calls = 0;
+    RM_STATUS status = RM_OK; // of the last call, in the library's words
+    const auto call = [&](RM_DriverParamList* list)
+    {
+        calls++;
+        status = deviceId ? LRM_GetDriverParams(wwpn, list) : LRM_GetDriverParamsGlobal(list);
+        if (deviceId)
+            TVR_LOG(TVR_DBG, "RM_GetDriverParams: status=%d", status);
+        else
+            TVR_LOG(TVR_DBG, "RM_GetDriverParamsGlobal: status=%d", status);
+        return status == RM_ERROR_BUFFER_TOO_SMALL ? RM_STATUS{RM_ERROR_MORE_DATA} : status;
+    };
+    constexpr int callAndRepeat = 2;
+    std::vector<RM_DriverParam> list;
+    const RM_STATUS fetched = fetchList<RM_DriverParamList>(
+        list, "ERROR: tvrcimGetDriverParamsGlobal: Unable to allocate buffer", call, callAndRepeat, TVR_CRIT);
+    if (fetched == RM_ERROR_NO_MEMORY && status != RM_ERROR_NO_MEMORY)
+    {
+        ++left_out_for_memory;
+        return fetched;
+    }
+    if (status != RM_OK)
+    {
+        if (deviceId)
+            TVR_LOG(TVR_DBG, "RM_GetDriverParams:failed");
+        else
+            TVR_LOG(TVR_DBG, "ERROR: tvrcimGetDriverParamsGlobal: RM_GetDriverParamsGlobal call failed (%s) (%d)",
+                    calls == 1 ? "a" : "b", status);
+        return status;
+    }
+    TVR_LOG(TVR_DBG, "number of driver parameters %d", static_cast<int>(list.size()));
+    *parameters = std::move(list);
+    return RM_OK;
+}
+catch (...)
+{
+    note_missing_memory();
     return thrownStatus();
 }
 

@@ -33,6 +33,7 @@ enum RM_StatusCode : std::int32_t
     RM_ERROR_MAILBOX_FAILED = 148,
     RM_ERROR_MAILBOX_TIMEOUT = 149,
     RM_ERROR_MAILBOX_BUSY = 150,
+    RM_ERROR_BUFFER_TOO_SMALL = 191, ///< RM_ERROR_MORE_DATA in the words of the driver parameter calls
 };
 
 /// Room that the program offers for each kind of attributes, in bytes.
@@ -275,6 +276,33 @@ extern "C"
     static_assert(sizeof(RM_VpdArea) == 4096 && offsetof(RM_VpdArea, data) == 4);
 
     typedef RM_STATUS RM_GetVPD_t(HBA_WWN wwpn, RM_VpdArea* area);
+
+    // Driver parameters, of an adapter port and of the driver itself.
+
+    /// The texts need not end in a zero byte. Fields from 32 to 52 are in native order.
+    struct RM_DriverParam
+    {
+        char name[32];
+        std::uint32_t lowRange;
+        std::uint32_t highRange;
+        std::uint32_t def;        ///< default, in the global list the value for all adapters
+        std::uint32_t current;    ///< value in use
+        std::uint16_t exportFlag; ///< 1 if the parameter is meant for users
+        std::uint16_t dynamic;    ///< when a change takes effect, in the driver's code
+        char help[80];
+    };
+
+    struct RM_DriverParamList
+    {
+        std::uint32_t count;
+        RM_DriverParam entry[1];
+    };
+    static_assert(sizeof(RM_DriverParam) == 132 && offsetof(RM_DriverParamList, entry) == 4);
+    static_assert(offsetof(RM_DriverParam, lowRange) == 32 && offsetof(RM_DriverParam, exportFlag) == 48 &&
+                  offsetof(RM_DriverParam, help) == 52);
+
+    typedef RM_STATUS RM_GetDriverParams_t(HBA_WWN wwpn, RM_DriverParamList* list);
+    typedef RM_STATUS RM_GetDriverParamsGlobal_t(RM_DriverParamList* list);
 
     // Virtual ports.
 

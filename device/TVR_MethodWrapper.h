@@ -92,6 +92,11 @@ public:
     /// if its count is none. Throws std::bad_alloc.
     static RM_STATUS GetFlashContents(const char* deviceId, std::vector<RM_FlashRegion>& regions);
 
+    // Driver parameters.
+
+    /// Those of the adapter behind a port; without a name those of the driver for all adapters.
+    static RM_STATUS tvrcimGetDriverParam(const char* deviceId, std::vector<RM_DriverParam>* parameters);
+
     // Virtual ports.
 
     static RM_STATUS ListVPorts(const char* deviceId, std::vector<RM_VPortEntry>* vports);

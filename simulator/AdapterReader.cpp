@@ -160,7 +160,33 @@ std::vector<RM_Feature> readFeatures(JsonNode node)
     return features;
 }
 
+RM_DriverParam readDriverParameter(JsonNode& node)
+{
+    RM_DriverParam parameter{};
+    node.at("name").asText(sizeof parameter.name - 1).copy(parameter.name, sizeof parameter.name - 1);
+    node.read("low", parameter.lowRange);
+    node.read("high", parameter.highRange);
+    node.read("default", parameter.def);
+    parameter.current = parameter.def;
+    node.read("current", parameter.current);
+    parameter.exportFlag = 1;
+    node.read("export", parameter.exportFlag);
+    node.read("dynamic", parameter.dynamic);
+    std::string help;
+    node.read("help", help, sizeof parameter.help - 1);
+    help.copy(parameter.help, sizeof parameter.help - 1);
+    node.finish();
+    return parameter;
+}
+
 } // namespace
+
+std::vector<RM_DriverParam> readDriverParameters(JsonNode& owner)
+{
+    std::vector<RM_DriverParam> parameters;
+    owner.forEach("driverParameters", [&](JsonNode& item) { parameters.push_back(readDriverParameter(item)); });
+    return parameters;
+}
 
 Adapter readAdapter(JsonNode& node, const std::vector<Target>& targets)
 {
@@ -184,6 +210,7 @@ Adapter readAdapter(JsonNode& node, const std::vector<Target>& targets)
     readAttributes(node, "attributes", adapterAttributeRows, adapter.attributes);
     if (node.has("features"))
         adapter.features = readFeatures(node.at("features"));
+    adapter.driverParameters = readDriverParameters(node);
     node.forEach("ports", [&](JsonNode& item) { adapter.ports.push_back(readPort(item, targets)); });
     node.finish();
     return adapter;

@@ -60,6 +60,10 @@ extern "C"
     /// Sets one attribute of a port, of its statistics or of its adapter: {"name": value}, as in a scenario.
     TVRSIM_EXPORT int tvrsim_set_attribute(const char* wwpn, const char* attribute, char* error, std::size_t errorSize);
 
+    /// Sets the current value of a driver parameter of the adapter behind a port, or of that for all adapters where
+    /// `wwpn` is null.
+    TVRSIM_EXPORT int tvrsim_set_driver_parameter(const char* wwpn, const char* name, std::uint32_t current);
+
     /// For the front ends: what they share. Loads a scenario first if none was loaded.
     TVRSIM_EXPORT tvrsim::Simulation* tvrsim_simulation();
 

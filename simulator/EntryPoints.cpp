@@ -43,6 +43,8 @@ constexpr Row rows[] = {
     {"DiagGetLoadListParams", dual, countedRecordOut},
     {"DiagReadPCIRegistersV2", dual, recordOut},
     {"ExitLib", dual, statusOnly},
+    {"GetDriverParams", dual, listOut | bit(Hostile::unterminatedText)},
+    {"GetDriverParamsGlobal", dual, listOut | bit(Hostile::unterminatedText)},
     {"GetDriverType", dual, numberOut},
     {"GetHBAAttributes", dual, attributesOut},
     {"GetHBAFeature", dual, numberOut},

@@ -41,6 +41,12 @@ inline void fillTexts(HBA_FCPSCSIENTRY& record)
     fillText(record.ScsiId.OSDeviceName);
 }
 
+inline void fillTexts(RM_DriverParam& record)
+{
+    fillText(record.name);
+    fillText(record.help);
+}
+
 inline void fillTexts(RM_VPortAttributes& record)
 {
     fillText(record.symbolicName);

@@ -97,6 +97,23 @@ template <class Use> RM_STATUS SimulatedHost::onVport(Wwn wwpn, Wwn vport, Use u
                   });
 }
 
+RM_STATUS SimulatedHost::driverParameters(Wwn wwpn, std::vector<RM_DriverParam>& out) const
+{
+    return onAdapter(wwpn,
+                     [&](const Adapter& adapter)
+                     {
+                         out = adapter.driverParameters;
+                         return RM_OK;
+                     });
+}
+
+RM_STATUS SimulatedHost::globalDriverParameters(std::vector<RM_DriverParam>& out) const
+{
+    std::lock_guard lock(_mutex);
+    out = _scenario.driverParameters;
+    return RM_OK;
+}
+
 RM_STATUS SimulatedHost::driverType(Wwn wwpn, std::uint32_t& out) const
 {
     return onAdapter(wwpn,

@@ -114,6 +114,7 @@ struct Adapter
     bool stale = false; ///< the HBA API answers "stale data" until the next refresh
     AttributeList attributes;
     std::vector<RM_Feature> features; ///< in ascending order of tag
+    std::vector<RM_DriverParam> driverParameters;
     std::vector<Port> ports;
 };
 
@@ -122,6 +123,7 @@ struct Scenario
     std::string libraryVersion = "12.0.100.0";
     std::string miliVersion = "2.0.30.0";
     AttributeList serverAttributes;
+    std::vector<RM_DriverParam> driverParameters; ///< those for all adapters
     std::vector<Adapter> adapters;
     std::vector<Target> targets;
     std::vector<Fault> faults;

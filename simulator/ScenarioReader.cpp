@@ -122,6 +122,7 @@ Scenario readDocument(JsonNode root)
     root.has("templates");
     if (root.has("library"))
         readLibrary(root.at("library"), scenario);
+    scenario.driverParameters = readDriverParameters(root);
     readAttributes(root, "server", serverAttributeRows, scenario.serverAttributes);
     root.forEach("targets", [&](JsonNode& item) { scenario.targets.push_back(readTarget(item)); });
     root.forEach("adapters", [&](JsonNode& item) { scenario.adapters.push_back(readAdapter(item, scenario.targets)); });

@@ -41,6 +41,8 @@ public:
     RM_STATUS libraryVersion(std::string& out) const;
     RM_STATUS miliVersion(std::string& out) const;
     RM_STATUS isLocal(Wwn wwpn, std::uint32_t& out) const;
+    RM_STATUS driverParameters(Wwn wwpn, std::vector<RM_DriverParam>& out) const;
+    RM_STATUS globalDriverParameters(std::vector<RM_DriverParam>& out) const;
     RM_STATUS driverType(Wwn wwpn, std::uint32_t& out) const;
     RM_STATUS feature(Wwn wwpn, std::uint32_t tag, std::uint32_t& out) const;
     RM_STATUS features(Wwn wwpn, std::vector<RM_Feature>& out) const;
@@ -71,6 +73,8 @@ public:
     bool removeAdapter(const std::string& name);
     bool makeStale(const std::string& name);
     bool setPortState(Wwn wwpn, std::uint32_t state);
+    /// Of the adapter behind a port, or of all adapters where there is no port; false also for an unknown parameter.
+    bool setDriverParameter(std::optional<Wwn> wwpn, const std::string& name, std::uint32_t current);
     /// The lists of adapter attributes, port attributes and statistics are told apart by the attribute's number.
     bool setAttributeOf(Wwn wwpn, const Attribute& attribute);
 

@@ -157,3 +157,9 @@ int tvrsim_set_attribute(const char* wwpn, const char* attribute, char* error, s
                            throw ScenarioError("no port " + wwnText(name) + ", or no attribute of a port or adapter");
                    });
 }
+
+int tvrsim_set_driver_parameter(const char* wwpn, const char* name, std::uint32_t current)
+{
+    const std::optional<Wwn> port = wwpn ? parseWwn(wwpn) : std::nullopt;
+    return (port || !wwpn) && tvrsim_simulation()->host.setDriverParameter(port, name, current);
+}

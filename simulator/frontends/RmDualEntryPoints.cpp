@@ -20,6 +20,8 @@ extern "C"
     TVRSIM_EXPORT RM_GetPortAttributes_t DUAL(GetPortAttributes);
     TVRSIM_EXPORT RM_GetPortStatistics_t DUAL(GetPortStatistics);
     TVRSIM_EXPORT RM_GetServerAttributes_t DUAL(GetServerAttributes);
+    TVRSIM_EXPORT RM_GetDriverParams_t DUAL(GetDriverParams);
+    TVRSIM_EXPORT RM_GetDriverParamsGlobal_t DUAL(GetDriverParamsGlobal);
     TVRSIM_EXPORT RM_GetDriverType_t DUAL(GetDriverType);
     TVRSIM_EXPORT RM_GetHBAFeature_t DUAL(GetHBAFeature);
     TVRSIM_EXPORT RM_GetHBAFeatureList_t DUAL(GetHBAFeatureList);
@@ -81,6 +83,20 @@ extern "C"
         Call call = callOf(__func__, port(wwpn));
         return call.attributes(buffer, size,
                                [&](auto& list) { return call.host().serverAttributes(fromHba(wwpn), list); });
+    }
+
+    RM_STATUS DUAL(GetDriverParams)(HBA_WWN wwpn, RM_DriverParamList* list)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.list(list, &RM_DriverParamList::count,
+                         [&](auto& entries) { return call.host().driverParameters(fromHba(wwpn), entries); });
+    }
+
+    RM_STATUS DUAL(GetDriverParamsGlobal)(RM_DriverParamList* list)
+    {
+        Call call = callOf(__func__);
+        return call.list(list, &RM_DriverParamList::count,
+                         [&](auto& entries) { return call.host().globalDriverParameters(entries); });
     }
 
     RM_STATUS DUAL(GetDriverType)(HBA_WWN wwpn, std::uint32_t* driverType)

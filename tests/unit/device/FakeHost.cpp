@@ -168,6 +168,16 @@ RM_STATUS LRM_VPList(HBA_WWN, RM_VPortList* list)
     return writeList("LRM_VPList", list, host->vports);
 }
 
+RM_STATUS LRM_GetDriverParams(HBA_WWN, RM_DriverParamList* list)
+{
+    return writeList("LRM_GetDriverParams", list, host->driverParameters);
+}
+
+RM_STATUS LRM_GetDriverParamsGlobal(RM_DriverParamList* list)
+{
+    return writeList("LRM_GetDriverParamsGlobal", list, host->driverParameters);
+}
+
 RM_STATUS LRM_VPListTargets(HBA_WWN, HBA_WWN, RM_VPortTargetList* list)
 {
     return writeList("LRM_VPListTargets", list, host->vportTargets);
@@ -352,6 +362,8 @@ const std::map<std::string, void*>& symbols()
         {"LRM_GetDriverType", address(LRM_GetDriverType)},
         {"LRM_InitLib", address(LRM_InitLib)},
         {"LRM_SetDebugTraces", address(LRM_SetDebugTraces)},
+        {"LRM_GetDriverParams", address(LRM_GetDriverParams)},
+        {"LRM_GetDriverParamsGlobal", address(LRM_GetDriverParamsGlobal)},
         {"LRM_GetHBAFeature", address(LRM_GetHBAFeature)},
         {"LRM_GetHBAFeatureList", address(LRM_GetHBAFeatureList)},
         {"LRM_VPList", address(LRM_VPList)},

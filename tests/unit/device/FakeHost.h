@@ -49,6 +49,7 @@ public:
     std::uint32_t driverType = 3;
     std::uint32_t isLocal = 1;
     std::map<std::uint32_t, std::uint32_t> features;
+    std::vector<RM_DriverParam> driverParameters; ///< of every adapter and for all of them
     std::vector<RM_VPortEntry> vports;
     std::vector<RM_VPortTarget> vportTargets;
     std::vector<RM_Lun> luns;
