@@ -1,12 +1,21 @@
 #include "model/LiveRefresh.h"
 
+#include "agent/SharedEnds.h"
+#include "model/DriverParameters.h"
+
 namespace cimple
 {
 
-// No step puts an instance of these classes in the cache, so there is none to bring up to date.
+template <> void liveRefresh<TVRHBA_DriverParams>(ProviderAgent& agent)
+{
+    const SharedEnds ends;
+    rebuildDriverParameters(agent);
+}
 
-template <> void liveRefresh<TVRHBA_DriverParams>(ProviderAgent&) {}
-
-template <> void liveRefresh<TVRHBA_DriverParamGlobal>(ProviderAgent&) {}
+template <> void liveRefresh<TVRHBA_DriverParamGlobal>(ProviderAgent& agent)
+{
+    const SharedEnds ends;
+    rebuildGlobalDriverParameters(agent);
+}
 
 } // namespace cimple

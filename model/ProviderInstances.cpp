@@ -37,6 +37,8 @@ Ref<TVRHBA_SoftwareIdentity> makeProviderIdentity()
     identity->VersionString.set(
         formatText("%d.%d.%d-%d", providerVersion[0], providerVersion[1], providerVersion[2], providerVersion[3]));
     identity->Classifications.set({instrumentation});
+    identity->IdentityInfoType.set({"TAVRIN:SOFTWARE_NAME"});
+    identity->IdentityInfoValue.set({"Tavrin CMPI HBA Provider"});
     identity->IsEntity.set(true);
     return identity;
 }

@@ -2,10 +2,13 @@
 #include "agent/RefreshSteps.h"
 
 #include "model/ComputerSystem.h"
+#include "model/DriverParameters.h"
 #include "model/PhysicalModel.h"
 #include "model/PortModel.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
+#include "model/Services.h"
+#include "model/SoftwareIdentities.h"
 #include "model/VitalProductData.h"
 
 namespace cimple
@@ -33,7 +36,15 @@ constexpr HostStep hostSteps[] = {
 constexpr HostStep cardSteps[] = {
     {createProviderSoftwareIdentity, Stop, "TVRHBA_SoftwareIdentity provider creation failed"},
     {createProviderConfigSettings, Stop, {}},
+    {createSoftwareInstallationService, Stop, {}},
+    {createWWNService, Stop, {}},
+    {createFCTagService, Stop, {}},
+    {createBootBIOSService, Stop, {}},
+    {createDriverParameterService, Stop, {}},
+    {createDriverSoftwareIdentities, Stop, {}},
+    {createRemoteAccessPoint, Stop, {}},
     {buildAdapters, Stop, {}},
+    {createDriverParameters, GoOn, {}},
     mark({TVR_DBG, "Done with the Driver Parameter fetching"}),
     mark({TVR_DBG, "Calling FC_CreateDumpClasses"}),
 };
@@ -57,6 +68,8 @@ constexpr PortStep portSteps[] = {
     {createFlashImages, GoOn, {}},
     {createPortControllerAssociations, Stop, {}},
     {createInitiatorEndpoint, Stop, {}},
+    {createPortSoftwareIdentities, Stop, {}},
+    {createPortServiceAssociations, GoOn, {}},
     mark<PortContext>({TVR_DBG, "Ending of Software Installation Service"}),
 };
 

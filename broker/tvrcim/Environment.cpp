@@ -106,6 +106,7 @@ FileRoot::FileRoot(SignalEnd& signals)
         fs::create_directories(_path / folder);
     for (const char* file : {"proc/version", "etc/issue"})
         copyText(fs::path("/") / file, _path / file);
+    std::ofstream(_path / "etc/tvr_smis.conf") << "https://fabricore.example.net/weblaunch\n";
     setenv("TVR_FILE_ROOT", name.c_str(), 1);
 }
 

@@ -93,6 +93,7 @@ Host::Host(const std::string& scenario, Libraries libraries) : _root(makeRoot())
     write("/proc/version", "Linux version 6.1.0 (test)\n");
     write("/etc/issue", "Debian GNU/Linux 12 \\n \\l\n");
     write("/etc/tavrin_fc_provider.dmp", "2,5,1\n" + (_root / "provider.log").string());
+    write("/etc/tvr_smis.conf", "# Management page\n  https://fabricore.example.net/weblaunch\n");
     setenv("TVR_FILE_ROOT", _root.c_str(), 1);
     loadScenario(scenario);
     if (libraries.hbaApi)
@@ -210,6 +211,12 @@ void Host::setAttribute(const char* wwpn, const char* attribute)
     char error[1024] = "";
     if (!TVR_CONTROL(tvrsim_set_attribute)(wwpn, attribute, error, sizeof(error)))
         throw std::runtime_error(error);
+}
+
+void Host::setDriverParameter(const char* wwpn, const char* name, std::uint32_t current)
+{
+    if (!TVR_CONTROL(tvrsim_set_driver_parameter)(wwpn, name, current))
+        throw std::runtime_error(std::string("no driver parameter ") + name);
 }
 
 void Host::openGate(const std::string& gate)

@@ -64,6 +64,8 @@ public:
     void setPortState(const char* wwpn, std::uint32_t state);
     /// One attribute of a port, of its statistics or of its adapter: {"name": value}, as in a scenario.
     void setAttribute(const char* wwpn, const char* attribute);
+    /// Of the adapter behind a port, or of the driver where `wwpn` is null.
+    void setDriverParameter(const char* wwpn, const char* name, std::uint32_t current);
     /// Lets calls go on that a fault row holds at a gate.
     void openGate(const std::string& gate);
     /// Waits until so many calls are held at a gate; false if that does not happen in time.

@@ -1,0 +1,190 @@
+#include "model/DriverParameters.h"
+
+#include "agent/Build.h"
+#include "device/ForeignText.h"
+#include "device/TVR_MethodWrapper.h"
+#include "schema/TVRHBA_DriverParamGlobal.h"
+#include "schema/TVRHBA_DriverParameterAffectsFCPort.h"
+#include "schema/TVRHBA_DriverParams.h"
+#include "schema/TVRHBA_DriverServiceElementSettingData.h"
+#include "schema/TVRHBA_FCHBADriverParamService.h"
+#include "schema/TVRHBA_FCPort.h"
+#include "schema/TVRHBA_GlobalDriverServiceElementSettingData.h"
+
+#include <cctype>
+#include <vector>
+
+namespace cimple
+{
+
+namespace
+{
+
+/// The parameters of one port that its map is to hold.
+struct PortParameters
+{
+    const TVRHBA_FCPort* port;
+    std::vector<Ref<TVRHBA_DriverParams>> parameters;
+};
+
+/// What both kinds of parameters have.
+template <class Parameter> void fill(Parameter& made, std::uint32_t number, const RM_DriverParam& record)
+{
+    constexpr std::uint16_t changeablePersistent = 2;
+    const String name(foreignText(record.name));
+    const String help(foreignText(record.help));
+    made.Caption.set("FC driver parameter");
+    made.Description.set(help);
+    made.ElementName.set(name);
+    made.ChangeableType.set(changeablePersistent);
+    made.paramno.set(number);
+    made.paramname.set(name);
+    made.lowRange.set(record.lowRange);
+    made.highRange.set(record.highRange);
+    made.current.set(record.current);
+    made.exportFlag.set(record.exportFlag);
+    made.dynamic.set(record.dynamic);
+    made.help.set(help);
+}
+
+String lowerCase(const String& text)
+{
+    std::string lower(text.c_str());
+    for (char& c : lower)
+        c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+    return String(lower);
+}
+
+/// Makes an instance of each record by `make(number, record)`.
+template <class Make> auto makeEach(const std::vector<RM_DriverParam>& records, Make make)
+{
+    std::vector<decltype(make(0, records[0]))> made;
+    made.reserve(records.size());
+    for (std::uint32_t number = 0; number < records.size(); number++)
+    {
+        TVR_LOG(TVR_DBG, "saving the values of driver parameter %d", static_cast<int>(number));
+        made.push_back(make(number, records[number]));
+    }
+    return made;
+}
+
+/// What the map has of a port.
+std::vector<Ref<TVRHBA_DriverParams>> presentOf(ProviderAgent& agent, const String& deviceId)
+{
+    std::vector<Ref<TVRHBA_DriverParams>> present;
+    const TypedMap<TVRHBA_DriverParams> map = mapOf<TVRHBA_DriverParams>(agent);
+    for (std::size_t i = 0; TVRHBA_DriverParams* entry = map.at(i); i++)
+        if (entry->deviceID.value == deviceId)
+        {
+            ref(entry);
+            present.emplace_back(entry);
+        }
+    return present;
+}
+
+PortParameters readPort(ProviderAgent& agent, const TVRHBA_FCPort& port)
+{
+    const String& id = port.DeviceID.value;
+    const String deviceId = lowerCase(id);
+    std::vector<RM_DriverParam> records;
+    if (TVR_MethodWrapper::tvrcimGetDriverParam(id.c_str(), &records) != RM_OK)
+        return {&port, presentOf(agent, deviceId)};
+    return {&port, makeEach(records,
+                            [&](std::uint32_t number, const RM_DriverParam& record)
+                            {
+                                Ref<TVRHBA_DriverParams> made = fresh<TVRHBA_DriverParams>();
+                                made->InstanceID.set(formatText("%s:%s", id.c_str(), foreignText(record.name).c_str()));
+                                fill(*made, number, record);
+                                made->deviceID.set(deviceId);
+                                made->def.set(record.def);
+                                return made;
+                            })};
+}
+
+/// Fills the flags of an association with a parameter that has this value for its default.
+template <class SettingData> auto flags(const Property<std::uint32_t>& current, const Property<std::uint32_t>& def)
+{
+    return [isDefault = current.value == def.value](SettingData& of)
+    {
+        of.IsDefault.set(isDefault ? 1 : 2);
+        of.IsCurrent.set(1);
+    };
+}
+
+void insert(ProviderAgent& agent, const TVRHBA_FCHBADriverParamService* service, const TVRHBA_FCPort* port,
+            const Ref<TVRHBA_DriverParams>& made)
+{
+    const TVRHBA_DriverParams* parameter =
+        mapOf<TVRHBA_DriverParams>(agent).insert(made, "Insert Failed : m_TVRHBA_DriverParams_map");
+    if (!parameter)
+        return;
+    using OfService = TVRHBA_DriverServiceElementSettingData;
+    join<OfService>(agent, &OfService::ManagedElement, service, &OfService::SettingData, parameter,
+                    "Insert Failed : m_TVRHBA_DriverServiceElementSettingData_map",
+                    flags<OfService>(parameter->current, parameter->def));
+    using OfPort = TVRHBA_DriverParameterAffectsFCPort;
+    join<OfPort>(agent, &OfPort::ManagedElement, port, &OfPort::SettingData, parameter,
+                 "Insert Failed : m_TVRHBA_DriverParameterAffectsFCPort_map",
+                 flags<OfPort>(parameter->current, parameter->def));
+}
+
+void insert(ProviderAgent& agent, const TVRHBA_FCHBADriverParamService* service,
+            const Ref<TVRHBA_DriverParamGlobal>& made)
+{
+    const TVRHBA_DriverParamGlobal* parameter =
+        mapOf<TVRHBA_DriverParamGlobal>(agent).insert(made, "Insert Failed : m_TVRHBA_DriverParamGlobal_map");
+    using OfService = TVRHBA_GlobalDriverServiceElementSettingData;
+    if (parameter)
+        join<OfService>(agent, &OfService::ManagedElement, service, &OfService::SettingData, parameter,
+                        "Insert Failed : m_TVRHBA_GlobalDriverServiceElementSettingData_map",
+                        flags<OfService>(parameter->current, parameter->glbl));
+}
+
+} // namespace
+
+void rebuildDriverParameters(ProviderAgent& agent)
+{
+    const TypedMap<TVRHBA_FCPort> ports = mapOf<TVRHBA_FCPort>(agent);
+    std::vector<PortParameters> all;
+    for (std::size_t i = 0; const TVRHBA_FCPort* port = ports.at(i); i++)
+        all.push_back(readPort(agent, *port));
+
+    mapOf<TVRHBA_DriverParams>(agent).clear();
+    mapOf<TVRHBA_DriverServiceElementSettingData>(agent).clear();
+    mapOf<TVRHBA_DriverParameterAffectsFCPort>(agent).clear();
+    const auto* service = mapOf<TVRHBA_FCHBADriverParamService>(agent).first();
+    for (const PortParameters& of : all)
+        for (const Ref<TVRHBA_DriverParams>& parameter : of.parameters)
+            insert(agent, service, of.port, parameter);
+}
+
+void rebuildGlobalDriverParameters(ProviderAgent& agent)
+{
+    std::vector<RM_DriverParam> records;
+    if (TVR_MethodWrapper::tvrcimGetDriverParam(nullptr, &records) != RM_OK)
+        return;
+    const auto parameters =
+        makeEach(records,
+                 [](std::uint32_t number, const RM_DriverParam& record)
+                 {
+                     Ref<TVRHBA_DriverParamGlobal> made = fresh<TVRHBA_DriverParamGlobal>();
+                     made->InstanceID.set(formatText("Global:%s", foreignText(record.name).c_str()));
+                     fill(*made, number, record);
+                     made->glbl.set(record.def);
+                     return made;
+                 });
+    mapOf<TVRHBA_DriverParamGlobal>(agent).clear();
+    mapOf<TVRHBA_GlobalDriverServiceElementSettingData>(agent).clear();
+    const auto* service = mapOf<TVRHBA_FCHBADriverParamService>(agent).first();
+    for (const Ref<TVRHBA_DriverParamGlobal>& parameter : parameters)
+        insert(agent, service, parameter);
+}
+
+std::uint32_t createDriverParameters(HostContext& host)
+{
+    rebuildDriverParameters(host.agent);
+    rebuildGlobalDriverParameters(host.agent);
+    return BUILD_DONE;
+}
+
+} // namespace cimple

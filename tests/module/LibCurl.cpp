@@ -1,0 +1,54 @@
+#include "tests/module/LibCurl.h"
+
+#include <dlfcn.h>
+#include <mutex>
+
+namespace module_test
+{
+
+namespace
+{
+
+std::mutex mutex;
+std::string present;
+std::vector<std::string> tried;
+
+bool isLibCurl(const std::string& file)
+{
+    return file.find("libcurl.") != file.npos || file == "curl.dll";
+}
+
+using Open = void* (*)(const char*, int);
+
+void* openOf(const char* file, int mode)
+{
+    static const Open next = reinterpret_cast<Open>(dlsym(RTLD_NEXT, "dlopen"));
+    if (!file || !isLibCurl(file))
+        return next(file, mode);
+    const std::lock_guard lock(mutex);
+    tried.push_back(file);
+    return file == present ? next(nullptr, mode) : nullptr; // a handle that can be closed
+}
+
+} // namespace
+
+void setLibCurl(const std::string& file)
+{
+    const std::lock_guard lock(mutex);
+    present = file;
+    tried.clear();
+}
+
+std::vector<std::string> triedLibCurls()
+{
+    const std::lock_guard lock(mutex);
+    return tried;
+}
+
+} // namespace module_test
+
+/// Stands before the C library's function for all libraries of the process, the module among them.
+extern "C" __attribute__((visibility("default"))) void* dlopen(const char* file, int mode)
+{
+    return module_test::openOf(file, mode);
+}
