@@ -3,6 +3,7 @@
 #include "device/Bindings.h"
 #include "device/TVR_MethodWrapper.h"
 #include "model/PhysicalModel.h"
+#include "model/VitalProductData.h"
 #include "schema/TVRHBA_PCIDevice.h"
 #include "schema/TVRHBA_PCIElementConformsToProfile.h"
 #include "schema/TVRHBA_RegisteredProfile.h"
@@ -268,7 +269,12 @@ std::uint32_t createPCIDeviceInstance(PortContext& port)
     if (!made)
         return failed("Failed to create TVRHBA_PCIDevice", BUILD_NO_INSTANCE);
     const Device* device = mapOf<Device>(port.host.agent).insert(made, "Insert Failed : m_TVRHBA_PCIDevice_map");
-    return device ? associateDevice(port.host, device) : BUILD_FAILED;
+    if (!device)
+        return BUILD_FAILED;
+    const std::uint32_t status = associateDevice(port.host, device);
+    if (status == BUILD_DONE)
+        createPortVpd(port, device);
+    return status;
 }
 
 } // namespace cimple

@@ -56,6 +56,7 @@ constexpr AdapterStep adapterSteps[] = {
 
 constexpr PortStep portSteps[] = {
     {readVitalProductData, GoOn, {}},
+    {updateCardFru, Stop, "Update FRU related class failed"},
     {createCardAssociations, GoOn, {}},
     {createChipInstances, Stop, "CreateChipInstances failed"},
     {createPCIDeviceInstance, Stop, "CreatePCIDeviceInstance failed"},
@@ -74,6 +75,10 @@ constexpr PortStep portSteps[] = {
 };
 
 constexpr HostStep closingSteps[] = {
+    {updateFruData,
+     GoOn,
+     {TVR_DBG, "Failed to update FRU VPD data to cim_ Softwareidentity/PhysicalPackage instances"},
+     {TVR_DBG, "Exception occured during FRU update to cim_ Softwareidentity/PhysicalPackage instances"}},
     {createProviderRecordLog, Stop, {}},
     mark({TVR_DBG, "Create the Diagnostic classes"}),
 };
