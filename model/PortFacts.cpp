@@ -84,9 +84,7 @@ void setPortIdentifiers(TVRHBA_FCPort& instance, const PortContext& port)
     const FCAdapterAttributes& adapter = port.on.attributes;
     instance.OtherIdentifyingInfo.null = 0;
     instance.IdentifyingDescriptions.null = 0;
-    std::vector<VpdField> fields;
-    TVR_MethodWrapper::GetVPD(port.port.name.c_str(), &fields);
-    for (const VpdField& field : fields)
+    for (const VpdField& field : port.vpd)
         identify(instance, field.value, vpdName(field.keyword));
     identify(instance, port.port.getAttributes()->osDeviceName, "OS Device Name");
     identify(instance, adapter.ieeeAddress, "TAVRIN:IEEE_ADDRESS");

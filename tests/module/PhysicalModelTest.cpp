@@ -90,6 +90,7 @@ Name = "2000027A51160211"
 NameFormat = "WWN"
 )"},
     {"TVRHBA_Card", "Tag", "TV16A02417", R"(
+CanBeFRUed = true
 CreationClassName = "TVRHBA_Card"
 Description = "Tavrin TV1602 8Gb 2-port PCIe Fibre Channel Adapter"
 DeviceID = 57856
@@ -108,6 +109,8 @@ SLIMode = 3
 SerialNumber = "TV16A02417"
 TVRSerialNumber = "TV16A02417"
 Tag = "TV16A02417"
+UserTracking = "RACK 12 SLOT 3"
+VendorEquipmentType = "TV1602-M8"
 VendorSpecID = 3791658362
 Version = "00000006"
 )"},
