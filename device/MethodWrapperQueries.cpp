@@ -496,23 +496,33 @@ try
     VPortPath path;
     if (const int failed = path.convert(deviceId, vportId, targetId))
         return failed;
-    const auto inquiry = sendScsi<inquirySize>(
-        [&](auto& to)
-        {
-            return LRM_VpScsiInquiry(path.wwpn, path.vport, path.target, lun, 0, 0, to.response.data(), inquirySize,
-                                     to.sense.data(), senseSize);
-        });
+    const auto inquire = [&](std::uint8_t evpd, std::uint32_t page)
+    {
+        return sendScsi<inquirySize>(
+            [&](auto& to)
+            {
+                return LRM_VpScsiInquiry(path.wwpn, path.vport, path.target, lun, evpd, page, to.response.data(),
+                                         inquirySize, to.sense.data(), senseSize);
+            });
+    };
+    const auto inquiry = inquire(0, 0);
     if (inquiry.status != RM_OK)
         return logged(inquiry.status);
+    VPortLunAttributes unit{.inquiry = decodeInquiry(inquiry.response)};
+    // A unit need not have a capacity, nor the pages.
     const auto capacity = sendScsi<capacitySize>(
         [&](auto& to)
         {
             return LRM_VpScsiReadCapacity(path.wwpn, path.vport, path.target, lun, to.response.data(), capacitySize,
                                           to.sense.data(), senseSize);
         });
-    if (capacity.status != RM_OK)
-        return logged(capacity.status);
-    *attributes = {decodeInquiry(inquiry.response), decodeCapacity(capacity.response)};
+    if (logged(capacity.status) == RM_OK)
+        unit.capacity = decodeCapacity(capacity.response);
+    if (const auto page = inquire(1, serialNumberPage); page.status == RM_OK)
+        unit.serialNumber = foreignText(page.response.data() + 4, inquirySize - 4);
+    if (const auto page = inquire(1, identificationPage); page.status == RM_OK)
+        designatorToRecord(&unit.designator, page.response);
+    *attributes = std::move(unit);
     return RM_OK;
 }
 catch (...)

@@ -16,6 +16,10 @@ constexpr std::uint32_t capacitySize = 8;
 constexpr std::uint32_t reportLunsSize = 8 + 512 * 8; ///< header and 512 units
 constexpr std::uint32_t senseSize = 128;
 
+// Pages of vital product data.
+constexpr std::uint32_t serialNumberPage = 0x80;
+constexpr std::uint32_t identificationPage = 0x83;
+
 /// Response and sense data of one command, zero where the unit sent less.
 template <std::uint32_t Size> struct ScsiAnswer
 {

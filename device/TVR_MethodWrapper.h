@@ -5,6 +5,7 @@
 #include "device/RmApi.h"
 #include "device/ScsiCommand.h"
 #include "device/Vpd.h"
+#include "foundation/CommonHelpers.h"
 
 #include <atomic>
 #include <memory>
@@ -24,8 +25,10 @@ struct TargetLun
 
 struct VPortLunAttributes
 {
-    StandardInquiry inquiry;
-    ReadCapacity capacity;
+    StandardInquiry inquiry = {};
+    ReadCapacity capacity = {};           ///< zero without one
+    std::string serialNumber = "Unknown"; ///< page 0x80
+    DesignatorRecord designator{};        ///< first one of page 0x83, zero without one
 };
 
 /// The agent owns one object of it, whose life spans the use of the RM library; the functions are static. They

@@ -13,8 +13,6 @@ namespace cimple
 namespace
 {
 
-constexpr std::uint32_t serialNumberPage = 0x80;
-constexpr std::uint32_t identificationPage = 0x83;
 constexpr std::size_t loggedSense = 24;
 
 template <std::uint32_t Size> bool succeeded(const ScsiAnswer<Size>& answer)

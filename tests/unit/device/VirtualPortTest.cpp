@@ -133,11 +133,20 @@ TEST_F(VirtualPortTest, AttributesOfALogicalUnit)
     EXPECT_EQ(out.inquiry.product, "Virtual Tape    ");
     EXPECT_EQ(out.capacity.lastLba, 15u);
     EXPECT_EQ(out.capacity.blockLength, 512u);
+    EXPECT_EQ(out.designator.designatorLength, 0u) << "no such page";
+    host.inquiry[0x80] = std::string("\x01\x80\x00\x04SN07", 8);
+    host.inquiry[0x83] = std::string("\x01\x83\x00\x0C\x01\x03\x00\x08\x50\x00\x00\x00\x00\x00\x00\x0A", 16);
+    EXPECT_EQ(W::VPortLunAttr(portId, vportId, targetId, 7, &out), 0);
+    EXPECT_EQ(out.serialNumber, "SN07");
+    EXPECT_EQ(out.designator.designatorLength, 8u);
     host.statuses["LRM_VpScsiReadCapacity"] = {5};
-    EXPECT_EQ(W::VPortLunAttr(portId, vportId, targetId, 7, &out), 5);
+    host.statuses["LRM_VpScsiInquiry"] = {0, 5, 5};
+    EXPECT_EQ(W::VPortLunAttr(portId, vportId, targetId, 7, &out), 0) << "a unit need not have them";
+    EXPECT_EQ(out.capacity.blockLength, 0u);
+    EXPECT_EQ(out.serialNumber, "Unknown");
     host.statuses["LRM_VpScsiInquiry"] = {6};
     EXPECT_EQ(W::VPortLunAttr(portId, vportId, targetId, 7, &out), 6);
-    EXPECT_EQ(host.calls["LRM_VpScsiReadCapacity"], 2);
+    EXPECT_EQ(host.calls["LRM_VpScsiReadCapacity"], 3);
 }
 
 TEST_F(VirtualPortTest, VirtualMachineTextsAreTerminated)
