@@ -5,6 +5,7 @@
 #include "model/DriverParameters.h"
 #include "model/PhysicalModel.h"
 #include "model/PortModel.h"
+#include "model/PortVirtualization.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
 #include "model/Services.h"
@@ -47,6 +48,11 @@ constexpr HostStep cardSteps[] = {
     {createDriverParameters, GoOn, {}},
     mark({TVR_DBG, "Done with the Driver Parameter fetching"}),
     mark({TVR_DBG, "Calling FC_CreateDumpClasses"}),
+    {createPortVirtualization,
+     GoOn,
+     {TVR_ERR, "CreatePortVirtualizationClasses failed: %d"},
+     {TVR_ERR, "Exception in port virtualization class creation"},
+     MapGroup::PortVirtualization},
 };
 
 constexpr AdapterStep adapterSteps[] = {

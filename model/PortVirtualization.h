@@ -1,0 +1,15 @@
+// Virtual ports: what shares a physical port, the virtual machines that they are given to, and what they reach.
+#pragma once
+
+#include "agent/RefreshContext.h"
+
+#include <cstdint>
+
+namespace cimple
+{
+
+/// Step of the host, behind the ports: the virtual ports of each, with their endpoints, units and paths, and the pool
+/// that they come from. What a call does not tell is left out; the status says whether anything was.
+std::uint32_t createPortVirtualization(HostContext& host);
+
+} // namespace cimple
