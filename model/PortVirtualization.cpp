@@ -213,14 +213,6 @@ void associatePort(const VirtualPort& vport)
     const CIM_ComputerSystem* system = vport.system ? vport.system.get() : host.system;
     vport.on.note(join<OfMachine>(host.agent, &OfMachine::GroupComponent, system, &OfMachine::PartComponent, vport.port,
                                   "Insert Failed : m_TVRHBA_VMSystemDevice_map"));
-
-    using Affects = TVRHBA_DriverParamAffectsVirtualFCPort;
-    const auto parameters = mapOf<TVRHBA_DriverParameterAffectsFCPort>(host.agent);
-    for (std::size_t i = 0; const TVRHBA_DriverParameterAffectsFCPort* physical = parameters.at(i); i++)
-        if (key_eq(physical->ManagedElement, &vport.on.port))
-            vport.on.note(join<Affects>(host.agent, &Affects::ManagedElement, vport.port, &Affects::SettingData,
-                                        physical->SettingData,
-                                        "Insert Failed : m_TVRHBA_DriverParamAffectsVirtualFCPort_map"));
 }
 
 void createInitiator(VirtualPort& vport)
@@ -464,6 +456,24 @@ void createVirtualPorts(const PhysicalPort& on)
     createPool(on, made);
 }
 
+/// The settings of a physical port for one of its virtual ports.
+void takeParameters(ProviderAgent& agent, const TVRHBA_VPortHostedDependency& hosted)
+{
+    const TVRHBA_VirtualFCPort* port = mapOf<TVRHBA_VirtualFCPort>(agent).withKeysOf(hosted.Dependent);
+    const auto physical = mapOf<TVRHBA_DriverParameterAffectsFCPort>(agent);
+    using Affects = TVRHBA_DriverParamAffectsVirtualFCPort;
+    for (std::size_t i = 0; const TVRHBA_DriverParameterAffectsFCPort* of = physical.at(i); i++)
+        if (key_eq(of->ManagedElement, hosted.Antecedent))
+            join<Affects>(agent, &Affects::ManagedElement, port, &Affects::SettingData,
+                          mapOf<TVRHBA_DriverParams>(agent).withKeysOf(of->SettingData),
+                          "Insert Failed : m_TVRHBA_DriverParamAffectsVirtualFCPort_map",
+                          [&](Affects& made)
+                          {
+                              made.IsDefault = of->IsDefault;
+                              made.IsCurrent = of->IsCurrent;
+                          });
+}
+
 } // namespace
 
 std::uint32_t createPortVirtualization(HostContext& host)
@@ -472,7 +482,16 @@ std::uint32_t createPortVirtualization(HostContext& host)
     const auto ports = mapOf<TVRHBA_FCPort>(host.agent);
     for (std::size_t i = 0; const TVRHBA_FCPort* port = ports.at(i); i++)
         createVirtualPorts({host, *port, complete});
+    rebuildVirtualPortParameters(host.agent);
     return complete ? BUILD_DONE : BUILD_FAILED;
+}
+
+void rebuildVirtualPortParameters(ProviderAgent& agent)
+{
+    mapOf<TVRHBA_DriverParamAffectsVirtualFCPort>(agent).clear();
+    const auto hosted = mapOf<TVRHBA_VPortHostedDependency>(agent);
+    for (std::size_t i = 0; const TVRHBA_VPortHostedDependency* port = hosted.at(i); i++)
+        takeParameters(agent, *port);
 }
 
 } // namespace cimple

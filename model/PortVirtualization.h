@@ -12,4 +12,8 @@ namespace cimple
 /// that they come from. What a call does not tell is left out; the status says whether anything was.
 std::uint32_t createPortVirtualization(HostContext& host);
 
+/// Ties the virtual ports to the driver parameters that the maps now hold of their physical ports. The caller holds the
+/// data mutex.
+void rebuildVirtualPortParameters(ProviderAgent& agent);
+
 } // namespace cimple
