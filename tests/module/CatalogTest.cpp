@@ -28,6 +28,9 @@ bool isListedException(const std::string& association, const broker::Property& r
     // Entries of the provider's log have other names in its associations than among its instances.
     if (association == "TVRHBA_RecordLogManagesRecord" && reference.name == "Record")
         return true;
+    // The system of a virtual machine is the hypervisor's to serve.
+    if (association == "TVRHBA_VMSystemDevice" && reference.name == "GroupComponent")
+        return true;
     return !platform && ownPlatformClasses.count(reference.value.asPath().className);
 }
 
