@@ -73,20 +73,15 @@ enum class Joined
     Refused,    ///< the map has one with these keys; the log has the text
 };
 
-/// Makes an association with defaults whose two references hold copies of the ends, as these are now, has it filled by
-/// `fill(association)`, and puts it in the map.
-template <class Association, class First, class Second, class Holder1, class Holder2, class Fill>
-Joined join(const TypedMap<Association>& map, First* Holder1::*firstRole, const std::type_identity_t<First>* first,
-            Second* Holder2::*secondRole, const std::type_identity_t<Second>* second, const LogText& refused, Fill fill)
+/// Makes an association with defaults, has it filled by `fill(association)`, and puts it in the map. For associations
+/// of which the ends are at hand as copies; join() makes these.
+template <class Association, class Fill>
+Joined insertFilled(const TypedMap<Association>& map, const LogText& refused, Fill fill)
 {
-    if (!first || !second)
-        return Joined::NoEnd;
-    const Ref<Association> made = unlessOutOfMemory(
+    Ref<Association> made = unlessOutOfMemory(
         [&]
         {
             Ref<Association> association = fresh<Association>();
-            association.get()->*firstRole = shared_end(first).release();
-            association.get()->*secondRole = shared_end(second).release();
             fill(*association);
             return association;
         });
@@ -95,7 +90,24 @@ Joined join(const TypedMap<Association>& map, First* Holder1::*firstRole, const 
         TVR_LOG(TVR_CRIT, "Could not create the instance of the Association class");
         return Joined::NoInstance;
     }
-    return map.insert(made, refused) ? Joined::Made : Joined::Refused;
+    return map.insert(std::move(made), refused) ? Joined::Made : Joined::Refused;
+}
+
+/// Makes an association with defaults whose two references hold copies of the ends, as these are now, has it filled by
+/// `fill(association)`, and puts it in the map.
+template <class Association, class First, class Second, class Holder1, class Holder2, class Fill>
+Joined join(const TypedMap<Association>& map, First* Holder1::*firstRole, const std::type_identity_t<First>* first,
+            Second* Holder2::*secondRole, const std::type_identity_t<Second>* second, const LogText& refused, Fill fill)
+{
+    if (!first || !second)
+        return Joined::NoEnd;
+    return insertFilled(map, refused,
+                        [&](Association& association)
+                        {
+                            association.*firstRole = shared_end(first).release();
+                            association.*secondRole = shared_end(second).release();
+                            fill(association);
+                        });
 }
 
 /// The same in the first map of the association's class.

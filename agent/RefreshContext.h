@@ -8,6 +8,8 @@
 #include "schema/CIM_Chassis.h"
 #include "schema/CIM_ComputerSystem.h"
 
+#include <set>
+#include <string>
 #include <string_view>
 #include <utility>
 #include <vector>
@@ -66,6 +68,8 @@ struct HostContext
     TVRHBA_FCTagService* tagService = nullptr;
     TVRHBA_BootBIOSService* bootService = nullptr;
     TVRHBA_FCHBADriverParamService* parameterService = nullptr;
+    /// The local and the remote port, "WWPN|WWPN", of all paths to logical units that a refresh of the SAN has found.
+    std::set<std::string> remotePorts;
 };
 
 /// Of an adapter.

@@ -8,8 +8,6 @@ namespace cimple
 namespace
 {
 
-constexpr std::uint32_t fibreChannel = 1; // Adapter::adapterType
-
 HostContext& hostOf(HostContext& context)
 {
     return context;
@@ -92,7 +90,7 @@ std::uint32_t buildAdapters(HostContext& host)
     for (unsigned index = 0; index < adapters.size(); index++)
     {
         Adapter& adapter = *adapters[index];
-        if (adapter.adapterType != fibreChannel)
+        if (adapter.adapterType != Adapter::fibreChannel)
         {
             TVR_LOG(TVR_DBG, "Skippping Non FC Adapter [%s]", adapter.getName().c_str());
             continue;
@@ -120,11 +118,21 @@ std::uint32_t buildAdapterMaps(ProviderAgent& agent, const RefreshSteps& steps)
 }
 
 std::uint32_t buildSANMaps(ProviderAgent& agent, const RefreshSteps& steps)
+try
 {
+    TVR_LOG(TVR_DBG, "PERF: updateSANMaps: Entry");
     agent.clearSANMaps();
     const SharedEnds ends;
     HostContext host = HostContext::ofCache(agent, steps);
-    return walk(steps.san, host);
+    const std::uint32_t status = walk(steps.san, host);
+    if (status == BUILD_DONE)
+        TVR_LOG(TVR_DBG, "PERF: updateSANMaps: cleanExit");
+    return status;
+}
+catch (...)
+{
+    note_missing_memory();
+    return failed({TVR_ERR, "Error updating SAN maps"});
 }
 
 } // namespace cimple

@@ -30,6 +30,9 @@ public:
     Adapter(const Adapter&) = delete;
     Adapter& operator=(const Adapter&) = delete;
     virtual ~Adapter();
+
+    static constexpr std::uint32_t fibreChannel = 1; ///< a value of adapterType
+
     virtual const std::string& getName() const = 0;
     /// Index in the HBA API.
     virtual const std::uint32_t& getAdapterNumber() const = 0;
@@ -49,7 +52,7 @@ public:
     std::string name;
     std::uint32_t adapterNumber;
     std::uint32_t functionType = 0;
-    std::uint32_t adapterType; ///< 1 for Fibre Channel
+    std::uint32_t adapterType;
 
 protected:
     Adapter(const std::string& adapterName, std::uint32_t number, std::uint32_t type);

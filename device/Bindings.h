@@ -68,6 +68,7 @@ inline constexpr Binding<entryRow("LRM_GetHBAAttributes"), RM_GetHBAAttributes_t
 inline constexpr Binding<entryRow("LRM_GetHBAFeature"), RM_GetHBAFeature_t> LRM_GetHBAFeature;
 inline constexpr Binding<entryRow("LRM_GetHBAFeatureList"), RM_GetHBAFeatureList_t> LRM_GetHBAFeatureList;
 inline constexpr Binding<entryRow("LRM_GetLunList"), RM_GetLunList_t> LRM_GetLunList;
+inline constexpr Binding<entryRow("LRM_GetOASLunList"), RM_GetOASLunList_t> LRM_GetOASLunList;
 inline constexpr Binding<entryRow("LRM_GetPortAttributes"), RM_GetPortAttributes_t> LRM_GetPortAttributes;
 inline constexpr Binding<entryRow("LRM_GetPortStatistics"), RM_GetPortStatistics_t> LRM_GetPortStatistics;
 inline constexpr Binding<entryRow("LRM_GetQoS"), RM_GetQoS_t> LRM_GetQoS;

@@ -16,6 +16,15 @@ std::string wwnText(const HBA_WWN& wwn)
     return text;
 }
 
+std::string lunText(std::uint64_t field)
+{
+    std::uint8_t bytes[sizeof field];
+    std::memcpy(bytes, &field, sizeof field);
+    char text[17];
+    wwnToUpperHex(bytes, text);
+    return text;
+}
+
 HBA_WWN wwnOf(const std::string& text)
 {
     HBA_WWN wwn{};

@@ -33,6 +33,9 @@ inline std::string foreignText(const std::uint8_t* bytes, std::size_t size)
 /// 16 upper-case hexadecimal digits.
 std::string wwnText(const HBA_WWN& wwn);
 
+/// A LUN field, eight bytes as they lie in memory: 16 upper-case hexadecimal digits.
+std::string lunText(std::uint64_t field);
+
 /// The name behind wwnText(). Logs a text of another form and throws std::exception.
 HBA_WWN wwnOf(const std::string& text);
 

@@ -552,4 +552,41 @@ RM_STATUS TVR_MethodWrapper::ListVMfromVPort(const char* deviceId, const char* v
     return status;
 }
 
+RM_STATUS TVR_MethodWrapper::GetOASLunList(const char* deviceId, const char* targetId, const char* vportId,
+                                           std::uint32_t option, std::vector<RM_OASLun>* luns)
+try
+{
+    TVR_LOG(TVR_DBG, "TVR_MethodWrapper::GetOASLunList");
+    if (!luns)
+    {
+        TVR_LOG(TVR_DBG, "Invalid input pointer");
+        return RM_ERROR;
+    }
+    HBA_WWN wwpn{};
+    HBA_WWN target{};
+    HBA_WWN vport{};
+    if (idToWwn(&wwpn, deviceId) != 0 || idToWwn(&target, targetId) != 0 || (vportId && idToWwn(&vport, vportId) != 0))
+        return RM_ERROR;
+    std::vector<RM_OASLun> list;
+    const RM_STATUS status = fetchList<RM_OASLunList>(list, "Memory allocation failed.",
+                                                      [&](RM_OASLunList* out)
+                                                      { return LRM_GetOASLunList(wwpn, vport, target, option, out); });
+    if (status != RM_OK)
+        TVR_LOG(TVR_DBG, "RM_GetOASLunList error.");
+    for (const RM_OASLun& lun : list)
+    {
+        TVR_LOG(TVR_DBG, "FCP Lun: %s", lunText(static_cast<std::uint64_t>(lun.fcpLun)).c_str());
+        TVR_LOG(TVR_DBG, "PrioLane Lun: %d", static_cast<int>(lun.osLun));
+        TVR_LOG(TVR_DBG, "PrioLane State: %d", static_cast<int>(lun.laneState));
+    }
+    if (status == RM_OK)
+        *luns = std::move(list);
+    TVR_LOG(TVR_DBG, "Exit GetOASLunList");
+    return logged(status);
+}
+catch (...)
+{
+    return thrownStatus();
+}
+
 } // namespace cimple

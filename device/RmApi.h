@@ -34,6 +34,7 @@ enum RM_StatusCode : std::int32_t
     RM_ERROR_MAILBOX_TIMEOUT = 149,
     RM_ERROR_MAILBOX_BUSY = 150,
     RM_ERROR_BUFFER_TOO_SMALL = 191, ///< RM_ERROR_MORE_DATA in the words of the driver parameter calls
+    RM_ERROR_FIRMWARE_LACKS = 251,   ///< the firmware of the adapter does not have the function
 };
 
 /// Room that the program offers for each kind of attributes, in bytes.
@@ -400,5 +401,35 @@ extern "C"
     static_assert(sizeof(RM_Lun) == 16 && offsetof(RM_LunList, entry) == 8);
 
     typedef RM_STATUS RM_GetLunList_t(HBA_WWN wwpn, HBA_WWN target, RM_LunList* list);
+
+    // Priority lanes: logical units that the adapter serves before others.
+
+    /// A logical unit of a target.
+    struct RM_OASLun
+    {
+        HBA_UINT64 fcpLun;       ///< LUN field, as HBA_FCPID carries it
+        std::uint32_t osLun;     ///< number that the operating system has for the unit
+        std::uint32_t laneState; ///< 1 for a unit that is served with priority, else 0
+    };
+
+    struct RM_OASLunList
+    {
+        std::uint32_t count;    ///< room in entries, then the number available
+        std::uint32_t reserved; ///< aligns the entries
+        RM_OASLun entry[1];     ///< as many as there is room for
+    };
+    static_assert(sizeof(RM_OASLun) == 16 && offsetof(RM_OASLun, osLun) == 8 && offsetof(RM_OASLun, laneState) == 12);
+    static_assert(sizeof(RM_OASLunList) == 24 && offsetof(RM_OASLunList, entry) == 8);
+
+    /// Whose setting is asked for.
+    enum RM_LaneOption : std::uint32_t
+    {
+        RM_LANE_DRIVER = 0, ///< that of the running driver
+        RM_LANE_CONFIG = 1, ///< that of the stored configuration
+    };
+
+    /// The lanes from a port to a target. `vport` is a virtual port of the port, or zero for the port itself.
+    typedef RM_STATUS RM_GetOASLunList_t(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, std::uint32_t option,
+                                         RM_OASLunList* list);
 
 } // extern "C"

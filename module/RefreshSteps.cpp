@@ -8,6 +8,7 @@
 #include "model/PortVirtualization.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
+#include "model/SanModel.h"
 #include "model/Services.h"
 #include "model/SoftwareIdentities.h"
 #include "model/VitalProductData.h"
@@ -89,6 +90,11 @@ constexpr HostStep closingSteps[] = {
     mark({TVR_DBG, "Create the Diagnostic classes"}),
 };
 
+constexpr HostStep sanSteps[] = {
+    {createLogicalUnits, Stop, {}},
+    {scanPriorityLanes, Stop, {}},
+};
+
 } // namespace
 
 const RefreshSteps refreshSteps = {
@@ -98,6 +104,7 @@ const RefreshSteps refreshSteps = {
     .adapter = adapterSteps,
     .port = portSteps,
     .closing = closingSteps,
+    .san = sanSteps,
 };
 
 } // namespace cimple

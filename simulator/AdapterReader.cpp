@@ -34,16 +34,21 @@ void readFc4Types(JsonNode& node, const char* key, std::array<std::uint8_t, 32>&
     std::ranges::copy(node.at(key).asBytes(out.size()), out.begin());
 }
 
+std::size_t readTargetName(const JsonNode& node, const std::vector<Target>& targets)
+{
+    const auto place = std::ranges::find(targets, node.asText(255), &Target::name);
+    if (place == targets.end())
+        node.fail("the name of a target");
+    return static_cast<std::size_t>(place - targets.begin());
+}
+
 std::vector<std::size_t> readTargetNames(JsonNode& node, const std::vector<Target>& targets)
 {
     std::vector<std::size_t> indexes;
     node.forEach("targets",
                  [&](const JsonNode& item)
                  {
-                     const auto place = std::ranges::find(targets, item.asText(255), &Target::name);
-                     if (place == targets.end())
-                         item.fail("the name of a target");
-                     const auto index = static_cast<std::size_t>(place - targets.begin());
+                     const std::size_t index = readTargetName(item, targets);
                      if (std::ranges::find(indexes, index) != indexes.end())
                          item.fail("each target once");
                      indexes.push_back(index);
@@ -79,6 +84,16 @@ VirtualPort readVirtualPort(JsonNode& node, const std::vector<Target>& targets)
 
 constexpr NamedNumber beaconStates[] = {
     {"notAvailable", RM_BEACON_NOT_AVAILABLE}, {"off", RM_BEACON_OFF}, {"on", RM_BEACON_ON}};
+
+PriorityLane readPriorityLane(JsonNode& node, const std::vector<Target>& targets)
+{
+    PriorityLane lane;
+    lane.target = readTargetName(node.at("target"), targets);
+    lane.lun = static_cast<std::uint32_t>(node.at("lun").asNumber(maximumUnits - 1));
+    node.read("state", lane.state);
+    node.finish();
+    return lane;
+}
 
 RM_QosInfo readQos(JsonNode node)
 {
@@ -132,6 +147,10 @@ Port readPort(JsonNode& node, const std::vector<Target>& targets)
         port.qos = readQos(node.at("qos"));
     port.targets = readTargetNames(node, targets);
     node.forEach("virtualPorts", [&](JsonNode& item) { port.virtualPorts.push_back(readVirtualPort(item, targets)); });
+    if (node.has("priorityLanes"))
+        port.priorityLanes.emplace();
+    node.forEach("priorityLanes",
+                 [&](JsonNode& item) { port.priorityLanes->push_back(readPriorityLane(item, targets)); });
     node.finish();
     return port;
 }

@@ -50,6 +50,7 @@ constexpr Row rows[] = {
     {"GetHBAFeature", dual, numberOut},
     {"GetHBAFeatureList", dual, listOut},
     {"GetLunList", dual, listOut},
+    {"GetOASLunList", dual, listOut},
     {"GetPortAttributes", dual, attributesOut},
     {"GetPortStatistics", dual, attributesOut},
     {"GetQoS", dual, recordOut},

@@ -31,6 +31,7 @@ constexpr StatusRow statusTexts[] = {
     {RM_ERROR_MAILBOX_FAILED, "The mailbox command failed"},
     {RM_ERROR_MAILBOX_TIMEOUT, "The mailbox command timed out"},
     {RM_ERROR_MAILBOX_BUSY, "The mailbox is busy"},
+    {RM_ERROR_FIRMWARE_LACKS, "The firmware does not have the function"},
 };
 
 /// What attributes follow from the members of the scenario, and over them those that it lists.
@@ -287,6 +288,23 @@ RM_STATUS SimulatedHost::luns(Wwn wwpn, Wwn target, std::vector<RM_Lun>& out) co
                           return RM_ERROR_INVALID_WWN;
                       for (const LogicalUnit& unit : _scenario.targets[*place].units)
                           out.push_back({encodeLun(unit.number), unit.number, unit.blocks ? unit.blockLength : 0});
+                      return RM_OK;
+                  });
+}
+
+RM_STATUS SimulatedHost::priorityLanes(Wwn wwpn, Wwn vport, Wwn target, std::vector<RM_OASLun>& out) const
+{
+    return onPort(wwpn,
+                  [&](const Port& port) -> RM_STATUS
+                  {
+                      if (!port.priorityLanes)
+                          return RM_ERROR_NOT_SUPPORTED;
+                      const std::optional<std::size_t> place = reach(port.state, port.targets, target);
+                      if (!place)
+                          return RM_ERROR_INVALID_WWN;
+                      for (const PriorityLane& lane : *port.priorityLanes)
+                          if (lane.target == *place && vport == 0)
+                              out.push_back({encodeLun(lane.lun), lane.lun, lane.state});
                       return RM_OK;
                   });
 }

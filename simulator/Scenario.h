@@ -66,6 +66,14 @@ struct Target
     std::vector<LogicalUnit> units; ///< in ascending order of number
 };
 
+/// A unit that a port may serve with priority.
+struct PriorityLane
+{
+    std::size_t target = 0; ///< index in Scenario::targets
+    std::uint32_t lun = 0;
+    std::uint32_t state = 1; ///< 0 or 1
+};
+
 struct VirtualPort
 {
     Wwn wwpn = 0, wwnn = 0, fabricName = 0;
@@ -99,6 +107,7 @@ struct Port
     std::optional<RM_QosInfo> qos;
     std::vector<std::size_t> targets; ///< indexes in Scenario::targets; the position is the SCSI target number
     std::vector<VirtualPort> virtualPorts;
+    std::optional<std::vector<PriorityLane>> priorityLanes; ///< none: the hardware does not have them
 };
 
 /// One adapter of the HBA API: a card, or one function of a card.

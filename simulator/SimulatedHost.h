@@ -58,6 +58,8 @@ public:
     RM_STATUS portStatistics(Wwn wwpn, AttributeList& out) const;
     RM_STATUS serverAttributes(Wwn wwpn, AttributeList& out) const;
     RM_STATUS luns(Wwn wwpn, Wwn target, std::vector<RM_Lun>& out) const;
+    /// A virtual port has no lanes of its own.
+    RM_STATUS priorityLanes(Wwn wwpn, Wwn vport, Wwn target, std::vector<RM_OASLun>& out) const;
     RM_STATUS scsi(Wwn wwpn, Wwn target, HBA_UINT64 lun, const ScsiCommand& command, ScsiReply& out);
     RM_STATUS vports(Wwn wwpn, std::vector<RM_VPortEntry>& out) const;
     RM_STATUS vportAttributes(Wwn wwpn, Wwn vport, RM_VPortAttributes& out) const;

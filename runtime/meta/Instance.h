@@ -29,6 +29,11 @@ template <class T> struct Property
         value = x;
         null = 0;
     }
+    void set(T&& x)
+    {
+        value = std::move(x);
+        null = 0;
+    }
     void set_null() { null = 1; }
     bool is_null() const { return null != 0; }
 };

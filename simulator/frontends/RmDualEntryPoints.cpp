@@ -33,6 +33,7 @@ extern "C"
     TVRSIM_EXPORT RM_DiagReadPCIRegistersV2_t DUAL(DiagReadPCIRegistersV2);
     TVRSIM_EXPORT RM_GetVPD_t DUAL(GetVPD);
     TVRSIM_EXPORT RM_GetLunList_t DUAL(GetLunList);
+    TVRSIM_EXPORT RM_GetOASLunList_t DUAL(GetOASLunList);
     TVRSIM_EXPORT RM_ScsiInquiry_t DUAL(ScsiInquiry);
     TVRSIM_EXPORT RM_VPList_t DUAL(VPList);
     TVRSIM_EXPORT RM_VPGetAttributes_t DUAL(VPGetAttributes);
@@ -165,6 +166,15 @@ extern "C"
         Call call = callOf(__func__, port(wwpn));
         return call.list(list, &RM_LunList::count,
                          [&](auto& entries) { return call.host().luns(fromHba(wwpn), fromHba(target), entries); });
+    }
+
+    RM_STATUS DUAL(GetOASLunList)(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, std::uint32_t, RM_OASLunList* list)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.list(list, &RM_OASLunList::count,
+                         [&](auto& entries) {
+                             return call.host().priorityLanes(fromHba(wwpn), fromHba(vport), fromHba(target), entries);
+                         });
     }
 
     RM_STATUS DUAL(ScsiInquiry)(HBA_WWN wwpn, HBA_WWN target, HBA_UINT64 lun, std::uint8_t evpd, std::uint32_t page,

@@ -188,6 +188,13 @@ RM_STATUS LRM_GetLunList(HBA_WWN, HBA_WWN, RM_LunList* list)
     return writeList("LRM_GetLunList", list, host->luns);
 }
 
+RM_STATUS LRM_GetOASLunList(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, std::uint32_t option, RM_OASLunList* list)
+{
+    if (host->laneList)
+        return host->laneList(wwpn, vport, target, option, list);
+    return writeList("LRM_GetOASLunList", list, host->lanes);
+}
+
 RM_STATUS LRM_VPGetAttributes(HBA_WWN, HBA_WWN vport, RM_VPortAttributes* attributes)
 {
     attributes->wwpn = vport;
@@ -370,6 +377,7 @@ const std::map<std::string, void*>& symbols()
         {"LRM_VPListTargets", address(LRM_VPListTargets)},
         {"LRM_VPGetAttributes", address(LRM_VPGetAttributes)},
         {"LRM_GetLunList", address(LRM_GetLunList)},
+        {"LRM_GetOASLunList", address(LRM_GetOASLunList)},
         {"LRM_GetVMFromVPort", address(LRM_GetVMFromVPort)},
         {"LRM_GetQoS", address(LRM_GetQoS)},
         {"LRM_GetVPD", address(LRM_GetVPD)},

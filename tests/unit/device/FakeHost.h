@@ -53,6 +53,10 @@ public:
     std::vector<RM_VPortEntry> vports;
     std::vector<RM_VPortTarget> vportTargets;
     std::vector<RM_Lun> luns;
+    std::vector<RM_OASLun> lanes;
+    /// Replaces LRM_GetOASLunList.
+    std::function<RM_STATUS(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, std::uint32_t option, RM_OASLunList*)>
+        laneList;
     std::string reportLuns;
     RM_VpdArea vpd{};
     std::string version = "7.1";

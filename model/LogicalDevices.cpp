@@ -1,0 +1,353 @@
+#include "model/LogicalDevices.h"
+
+#include "schema/TVRHBA_LogicalDisk.h"
+#include "schema/TVRHBA_LogicalDiskSystemDevice.h"
+#include "schema/TVRHBA_SCSIArbitraryLogicalUnit.h"
+#include "schema/TVRHBA_SCSIArbitraryLogicalUnitSystemDevice.h"
+#include "schema/TVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath.h"
+#include "schema/TVRHBA_SCSIInitiatorTargetLogicalDiskPath.h"
+#include "schema/TVRHBA_SCSIInitiatorTargetStorageExtentPath.h"
+#include "schema/TVRHBA_SCSIInitiatorTargetStorageVolumePath.h"
+#include "schema/TVRHBA_SCSIInitiatorTargetTapeDrivePath.h"
+#include "schema/TVRHBA_StorageExtent.h"
+#include "schema/TVRHBA_StorageExtentSystemDevice.h"
+#include "schema/TVRHBA_StorageVolume.h"
+#include "schema/TVRHBA_StorageVolumeSystemDevice.h"
+#include "schema/TVRHBA_TapeDrive.h"
+#include "schema/TVRHBA_TapeDriveSystemDevice.h"
+
+#include <algorithm>
+#include <span>
+
+namespace cimple
+{
+
+namespace
+{
+
+// --- names ------------------------------------------------------------------------------------------------
+
+/// A value for some types and the text that stands for it; texts may take a number.
+struct NameRow
+{
+    std::uint32_t deviceType;
+    const char* text;
+};
+
+constexpr const char* unknownDevice = "Unknown device %d";
+
+constexpr NameRow arbitraryUnitNames[] = {
+    {12, "Storage array controller %d"},
+    {13, "Enclosure services %d"},
+    {16, "Bridge controller %d"},
+};
+
+constexpr NameRow extentNames[] = {
+    {2, "Printer %d"},
+    {3, "Processor %d"},
+    {4, "Write-once device %d"},
+    {5, "CD/DVD %d"},
+    {6, "Scanner %d"},
+    {7, "Optical memory device %d"},
+    {8, "Jukebox %d"},
+    {9, "Communications device %d"},
+    {15, "Optical card reader/writer %d"},
+    {17, "Object-based storage device %d"},
+};
+
+int osLun(const LogicalUnit& unit)
+{
+    return static_cast<int>(unit.target.scsiOSLun);
+}
+
+String nameByType(std::span<const NameRow> names, const LogicalUnit& unit)
+{
+    const auto row = std::ranges::find(names, unit.target.deviceType, &NameRow::deviceType);
+    return formatText(row == names.end() ? unknownDevice : row->text, osLun(unit));
+}
+
+/// Types of a designator (SPC-4, 7.8.6.1), and formats of the name that one of type 3 has, in its first four bits.
+constexpr std::uint32_t typeNaa = 3;
+constexpr unsigned naaIeeeExtended = 1, naaLocal = 2, naaIeee = 5, naaIeeeRegisteredExtended = 6;
+
+String hexadecimalFrom(const Descriptor& designator, std::size_t first)
+{
+    // The designator's two numbers are the head of the record, its bytes what follows.
+    const auto* record = reinterpret_cast<const std::uint8_t*>(&designator);
+    String text;
+    bytesRangeToHex({record, sizeof designator}, first, designator.designatorLength, text);
+    return text;
+}
+
+/// The identifier as the name of the unit. That of an NAA name leaves out its head.
+String refinedName(const LogicalUnit& unit)
+{
+    const Descriptor& designator = unit.target.designator;
+    if (designator.designatorType != typeNaa)
+        return unit.identifier;
+    switch (designator.value[0] >> 4)
+    {
+    case naaIeeeExtended:
+    case naaLocal:
+    case naaIeee:
+        return hexadecimalFrom(designator, 2);
+    case naaIeeeRegisteredExtended:
+        return hexadecimalFrom(designator, 1);
+    default:
+        return unit.identifier;
+    }
+}
+
+/// What a volume says of its name, by the type of its designator. Null texts are left unset.
+struct NameFormatRow
+{
+    std::uint16_t format;
+    std::uint16_t nameSpace;
+    const char* otherFormat;
+    const char* otherNameSpace;
+};
+
+constexpr NameFormatRow nameFormats[] = {
+    {6, 1, nullptr, "Vendor specific"},
+    {5, 4, nullptr, nullptr},
+    {10, 3, nullptr, nullptr},
+    {9, 2, nullptr, nullptr},
+    {1, 1, "Relative target port identifier", "Relative target port idientifier"},
+    {1, 1, "Target port group", "Target port group"},
+    {1, 1, "Logical port group", "Logical unit group"},
+    {1, 1, "MD5 logical unit identifier", "MD5 logical unit identifier"},
+    {1, 1, "SCSI name std::string", "SCSI name std::string"},
+};
+
+void setNameFormat(TVRHBA_StorageVolume& volume, const LogicalUnit& unit)
+{
+    const std::uint32_t type = unit.target.designator.designatorType;
+    if (type >= std::size(nameFormats))
+        return;
+    const NameFormatRow& row = nameFormats[type];
+    volume.NameFormat.set(row.format);
+    volume.NameNamespace.set(row.nameSpace);
+    if (row.otherFormat)
+        volume.OtherNameFormat.set(row.otherFormat);
+    if (row.otherNameSpace)
+        volume.OtherNameNamespace.set(row.otherNameSpace);
+}
+
+// --- properties -------------------------------------------------------------------------------------------
+
+/// What all devices have.
+template <class Device> Ref<Device> makeDevice(const LogicalUnit& unit)
+{
+    Ref<Device> device = fresh<Device>();
+    device->Description.set(unit.description);
+    device->SystemCreationClassName = unit.system->CreationClassName;
+    device->SystemName = unit.system->Name;
+    device->CreationClassName.set(className<Device>());
+    device->DeviceID.set(unit.deviceId);
+    device->OperationalStatus.set({0});
+    return device;
+}
+
+void setIdentifyingInfo(CIM_LogicalDevice& device, const LogicalUnit& unit, const String& inquiry,
+                        const char* firstDescription, const char* secondDescription)
+{
+    device.OtherIdentifyingInfo.set({unit.osDeviceName, inquiry});
+    device.IdentifyingDescriptions.set({firstDescription, secondDescription});
+}
+
+/// Read Capacity tells the last block; without an answer there is no block size.
+std::uint64_t numberOfBlocks(const Target& target)
+{
+    return target.blockLength ? target.lastLba + 1 : 0;
+}
+
+template <class Device> void setCapacity(Device& device, const LogicalUnit& unit)
+{
+    const std::uint64_t blocks = numberOfBlocks(unit.target);
+    if (blocks == 0)
+        return;
+    device.Capacity.set(unit.target.blockLength * blocks);
+    device.CapacityUnit.set("Byte");
+}
+
+template <class Device> void setBlocks(Device& device, const LogicalUnit& unit)
+{
+    const std::uint64_t blocks = numberOfBlocks(unit.target);
+    if (blocks == 0)
+        return;
+    device.BlockSize.set(unit.target.blockLength);
+    device.NumberOfBlocks.set(blocks);
+}
+
+std::uint16_t deviceType(const LogicalUnit& unit)
+{
+    return static_cast<std::uint16_t>(unit.target.deviceType);
+}
+
+// --- insertion --------------------------------------------------------------------------------------------
+
+/// What the log says of the devices of a class.
+struct DeviceTexts
+{
+    LogText deviceRefused;
+    const char* generating; ///< of the association with the system, with the DeviceID
+    LogText systemDeviceRefused;
+    LogText creating; ///< of the path
+    LogText pathRefused;
+};
+
+/// Puts the device in its map, and what it is associated with.
+template <class SystemDevice, class Path, class Device>
+std::uint32_t insertDevice(const LogicalUnit& unit, const Ref<Device>& made, const DeviceTexts& texts)
+{
+    const Device* device = mapOf<Device>(unit.agent).insert(made, texts.deviceRefused);
+    if (!device)
+        return BUILD_FAILED;
+    const Ref<Device> end(clone_of(device)); // one for both associations
+    TVR_LOG(TVR_DBG, texts.generating, unit.deviceId.c_str());
+    if (insertFilled(mapOf<SystemDevice>(unit.agent), texts.systemDeviceRefused,
+                     [&](SystemDevice& association)
+                     {
+                         association.GroupComponent = Ref(unit.system).release();
+                         association.PartComponent = Ref(end).release();
+                     }) == Joined::Refused)
+        return BUILD_FAILED;
+    texts.creating.log();
+    const Joined path = insertFilled(mapOf<Path>(unit.agent), texts.pathRefused,
+                                     [&](Path& association)
+                                     {
+                                         association.Initiator = Ref(unit.initiator).release();
+                                         association.Target = Ref(unit.endpoint).release();
+                                         association.LogicalUnit = Ref(end).release();
+                                     });
+    return path == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
+}
+
+// --- one function a class -----------------------------------------------------------------------------------
+
+std::uint32_t createStorageVolume(const LogicalUnit& unit)
+{
+    Ref<TVRHBA_StorageVolume> volume = makeDevice<TVRHBA_StorageVolume>(unit);
+    volume->ElementName.set(formatText("Storage Volume: %d", osLun(unit)));
+    volume->Name.set(refinedName(unit));
+    setNameFormat(*volume, unit);
+    setBlocks(*volume, unit);
+    setCapacity(*volume, unit);
+    volume->DeviceType.set(deviceType(unit));
+    setIdentifyingInfo(*volume, unit, unit.inquiry, "OS Device Name", "Standard SCSI inquiry data");
+    return insertDevice<TVRHBA_StorageVolumeSystemDevice, TVRHBA_SCSIInitiatorTargetStorageVolumePath>(
+        unit, volume,
+        {
+            "Insert Failed : m_TVRHBA_StorageVolume_map",
+            "Generating TVRHBA_StorageVolumeSystemDevice (Storage Volume: %s)",
+            "Insert Failed : m_TVRHBA_StorageVolumeSystemDevice_map",
+            {TVR_DBG, "creating TVRHBA_SCSIInitiatorTargetStorageVolumePath - Storage Volume"},
+            "Insert Failed : m_TVRHBA_SCSIInitiatorTargetStorageVolumePath_map",
+        });
+}
+
+std::uint32_t createTapeDrive(const LogicalUnit& unit)
+{
+    const Target& target = unit.target;
+    Ref<TVRHBA_TapeDrive> tape = makeDevice<TVRHBA_TapeDrive>(unit);
+    tape->ElementName.set(formatText("Tape Drive %d", osLun(unit)));
+    tape->Name.set(unit.osDeviceName);
+    setCapacity(*tape, unit);
+    tape->DeviceType.set(deviceType(unit));
+    setIdentifyingInfo(*tape, unit,
+                       formatText("%s %s %s", target.vendor.c_str(), target.product.c_str(), target.revision.c_str()),
+                       "OS Device Name", "standard SCSI Inquery data");
+    return insertDevice<TVRHBA_TapeDriveSystemDevice, TVRHBA_SCSIInitiatorTargetTapeDrivePath>(
+        unit, tape,
+        {
+            "Insert Failed : m_TVRHBA_TapeDrive_map",
+            "Generating TVRHBA_TapeDriveSystemDevice (Tape Drive: %s)",
+            "Insert Failed : m_TVRHBA_TapeDriveSystemDevice_map",
+            {TVR_DBG, "creating TVRHBA_SCSIInitiatorTargetTapeDrivePath - Tape Drive"},
+            "Insert Failed : m_TVRHBA_SCSIInitiatorTargetTapeDrivePath_map",
+        });
+}
+
+std::uint32_t createLogicalDisk(const LogicalUnit& unit)
+{
+    constexpr std::uint16_t runningFullPower = 3; // it has just answered an Inquiry
+    Ref<TVRHBA_LogicalDisk> disk = makeDevice<TVRHBA_LogicalDisk>(unit);
+    disk->ElementName.set(formatText("Object-based storage device: %d", osLun(unit)));
+    disk->Name.set(refinedName(unit));
+    setBlocks(*disk, unit);
+    setCapacity(*disk, unit);
+    disk->AdditionalAvailability.set({runningFullPower});
+    setIdentifyingInfo(*disk, unit, unit.inquiry, "OS Device Name", "Standard SCSI inquiry data");
+    return insertDevice<TVRHBA_LogicalDiskSystemDevice, TVRHBA_SCSIInitiatorTargetLogicalDiskPath>(
+        unit, disk,
+        {
+            "Insert Failed : m_TVRHBA_LogicalDisk_map",
+            "Generating TVRHBA_LogicalDiskSystemDevice (Logical Disk: %s)",
+            "Insert Failed : m_TVRHBA_LogicalDiskSystemDevice_map",
+            {TVR_DBG, "creating TVRHBA_SCSIInitiatorTargetLogicalDiskPath - Logical Disk"},
+            "Insert Failed : m_TVRHBA_SCSIInitiatorTargetLogicalDiskPath_map",
+        });
+}
+
+std::uint32_t createArbitraryLogicalUnit(const LogicalUnit& unit)
+{
+    Ref<TVRHBA_SCSIArbitraryLogicalUnit> device = makeDevice<TVRHBA_SCSIArbitraryLogicalUnit>(unit);
+    device->ElementName.set(nameByType(arbitraryUnitNames, unit));
+    device->Name.set(refinedName(unit));
+    device->OtherDeviceType.set(formatText("Peripheral devices type is 0x%02X", unit.target.deviceType));
+    setIdentifyingInfo(*device, unit, unit.inquiry, "OS Device Name", "Standard SCSI inquiry data");
+    return insertDevice<TVRHBA_SCSIArbitraryLogicalUnitSystemDevice,
+                        TVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath>(
+        unit, device,
+        {
+            "Insert Failed : m_TVRHBA_SCSIArbitraryLogicalUnit_map",
+            "Generating TVRHBA_SCSIArbitraryLogicalUnitSystemDevice (SCSI Arbitrary Logical Unit: %s)",
+            "Insert Failed : m_TVRHBA_SCSIArbitraryLogicalUnitSystemDevice_map",
+            {TVR_DBG, "creating TVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath - SCSI Arbitrary Logical Unit"},
+            "Insert Failed : m_TVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath_map",
+        });
+}
+
+std::uint32_t createStorageExtent(const LogicalUnit& unit)
+{
+    Ref<TVRHBA_StorageExtent> extent = makeDevice<TVRHBA_StorageExtent>(unit);
+    extent->ElementName.set(nameByType(extentNames, unit));
+    extent->Name.set(refinedName(unit));
+    setBlocks(*extent, unit);
+    setCapacity(*extent, unit);
+    extent->DeviceType.set(deviceType(unit));
+    // Clients know the two descriptions in this order, which is not that of the values.
+    setIdentifyingInfo(*extent, unit, unit.inquiry, "Standard SCSI inquiry data", "OS Device Name");
+    return insertDevice<TVRHBA_StorageExtentSystemDevice, TVRHBA_SCSIInitiatorTargetStorageExtentPath>(
+        unit, extent,
+        {
+            "Insert Failed : m_TVRHBA_StorageExtent_map",
+            "Generating TVRHBA_StorageExtentSystemDevice (Storage Extent: %s)",
+            "Insert Failed : m_TVRHBA_StorageExtentSystemDevice_map",
+            {TVR_DBG, "creating TVRHBA_SCSIInitiatorTargetStorageExtentPath - Storage Extent"},
+            "Insert Failed : m_TVRHBA_SCSIInitiatorTargetStorageExtentPath_map",
+        });
+}
+
+/// The devices that are not extents, by peripheral device type.
+struct DeviceRow
+{
+    std::uint32_t type;
+    std::uint32_t (*create)(const LogicalUnit& unit);
+};
+
+constexpr DeviceRow devices[] = {
+    {0, createStorageVolume},         {14, createStorageVolume},        {1, createTapeDrive},
+    {12, createArbitraryLogicalUnit}, {13, createArbitraryLogicalUnit}, {16, createArbitraryLogicalUnit},
+    {17, createLogicalDisk},
+};
+
+} // namespace
+
+std::uint32_t createLogicalDevice(const LogicalUnit& unit)
+{
+    const auto row = std::ranges::find(devices, unit.target.deviceType, &DeviceRow::type);
+    return row == std::end(devices) ? createStorageExtent(unit) : row->create(unit);
+}
+
+} // namespace cimple
