@@ -3,6 +3,7 @@
 #include "runtime/meta/InstanceSlots.h"
 
 #include <algorithm>
+#include <bit>
 #include <cstring>
 #include <utility>
 
@@ -87,6 +88,9 @@ std::optional<std::uint32_t> reduce(const Instance* instance, const Meta_Class* 
     return static_cast<std::uint32_t>(hash ^ (hash >> 32));
 }
 
+/// From so many entries on a map has a table: up to there a pass over the fingerprints is as fast.
+constexpr std::size_t tableFrom = 64;
+
 /// Index of the first element from `from` on that equals `print`, or `size`.
 std::size_t scan(const std::uint32_t* prints, std::size_t from, std::size_t size, std::uint32_t print)
 {
@@ -129,6 +133,13 @@ std::ptrdiff_t Instance_Map::findLocked(const Instance* keys, std::optional<Fing
                 return static_cast<std::ptrdiff_t>(i);
         return -1;
     }
+    if (!_table.empty())
+    {
+        for (std::size_t place = *print & (_table.size() - 1); _table[place]; place = (place + 1) & (_table.size() - 1))
+            if (const std::size_t i = _table[place] - 1; _prints[i] == *print && key_eq(keys, _entries[i]))
+                return static_cast<std::ptrdiff_t>(i);
+        return -1;
+    }
     for (std::size_t i = scan(_prints.data(), 0, size, *print); i < size; i = scan(_prints.data(), i + 1, size, *print))
         if (key_eq(keys, _entries[i]))
             return static_cast<std::ptrdiff_t>(i);
@@ -145,6 +156,7 @@ std::ptrdiff_t Instance_Map::insert(Instance* instance)
         _printed = true;
         _keyClass = instance->__meta_class;
         _roles.clear();
+        _table.clear();
     }
     const std::optional<Fingerprint> print = fingerprintLocked(instance);
     if (findLocked(instance, print) != -1)
@@ -154,11 +166,16 @@ std::ptrdiff_t Instance_Map::insert(Instance* instance)
     reserveOneMore(); // all that may throw: until here the instance is the caller's
     _entries.append(instance);
     if (print)
+    {
         _prints.push_back(*print);
+        if (!_table.empty())
+            enterLocked(index);
+    }
     else
     {
         _printed = false; // an entry of another class: compare all from here on
         _prints.clear();
+        _table.clear();
     }
     return static_cast<std::ptrdiff_t>(index);
 }
@@ -170,6 +187,50 @@ void Instance_Map::reserveOneMore()
         _entries.reserve(std::max(first, 2 * _entries.size()));
     if (_printed && _prints.size() == _prints.capacity())
         _prints.reserve(std::max(first, 2 * _prints.size()));
+    if (_printed && _entries.size() >= tableFrom)
+        reserveTable();
+}
+
+// --- the table: linear probing, half empty at least ------------------------------------------------------
+
+void Instance_Map::reserveTable()
+{
+    if (2 * (_entries.size() + 1) <= _table.size())
+        return;
+    std::vector<std::uint32_t> larger(std::bit_ceil(4 * _entries.size()), 0);
+    _table.swap(larger);
+    for (std::size_t i = 0; i < _prints.size(); i++)
+        enterLocked(i);
+}
+
+void Instance_Map::enterLocked(std::size_t index)
+{
+    const std::size_t mask = _table.size() - 1;
+    std::size_t place = _prints[index] & mask;
+    while (_table[place])
+        place = (place + 1) & mask;
+    _table[place] = static_cast<std::uint32_t>(index + 1);
+}
+
+/// Takes the entry out, and those behind it move up by one. `_prints` still has it.
+void Instance_Map::leaveLocked(std::size_t index)
+{
+    const std::size_t mask = _table.size() - 1;
+    std::size_t hole = _prints[index] & mask;
+    while (_table[hole] != index + 1)
+        hole = (hole + 1) & mask;
+    for (std::size_t place = (hole + 1) & mask; _table[place]; place = (place + 1) & mask)
+    {
+        const std::size_t home = _prints[_table[place] - 1] & mask;
+        if (((place - home) & mask) < ((place - hole) & mask))
+            continue; // its search does not come through the hole
+        _table[hole] = _table[place];
+        hole = place;
+    }
+    _table[hole] = 0;
+    if (index + 1 < _prints.size())
+        for (std::uint32_t& entry : _table)
+            entry -= entry > index + 1 ? 1u : 0u;
 }
 
 std::ptrdiff_t Instance_Map::find(const Instance* keys) const
@@ -246,6 +307,8 @@ Instance* Instance_Map::takeLocked(std::size_t index)
 {
     Instance* instance = _entries[index];
     _entries.remove(index);
+    if (!_table.empty())
+        leaveLocked(index);
     if (_printed)
         _prints.erase(_prints.begin() + static_cast<std::ptrdiff_t>(index));
     for (Role& role : _roles)
@@ -393,6 +456,7 @@ void Instance_Map::takeAll(Array<Instance*>& entries)
     Auto_Mutex lock(_lock);
     entries.swap(_entries);
     _prints.clear();
+    _table.clear();
     _roles.clear();
 }
 

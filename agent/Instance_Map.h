@@ -14,9 +14,9 @@ namespace cimple
 
 /// Owns its instances. Look-up is linear by key_eq; return values, indexes and order are those of a plain vector.
 ///
-/// While all entries and the searched keys are of one class, a pass over 32-bit fingerprints of the keys stands
-/// before key_eq, so that an insert into a large map touches four bytes an entry. A fingerprint only filters:
-/// equal keys have equal fingerprints, and what passes is still compared.
+/// While all entries and the searched keys are of one class, 32-bit fingerprints of the keys stand before key_eq: a
+/// pass over them in a small map, a hash table of them in a large one. A fingerprint only filters: equal keys have
+/// equal fingerprints, and what passes is still compared.
 ///
 /// The same of the ends of associations, from when somebody first asks for those of one instance.
 ///
@@ -92,6 +92,9 @@ private:
     std::optional<Fingerprint> fingerprintLocked(const Instance* keys) const;
     Instance* takeLocked(std::size_t index);
     void reserveOneMore();
+    void reserveTable();
+    void enterLocked(std::size_t index);
+    void leaveLocked(std::size_t index);
     void takeAll(Array<Instance*>& entries);
     bool reduceEndsLocked(Role& role) const;
     /// One for each role that may refer to `end`; nothing when fingerprints do not tell.
@@ -101,6 +104,7 @@ private:
     mutable Mutex _lock;
     Array<Instance*> _entries;
     std::vector<Fingerprint> _prints;      ///< parallel to _entries while _printed
+    std::vector<std::uint32_t> _table;     ///< of a large map: index + 1 by fingerprint, 0 is a free place
     const Meta_Class* _keyClass = nullptr; ///< class of all entries while _printed
     bool _printed = true;
     mutable std::vector<Role> _roles; ///< while _printed; empty before somebody asks for ends

@@ -173,6 +173,97 @@ TEST_F(VirtualPortTest, TargetMappingOfAPhysicalPort)
     EXPECT_THAT(out, SizeIs(2));
 }
 
+// --- priority lanes
+
+TEST_F(VirtualPortTest, PriorityLanesAreAskedForByAllNames)
+{
+    std::string asked;
+    host.laneList = [&](HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, std::uint32_t option, RM_OASLunList* list)
+    {
+        asked = W::hbaNameToString(wwpn) + " " + W::hbaNameToString(vport) + " " + W::hbaNameToString(target) + " " +
+                std::to_string(option) + " " + std::to_string(list->count);
+        list->count = 0;
+        return RM_OK;
+    };
+    std::vector<RM_OASLun> out(3);
+    EXPECT_EQ(W::GetOASLunList(portId, targetId, nullptr, RM_LANE_DRIVER, &out), 0);
+    EXPECT_EQ(asked, "10:00:11:22:33:12:34:56 00:00:00:00:00:00:00:00 50:00:00:00:00:00:00:01 0 64");
+    EXPECT_THAT(out, IsEmpty());
+    EXPECT_EQ(W::GetOASLunList(portId, targetId, vportId, RM_LANE_CONFIG, &out), 0);
+    EXPECT_EQ(asked, "10:00:11:22:33:12:34:56 10:00:11:22:33:00:00:01 50:00:00:00:00:00:00:01 1 64");
+}
+
+TEST_F(VirtualPortTest, PriorityLanesAreListedWithTheirFieldsAsBytesLie)
+{
+    HBA_UINT64 field;
+    const unsigned char bytes[] = {0x40, 0x0A, 0, 0, 0, 0, 0, 0xFF};
+    std::memcpy(&field, bytes, sizeof field);
+    host.lanes = {{field, 10, 1}, {0, 11, 0}};
+    std::vector<RM_OASLun> out;
+    EXPECT_EQ(W::GetOASLunList(portId, targetId, nullptr, RM_LANE_DRIVER, &out), 0);
+    ASSERT_THAT(out, SizeIs(2));
+    EXPECT_EQ(out[0].osLun, 10u);
+    EXPECT_EQ(out[0].laneState, 1u);
+    std::erase_if(log.lines, [](const std::string& line)
+                  { return line.find("Lane") == line.npos && line.find("Lun") == line.npos; });
+    EXPECT_THAT(log.lines, ElementsAre("5 TVR_MethodWrapper::GetOASLunList", "5 FCP Lun: 400A0000000000FF",
+                                       "5 PrioLane Lun: 10", "5 PrioLane State: 1", "5 FCP Lun: 0000000000000000",
+                                       "5 PrioLane Lun: 11", "5 PrioLane State: 0", "5 Exit GetOASLunList"));
+}
+
+/// A library that says more than it may: the count of each call, and what it returns.
+struct LaneRow
+{
+    std::uint32_t count;
+    RM_STATUS status;
+    std::size_t entries; ///< that come out
+    std::uint32_t rooms; ///< of all calls, added up
+    RM_STATUS result;
+};
+
+TEST_F(VirtualPortTest, CountsOfPriorityLanesAreBounded)
+{
+    constexpr LaneRow rows[] = {
+        {64, RM_OK, 64, 64, RM_OK},
+        {65, RM_OK, 64, 64, RM_OK}, // a success with more than there was room for
+        {0xFFFFFFFF, RM_OK, 64, 64, RM_OK},
+        {100, RM_ERROR_MORE_DATA, 0, 64 + 100 + 100, RM_ERROR_MORE_DATA},
+        {0, RM_ERROR_MORE_DATA, 0, 64, RM_ERROR_MORE_DATA},
+        {0xFFFFFFFF, RM_ERROR_MORE_DATA, 0, 64 + 2 * 65536, RM_ERROR_MORE_DATA},
+        {0xFFFFFFFF, RM_ERROR_NOT_SUPPORTED, 0, 64, RM_ERROR_NOT_SUPPORTED},
+        {1, RM_ERROR_FIRMWARE_LACKS, 0, 64, 251},
+    };
+    for (const LaneRow& row : rows)
+    {
+        std::uint32_t rooms = 0;
+        host.laneList = [&](HBA_WWN, HBA_WWN, HBA_WWN, std::uint32_t, RM_OASLunList* list)
+        {
+            rooms += list->count;
+            std::memset(static_cast<void*>(list->entry), 0xFF, list->count * sizeof list->entry[0]);
+            list->count = row.count;
+            return row.status;
+        };
+        std::vector<RM_OASLun> out(3);
+        EXPECT_EQ(W::GetOASLunList(portId, targetId, nullptr, RM_LANE_DRIVER, &out), row.result) << row.count;
+        EXPECT_THAT(out, SizeIs(row.status == RM_OK ? row.entries : 3)) << row.count;
+        EXPECT_EQ(rooms, row.rooms) << row.count;
+    }
+    EXPECT_EQ(log.count("5 RM_GetOASLunList error."), 5);
+}
+
+TEST_F(VirtualPortTest, PriorityLanesOfWrongNamesAreNotAskedFor)
+{
+    std::vector<RM_OASLun> out(3);
+    EXPECT_EQ(W::GetOASLunList(portId, targetId, nullptr, RM_LANE_DRIVER, nullptr), 1);
+    EXPECT_EQ(log.count("5 Invalid input pointer"), 1);
+    for (const auto& [port, target, vport] :
+         {std::tuple{"x", targetId, vportId}, std::tuple{portId, "x", vportId}, std::tuple{portId, targetId, "x"}})
+        EXPECT_EQ(W::GetOASLunList(port, target, vport, RM_LANE_DRIVER, &out), 1);
+    EXPECT_EQ(W::GetOASLunList(nullptr, targetId, nullptr, RM_LANE_DRIVER, &out), 1);
+    EXPECT_THAT(out, SizeIs(3));
+    EXPECT_THAT(host.calls, IsEmpty());
+}
+
 TEST_F(VirtualPortTest, FeaturesQosAndTraces)
 {
     const HBA_WWN port = wwn(0x1000112233123456);
