@@ -54,7 +54,8 @@ const Row rows[] = {
      everyPort,
      2,
      everyUnit,
-     {{"[TVR_WARN]", 0},
+     {{"[TVR_WARN] GetOASLunList failed. Unsupported Hardware", 7}, // for each pair of a port and a remote one
+      {"[TVR_WARN]", 7},
       {"[TVR_ERR]", 0},
       {"[TVR_DBG] HBA_SendScsiInquiry_t(0x80) returns 9.", noDisks},
       {"[TVR_DBG] HBA_GetFcpTargetMapping_t() found no target mappings", 1}},
@@ -352,7 +353,7 @@ TEST(Faulty, AdaptersOfOtherKindsAreSkippedWithoutAWord)
     Host host("mixed");
     EXPECT_EQ(servedPorts(host), "0002 0008");
     EXPECT_EQ(host.logged("[TVR_WARN] Error hbaStatus = 1, Skipping Adapter# 6"), 1u);
-    EXPECT_EQ(host.logged("[TVR_WARN]"), 1u);
+    EXPECT_EQ(host.logged("[TVR_WARN] Error"), 1u);
     EXPECT_EQ(host.logged("[TVR_DBG] FC AdapterName : [Tavrin-O1]"), 0u);
     EXPECT_EQ(host.logged("[TVR_DBG] FC AdapterName : [Tavrin-NIC10-1]"), 0u);
     EXPECT_EQ(host.logged("[TVR_DBG] FC AdapterName : ["), 5u);

@@ -333,6 +333,7 @@ TEST(PhysicalModel, FunctionsOfOneNodeShareTheirPortGroup)
 TEST(PhysicalModel, ConnectorsOfOneAdapterAreNamedAfterTheirPorts)
 {
     Host host("multiport");
+    host.write("/etc/tavrin_fc_provider.conf", "TVR_PROVIDER_REFRESH_SANDATA = FALSE");
     EXPECT_THAT(texts(host, "TVRHBA_PCIDevice", "DeviceID"),
                 ElementsAre("1000027A51320D00:0x7410", "1000027A51320D01:0x7410"));
     for (const char* property : {"Tag", "Name"})
