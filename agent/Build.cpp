@@ -21,6 +21,18 @@ const String& moduleNamespace()
     return *name;
 }
 
+String joinTexts(std::initializer_list<std::string_view> parts)
+{
+    std::size_t size = 0;
+    for (const std::string_view part : parts)
+        size += part.size();
+    String text;
+    text.reserve(size);
+    for (const std::string_view part : parts)
+        text.append(part.data(), part.size());
+    return text;
+}
+
 String formatText(const char* format, ...)
 {
     va_list args;

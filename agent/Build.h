@@ -9,7 +9,9 @@
 #include "runtime/meta/Instance.h"
 
 #include <cstdint>
+#include <initializer_list>
 #include <new>
+#include <string_view>
 #include <type_traits>
 
 namespace cimple
@@ -124,6 +126,9 @@ Joined join(InstanceCache& cache, First* Holder1::*firstRole, const std::type_id
 {
     return join<Association>(cache, firstRole, first, secondRole, second, refused, [](Association&) {});
 }
+
+/// The parts one behind the other.
+String joinTexts(std::initializer_list<std::string_view> parts);
 
 /// Text by a printf format, of any length.
 String formatText(const char* format, ...) __attribute__((format(printf, 1, 2)));

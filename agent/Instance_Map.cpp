@@ -13,25 +13,34 @@ namespace cimple
 namespace
 {
 
-/// Multiplies and folds, eight bytes at a time.
-std::uint64_t mix(std::uint64_t hash, std::uint64_t word)
+/// Multiplies and folds, sixteen bytes at a time.
+std::uint64_t mix(std::uint64_t hash, std::uint64_t low, std::uint64_t high = 0)
 {
-    hash = (hash ^ word) * 0x9E3779B97F4A7C15ULL;
-    return hash ^ (hash >> 29);
+    const auto product = static_cast<unsigned __int128>(hash ^ low ^ 0x9E3779B97F4A7C15ULL) *
+                         static_cast<unsigned __int128>(high ^ 0xD6E8FEB86659FD93ULL);
+    return static_cast<std::uint64_t>(product) ^ static_cast<std::uint64_t>(product >> 64);
+}
+
+std::uint64_t wordAt(const unsigned char* bytes)
+{
+    std::uint64_t word;
+    std::memcpy(&word, bytes, sizeof word);
+    return word;
 }
 
 std::uint64_t hashBytes(std::uint64_t hash, const void* data, std::size_t size)
 {
     const auto* bytes = static_cast<const unsigned char*>(data);
-    for (; size >= 8; bytes += 8, size -= 8)
-    {
-        std::uint64_t word;
-        std::memcpy(&word, bytes, 8);
-        hash = mix(hash, word);
-    }
+    const unsigned char* const end = bytes + size;
+    for (; end - bytes > 16; bytes += 16)
+        hash = mix(hash, wordAt(bytes), wordAt(bytes + 8));
+    if (size >= 16) // the last ones, some of them again
+        return mix(hash ^ size, wordAt(end - 16), wordAt(end - 8));
+    if (size >= 8)
+        return mix(hash ^ size, wordAt(bytes), wordAt(end - 8));
     std::uint64_t tail = 0;
     std::memcpy(&tail, bytes, size);
-    return mix(hash, tail ^ (static_cast<std::uint64_t>(size) << 56));
+    return mix(hash ^ size, tail);
 }
 
 /// Adds a property to the hash. Reals add nothing: their equality is not that of their bytes.

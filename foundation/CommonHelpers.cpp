@@ -86,8 +86,8 @@ void bytesRangeToHex(std::span<const std::uint8_t> record, std::size_t first, st
     const std::span<const std::uint8_t> data = record.subspan(header);
     for (std::size_t i = first; i < std::min(last, data.size()); ++i)
     {
-        out.append(upperDigits[data[i] >> 4]);
-        out.append(upperDigits[data[i] & 0xF]);
+        const char digits[] = {upperDigits[data[i] >> 4], upperDigits[data[i] & 0xF]};
+        out.append(digits, sizeof digits);
     }
 }
 

@@ -1,19 +1,14 @@
 #include "model/LogicalDevices.h"
 
-#include "schema/TVRHBA_LogicalDisk.h"
 #include "schema/TVRHBA_LogicalDiskSystemDevice.h"
-#include "schema/TVRHBA_SCSIArbitraryLogicalUnit.h"
 #include "schema/TVRHBA_SCSIArbitraryLogicalUnitSystemDevice.h"
 #include "schema/TVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath.h"
 #include "schema/TVRHBA_SCSIInitiatorTargetLogicalDiskPath.h"
 #include "schema/TVRHBA_SCSIInitiatorTargetStorageExtentPath.h"
 #include "schema/TVRHBA_SCSIInitiatorTargetStorageVolumePath.h"
 #include "schema/TVRHBA_SCSIInitiatorTargetTapeDrivePath.h"
-#include "schema/TVRHBA_StorageExtent.h"
 #include "schema/TVRHBA_StorageExtentSystemDevice.h"
-#include "schema/TVRHBA_StorageVolume.h"
 #include "schema/TVRHBA_StorageVolumeSystemDevice.h"
-#include "schema/TVRHBA_TapeDrive.h"
 #include "schema/TVRHBA_TapeDriveSystemDevice.h"
 
 #include <algorithm>
@@ -135,24 +130,26 @@ void setNameFormat(TVRHBA_StorageVolume& volume, const LogicalUnit& unit)
 
 // --- properties -------------------------------------------------------------------------------------------
 
-/// What all devices have.
-template <class Device> Ref<Device> makeDevice(const LogicalUnit& unit)
+template <class Device>
+Prototype<Device> makePrototype(const CIM_ComputerSystem& system, const char* firstDescription,
+                                const char* secondDescription)
 {
     Ref<Device> device = fresh<Device>();
-    device->Description.set(unit.description);
-    device->SystemCreationClassName = unit.system->CreationClassName;
-    device->SystemName = unit.system->Name;
+    device->SystemCreationClassName = system.CreationClassName;
+    device->SystemName = system.Name;
     device->CreationClassName.set(className<Device>());
-    device->DeviceID.set(unit.deviceId);
     device->OperationalStatus.set({0});
-    return device;
+    device->IdentifyingDescriptions.set({firstDescription, secondDescription});
+    return Prototype<Device>(device);
 }
 
-void setIdentifyingInfo(CIM_LogicalDevice& device, const LogicalUnit& unit, const String& inquiry,
-                        const char* firstDescription, const char* secondDescription)
+/// What all devices have.
+template <class Device> Ref<Device> makeDevice(const Prototype<Device>& prototype, const LogicalUnit& unit)
 {
-    device.OtherIdentifyingInfo.set({unit.osDeviceName, inquiry});
-    device.IdentifyingDescriptions.set({firstDescription, secondDescription});
+    Ref<Device> device = prototype.copy();
+    device->Description.set(unit.description);
+    device->DeviceID.set(unit.deviceId);
+    return device;
 }
 
 /// Read Capacity tells the last block; without an answer there is no block size.
@@ -200,16 +197,14 @@ struct DeviceTexts
 template <class SystemDevice, class Path, class Device>
 std::uint32_t insertDevice(const LogicalUnit& unit, const Ref<Device>& made, const DeviceTexts& texts)
 {
-    const Device* device = mapOf<Device>(unit.agent).insert(made, texts.deviceRefused);
-    if (!device)
+    if (!mapOf<Device>(unit.agent).insert(made, texts.deviceRefused))
         return BUILD_FAILED;
-    const Ref<Device> end(clone_of(device)); // one for both associations
     TVR_LOG(TVR_DBG, texts.generating, unit.deviceId.c_str());
     if (insertFilled(mapOf<SystemDevice>(unit.agent), texts.systemDeviceRefused,
                      [&](SystemDevice& association)
                      {
                          association.GroupComponent = Ref(unit.system).release();
-                         association.PartComponent = Ref(end).release();
+                         association.PartComponent = Ref(made).release();
                      }) == Joined::Refused)
         return BUILD_FAILED;
     texts.creating.log();
@@ -218,7 +213,7 @@ std::uint32_t insertDevice(const LogicalUnit& unit, const Ref<Device>& made, con
                                      {
                                          association.Initiator = Ref(unit.initiator).release();
                                          association.Target = Ref(unit.endpoint).release();
-                                         association.LogicalUnit = Ref(end).release();
+                                         association.LogicalUnit = Ref(made).release();
                                      });
     return path == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
 }
@@ -227,14 +222,14 @@ std::uint32_t insertDevice(const LogicalUnit& unit, const Ref<Device>& made, con
 
 std::uint32_t createStorageVolume(const LogicalUnit& unit)
 {
-    Ref<TVRHBA_StorageVolume> volume = makeDevice<TVRHBA_StorageVolume>(unit);
-    volume->ElementName.set(formatText("Storage Volume: %d", osLun(unit)));
+    Ref<TVRHBA_StorageVolume> volume = makeDevice(unit.prototypes.volume, unit);
+    volume->ElementName.set(joinTexts({"Storage Volume: ", std::to_string(osLun(unit))}));
     volume->Name.set(refinedName(unit));
     setNameFormat(*volume, unit);
     setBlocks(*volume, unit);
     setCapacity(*volume, unit);
     volume->DeviceType.set(deviceType(unit));
-    setIdentifyingInfo(*volume, unit, unit.inquiry, "OS Device Name", "Standard SCSI inquiry data");
+    volume->OtherIdentifyingInfo.set({unit.osDeviceName, unit.inquiry});
     return insertDevice<TVRHBA_StorageVolumeSystemDevice, TVRHBA_SCSIInitiatorTargetStorageVolumePath>(
         unit, volume,
         {
@@ -249,14 +244,13 @@ std::uint32_t createStorageVolume(const LogicalUnit& unit)
 std::uint32_t createTapeDrive(const LogicalUnit& unit)
 {
     const Target& target = unit.target;
-    Ref<TVRHBA_TapeDrive> tape = makeDevice<TVRHBA_TapeDrive>(unit);
+    Ref<TVRHBA_TapeDrive> tape = makeDevice(unit.prototypes.tape, unit);
     tape->ElementName.set(formatText("Tape Drive %d", osLun(unit)));
     tape->Name.set(unit.osDeviceName);
     setCapacity(*tape, unit);
     tape->DeviceType.set(deviceType(unit));
-    setIdentifyingInfo(*tape, unit,
-                       formatText("%s %s %s", target.vendor.c_str(), target.product.c_str(), target.revision.c_str()),
-                       "OS Device Name", "standard SCSI Inquery data");
+    tape->OtherIdentifyingInfo.set(
+        {unit.osDeviceName, joinTexts({target.vendor, " ", target.product, " ", target.revision})});
     return insertDevice<TVRHBA_TapeDriveSystemDevice, TVRHBA_SCSIInitiatorTargetTapeDrivePath>(
         unit, tape,
         {
@@ -271,13 +265,13 @@ std::uint32_t createTapeDrive(const LogicalUnit& unit)
 std::uint32_t createLogicalDisk(const LogicalUnit& unit)
 {
     constexpr std::uint16_t runningFullPower = 3; // it has just answered an Inquiry
-    Ref<TVRHBA_LogicalDisk> disk = makeDevice<TVRHBA_LogicalDisk>(unit);
+    Ref<TVRHBA_LogicalDisk> disk = makeDevice(unit.prototypes.disk, unit);
     disk->ElementName.set(formatText("Object-based storage device: %d", osLun(unit)));
     disk->Name.set(refinedName(unit));
     setBlocks(*disk, unit);
     setCapacity(*disk, unit);
     disk->AdditionalAvailability.set({runningFullPower});
-    setIdentifyingInfo(*disk, unit, unit.inquiry, "OS Device Name", "Standard SCSI inquiry data");
+    disk->OtherIdentifyingInfo.set({unit.osDeviceName, unit.inquiry});
     return insertDevice<TVRHBA_LogicalDiskSystemDevice, TVRHBA_SCSIInitiatorTargetLogicalDiskPath>(
         unit, disk,
         {
@@ -291,11 +285,11 @@ std::uint32_t createLogicalDisk(const LogicalUnit& unit)
 
 std::uint32_t createArbitraryLogicalUnit(const LogicalUnit& unit)
 {
-    Ref<TVRHBA_SCSIArbitraryLogicalUnit> device = makeDevice<TVRHBA_SCSIArbitraryLogicalUnit>(unit);
+    Ref<TVRHBA_SCSIArbitraryLogicalUnit> device = makeDevice(unit.prototypes.arbitrary, unit);
     device->ElementName.set(nameByType(arbitraryUnitNames, unit));
     device->Name.set(refinedName(unit));
     device->OtherDeviceType.set(formatText("Peripheral devices type is 0x%02X", unit.target.deviceType));
-    setIdentifyingInfo(*device, unit, unit.inquiry, "OS Device Name", "Standard SCSI inquiry data");
+    device->OtherIdentifyingInfo.set({unit.osDeviceName, unit.inquiry});
     return insertDevice<TVRHBA_SCSIArbitraryLogicalUnitSystemDevice,
                         TVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath>(
         unit, device,
@@ -310,14 +304,13 @@ std::uint32_t createArbitraryLogicalUnit(const LogicalUnit& unit)
 
 std::uint32_t createStorageExtent(const LogicalUnit& unit)
 {
-    Ref<TVRHBA_StorageExtent> extent = makeDevice<TVRHBA_StorageExtent>(unit);
+    Ref<TVRHBA_StorageExtent> extent = makeDevice(unit.prototypes.extent, unit);
     extent->ElementName.set(nameByType(extentNames, unit));
     extent->Name.set(refinedName(unit));
     setBlocks(*extent, unit);
     setCapacity(*extent, unit);
     extent->DeviceType.set(deviceType(unit));
-    // Clients know the two descriptions in this order, which is not that of the values.
-    setIdentifyingInfo(*extent, unit, unit.inquiry, "Standard SCSI inquiry data", "OS Device Name");
+    extent->OtherIdentifyingInfo.set({unit.osDeviceName, unit.inquiry});
     return insertDevice<TVRHBA_StorageExtentSystemDevice, TVRHBA_SCSIInitiatorTargetStorageExtentPath>(
         unit, extent,
         {
@@ -343,6 +336,15 @@ constexpr DeviceRow devices[] = {
 };
 
 } // namespace
+
+DevicePrototypes::DevicePrototypes(const CIM_ComputerSystem& system)
+    : volume(makePrototype<TVRHBA_StorageVolume>(system, "OS Device Name", "Standard SCSI inquiry data")),
+      tape(makePrototype<TVRHBA_TapeDrive>(system, "OS Device Name", "standard SCSI Inquery data")),
+      disk(makePrototype<TVRHBA_LogicalDisk>(system, "OS Device Name", "Standard SCSI inquiry data")),
+      arbitrary(makePrototype<TVRHBA_SCSIArbitraryLogicalUnit>(system, "OS Device Name", "Standard SCSI inquiry data")),
+      // Clients know the two descriptions in this order, which is not that of the values.
+      extent(makePrototype<TVRHBA_StorageExtent>(system, "Standard SCSI inquiry data", "OS Device Name"))
+{}
 
 std::uint32_t createLogicalDevice(const LogicalUnit& unit)
 {

@@ -4,47 +4,37 @@
 #include "model/LogicalDevices.h"
 #include "schema/TVRHBA_LocalHostedAccessPoint.h"
 
+#include <cstdio>
+#include <optional>
+#include <string_view>
+
 namespace cimple
 {
 
 namespace
 {
 
-/// A port with the initiator endpoint that stands for it.
-struct InitiatorPort
+/// A text that is often the same as the last one: equal ones share their characters.
+class RepeatedText
 {
-    HostContext& host;
-    FCPort& port;
-    String wwpn;
-    Ref<CIM_ComputerSystem> system;
-    Ref<TVRHBA_SCSIProtocolInitiatorEndpoint> initiator;
+public:
+    const String& of(std::string_view text)
+    {
+        if (_last.view() != text)
+            _last = String(text);
+        return _last;
+    }
+
+private:
+    String _last;
 };
 
-String inquiryText(const Target& target)
+Prototype<TVRHBA_SCSIProtocolEndpoint> endpointPrototype(const CIM_ComputerSystem& system)
 {
-    return formatText("%.8s %.16s Revision %.4s", target.vendor.c_str(), target.product.c_str(),
-                      target.revision.c_str());
-}
-
-String identifierText(const Target& target)
-{
-    char text[33];
-    descriptorToString(text, &target.designator);
-    return text;
-}
-
-Ref<TVRHBA_SCSIProtocolEndpoint> makeEndpoint(const LogicalUnit& unit, const String& name)
-{
-    const Target& target = unit.target;
     Ref<TVRHBA_SCSIProtocolEndpoint> endpoint = fresh<TVRHBA_SCSIProtocolEndpoint>();
-    endpoint->TargetWWPN.set(target.portWWN);
-    endpoint->TargetWWNN.set(target.nodeWWN);
-    endpoint->Description.set(unit.description);
-    endpoint->SystemCreationClassName = unit.system->CreationClassName;
-    endpoint->SystemName = unit.system->Name;
+    endpoint->SystemCreationClassName = system.CreationClassName;
+    endpoint->SystemName = system.Name;
     endpoint->CreationClassName.set(className<TVRHBA_SCSIProtocolEndpoint>());
-    endpoint->ElementName.set(target.product);
-    endpoint->Name.set(name);
     endpoint->ProtocolType.set(18);
     endpoint->ProtocolIFType.set(56);
     endpoint->ConnectionType.set(2);
@@ -53,23 +43,54 @@ Ref<TVRHBA_SCSIProtocolEndpoint> makeEndpoint(const LogicalUnit& unit, const Str
     endpoint->EnabledState.set(0);
     endpoint->RequestedState.set(0);
     endpoint->OperationalStatus.set({0});
+    endpoint->IdentifyingDescriptions.set({"OS Device Name"});
+    return Prototype<TVRHBA_SCSIProtocolEndpoint>(endpoint);
+}
+
+/// What the units of all ports have in common.
+struct SanContext
+{
+    explicit SanContext(HostContext& host)
+        : host(host), system(shared_end(host.system)), endpoint(endpointPrototype(*system)), devices(*system)
+    {}
+    HostContext& host;
+    Ref<CIM_ComputerSystem> system;
+    Prototype<TVRHBA_SCSIProtocolEndpoint> endpoint;
+    DevicePrototypes devices;
+    RepeatedText targetWwpn, targetWwnn, product, inquiry;
+};
+
+/// A port with the initiator endpoint that stands for it.
+struct InitiatorPort
+{
+    SanContext& san;
+    FCPort& port;
+    Ref<TVRHBA_SCSIProtocolInitiatorEndpoint> initiator;
+};
+
+Ref<TVRHBA_SCSIProtocolEndpoint> makeEndpoint(SanContext& san, const LogicalUnit& unit, const String& name)
+{
+    const Target& target = unit.target;
+    Ref<TVRHBA_SCSIProtocolEndpoint> endpoint = san.endpoint.copy();
+    endpoint->TargetWWPN.set(san.targetWwpn.of(target.portWWN));
+    endpoint->TargetWWNN.set(san.targetWwnn.of(target.nodeWWN));
+    endpoint->Description.set(unit.description);
+    endpoint->ElementName.set(san.product.of(target.product));
+    endpoint->Name.set(name);
     endpoint->FCID.set(target.fcId);
     endpoint->SCSIBusNumber.set(target.scsiBusNumber);
     endpoint->SCSITargetNumber.set(target.scsiTargetNumber);
     endpoint->OtherIdentifyingInfo.set({unit.osDeviceName});
-    endpoint->IdentifyingDescriptions.set({"OS Device Name"});
     return endpoint;
 }
 
-/// The endpoint of a unit and what hosts it. Its copy is left in the unit, for the path.
-std::uint32_t createEndpoint(LogicalUnit& unit, const String& name)
+/// The endpoint of a unit and what hosts it.
+std::uint32_t createEndpoint(SanContext& san, LogicalUnit& unit, const String& name)
 {
-    const TVRHBA_SCSIProtocolEndpoint* endpoint =
-        mapOf<TVRHBA_SCSIProtocolEndpoint>(unit.agent)
-            .insert(makeEndpoint(unit, name), "Insert Failed : m_TVRHBA_SCSIProtocolEndpoint_map");
-    if (!endpoint)
+    unit.endpoint = makeEndpoint(san, unit, name);
+    if (!mapOf<TVRHBA_SCSIProtocolEndpoint>(unit.agent)
+             .insert(unit.endpoint, "Insert Failed : m_TVRHBA_SCSIProtocolEndpoint_map"))
         return BUILD_FAILED;
-    unit.endpoint.reset(clone_of(endpoint));
     TVR_LOG(TVR_DBG, "Generating TVRHBA_LocalHostedAccessPoint (Local Hosted Access Point %s)", name.c_str());
     using Hosted = TVRHBA_LocalHostedAccessPoint;
     const Joined hosted = insertFilled(mapOf<Hosted>(unit.agent), "Insert Failed : m_TVRHBA_LocalHostedAccessPoint_map",
@@ -81,32 +102,52 @@ std::uint32_t createEndpoint(LogicalUnit& unit, const String& name)
     return hosted == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
 }
 
+/// "%.8s %.16s Revision %.4s" of vendor, product and revision.
+const String& inquiryText(SanContext& san, const Target& target)
+{
+    char text[8 + 1 + 16 + 10 + 4 + 1];
+    const int size = std::snprintf(text, sizeof text, "%.8s %.16s Revision %.4s", target.vendor.c_str(),
+                                   target.product.c_str(), target.revision.c_str());
+    return san.inquiry.of({text, static_cast<std::size_t>(size)});
+}
+
+/// Notes a pair of ports. The units of a target follow each other.
+void noteRemotePort(HostContext& host, const std::string& wwpn, const std::string& remote)
+{
+    const std::string pair = wwpn + "|" + remote;
+    if (host.remotePorts.empty() || *host.remotePorts.rbegin() != pair)
+        host.remotePorts.insert(pair);
+}
+
 std::uint32_t createLogicalUnit(const InitiatorPort& on, unsigned index)
 {
+    SanContext& san = on.san;
     const Target& target = *on.port.getTarget(index);
-    on.host.remotePorts.insert(on.port.name + "|" + target.portWWN);
+    noteRemotePort(san.host, on.port.name, target.portWWN);
     const std::string lun = lunText(target.fcpLun);
-    LogicalUnit unit{on.host.agent, target, on.system, on.initiator};
+    const std::string& wwpn = on.port.name;
+    LogicalUnit unit{san.host.agent, san.devices, target, san.system, on.initiator, inquiryText(san, target)};
+    unit.description =
+        joinTexts({unit.inquiry.view(), " Serial Number ", std::string_view(target.serialNumber).substr(0, 40)});
     unit.osDeviceName = target.osDeviceName;
-    unit.inquiry = inquiryText(target);
-    unit.description = formatText("%s Serial Number %.40s", unit.inquiry.c_str(), target.serialNumber.c_str());
-    const String name = formatText("%s:%s:%s", on.wwpn.c_str(), target.portWWN.c_str(), lun.c_str());
-    if (const std::uint32_t status = createEndpoint(unit, name); status != BUILD_DONE)
+    if (const std::uint32_t status = createEndpoint(san, unit, joinTexts({wwpn, ":", target.portWWN, ":", lun}));
+        status != BUILD_DONE)
         return status;
     TVR_LOG(TVR_DBG, "Target %d is of type %d.", static_cast<int>(index), static_cast<int>(target.deviceType));
-    unit.identifier = identifierText(target);
-    unit.deviceId =
-        formatText("%s_%s_%s_%s", on.wwpn.c_str(), target.portWWN.c_str(), unit.identifier.c_str(), lun.c_str());
+    descriptorToString(unit.identifier, &target.designator);
+    unit.deviceId = joinTexts({wwpn, "_", target.portWWN, "_", unit.identifier, "_", lun});
     return createLogicalDevice(unit);
 }
 
-std::uint32_t createUnitsOfPort(HostContext& host, FCPort& port)
+std::uint32_t createUnitsOfPort(HostContext& host, std::optional<SanContext>& san, FCPort& port)
 {
     const auto* initiator = mapOf<TVRHBA_SCSIProtocolInitiatorEndpoint>(host.agent)
                                 .findFirst([&](const auto& known) { return known.Name.value == port.name.c_str(); });
     if (!initiator || !host.system)
         return failed({TVR_ERR, "Could not find TVRHBA_SCSIProtocolEndpoint Initiator instance."});
-    const InitiatorPort on{host, port, port.name, shared_end(host.system), shared_end(initiator)};
+    if (!san)
+        san.emplace(host);
+    const InitiatorPort on{*san, port, shared_end(initiator)};
     for (unsigned index = 0; index < port.getTargetCount(); index++)
     {
         TVR_LOG(TVR_DBG, "Creating classes for target %d of %d.", static_cast<int>(index),
@@ -121,6 +162,7 @@ std::uint32_t createUnitsOfPort(HostContext& host, FCPort& port)
 
 std::uint32_t createLogicalUnits(HostContext& host)
 {
+    std::optional<SanContext> san; // made with the first port
     for (Adapter* adapter : host.agent.m_pData->adapters)
     {
         if (adapter->adapterType != Adapter::fibreChannel)
@@ -134,7 +176,7 @@ std::uint32_t createLogicalUnits(HostContext& host)
         {
             TVR_LOG(TVR_DBG, "Creating classes for port %d.", static_cast<int>(index));
             auto& port = dynamic_cast<FCPort&>(*fcAdapter.getPort(index));
-            if (const std::uint32_t status = createUnitsOfPort(host, port); status != BUILD_DONE)
+            if (const std::uint32_t status = createUnitsOfPort(host, san, port); status != BUILD_DONE)
                 return status;
         }
     }
