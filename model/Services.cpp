@@ -136,7 +136,7 @@ std::uint32_t conformToSoftwareUpdate(HostContext& on)
     using Conforms = TVRHBA_InstallServiceConformsToProfile;
     const Joined conforms =
         join<Conforms>(on.agent, &Conforms::ConformantStandard,
-                       createRegisteredProfile(on, "Software Update", DMTF, "1.0.0"), &Conforms::ManagedElement,
+                       createRegisteredProfile(on, profileRow("Software Update")), &Conforms::ManagedElement,
                        on.installationService, "Insert Failed : m_TVRHBA_InstallServiceConformsToProfile_map");
     return conforms == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
 }
