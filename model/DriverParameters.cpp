@@ -3,6 +3,7 @@
 #include "agent/Build.h"
 #include "device/ForeignText.h"
 #include "device/TVR_MethodWrapper.h"
+#include "model/PortVirtualization.h"
 #include "schema/TVRHBA_DriverParamGlobal.h"
 #include "schema/TVRHBA_DriverParameterAffectsFCPort.h"
 #include "schema/TVRHBA_DriverParams.h"
@@ -156,6 +157,7 @@ void rebuildDriverParameters(ProviderAgent& agent)
     for (const PortParameters& of : all)
         for (const Ref<TVRHBA_DriverParams>& parameter : of.parameters)
             insert(agent, service, of.port, parameter);
+    rebuildVirtualPortParameters(agent);
 }
 
 void rebuildGlobalDriverParameters(ProviderAgent& agent)

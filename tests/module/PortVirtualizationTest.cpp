@@ -223,6 +223,28 @@ TEST(PortVirtualization, AssociationsJoinTheseInstances)
     host.unload();
 }
 
+TEST(PortVirtualization, DriverParametersAreThoseOfThePhysicalPort)
+{
+    const auto parametersOf = [](Host& host, const std::string& association, const std::string& port)
+    {
+        std::vector<std::string> parameters;
+        for (const broker::Object& object : host.instancesOf(association))
+            if (object.get("ManagedElement").asPath().key("DeviceID")->asString() == port)
+                parameters.push_back(object.get("SettingData").asPath().key("InstanceID")->asString() + " " +
+                                     std::to_string(object.get("IsDefault").asUnsigned()));
+        return parameters;
+    };
+    Host host;
+    const auto physical = parametersOf(host, "TVRHBA_DriverParameterAffectsFCPort", "1000027A51320240");
+    ASSERT_FALSE(physical.empty());
+    EXPECT_EQ(parametersOf(host, "TVRHBA_DriverParamAffectsVirtualFCPort", "2001027A51320240"), physical);
+    // They follow when the parameters are read again.
+    EXPECT_FALSE(host.instancesOf("TVRHBA_DriverParams").empty());
+    EXPECT_EQ(parametersOf(host, "TVRHBA_DriverParamAffectsVirtualFCPort", "2001027A51320240"), physical);
+    EXPECT_THAT(logAbout(host, {"m_TVRHBA_DriverParamAffectsVirtualFCPort_map"}), testing::IsEmpty());
+    host.unload();
+}
+
 // --- several of everything
 
 /// Two virtual ports of two targets each, with and without a machine; one target has a disk, a tape and an enclosure.

@@ -157,6 +157,21 @@ TEST(VitalProductData, CompleteWhatTheAdapterLeavesEmpty)
     host.unload();
 }
 
+TEST(VitalProductData, FirmwareHasTheNumberOfItsCard)
+{
+    Host host;
+    const std::pair<const char*, const char*> numbers[] = {
+        {"TVR FC HBA: Operational Firmware v11.4.210.8 TV1602:1000027A51160211", "TV16A02417"},
+        {"TVR FC HBA: Operational Firmware v12.0.100.0 TV3202:1000027A51320240", "TV32B71155"},
+    };
+    for (const auto& [id, number] : numbers)
+        EXPECT_EQ(text(theOne(host, "TVRHBA_SoftwareIdentity", "InstanceID", id), "SerialNumber"), number) << id;
+    const broker::Object driver =
+        theOne(host, "TVRHBA_SoftwareIdentity", "InstanceID", "TVR FC HBA: Driver tvrfc v12.0.0.1");
+    EXPECT_TRUE(driver.get("SerialNumber").isNull()) << "it serves all cards";
+    host.unload();
+}
+
 TEST(VitalProductData, SubAdaptersAreToldApart)
 {
     const std::string vpd = R"("vpd": {"readOnly": {"PN": "PN1"}})";
