@@ -52,6 +52,13 @@ template <class Record> Ref<Record> empty()
     return instance;
 }
 
+/// The keys of what is weak to the system.
+void setSystem(auto& element, const auto& system)
+{
+    element.SystemCreationClassName.set(system.CreationClassName.value);
+    element.SystemName.set(system.Name.value);
+}
+
 /// What `make` gives; null when memory ran out on the way.
 template <class Make> auto unlessOutOfMemory(Make make) -> decltype(make())
 {

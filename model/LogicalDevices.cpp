@@ -1,5 +1,6 @@
 #include "model/LogicalDevices.h"
 
+#include "model/UnitNames.h"
 #include "schema/TVRHBA_LogicalDiskSystemDevice.h"
 #include "schema/TVRHBA_SCSIArbitraryLogicalUnitSystemDevice.h"
 #include "schema/TVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath.h"
@@ -61,73 +62,6 @@ String nameByType(std::span<const NameRow> names, const LogicalUnit& unit)
     return formatText(row == names.end() ? unknownDevice : row->text, osLun(unit));
 }
 
-/// Types of a designator (SPC-4, 7.8.6.1), and formats of the name that one of type 3 has, in its first four bits.
-constexpr std::uint32_t typeNaa = 3;
-constexpr unsigned naaIeeeExtended = 1, naaLocal = 2, naaIeee = 5, naaIeeeRegisteredExtended = 6;
-
-String hexadecimalFrom(const Descriptor& designator, std::size_t first)
-{
-    // The designator's two numbers are the head of the record, its bytes what follows.
-    const auto* record = reinterpret_cast<const std::uint8_t*>(&designator);
-    String text;
-    bytesRangeToHex({record, sizeof designator}, first, designator.designatorLength, text);
-    return text;
-}
-
-/// The identifier as the name of the unit. That of an NAA name leaves out its head.
-String refinedName(const LogicalUnit& unit)
-{
-    const Descriptor& designator = unit.target.designator;
-    if (designator.designatorType != typeNaa)
-        return unit.identifier;
-    switch (designator.value[0] >> 4)
-    {
-    case naaIeeeExtended:
-    case naaLocal:
-    case naaIeee:
-        return hexadecimalFrom(designator, 2);
-    case naaIeeeRegisteredExtended:
-        return hexadecimalFrom(designator, 1);
-    default:
-        return unit.identifier;
-    }
-}
-
-/// What a volume says of its name, by the type of its designator. Null texts are left unset.
-struct NameFormatRow
-{
-    std::uint16_t format;
-    std::uint16_t nameSpace;
-    const char* otherFormat;
-    const char* otherNameSpace;
-};
-
-constexpr NameFormatRow nameFormats[] = {
-    {6, 1, nullptr, "Vendor specific"},
-    {5, 4, nullptr, nullptr},
-    {10, 3, nullptr, nullptr},
-    {9, 2, nullptr, nullptr},
-    {1, 1, "Relative target port identifier", "Relative target port idientifier"},
-    {1, 1, "Target port group", "Target port group"},
-    {1, 1, "Logical port group", "Logical unit group"},
-    {1, 1, "MD5 logical unit identifier", "MD5 logical unit identifier"},
-    {1, 1, "SCSI name std::string", "SCSI name std::string"},
-};
-
-void setNameFormat(TVRHBA_StorageVolume& volume, const LogicalUnit& unit)
-{
-    const std::uint32_t type = unit.target.designator.designatorType;
-    if (type >= std::size(nameFormats))
-        return;
-    const NameFormatRow& row = nameFormats[type];
-    volume.NameFormat.set(row.format);
-    volume.NameNamespace.set(row.nameSpace);
-    if (row.otherFormat)
-        volume.OtherNameFormat.set(row.otherFormat);
-    if (row.otherNameSpace)
-        volume.OtherNameNamespace.set(row.otherNameSpace);
-}
-
 // --- properties -------------------------------------------------------------------------------------------
 
 template <class Device>
@@ -135,8 +69,7 @@ Prototype<Device> makePrototype(const CIM_ComputerSystem& system, const char* fi
                                 const char* secondDescription)
 {
     Ref<Device> device = fresh<Device>();
-    device->SystemCreationClassName = system.CreationClassName;
-    device->SystemName = system.Name;
+    setSystem(*device, system);
     device->CreationClassName.set(className<Device>());
     device->OperationalStatus.set({0});
     device->IdentifyingDescriptions.set({firstDescription, secondDescription});
@@ -224,8 +157,8 @@ std::uint32_t createStorageVolume(const LogicalUnit& unit)
 {
     Ref<TVRHBA_StorageVolume> volume = makeDevice(unit.prototypes.volume, unit);
     volume->ElementName.set(joinTexts({"Storage Volume: ", std::to_string(osLun(unit))}));
-    volume->Name.set(refinedName(unit));
-    setNameFormat(*volume, unit);
+    volume->Name.set(refinedName(unit.target.designator, unit.identifier));
+    setNameFormat(*volume, unit.target.designator);
     setBlocks(*volume, unit);
     setCapacity(*volume, unit);
     volume->DeviceType.set(deviceType(unit));
@@ -267,7 +200,7 @@ std::uint32_t createLogicalDisk(const LogicalUnit& unit)
     constexpr std::uint16_t runningFullPower = 3; // it has just answered an Inquiry
     Ref<TVRHBA_LogicalDisk> disk = makeDevice(unit.prototypes.disk, unit);
     disk->ElementName.set(formatText("Object-based storage device: %d", osLun(unit)));
-    disk->Name.set(refinedName(unit));
+    disk->Name.set(refinedName(unit.target.designator, unit.identifier));
     setBlocks(*disk, unit);
     setCapacity(*disk, unit);
     disk->AdditionalAvailability.set({runningFullPower});
@@ -287,7 +220,7 @@ std::uint32_t createArbitraryLogicalUnit(const LogicalUnit& unit)
 {
     Ref<TVRHBA_SCSIArbitraryLogicalUnit> device = makeDevice(unit.prototypes.arbitrary, unit);
     device->ElementName.set(nameByType(arbitraryUnitNames, unit));
-    device->Name.set(refinedName(unit));
+    device->Name.set(refinedName(unit.target.designator, unit.identifier));
     device->OtherDeviceType.set(formatText("Peripheral devices type is 0x%02X", unit.target.deviceType));
     device->OtherIdentifyingInfo.set({unit.osDeviceName, unit.inquiry});
     return insertDevice<TVRHBA_SCSIArbitraryLogicalUnitSystemDevice,
@@ -306,7 +239,7 @@ std::uint32_t createStorageExtent(const LogicalUnit& unit)
 {
     Ref<TVRHBA_StorageExtent> extent = makeDevice(unit.prototypes.extent, unit);
     extent->ElementName.set(nameByType(extentNames, unit));
-    extent->Name.set(refinedName(unit));
+    extent->Name.set(refinedName(unit.target.designator, unit.identifier));
     setBlocks(*extent, unit);
     setCapacity(*extent, unit);
     extent->DeviceType.set(deviceType(unit));

@@ -204,11 +204,9 @@ RM_PciRegisters readRegisters(const HBA_WWN& wwpn)
 Ref<Device> makeDevice(const PortContext& port, const RM_PciRegisters& registers)
 {
     Ref<Device> made = fresh<Device>();
-    const CIM_ComputerSystem* system = port.host.system;
     const FCAdapterAttributes& attributes = port.on.attributes;
     const unsigned pciDeviceId = wordAt(registers, 2);
-    made->SystemCreationClassName.set(system->CreationClassName.value);
-    made->SystemName.set(system->Name.value);
+    setSystem(*made, *port.host.system);
     made->CreationClassName.set(className<Device>());
     made->DeviceID.set(formatText("%s:0x%04X", port.port.name.c_str(), pciDeviceId));
     made->ElementName.set(formatText("Tavrin:FCAdapter%d", static_cast<int>(port.on.index)));

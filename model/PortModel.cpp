@@ -42,12 +42,6 @@ BuildStatus doneUnless(bool refused)
     return refused ? BUILD_NO_INSTANCE : BUILD_DONE;
 }
 
-void setSystem(auto& device, const CIM_ComputerSystem& system)
-{
-    device.SystemCreationClassName.set(system.CreationClassName.value);
-    device.SystemName.set(system.Name.value);
-}
-
 void setStatus(auto& element, const ValueText& status)
 {
     element.OperationalStatus.set({status.value});

@@ -4,6 +4,7 @@
 #include "device/ForeignText.h"
 #include "device/TVR_MethodWrapper.h"
 #include "model/PortValues.h"
+#include "model/UnitNames.h"
 #include "schema/TVRHBA_DriverParamAffectsVirtualFCPort.h"
 #include "schema/TVRHBA_DriverParameterAffectsFCPort.h"
 #include "schema/TVRHBA_DriverParams.h"
@@ -93,12 +94,6 @@ struct VirtualUnit
     ProviderAgent& agent() const { return behind.on.host.agent; }
     const CIM_ComputerSystem* system() const { return behind.on.host.system; }
 };
-
-void setSystem(auto& element, const CIM_ComputerSystem& system)
-{
-    element.SystemCreationClassName.set(system.CreationClassName.value);
-    element.SystemName.set(system.Name.value);
-}
 
 // --- the port ------------------------------------------------------------------------------------------------
 
@@ -306,7 +301,9 @@ Ref<TVRHBA_VirtualStorageVolume> makeVolume(const VirtualUnit& unit)
     made->DeviceID.set(
         formatText("%s_%s_%s_%s", unit.behind.wwpn.c_str(), unit.target.c_str(), identifier, unit.lun.c_str()));
     made->ElementName.set(formatText("Storage Volume: %d", unit.number));
-    made->Name.set(identifier);
+    made->Name.set(refinedName(unit.attributes.designator, identifier));
+    if (identifier[0])
+        setNameFormat(*made, unit.attributes.designator);
     made->OperationalStatus.set({0});
     setCapacity(*made, unit.attributes.capacity);
     made->OtherIdentifyingInfo.set({inquiryText(unit.attributes.inquiry)});
@@ -339,11 +336,11 @@ void createVolume(const VirtualUnit& unit)
 
 VirtualUnit unitOf(const VirtualPort& behind, const String& target, HBA_UINT64 lun)
 {
-    HBA_WWN bytes; // of the same form: eight of them
-    std::memcpy(bytes.wwn, &lun, sizeof bytes.wwn);
+    std::uint8_t bytes[sizeof lun];
+    std::memcpy(bytes, &lun, sizeof lun);
     // The first level of the field, peripheral or flat space addressing (SAM-4, 4.6).
-    const auto number = static_cast<std::uint16_t>((bytes.wwn[0] & 0x3F) << 8 | bytes.wwn[1]);
-    return {behind, target, wwnText(bytes), number};
+    const auto number = static_cast<std::uint16_t>((bytes[0] & 0x3F) << 8 | bytes[1]);
+    return {behind, target, lunText(static_cast<std::uint64_t>(lun)), number};
 }
 
 void createUnit(const VirtualPort& vport, const String& target, HBA_UINT64 lun)

@@ -32,8 +32,7 @@ private:
 Prototype<TVRHBA_SCSIProtocolEndpoint> endpointPrototype(const CIM_ComputerSystem& system)
 {
     Ref<TVRHBA_SCSIProtocolEndpoint> endpoint = fresh<TVRHBA_SCSIProtocolEndpoint>();
-    endpoint->SystemCreationClassName = system.CreationClassName;
-    endpoint->SystemName = system.Name;
+    setSystem(*endpoint, system);
     endpoint->CreationClassName.set(className<TVRHBA_SCSIProtocolEndpoint>());
     endpoint->ProtocolType.set(18);
     endpoint->ProtocolIFType.set(56);

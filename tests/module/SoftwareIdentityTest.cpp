@@ -158,6 +158,7 @@ Manufacturer = "Tavrin Corporation"
 MinorVersion = 0
 Name = "ULP Functional Firmware"
 RevisionNumber = 100
+SerialNumber = "TV32B71155"
 VersionString = "12.0.100.0"
 )"},
 };
