@@ -3,6 +3,7 @@
 #include "agent/Build.h"
 #include "device/ForeignText.h"
 #include "device/TVR_MethodWrapper.h"
+#include "model/LiveRefresh.h"
 #include "model/PortVirtualization.h"
 #include "schema/TVRHBA_DriverParamGlobal.h"
 #include "schema/TVRHBA_DriverParameterAffectsFCPort.h"
@@ -141,8 +142,7 @@ void insert(ProviderAgent& agent, const TVRHBA_FCHBADriverParamService* service,
                         flags<OfService>(parameter->current, parameter->glbl));
 }
 
-} // namespace
-
+/// The caller holds the data mutex. A port whose list the library does not give keeps what it has.
 void rebuildDriverParameters(ProviderAgent& agent)
 {
     const TypedMap<TVRHBA_FCPort> ports = mapOf<TVRHBA_FCPort>(agent);
@@ -160,6 +160,7 @@ void rebuildDriverParameters(ProviderAgent& agent)
     rebuildVirtualPortParameters(agent);
 }
 
+/// The same of those for all adapters.
 void rebuildGlobalDriverParameters(ProviderAgent& agent)
 {
     std::vector<RM_DriverParam> records;
@@ -180,6 +181,20 @@ void rebuildGlobalDriverParameters(ProviderAgent& agent)
     const auto* service = mapOf<TVRHBA_FCHBADriverParamService>(agent).first();
     for (const Ref<TVRHBA_DriverParamGlobal>& parameter : parameters)
         insert(agent, service, parameter);
+}
+
+} // namespace
+
+template <> void liveRefresh<TVRHBA_DriverParams>(ProviderAgent& agent)
+{
+    const SharedEnds ends;
+    rebuildDriverParameters(agent);
+}
+
+template <> void liveRefresh<TVRHBA_DriverParamGlobal>(ProviderAgent& agent)
+{
+    const SharedEnds ends;
+    rebuildGlobalDriverParameters(agent);
 }
 
 std::uint32_t createDriverParameters(HostContext& host)

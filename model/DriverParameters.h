@@ -1,4 +1,5 @@
-// The parameters of the Fibre Channel driver as settings: those of each port, and those for all adapters.
+// The parameters of the Fibre Channel driver as settings: those of each port, and those for all adapters. Their classes
+// read them live.
 #pragma once
 
 #include "agent/RefreshContext.h"
@@ -8,12 +9,7 @@
 namespace cimple
 {
 
-/// Step of the host; what the library does not list, no port has.
+/// Step of the host. A parameter that is refused is left out, and what the library does not list is not there.
 std::uint32_t createDriverParameters(HostContext& host);
-
-/// Put what the library lists now in the place of what the maps hold, with the associations. What it does not list,
-/// for a port or for all adapters, stays as it is. The caller holds the data mutex.
-void rebuildDriverParameters(ProviderAgent& agent);
-void rebuildGlobalDriverParameters(ProviderAgent& agent);
 
 } // namespace cimple

@@ -2,8 +2,8 @@
 #include "agent/Build.h"
 #include "device/ForeignText.h"
 #include "device/TVR_MethodWrapper.h"
-#include "foundation/FirmwareVersion.h"
 #include "model/PortModel.h"
+#include "model/SoftwareVersion.h"
 #include "schema/TVRHBA_ElementFlashImageSoftwareIdentity.h"
 #include "schema/TVRHBA_FlashImageSoftwareIdentity.h"
 #include "schema/TVRHBA_PortController.h"
@@ -149,20 +149,6 @@ Ref<Transceiver> makeTransceiver(const PortContext& port, const RM_SffData& data
 
 using FlashImage = TVRHBA_FlashImageSoftwareIdentity;
 
-void setVersion(FlashImage& instance, const String& text)
-{
-    instance.VersionString.set(text);
-    FirmwareVersion version;
-    if (parseVersion(text.c_str(), version) != 0)
-        return;
-    instance.MajorVersion.set(version.major);
-    instance.MinorVersion.set(version.minor);
-    instance.RevisionNumber.set(version.revision);
-    instance.BuildNumber.set(version.build);
-    instance.ReleaseType.set(version.releaseType);
-    instance.TestReleaseVersion.set(version.testRelease);
-}
-
 Ref<FlashImage> makeFlashImage(const PortContext& port, const RM_FlashRegion& region)
 {
     const FCAdapterAttributes& adapter = port.on.attributes;
@@ -173,7 +159,7 @@ Ref<FlashImage> makeFlashImage(const PortContext& port, const RM_FlashRegion& re
     Ref<FlashImage> made = fresh<FlashImage>();
     made->ProgramType.set(type);
     made->ProgramID.set({region.programId[0], region.programId[1]});
-    setVersion(*made, version);
+    setFirmwareVersion(*made, version);
     made->Description.set(foreignText(region.description));
     made->ElementName.set(id);
     made->InstanceID.set(id);

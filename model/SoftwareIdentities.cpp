@@ -2,7 +2,7 @@
 
 #include "agent/Build.h"
 #include "device/Data.h"
-#include "foundation/CommonHelpers.h"
+#include "model/SoftwareVersion.h"
 #include "schema/TVRHBA_ElementSoftwareIdentity.h"
 #include "schema/TVRHBA_FCDriverServiceAffectsDriver.h"
 #include "schema/TVRHBA_FCHBADriverParamService.h"
@@ -63,21 +63,12 @@ std::vector<std::uint16_t> dottedNumbers(const std::string& version)
     return {};
 }
 
-/// Firmware has versions of one form, newer firmware and other software of another; a text of neither is a version
-/// without numbers.
+/// Newer firmware and other software has versions of the dotted form; a text of neither is a version without numbers.
 void setVersion(Identity& identity, const std::string& version)
 {
-    identity.VersionString.set(version);
-    FirmwareVersion parsed;
-    std::vector<std::uint16_t> numbers;
-    if (parseVersion(version.c_str(), parsed) == 0)
-    {
-        numbers = {parsed.major, parsed.minor, parsed.revision, parsed.build};
-        identity.ReleaseType.set(parsed.releaseType);
-        identity.TestReleaseVersion.set(parsed.testRelease);
-    }
-    else
-        numbers = dottedNumbers(version);
+    if (setFirmwareVersion(identity, String(version)))
+        return;
+    const std::vector<std::uint16_t> numbers = dottedNumbers(version);
     for (std::size_t i = 0; i < numbers.size(); i++)
         (identity.*versionNumbers[i]).set(numbers[i]);
 }
