@@ -12,6 +12,7 @@ namespace
 std::mutex mutex;
 std::string present;
 std::vector<std::string> tried;
+bool isSet = false; ///< a test asks what is tried
 
 bool isLibCurl(const std::string& file)
 {
@@ -26,7 +27,8 @@ void* openOf(const char* file, int mode)
     if (!file || !isLibCurl(file))
         return next(file, mode);
     const std::lock_guard lock(mutex);
-    tried.push_back(file);
+    if (isSet)
+        tried.push_back(file);
     return file == present ? next(nullptr, mode) : nullptr; // a handle that can be closed
 }
 
@@ -36,6 +38,7 @@ void setLibCurl(const std::string& file)
 {
     const std::lock_guard lock(mutex);
     present = file;
+    isSet = true;
     tried.clear();
 }
 

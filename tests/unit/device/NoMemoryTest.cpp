@@ -93,6 +93,7 @@ TEST(NoMemory, QueriesAnswerByTheirStatus)
     host.version = std::string(100, 'v');
     host.features[201] = 1;
     host.serverAttributes[264] = "Debian GNU/Linux 12 (bookworm)";
+    host.driverParameters.resize(1);
     host.vports.resize(1);
     host.vportTargets.resize(1);
     host.luns.resize(1);
@@ -104,6 +105,7 @@ TEST(NoMemory, QueriesAnswerByTheirStatus)
         [] { return ask<std::string>([](auto* out) { return W::GetLibraryVersion(out); }); },
         [] { return ask<std::vector<RM_Feature>>([](auto* out) { return W::GetHBAFeatureList(wwn(1), out); }); },
         [] { return ask<std::vector<TargetLun>>([](auto* out) { return W::tvrcimGetTargetMapping(id, id, out); }); },
+        [] { return ask<std::vector<RM_DriverParam>>([](auto* out) { return W::tvrcimGetDriverParam(id, out); }); },
         [] { return ask<std::vector<RM_VPortEntry>>([](auto* out) { return W::ListVPorts(id, out); }); },
         [] { return ask<std::vector<RM_VPortTarget>>([](auto* out) { return W::ListVPortTargets(id, id, out); }); },
         [] { return ask<std::vector<HBA_UINT64>>([](auto* out) { return W::ListVPortLuns(id, id, id, out); }); },
