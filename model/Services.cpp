@@ -1,8 +1,8 @@
 #include "model/Services.h"
 
-#include "agent/Build.h"
 #include "device/CurlLibrary.h"
 #include "foundation/WebLaunchConfig.h"
+#include "model/Affects.h"
 #include "model/Profiles.h"
 #include "schema/TVRHBA_BootBIOSService.h"
 #include "schema/TVRHBA_BootBIOSServiceAffectsFCPort.h"
@@ -38,7 +38,6 @@ namespace
 constexpr std::uint16_t enabled = 2; // CIM_EnabledLogicalElement.EnabledState
 constexpr std::uint16_t ok = 2;      // CIM_ManagedSystemElement.OperationalStatus
 constexpr std::uint16_t healthy = 5; // CIM_ManagedSystemElement.HealthState
-constexpr std::uint16_t manages = 5; // CIM_ServiceAffectsElement.ElementEffects
 
 /// What an element that the computer system hosts is keyed by, and that it is at work.
 template <class Element> Ref<Element> makeHosted(const HostContext& host, const String& name)
@@ -54,22 +53,16 @@ template <class Element> Ref<Element> makeHosted(const HostContext& host, const 
     return element;
 }
 
+/// A refused association ends the step.
+std::uint32_t statusOf(Joined joined)
+{
+    return joined == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
+}
+
 template <class Hosting, class Element>
 std::uint32_t host(const HostContext& by, const Element* element, const LogText& refused)
 {
-    const Joined hosted =
-        join<Hosting>(by.agent, &Hosting::Antecedent, by.system, &Hosting::Dependent, element, refused);
-    return hosted == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
-}
-
-/// Says that a service affects an element; one that is absent is not affected.
-template <class Affects, class Service, class Element>
-std::uint32_t affect(ProviderAgent& agent, const Service* service, const Element* element, const LogText& refused)
-{
-    const Joined affected =
-        join<Affects>(agent, &Affects::AffectingElement, service, &Affects::AffectedElement, element, refused,
-                      [](Affects& affects) { affects.ElementEffects.set({manages}); });
-    return affected == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
+    return statusOf(join<Hosting>(by.agent, &Hosting::Antecedent, by.system, &Hosting::Dependent, element, refused));
 }
 
 struct ServiceRow
@@ -79,7 +72,7 @@ struct ServiceRow
     const char* description;
 };
 
-/// Makes a service and has the computer system host it; null where that fails.
+/// Makes a service that the computer system hosts.
 template <class Hosting, class Service>
 std::uint32_t start(HostContext& by, Service*& service, const ServiceRow& row, const LogText& refused,
                     const LogText& notHosted)
@@ -125,20 +118,18 @@ std::uint32_t createInstallationCapabilities(HostContext& on)
         return BUILD_FAILED;
     using Has = TVRHBA_ElementCapabilities;
     constexpr std::uint16_t current = 3;
-    const Joined joined = join<Has>(on.agent, &Has::ManagedElement, on.installationService, &Has::Capabilities,
-                                    capabilities, "Insert Failed : m_TVRHBA_ElementCapabilities_map",
-                                    [](Has& has) { has.Characteristics.set({current}); });
-    return joined == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
+    return statusOf(join<Has>(on.agent, &Has::ManagedElement, on.installationService, &Has::Capabilities, capabilities,
+                              "Insert Failed : m_TVRHBA_ElementCapabilities_map",
+                              [](Has& has) { has.Characteristics.set({current}); }));
 }
 
 std::uint32_t conformToSoftwareUpdate(HostContext& on)
 {
     using Conforms = TVRHBA_InstallServiceConformsToProfile;
-    const Joined conforms =
-        join<Conforms>(on.agent, &Conforms::ConformantStandard,
-                       createRegisteredProfile(on, profileRow("Software Update")), &Conforms::ManagedElement,
-                       on.installationService, "Insert Failed : m_TVRHBA_InstallServiceConformsToProfile_map");
-    return conforms == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
+    return statusOf(join<Conforms>(on.agent, &Conforms::ConformantStandard,
+                                   createRegisteredProfile(on, profileRow("Software Update")),
+                                   &Conforms::ManagedElement, on.installationService,
+                                   "Insert Failed : m_TVRHBA_InstallServiceConformsToProfile_map"));
 }
 
 // --- remote access point
@@ -170,8 +161,8 @@ std::uint32_t createSoftwareInstallationService(HostContext& on)
     if (status == BUILD_DONE)
         status = createInstallationCapabilities(on);
     if (status == BUILD_DONE)
-        status = affect<TVRHBA_InstallServiceAffectsSystem>(on.agent, on.installationService, on.system,
-                                                            "Insert Failed : m_TVRHBA_InstallServiceAffectsSystem_map");
+        status = statusOf(affect<TVRHBA_InstallServiceAffectsSystem>(
+            on.agent, on.installationService, on.system, "Insert Failed : m_TVRHBA_InstallServiceAffectsSystem_map"));
     return status == BUILD_DONE ? conformToSoftwareUpdate(on) : status;
 }
 
@@ -184,8 +175,8 @@ std::uint32_t createWWNService(HostContext& on)
         "Insert Failed : m_TVRHBA_FCHBAWWNService_map", "Insert Failed : m_TVRHBA_HostedFCHBAWWNService_map");
     if (status != BUILD_DONE)
         return status;
-    return affect<TVRHBA_FCHBAWWNServiceAffectsSystem>(on.agent, on.wwnService, on.system,
-                                                       "Insert Failed : m_TVRHBA_FCHBAWWNServiceAffectsSystem_map");
+    return statusOf(affect<TVRHBA_FCHBAWWNServiceAffectsSystem>(
+        on.agent, on.wwnService, on.system, "Insert Failed : m_TVRHBA_FCHBAWWNServiceAffectsSystem_map"));
 }
 
 std::uint32_t createFCTagService(HostContext& on)
@@ -206,8 +197,8 @@ std::uint32_t createBootBIOSService(HostContext& on)
         "Insert Failed : m_TVRHBA_BootBIOSService_map", "Insert Failed : m_TVRHBA_HostedBootBIOSService_map");
     if (status != BUILD_DONE)
         return status;
-    return affect<TVRHBA_BootBIOSServiceAffectsSystem>(on.agent, on.bootService, on.system,
-                                                       "Insert Failed : m_TVRHBA_BootBIOSServiceAffectsSystem_map");
+    return statusOf(affect<TVRHBA_BootBIOSServiceAffectsSystem>(
+        on.agent, on.bootService, on.system, "Insert Failed : m_TVRHBA_BootBIOSServiceAffectsSystem_map"));
 }
 
 std::uint32_t createDriverParameterService(HostContext& on)

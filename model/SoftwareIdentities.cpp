@@ -1,7 +1,7 @@
 #include "model/SoftwareIdentities.h"
 
-#include "agent/Build.h"
 #include "device/Data.h"
+#include "model/Affects.h"
 #include "model/SoftwareVersion.h"
 #include "schema/TVRHBA_ElementSoftwareIdentity.h"
 #include "schema/TVRHBA_FCDriverServiceAffectsDriver.h"
@@ -235,15 +235,6 @@ void conformToSoftwareInventory(const PortContext& port, const Identity* identit
                    &Conforms::ManagedElement, identity, "Insert Failed : m_TVRHBA_SoftwareConformsToProfile_map");
 }
 
-void affectByInstallation(const HostContext& host, const Identity* identity)
-{
-    using Affects = TVRHBA_InstallServiceAffectsFirmwareIdentity;
-    constexpr std::uint16_t manages = 5;
-    join<Affects>(host.agent, &Affects::AffectingElement, host.installationService, &Affects::AffectedElement, identity,
-                  "Insert Failed : m_TVRHBA_InstallServiceAffectsFirmwareIdentity_map",
-                  [](Affects& affects) { affects.ElementEffects.set({manages}); });
-}
-
 /// The table of tags is kept by the firmware that the adapter runs.
 void tieToTagService(const HostContext& host, const Identity* identity)
 {
@@ -274,11 +265,8 @@ std::uint32_t createDriverSoftwareIdentities(HostContext& host)
         if (!host.driverIdentity)
             host.driverIdentity = identity;
         installOnSystem(host, identity);
-        using Affects = TVRHBA_FCDriverServiceAffectsDriver;
-        constexpr std::uint16_t manages = 5;
-        join<Affects>(agent, &Affects::AffectingElement, host.parameterService, &Affects::AffectedElement, identity,
-                      "Insert Failed : m_TVRHBA_FCDriverServiceAffectsDriver_map",
-                      [](Affects& affects) { affects.ElementEffects.set({manages}); });
+        affect<TVRHBA_FCDriverServiceAffectsDriver>(agent, host.parameterService, identity,
+                                                    "Insert Failed : m_TVRHBA_FCDriverServiceAffectsDriver_map");
     }
     return BUILD_DONE;
 }
@@ -302,7 +290,9 @@ std::uint32_t createPortSoftwareIdentities(PortContext& port)
         else
             tieAsSoftware(port, identity, row.status);
         conformToSoftwareInventory(port, identity);
-        affectByInstallation(host, identity);
+        affect<TVRHBA_InstallServiceAffectsFirmwareIdentity>(
+            host.agent, host.installationService, identity,
+            "Insert Failed : m_TVRHBA_InstallServiceAffectsFirmwareIdentity_map");
         if (row.status == current)
             tieToTagService(host, identity);
     }

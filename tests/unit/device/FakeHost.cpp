@@ -361,7 +361,8 @@ template <class Function> void* address(Function* function)
 /// All functions of the fake by the name that the program looks up first.
 const std::map<std::string, void*>& symbols()
 {
-    static const std::map<std::string, void*> all = {
+    // Never destroyed: what the C library needs to destroy it at the end is an allocation that may fail unseen.
+    static const auto& all = *new std::map<std::string, void*>{
         {"LRM_GetHBAAttributes", address(LRM_GetHBAAttributes)},
         {"LRM_GetPortAttributes", address(LRM_GetPortAttributes)},
         {"LRM_GetPortStatistics", address(LRM_GetPortStatistics)},
@@ -445,7 +446,6 @@ int closeFile(void* library)
 FakeHost::FakeHost()
     : _previous(cimple::setDynamicLoader({openFile, findSymbol, closeFile, [] { return "fake error"; }}))
 {
-    symbols(); // made now, and not where a test has memory run out
     host = this;
 }
 
