@@ -60,6 +60,11 @@ public:
         _current->add_flag("--all", _command.all, help);
         return *this;
     }
+    CommandOptions& output(const char* help)
+    {
+        _current->add_option("--output", _command.output, help);
+        return *this;
+    }
     CommandOptions& associationClass(const char* option)
     {
         _current->add_option(option, _command.filter.assocClass, "association class");
@@ -108,7 +113,11 @@ void addCommands(CommandOptions& options)
     options.add("create", "create an instance").className().assignments(false);
     options.add("delete", "delete an instance").path();
     options.add("call", "call a method").path().method().assignments(false);
-    options.add("host", "show the host and its adapters as a tree");
+    options.add("host", "show the host, its adapters and what they reach as a tree")
+        .all("list each target and unit, however many");
+    options.add("topology", "draw cards, ports, targets and units as a graph for graphviz")
+        .all("draw each target and unit, however many")
+        .output("write FILE.dot, or a picture FILE.svg, .png or .pdf by graphviz");
 }
 
 std::vector<std::string> serverNames()

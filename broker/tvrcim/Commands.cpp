@@ -1,12 +1,16 @@
 #include "broker/tvrcim/Commands.h"
 
+#include "broker/tvrcim/Graphviz.h"
 #include "broker/tvrcim/HostReport.h"
+#include "broker/tvrcim/Topology.h"
 #include "broker/values/PathText.h"
 
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <array>
+#include <filesystem>
+#include <fstream>
 
 namespace tvrcim
 {
@@ -185,13 +189,46 @@ void call(Session& session, const Command& command)
     printMethodReply(session.out, session.format, checked(session.broker.invokeMethod(path, method->name, in)));
 }
 
-void showHost(Session& session, const Command&)
+void showHost(Session& session, const Command& command)
 {
     const HostReport report(session.broker, session.nameSpace);
     if (session.format == Format::json)
         printJson(session.out, report.json());
     else
-        report.print(session.out);
+        report.print(session.out, {.colour = session.colour, .all = command.all});
+}
+
+/// Graphviz's name of the format that a file name ends in.
+std::string pictureFormat(const std::string& file)
+{
+    static constexpr std::array<std::array<const char*, 2>, 5> formats{
+        {{".dot", "dot"}, {".gv", "dot"}, {".svg", "svg"}, {".png", "png"}, {".pdf", "pdf"}}};
+    const std::string ending = std::filesystem::path(file).extension();
+    const auto* row = std::ranges::find_if(formats, [&](const auto& format) { return ending == format[0]; });
+    if (row == formats.end())
+        throw UsageError("--output: '" + file + "' does not end in .dot, .gv, .svg, .png or .pdf");
+    return (*row)[1];
+}
+
+void writeFile(const std::string& name, const std::string& content)
+{
+    std::ofstream file(name, std::ios::binary);
+    file << content;
+    file.close();
+    if (!file)
+        throw UsageError("--output: cannot write '" + name + "'");
+}
+
+void drawTopology(Session& session, const Command& command)
+{
+    if (session.format != Format::table)
+        throw UsageError("--format: a picture is none of table, json or mof; --output says its format");
+    const std::string format = command.output.empty() ? "dot" : pictureFormat(command.output);
+    const std::string dot = topologyDot(HostReport(session.broker, session.nameSpace).root(), command.all);
+    if (command.output.empty())
+        session.out << dot;
+    else
+        writeFile(command.output, format == "dot" ? dot : drawnByGraphviz(dot, format));
 }
 
 struct CommandRow
@@ -200,7 +237,7 @@ struct CommandRow
     void (*run)(Session& session, const Command& command);
 };
 
-constexpr std::array<CommandRow, 11> commands{{
+constexpr std::array<CommandRow, 12> commands{{
     {"classes", listClasses},
     {"class", showClass},
     {"enum", enumerate},
@@ -212,6 +249,7 @@ constexpr std::array<CommandRow, 11> commands{{
     {"delete", remove},
     {"call", call},
     {"host", showHost},
+    {"topology", drawTopology},
 }};
 
 } // namespace

@@ -37,6 +37,7 @@ struct Command
     broker::AssociationFilter filter = {};
     bool names = false;
     bool all = false;
+    std::string output = {}; ///< a file
 };
 
 /// Where a command works and how it prints.
@@ -46,6 +47,7 @@ struct Session
     std::string nameSpace;
     Format format;
     std::ostream& out;
+    bool colour = false; ///< what is wrong may be in colour
 };
 
 /// Runs a command and prints its result. Throws UsageError or CimError.

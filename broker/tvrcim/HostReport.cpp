@@ -1,15 +1,15 @@
 #include "broker/tvrcim/HostReport.h"
 
-#include "broker/tvrcim/Commands.h"
+#include "broker/tvrcim/HostGraph.h"
 #include "broker/tvrcim/Printing.h"
-#include "broker/values/PathText.h"
+#include "broker/tvrcim/ReadableText.h"
+#include "broker/values/ValueText.h"
 
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
-#include <array>
-#include <cstdio>
 #include <map>
+#include <set>
 
 namespace tvrcim
 {
@@ -19,234 +19,218 @@ using namespace broker;
 namespace
 {
 
-enum class Show
-{
-    plain,
-    hexadecimal,
-};
+// --- from the elements to the tree ------------------------------------------------------------------------------
 
-/// A property that a node shows, under a label for people.
-struct FactRow
+/// DeviceID of a unit is initiator, target, designator and number of the unit with underscores between.
+std::string identityOfUnit(const Object& unit)
 {
-    const char* label;
-    const char* property;
-    Show show = Show::plain;
-};
-
-/// How the elements of one class appear.
-struct KindRow
-{
-    const char* className;
-    const char* kind;
-    const char* nameProperty;
-    std::vector<FactRow> facts;
-};
-
-const std::array<KindRow, 5> kinds{{
-    {"TVRHBA_Product",
-     "Product",
-     "Name",
-     {{"description", "Description"},
-      {"vendor", "Vendor"},
-      {"serial number", "IdentifyingNumber"},
-      {"hardware version", "Version"}}},
-    {"TVRHBA_Card",
-     "Card",
-     "ElementName",
-     {{"model", "Model"},
-      {"part number", "PartNumber"},
-      {"serial number", "SerialNumber"},
-      {"version", "Version"},
-      {"SLI mode", "SLIMode"}}},
-    {"TVRHBA_Chip",
-     "Chip",
-     "ElementName",
-     {{"tag", "Tag"},
-      {"temperature", "BoardTemperature"},
-      {"warning at", "ThresholdWarningTemp"},
-      {"critical at", "ThresholdCriticalTemp"},
-      {"unit", "TemperatureUnit"}}},
-    {"TVRHBA_PhysicalConnector", "Connector", "ElementName", {{"WWPN", "Tag"}, {"port", "OtherIdentifyingInfo"}}},
-    {"TVRHBA_PCIDevice",
-     "PCI device",
-     "DeviceID",
-     {{"element", "ElementName"},
-      {"bus", "BusNumber"},
-      {"function", "FunctionNumber"},
-      {"vendor", "VendorID", Show::hexadecimal},
-      {"subsystem", "SubsystemID", Show::hexadecimal},
-      {"revision", "RevisionID"}}},
-}};
-
-std::string factText(const Object& object, const FactRow& row)
-{
-    const Value& value = object.get(row.property);
-    if (row.show == Show::hexadecimal && !value.isNull())
-    {
-        std::array<char, 32> text{};
-        std::snprintf(text.data(), text.size(), "0x%04llX", static_cast<unsigned long long>(value.asUnsigned()));
-        return text.data();
-    }
-    return value.isNull() ? std::string() : oneLine(valueText(value));
+    const Value& id = unit.get("DeviceID");
+    const std::string text = id.isNull() ? "" : valueText(id);
+    const std::size_t initiator = text.find('_');
+    const std::size_t target = initiator == std::string::npos ? initiator : text.find('_', initiator + 1);
+    return target == std::string::npos ? text : text.substr(target + 1);
 }
 
-HostNode describe(const KindRow& row, const Object& object, const char* association)
+HostNode describe(const Element& element, const char* association)
 {
-    HostNode node{row.kind, oneLine(valueText(object.get(row.nameProperty))), association};
-    for (const FactRow& fact : row.facts)
-        if (std::string text = factText(object, fact); !text.empty())
-            node.facts.emplace_back(fact.label, std::move(text));
+    const KindRow& kind = *element.kind;
+    const Value& name = element.object.get(kind.nameProperty);
+    HostNode node{kind.name, name.isNull() ? "" : oneLine(valueText(name)), association};
+    for (const FactRow& row : kind.facts)
+        if (const std::string text = row.text(element.object, row); !text.empty())
+            node.facts.push_back({row.label, oneLine(text), row.place});
+    if (kind.problems)
+        node.problems = kind.problems(element.object);
+    if (kind.appears == Appears::unit)
+    {
+        const Value& capacity = element.object.get("Capacity");
+        node.identity = identityOfUnit(element.object);
+        node.isUnit = true;
+        node.units = 1;
+        node.bytes = capacity.isNull() || integerBits(capacity.type()) == 0 ? 0 : capacity.asUnsigned();
+    }
     return node;
 }
 
-/// The elements of the host by class, and what the associations say about them.
-class Host
+/// Makes the nodes of elements, each once: the first way that leads to an element is that on which it is shown.
+class TreeMaker
 {
 public:
-    Host(Broker& broker, const std::string& nameSpace) : _broker(broker), _nameSpace(nameSpace)
-    {
-        for (const KindRow& row : kinds)
-            _objects[row.className] = enumerate(row.className);
-    }
+    explicit TreeMaker(HostGraph& graph) : _graph(graph) {}
 
-    std::vector<Object> enumerate(const std::string& className)
+    HostNode tree()
     {
-        Reply reply = _broker.enumerateInstances(_nameSpace, className);
-        if (!reply.ok())
-            throw CimError(reply);
-        return std::move(reply.objects);
-    }
-
-    const std::vector<Object>& all(const KindRow& row) const { return _objects.at(row.className); }
-
-    /// Paths at the other end of an association.
-    std::vector<Path> associated(const Path& path, const char* association)
-    {
-        NamesReply reply = _broker.associatorNames(path, {.assocClass = association});
-        if (!reply.ok())
-            throw CimError(reply);
-        return std::move(reply.paths);
-    }
-
-    /// Nodes of the elements of one kind that an association joins to a path.
-    std::vector<HostNode> nodes(const KindRow& row, const Path& path, const char* association,
-                                std::vector<HostNode> (Host::*children)(const Object& object) = nullptr)
-    {
-        std::vector<HostNode> result;
-        for (const Path& other : associated(path, association))
-        {
-            const std::vector<Object>& objects = all(row);
-            const auto found = std::find_if(objects.begin(), objects.end(),
-                                            [&](const Object& object) { return sameObject(object.path, other); });
-            if (found == objects.end())
-                continue;
-            result.push_back(describe(row, *found, association));
-            if (children)
-                result.back().children = (this->*children)(*found);
-        }
-        return result;
-    }
-
-    std::vector<HostNode> connectorsOf(const Object& card)
-    {
-        std::vector<HostNode> result = nodes(kinds[3], card.path, "TVRHBA_CardContainsConnector");
-        const std::vector<Path> paths = associated(card.path, "TVRHBA_CardContainsConnector");
-        for (std::size_t i = 0; i < std::min(result.size(), paths.size()); ++i)
-        {
-            for (const Path& chip : associated(paths[i], "TVRHBA_ConnectorDependsOnChip"))
-            {
-                const Value* tag = chip.key("Tag");
-                result[i].facts.emplace_back("depends on chip", tag ? valueText(*tag) : pathText(chip));
-            }
-        }
-        return result;
-    }
-
-    std::vector<HostNode> partsOfCard(const Object& card)
-    {
-        std::vector<HostNode> result = nodes(kinds[2], card.path, "TVRHBA_CardContainsChip");
-        std::vector<HostNode> connectors = connectorsOf(card);
-        std::move(connectors.begin(), connectors.end(), std::back_inserter(result));
-        return result;
-    }
-
-    std::vector<HostNode> partsOfProduct(const Object& product)
-    {
-        return nodes(kinds[1], product.path, "TVRHBA_ProductPhysicalComponent", &Host::partsOfCard);
+        HostNode root = describe(_graph.host(), "");
+        if (root.name.empty())
+            root.name = "(none that an adapter belongs to)";
+        addParts(root, _graph.host());
+        // What nothing leads to stands directly under the host; containers come first and take their contents along.
+        for (const KindRow& kind : kinds())
+            for (const Element& element : _graph.elements())
+                if (element.kind == &kind && &element != &_graph.host())
+                    add(root, element, "");
+        std::ranges::stable_sort(root.children, {}, [](const HostNode& node) { return &kindNamed(node.kind); });
+        return root;
     }
 
 private:
-    Broker& _broker;
-    std::string _nameSpace;
-    std::map<std::string, std::vector<Object>> _objects;
+    void add(HostNode& parent, const Element& element, const char* association)
+    {
+        if (!_shown.insert(&element).second)
+            return;
+        if (element.kind->appears == Appears::through)
+            return addParts(parent, element);
+        HostNode node = describe(element, association);
+        addParts(node, element);
+        if (element.kind->appears == Appears::summed)
+            node.facts.push_back({"contents", unitsText(node), inLine | pictured});
+        parent.units += node.units;
+        parent.bytes += node.bytes;
+        parent.children.push_back(std::move(node));
+    }
+
+    void addParts(HostNode& node, const Element& element)
+    {
+        for (const Part& part : element.parts)
+            add(node, *part.element, part.association);
+    }
+
+    HostGraph& _graph;
+    std::set<const Element*> _shown;
 };
 
-std::string keyText(const Path& path, const char* key)
+std::string contentsText(const std::deque<Element>& elements)
 {
-    const Value* value = path.key(key);
-    return value ? oneLine(valueText(*value)) : pathText(path);
+    std::map<const KindRow*, std::size_t> counts; // in the order of the table
+    for (const KindRow& kind : kinds())
+        if (kind.className && kind.appears != Appears::through)
+            counts[&kind] = 0;
+    for (const Element& element : elements)
+        if (const auto count = counts.find(element.kind); count != counts.end())
+            ++count->second;
+    std::string text;
+    for (const auto& [kind, count] : counts)
+        if (count > 0)
+            text += (text.empty() ? "" : ", ") + countText(count, inSentence(kind->name).c_str(), kind->plural);
+    return text.empty() ? "nothing" : text;
 }
 
-/// The computer system that the PCI devices belong to, with the chassis that holds the cards.
-HostNode computerSystem(Host& host)
+void collectProblems(const HostNode& node, std::vector<HostFact>& facts)
 {
-    HostNode node{"Computer system", "(none that an adapter belongs to)", ""};
-    for (const Object& device : host.enumerate("TVRHBA_SystemDevice"))
-    {
-        const Value& system = device.get("GroupComponent");
-        if (system.type() == CMPI_ref && !system.isNull())
-        {
-            node.name = keyText(system.asPath(), "Name");
-            node.facts.emplace_back("class", system.asPath().className);
-            node.facts.emplace_back("namespace", system.asPath().nameSpace);
-            break;
-        }
-    }
-    for (const Object& containment : host.enumerate("TVRHBA_ChassisContainsCard"))
-    {
-        const Value& chassis = containment.get("GroupComponent");
-        if (chassis.type() == CMPI_ref && !chassis.isNull())
-        {
-            node.facts.emplace_back("chassis", keyText(chassis.asPath(), "Tag"));
-            break;
-        }
-    }
-    return node;
-}
-
-std::string countText(std::size_t count, const char* singular)
-{
-    return std::to_string(count) + " " + singular + (count == 1 ? "" : "s");
-}
-
-/// One line of a tree: `first` in front of the node's own line, `rest` in front of all that follows it.
-void printNode(std::ostream& out, const HostNode& node, const std::string& first, const std::string& rest)
-{
-    constexpr std::size_t associationColumn = 72;
-    std::string line = first + node.kind + "  " + node.name;
-    if (!node.association.empty())
-        line = padded(line, associationColumn) + "  " + node.association;
-    out << line << '\n';
-    std::size_t width = 0;
-    for (const auto& [label, text] : node.facts)
-        width = std::max(width, label.size());
-    const std::string stem = rest + (node.children.empty() ? "    " : "│   ");
-    for (const auto& [label, text] : node.facts)
-        out << stem << padded(label, width) << "  " << text << '\n';
+    for (const std::string& problem : node.problems)
+        facts.push_back({"attention", node.kind + " " + node.name + ": " + problem, isProblem});
     for (const HostNode& child : node.children)
-    {
-        const bool last = &child == &node.children.back();
-        printNode(out, child, rest + (last ? "└── " : "├── "), rest + (last ? "    " : "│   "));
-    }
+        collectProblems(child, facts);
 }
+
+// --- many of one sort ---------------------------------------------------------------------------------------------
+
+/// Targets of a port, and units of a target, that are listed; more than that are counted.
+constexpr std::size_t listedTargets = 64;
+constexpr std::size_t listedUnits = 8;
+
+bool isTarget(const HostNode& node)
+{
+    return node.kind == targetKind;
+}
+
+bool isUnit(const HostNode& node)
+{
+    return node.isUnit;
+}
+
+/// Puts one node in the place of those of a sort, where they are too many. Whether it did.
+bool fold(HostNode& node, bool (*isOfSort)(const HostNode&), std::size_t limit, const char* sort)
+{
+    std::vector<HostNode>& children = node.children;
+    const auto first = std::ranges::find_if(children, isOfSort);
+    const auto count = static_cast<std::size_t>(std::ranges::count_if(children, isOfSort));
+    if (count <= limit)
+        return false;
+    const std::ptrdiff_t place = first - children.begin();
+    HostNode sum{sort, std::to_string(count)};
+    for (const HostNode& child : children)
+        if (isOfSort(child))
+        {
+            sum.units += child.units;
+            sum.bytes += child.bytes;
+        }
+    sum.facts.push_back({"contents", unitsText(sum), inLine});
+    children.erase(std::remove_if(first + 1, children.end(), isOfSort), children.end());
+    if (isTarget(node)) // which has the sum in its own line
+        children.erase(children.begin() + place);
+    else
+        children[static_cast<std::size_t>(place)] = std::move(sum);
+    return true;
+}
+
+bool foldBelow(HostNode& node)
+{
+    bool folded = fold(node, isTarget, listedTargets, "Targets");
+    folded = fold(node, isUnit, listedUnits, "Units") || folded;
+    for (HostNode& child : node.children)
+        folded = foldBelow(child) || folded;
+    return folded;
+}
+
+// --- printing ---------------------------------------------------------------------------------------------------
+
+class TreePrinter
+{
+public:
+    TreePrinter(std::ostream& out, bool colour) : _out(out), _colour(colour) {}
+
+    /// `first` in front of the node's own line, `rest` in front of all that follows it.
+    void print(const HostNode& node, const std::string& first, const std::string& rest)
+    {
+        _out << first << node.kind << "  " << node.name;
+        for (const std::string& problem : node.problems)
+            _out << "  " << warning(problem);
+        std::string line;
+        for (const std::string& text : factTexts(node, inLine))
+            line += (line.empty() ? "  " : ", ") + text;
+        _out << line << '\n';
+        printFacts(node, rest + (node.children.empty() ? "    " : "│   "));
+        for (const HostNode& child : node.children)
+        {
+            const bool last = &child == &node.children.back();
+            print(child, rest + (last ? "└── " : "├── "), rest + (last ? "    " : "│   "));
+        }
+    }
+
+private:
+    void printFacts(const HostNode& node, const std::string& stem)
+    {
+        std::size_t width = 0;
+        for (const HostFact& fact : node.facts)
+            if (!(fact.place & inLine))
+                width = std::max(width, fact.label.size());
+        for (const HostFact& fact : node.facts)
+            if (!(fact.place & inLine))
+                _out << stem << padded(fact.label, width) << "  "
+                     << (fact.place & isProblem ? warning(fact.text) : fact.text) << '\n';
+    }
+
+    std::string warning(const std::string& text) const { return _colour ? "\x1b[1;31m" + text + "\x1b[0m" : text; }
+
+    std::ostream& _out;
+    bool _colour;
+};
 
 Json toJson(const HostNode& node)
 {
     Json json{{"kind", node.kind}, {"name", node.name}};
     if (!node.association.empty())
         json["association"] = node.association;
-    for (const auto& [label, text] : node.facts)
-        json["facts"][label] = text;
+    for (const HostFact& fact : node.facts)
+    {
+        if (fact.place & isProblem)
+            json[fact.label].push_back(fact.text);
+        else
+            json["facts"][fact.label] = fact.text;
+    }
+    for (const std::string& problem : node.problems)
+        json["problems"].push_back(problem);
     for (const HostNode& child : node.children)
         json["parts"].push_back(toJson(child));
     return json;
@@ -256,32 +240,24 @@ Json toJson(const HostNode& node)
 
 HostReport::HostReport(Broker& broker, const std::string& nameSpace)
 {
-    Host host(broker, nameSpace);
-    _root = computerSystem(host);
-    std::string summary;
-    for (const KindRow& row : kinds)
-    {
-        std::string kind = row.kind;
-        std::transform(kind.begin(), kind.begin() + 1, kind.begin(),
-                       [&](char c) { return kind.starts_with("PCI") ? c : static_cast<char>(std::tolower(c)); });
-        summary += (summary.empty() ? "" : ", ") + countText(host.all(row).size(), kind.c_str());
-    }
-    _root.facts.emplace_back("contents", summary);
-    for (const Object& product : host.all(kinds[0]))
-    {
-        _root.children.push_back(describe(kinds[0], product, ""));
-        _root.children.back().children = host.partsOfProduct(product);
-    }
-    for (const Object& device : host.all(kinds[4]))
-    {
-        const bool joined = !host.associated(device.path, "TVRHBA_SystemDevice").empty();
-        _root.children.push_back(describe(kinds[4], device, joined ? "TVRHBA_SystemDevice" : ""));
-    }
+    HostGraph graph(broker, nameSpace);
+    _root = TreeMaker(graph).tree();
+    _root.facts.push_back({"contents", contentsText(graph.elements())});
+    for (const std::string& failure : graph.failures())
+        _root.facts.push_back({"attention", failure, isProblem});
+    for (const HostNode& child : _root.children)
+        collectProblems(child, _root.facts);
 }
 
-void HostReport::print(std::ostream& out) const
+void HostReport::print(std::ostream& out, const TreeStyle& style) const
 {
-    printTree(out, _root);
+    if (style.all)
+        return printTree(out, _root, style.colour);
+    HostNode folded = _root;
+    const bool hasFolded = foldBelow(folded);
+    printTree(out, folded, style.colour);
+    if (hasFolded)
+        out << "(--all lists each target and unit)\n";
 }
 
 Json HostReport::json() const
@@ -289,9 +265,25 @@ Json HostReport::json() const
     return toJson(_root);
 }
 
-void printTree(std::ostream& out, const HostNode& root)
+void printTree(std::ostream& out, const HostNode& root, bool colour)
 {
-    printNode(out, root, "", "");
+    TreePrinter(out, colour).print(root, "", "");
+}
+
+std::string unitsText(const HostNode& node)
+{
+    return countText(node.units, "unit", "units") + (node.bytes ? ", " + sizeText(node.bytes) : "");
+}
+
+std::vector<std::string> factTexts(const HostNode& node, Place place)
+{
+    std::vector<std::string> texts;
+    const auto isSaid = [&](const std::string& text)
+    { return std::ranges::any_of(node.problems, [&](const std::string& problem) { return sameName(problem, text); }); };
+    for (const HostFact& fact : node.facts)
+        if (fact.place & place && !isSaid(fact.text))
+            texts.push_back((fact.place & labelled ? fact.label + " " : "") + fact.text);
+    return texts;
 }
 
 } // namespace tvrcim

@@ -2,34 +2,54 @@
 #pragma once
 
 #include "broker/core/Broker.h"
+#include "broker/tvrcim/HostKinds.h"
 #include "broker/values/Json.h"
 
+#include <cstdint>
 #include <ostream>
 #include <string>
-#include <utility>
 #include <vector>
 
 namespace tvrcim
 {
+
+struct HostFact
+{
+    std::string label;
+    std::string text;
+    unsigned place = below;
+};
 
 /// An element of the host.
 struct HostNode
 {
     std::string kind; ///< "Card", "Chip", ...
     std::string name;
-    std::string association; ///< class of the association that leads here from the parent
-    std::vector<std::pair<std::string, std::string>> facts = {};
+    std::string association = {}; ///< class of the association that leads here from the parent
+    std::vector<HostFact> facts = {};
+    std::vector<std::string> problems = {};
     std::vector<HostNode> children = {};
+    std::string identity = {}; ///< of a unit: what it has in common with itself behind another port
+    bool isUnit = false;
+    std::uint64_t units = 0; ///< at it and below
+    std::uint64_t bytes = 0; ///< what these hold
+};
+
+/// How a tree is printed.
+struct TreeStyle
+{
+    bool colour = false;
+    bool all = false; ///< each target and unit, not their numbers where they are many
 };
 
 class HostReport
 {
 public:
-    /// Asks the broker. Throws CimError when an enumeration fails.
+    /// Asks the broker. Throws CimError when it answers nothing.
     HostReport(broker::Broker& broker, const std::string& nameSpace);
 
     const HostNode& root() const { return _root; }
-    void print(std::ostream& out) const;
+    void print(std::ostream& out, const TreeStyle& style) const;
     broker::Json json() const;
 
 private:
@@ -37,6 +57,11 @@ private:
 };
 
 /// A node with its facts in aligned columns and its children as branches.
-void printTree(std::ostream& out, const HostNode& root);
+void printTree(std::ostream& out, const HostNode& root, bool colour = false);
+
+/// "2 units, 600 GiB"
+std::string unitsText(const HostNode& node);
+/// The facts at a place, with their labels where these belong to them; not what a problem says already.
+std::vector<std::string> factTexts(const HostNode& node, Place place);
 
 } // namespace tvrcim

@@ -2,6 +2,7 @@
 
 #include "broker/values/PathText.h"
 #include "broker/values/QualifierText.h"
+#include "broker/values/Utf8.h"
 
 #include <nlohmann/json.hpp>
 
@@ -47,6 +48,17 @@ void printColumns(std::ostream& out, const std::vector<Object>& objects, const s
         table.add(std::move(row));
     }
     table.print(out);
+}
+
+/// Length of the character of several bytes at the head; 0 if there is none, or one that controls terminals.
+std::size_t printableCharacter(std::string_view text)
+{
+    constexpr unsigned char controlLead = 0xC2;
+    constexpr unsigned char firstPrintable = 0xA0;
+    const std::size_t length = longCharacter(text);
+    const bool isControl = length == 2 && static_cast<unsigned char>(text[0]) == controlLead &&
+                           static_cast<unsigned char>(text[1]) < firstPrintable;
+    return isControl ? 0 : length;
 }
 
 std::string typeOf(const FeatureInfo& feature)
@@ -111,16 +123,18 @@ std::string padded(const std::string& text, std::size_t width)
 std::string oneLine(const std::string& text)
 {
     std::string result;
-    for (const char c : text)
+    for (std::string_view rest = text; !rest.empty();)
     {
-        if (static_cast<unsigned char>(c) >= ' ' && c != '\x7f')
+        const auto c = static_cast<unsigned char>(rest.front());
+        const std::size_t length = c >= ' ' && c < 0x7f ? 1 : printableCharacter(rest);
+        if (length == 0)
         {
-            result += c;
-            continue;
+            std::array<char, 8> escape{};
+            std::snprintf(escape.data(), escape.size(), "\\x%02x", static_cast<unsigned>(c));
+            result += c == '\n' ? "\\n" : c == '\t' ? "\\t" : escape.data();
         }
-        std::array<char, 8> escape{};
-        std::snprintf(escape.data(), escape.size(), "\\x%02x", static_cast<unsigned>(static_cast<unsigned char>(c)));
-        result += c == '\n' ? "\\n" : c == '\t' ? "\\t" : escape.data();
+        result += rest.substr(0, length);
+        rest.remove_prefix(std::max<std::size_t>(length, 1));
     }
     return result;
 }

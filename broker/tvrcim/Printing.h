@@ -34,7 +34,8 @@ private:
 std::size_t displayWidth(const std::string& text);
 /// The text filled up with blanks on the right.
 std::string padded(const std::string& text, std::size_t width);
-/// Line breaks and other control characters as escapes, so that a value stays on its line.
+/// Line breaks and other control characters as escapes, so that a value stays on its line and does nothing to the
+/// terminal; bytes that are no UTF-8 too.
 std::string oneLine(const std::string& text);
 
 /// Instances: with `columns` a table of these properties, otherwise a block for each.

@@ -2,9 +2,13 @@
 #include "broker/tvrcim/CommandLine.h"
 #include "broker/tvrcim/Environment.h"
 
+#include <cstdlib>
 #include <exception>
 #include <iostream>
 #include <optional>
+#include <string_view>
+
+#include <unistd.h>
 
 namespace
 {
@@ -15,6 +19,14 @@ int report(const char* kind, const std::exception& error, int exitCode)
 {
     std::cerr << "tvrcim: " << kind << error.what() << '\n';
     return exitCode;
+}
+
+/// A terminal that shows colours, and nobody asked for none (no-color.org).
+bool wantsColour()
+{
+    const char* refusal = std::getenv("NO_COLOR");
+    const char* terminal = std::getenv("TERM");
+    return isatty(STDOUT_FILENO) && !(refusal && *refusal) && terminal && std::string_view(terminal) != "dumb";
 }
 
 /// Runs the command and tells why it failed, where it did.
@@ -52,7 +64,7 @@ int run(const Settings& settings)
     const UnloadedBySignal entrusted(signals, broker);
     if (!settings.platform.empty())
         broker::loadPlatformFile(broker.store(), broker.classes(), settings.platform);
-    Session session{broker, settings.nameSpace, settings.format, std::cout};
+    Session session{broker, settings.nameSpace, settings.format, std::cout, wantsColour()};
     int exitCode = runAndReport(session, settings.command, signals);
     std::cout.flush();
     broker.unload();

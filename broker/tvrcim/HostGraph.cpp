@@ -1,0 +1,189 @@
+#include "broker/tvrcim/HostGraph.h"
+
+#include "broker/tvrcim/Commands.h"
+#include "broker/values/ValueText.h"
+
+#include <algorithm>
+#include <set>
+
+namespace tvrcim
+{
+
+using namespace broker;
+
+namespace
+{
+
+/// One text for all paths of an instance, whatever the order of their keys. Namespaces are left out: classes of the
+/// module are the same instances in each.
+std::string pathId(const Path& path)
+{
+    std::vector<std::string> keys;
+    keys.reserve(path.keys.size());
+    for (const Property& key : path.keys)
+        keys.push_back(lowerCase(key.name) + quoteText(key.value.isNull() ? "" : valueText(key.value)));
+    std::sort(keys.begin(), keys.end());
+    std::string id = lowerCase(path.className);
+    for (const std::string& key : keys)
+        id += key;
+    return id;
+}
+
+bool isOf(const KindRow& kind, const Object& object)
+{
+    if (!kind.className || !sameName(kind.className, object.path.className))
+        return false;
+    if (kind.classification == 0)
+        return true;
+    const Value& list = object.get("Classifications");
+    return !list.isNull() && list.isArray() &&
+           std::ranges::any_of(list.asList(), [&](const Value& value)
+                               { return !value.isNull() && value.asUnsigned() == kind.classification; });
+}
+
+/// The middle of "initiator:target port:unit".
+std::string targetPort(const Path& endpoint)
+{
+    const Value* name = endpoint.key("Name");
+    const std::string text = name && !name->isNull() ? valueText(*name) : "";
+    const std::size_t first = text.find(':');
+    const std::size_t second = text.find(':', first + 1);
+    return second == std::string::npos ? text : text.substr(first + 1, second - first - 1);
+}
+
+bool sameKind(const Element& element, const char* name)
+{
+    return std::string_view(element.kind->name) == name;
+}
+
+/// Null for what is no reference.
+const Path* pathOf(const Value& value)
+{
+    return value.type() == CMPI_ref && !value.isNull() ? &value.asPath() : nullptr;
+}
+
+} // namespace
+
+HostGraph::HostGraph(Broker& broker, const std::string& nameSpace) : _broker(broker), _nameSpace(nameSpace)
+{
+    _elements.push_back({&kindNamed(hostKind), {}});
+    std::set<std::string> asked;
+    for (const KindRow& kind : kinds())
+        if (kind.className && asked.insert(kind.className).second)
+            takeElements(kind.className);
+    for (const EdgeRow& row : edges())
+        if (asked.insert(row.association).second)
+            takeParts(row.association);
+    findChassis();
+}
+
+/// What the broker answers, or an empty answer and a note of the failure.
+template <class Answer> Answer HostGraph::noted(const std::string& className, Answer answer)
+{
+    if (answer.ok())
+    {
+        _anyAnswered = true;
+        return answer;
+    }
+    const CimError error(answer);
+    if (!_anyAnswered)
+        throw error;
+    _failures.push_back(className + ": " + error.what());
+    return {};
+}
+
+void HostGraph::takeElements(const std::string& className)
+{
+    for (Object& object : noted(className, _broker.enumerateInstances(_nameSpace, className)).objects)
+    {
+        const auto kind = std::ranges::find_if(kinds(), [&](const KindRow& row) { return isOf(row, object); });
+        if (kind == kinds().end())
+            continue;
+        Element& element = _elements.emplace_back(Element{&*kind, std::move(object)});
+        _byPath.emplace(pathId(element.object.path), &element);
+    }
+}
+
+void HostGraph::takeParts(const std::string& association)
+{
+    const NamesReply reply = noted(association, _broker.enumerateInstanceNames(_nameSpace, association));
+    for (const EdgeRow& row : edges())
+        if (association == row.association)
+            for (const Path& path : reply.paths)
+                join(row, path);
+}
+
+/// Ends are told apart by their kinds. What is no element is the host, where a host is expected.
+void HostGraph::join(const EdgeRow& row, const Path& association)
+{
+    Element* whole = nullptr;
+    Element* part = nullptr;
+    const Path* other = nullptr;
+    for (const Property& key : association.keys)
+    {
+        const Path* path = pathOf(key.value);
+        Element* element = path ? find(*path) : nullptr;
+        if (!element)
+            other = path ? path : other;
+        else if (sameKind(*element, row.part))
+            part = element;
+        else if (sameKind(*element, row.whole))
+            whole = element;
+    }
+    if (!whole && other && sameKind(host(), row.whole))
+    {
+        whole = &host();
+        nameHost(*other);
+    }
+    if (!whole || !part)
+        return;
+    const Value* endpoint = row.target ? association.key(row.target) : nullptr;
+    if (const Path* path = endpoint ? pathOf(*endpoint) : nullptr)
+        whole = &targetOf(*whole, row.association, *path);
+    whole->parts.push_back({row.association, part});
+}
+
+Element* HostGraph::find(const Path& path) const
+{
+    const auto found = _byPath.find(pathId(path));
+    return found == _byPath.end() ? nullptr : found->second;
+}
+
+Element& HostGraph::targetOf(Element& initiator, const char* association, const Path& endpoint)
+{
+    const std::string port = targetPort(endpoint);
+    Element*& target = _targets[{&initiator, port}];
+    if (!target)
+    {
+        target = &_elements.emplace_back(Element{&kindNamed(targetKind), {{}, {{"Name", Value::string(port)}}}});
+        initiator.parts.push_back({association, target});
+    }
+    return *target;
+}
+
+void HostGraph::nameHost(const Path& path)
+{
+    Object& object = host().object;
+    if (object.has("Class"))
+        return;
+    const Value* name = path.key("Name");
+    object.set("Name", name ? *name : Value());
+    object.set("Class", Value::string(path.className));
+    object.set("NameSpace", Value::string(path.nameSpace));
+}
+
+/// The chassis belongs to the platform as the computer system does: associations alone tell of it.
+void HostGraph::findChassis()
+{
+    const char* containment = "TVRHBA_ChassisContainsCard";
+    for (const Path& association : noted(containment, _broker.enumerateInstanceNames(_nameSpace, containment)).paths)
+    {
+        const Value* end = association.key("GroupComponent");
+        const Path* chassis = end ? pathOf(*end) : nullptr;
+        const Value* tag = chassis ? chassis->key("Tag") : nullptr;
+        if (tag)
+            return host().object.set("Chassis", *tag);
+    }
+}
+
+} // namespace tvrcim

@@ -1,0 +1,69 @@
+// The elements of a host and what the associations between them say. Each class is asked for once, and the ends of the
+// associations are found by the texts of their paths: tens of thousands of units do not mean as many requests.
+#pragma once
+
+#include "broker/core/Broker.h"
+#include "broker/tvrcim/HostKinds.h"
+
+#include <deque>
+#include <map>
+#include <string>
+#include <unordered_map>
+#include <utility>
+#include <vector>
+
+namespace tvrcim
+{
+
+struct Element;
+
+struct Part
+{
+    const char* association;
+    Element* element;
+};
+
+struct Element
+{
+    const KindRow* kind;
+    broker::Object object;
+    std::vector<Part> parts = {};
+};
+
+class HostGraph
+{
+public:
+    /// Asks the broker. A class that cannot be enumerated is left out and told by failures(); throws CimError when that
+    /// is true of all.
+    HostGraph(broker::Broker& broker, const std::string& nameSpace);
+    HostGraph(const HostGraph&) = delete;
+    HostGraph& operator=(const HostGraph&) = delete;
+
+    /// The computer system; without a name when no adapter belongs to one.
+    Element& host() { return _elements.front(); }
+    /// The computer system and all others.
+    std::deque<Element>& elements() { return _elements; }
+    /// A class and a CIM status each.
+    const std::vector<std::string>& failures() const { return _failures; }
+
+private:
+    template <class Answer> Answer noted(const std::string& className, Answer answer);
+    void takeElements(const std::string& className);
+    void takeParts(const std::string& association);
+    void join(const EdgeRow& row, const broker::Path& association);
+    Element* find(const broker::Path& path) const;
+    /// The target behind an initiator that an endpoint is of, new or existing.
+    Element& targetOf(Element& initiator, const char* association, const broker::Path& endpoint);
+    void nameHost(const broker::Path& path);
+    void findChassis();
+
+    broker::Broker& _broker;
+    std::string _nameSpace;
+    std::deque<Element> _elements;
+    std::unordered_map<std::string, Element*> _byPath;
+    std::map<std::pair<const Element*, std::string>, Element*> _targets; ///< by initiator and WWPN
+    std::vector<std::string> _failures;
+    bool _anyAnswered = false;
+};
+
+} // namespace tvrcim

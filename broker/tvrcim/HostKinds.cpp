@@ -1,0 +1,425 @@
+#include "broker/tvrcim/HostKinds.h"
+
+#include "broker/tvrcim/Printing.h"
+#include "broker/tvrcim/ReadableText.h"
+#include "broker/values/ValueText.h"
+
+#include <algorithm>
+#include <array>
+#include <cstdio>
+#include <optional>
+#include <stdexcept>
+
+namespace tvrcim
+{
+
+using namespace broker;
+
+namespace
+{
+
+// --- values ---------------------------------------------------------------------------------------------------
+
+std::optional<std::uint64_t> unsignedOf(const Object& object, const std::string& property)
+{
+    const Value& value = object.get(property);
+    if (value.isNull() || value.isArray() || integerBits(value.type()) == 0)
+        return std::nullopt;
+    return value.asUnsigned();
+}
+
+std::optional<double> numberOf(const Object& object, const std::string& property)
+{
+    const Value& value = object.get(property);
+    if (!value.isNull() && (value.type() == CMPI_real32 || value.type() == CMPI_real64))
+        return value.asReal();
+    const auto whole = unsignedOf(object, property);
+    return whole ? std::optional<double>(static_cast<double>(*whole)) : std::nullopt;
+}
+
+/// The elements of an array; none of what is no array.
+const Value::List& listOf(const Object& object, const std::string& property)
+{
+    static const Value::List none;
+    const Value& value = object.get(property);
+    return value.isNull() || !value.isArray() ? none : value.asList();
+}
+
+std::string textOf(const Value& value)
+{
+    return value.isNull() ? std::string() : withSingleBlanks(valueText(value));
+}
+
+std::string hexadecimal(std::uint64_t number, int digits)
+{
+    std::array<char, 32> text{};
+    std::snprintf(text.data(), text.size(), "0x%0*llX", digits, static_cast<unsigned long long>(number));
+    return text.data();
+}
+
+// --- texts of facts -----------------------------------------------------------------------------------------------
+
+std::string plain(const Object& object, const FactRow& row)
+{
+    return textOf(object.get(row.property));
+}
+
+std::string id(const Object& object, const FactRow& row)
+{
+    const auto number = unsignedOf(object, row.property);
+    return number ? hexadecimal(*number, 4) : std::string();
+}
+
+/// The address of a port in a fabric, which one without a link does not have.
+std::string fabricAddress(const Object& object, const FactRow& row)
+{
+    const auto number = unsignedOf(object, row.property);
+    return number.value_or(0) ? hexadecimal(*number, 6) : std::string();
+}
+
+/// A name that is no name if it is 0.
+std::string worldWideName(const Object& object, const FactRow& row)
+{
+    const std::string text = plain(object, row);
+    return text.find_first_not_of('0') == std::string::npos ? std::string() : text;
+}
+
+std::string speed(const Object& object, const FactRow& row)
+{
+    return speedText(unsignedOf(object, row.property).value_or(0));
+}
+
+std::string size(const Object& object, const FactRow& row)
+{
+    const auto bytes = unsignedOf(object, row.property);
+    return bytes ? sizeText(*bytes) : std::string();
+}
+
+/// A number with its unit.
+std::string measure(const Object& object, const FactRow& row)
+{
+    const std::string text = plain(object, row);
+    return text.empty() ? text : text + " " + row.detail;
+}
+
+std::string temperature(const Object& object, const FactRow& row)
+{
+    const std::string text = plain(object, row);
+    const std::string unit = textOf(object.get("TemperatureUnit"));
+    return text.empty() ? text : text + " " + (unit == "Celsius" ? "°C" : unit);
+}
+
+std::string first(const Object& object, const FactRow& row)
+{
+    const Value::List& list = listOf(object, row.property);
+    return list.empty() ? std::string() : textOf(list.front());
+}
+
+/// The one of OtherIdentifyingInfo that the row's detail describes.
+std::string identified(const Object& object, const FactRow& row)
+{
+    const Value::List& descriptions = listOf(object, "IdentifyingDescriptions");
+    const Value::List& values = listOf(object, row.property);
+    for (std::size_t i = 0; i < std::min(descriptions.size(), values.size()); ++i)
+        if (textOf(descriptions[i]) == row.detail)
+            return textOf(values[i]);
+    return {};
+}
+
+std::string yes(const Object& object, const FactRow& row)
+{
+    const Value& value = object.get(row.property);
+    return !value.isNull() && value.type() == CMPI_boolean && value.asBoolean() ? row.detail : "";
+}
+
+std::string beacon(const Object& object, const FactRow& row)
+{
+    constexpr std::uint64_t on = 2;
+    return unsignedOf(object, row.property) == on ? "on" : "";
+}
+
+std::string type(const Object& object, const FactRow& row)
+{
+    const std::string text = plain(object, row);
+    constexpr std::size_t letters = 2; // of N, NL, F, ...; what is longer says itself what it is
+    return text.size() <= letters && !text.empty() ? text + " port" : text == "Unknown" ? "" : text;
+}
+
+// --- states and problems ----------------------------------------------------------------------------------------
+
+struct StateRow
+{
+    std::uint64_t status;
+    const char* text;
+    const char* problem; ///< empty where all is well
+};
+
+/// OperationalStatus of a port.
+constexpr StateRow portStates[] = {
+    {2, "up", ""},
+    {1, "link down", "LINK DOWN"}, // or bypassed, which is none either
+    {10, "offline", "OFFLINE"},
+    {11, "in diagnosis", "IN DIAGNOSIS"},
+    {6, "error", "ERROR"},
+    {32776, "loopback", "LOOPBACK"},
+    {32788, "up, needs a reset", "NEEDS RESET"},
+    {32789, "link down, needs a reset", "LINK DOWN"},
+    {32790, "disabled", "DISABLED"},
+};
+
+const StateRow* portState(const Object& port)
+{
+    const Value::List& list = listOf(port, "OperationalStatus");
+    if (list.empty() || list.front().isNull())
+        return nullptr;
+    const auto* row = std::ranges::find(portStates, list.front().asUnsigned(), &StateRow::status);
+    return row == std::end(portStates) ? nullptr : row;
+}
+
+std::string state(const Object& object, const FactRow&)
+{
+    const StateRow* row = portState(object);
+    return row ? row->text : "state unknown";
+}
+
+std::vector<std::string> portProblems(const Object& port)
+{
+    const StateRow* row = portState(port);
+    return row && *row->problem ? std::vector<std::string>{row->problem} : std::vector<std::string>();
+}
+
+/// A measured value, and limits that it should stay within. Limits that are all 0 are none.
+struct MeasureRow
+{
+    const char* word;
+    const char* value;
+    const char* highAlarm;
+    const char* highWarning;
+    const char* lowWarning; ///< null if there is no low limit
+    const char* lowAlarm;
+};
+
+constexpr MeasureRow chipMeasures[] = {
+    {"TEMPERATURE", "BoardTemperature", "ThresholdCriticalTemp", "ThresholdWarningTemp", nullptr, nullptr},
+};
+
+constexpr MeasureRow transceiverMeasures[] = {
+    {"TEMPERATURE", "Temperature", "TemperatureHighAlarm", "TemperatureHighWarning", "TemperatureLowWarning",
+     "TemperatureLowAlarm"},
+    {"VOLTAGE", "Vcc", "VoltageHighAlarm", "VoltageHighWarning", "VoltageLowWarning", "VoltageLowAlarm"},
+    {"BIAS CURRENT", "TxBiasCurrent", "CurrentHighAlarm", "CurrentHighWarning", "CurrentLowWarning", "CurrentLowAlarm"},
+    {"TRANSMIT POWER", "TxPower", "TxPowerHighAlarm", "TxPowerHighWarning", "TxPowerLowWarning", "TxPowerLowAlarm"},
+    {"RECEIVE POWER", "RxPower", "RxPowerHighAlarm", "RxPowerHighWarning", "RxPowerLowWarning", "RxPowerLowAlarm"},
+};
+
+/// "ABOVE WARNING" and the like; empty for a value within the limits.
+std::string excess(const Object& object, const MeasureRow& row)
+{
+    const auto value = numberOf(object, row.value);
+    const auto limit = [&](const char* property) { return property ? numberOf(object, property).value_or(0) : 0; };
+    const double highAlarm = limit(row.highAlarm);
+    const double highWarning = limit(row.highWarning);
+    const double lowWarning = limit(row.lowWarning);
+    const double lowAlarm = limit(row.lowAlarm);
+    const bool none = highAlarm == 0 && highWarning == 0 && lowWarning == 0 && lowAlarm == 0;
+    if (!value || none)
+        return {};
+    if (highAlarm != 0 && *value >= highAlarm)
+        return "ABOVE CRITICAL";
+    if (highWarning != 0 && *value >= highWarning)
+        return "ABOVE WARNING";
+    if (row.lowAlarm && *value <= lowAlarm)
+        return "BELOW CRITICAL";
+    return row.lowWarning && *value <= lowWarning ? "BELOW WARNING" : "";
+}
+
+template <const auto& Rows> std::vector<std::string> measureProblems(const Object& object)
+{
+    std::vector<std::string> problems;
+    for (const MeasureRow& row : Rows)
+        if (const std::string text = excess(object, row); !text.empty())
+            problems.push_back(std::string(row.word) + " " + text);
+    return problems;
+}
+
+// --- the tables ---------------------------------------------------------------------------------------------------
+
+// CIM_SoftwareIdentity.Classifications
+constexpr unsigned driver = 2;
+constexpr unsigned application = 5;
+constexpr unsigned firmware = 10;
+constexpr unsigned bootCode = 11;
+
+const std::vector<FactRow> softwareFacts = {{"version", "VersionString", plain, inLine}};
+
+const std::vector<FactRow> unitFacts = {
+    {"capacity", "Capacity", size, inLine | pictured},
+    {"device", "OtherIdentifyingInfo", first, inLine},
+    {"description", "Description", plain, inLine | pictured},
+};
+
+const KindRow allKinds[] = {
+    {hostKind,
+     "computer systems",
+     nullptr,
+     "Name",
+     {{"class", "Class", plain}, {"namespace", "NameSpace", plain}, {"chassis", "Chassis", plain}}},
+    {"Driver", "drivers", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr, driver},
+    {"Provider", "providers", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr, application},
+    {"Product",
+     "products",
+     "TVRHBA_Product",
+     "Name",
+     {{"description", "Description", plain},
+      {"vendor", "Vendor", plain},
+      {"serial number", "IdentifyingNumber", plain},
+      {"hardware version", "Version", plain}}},
+    {"Card",
+     "cards",
+     "TVRHBA_Card",
+     "ElementName",
+     {{"model", "Model", plain, pictured},
+      {"part number", "PartNumber", plain},
+      {"serial number", "SerialNumber", plain, pictured | labelled},
+      {"version", "Version", plain},
+      {"SLI mode", "SLIMode", plain}}},
+    {"Chip",
+     "chips",
+     "TVRHBA_Chip",
+     "ElementName",
+     {{"temperature", "BoardTemperature", temperature, inLine},
+      {"warning at", "ThresholdWarningTemp", temperature, inLine | labelled},
+      {"critical at", "ThresholdCriticalTemp", temperature, inLine | labelled}},
+     Appears::itself,
+     measureProblems<chipMeasures>},
+    {"Connector",
+     "connectors",
+     "TVRHBA_PhysicalConnector",
+     "ElementName",
+     {{"port", "OtherIdentifyingInfo", plain, inLine}}},
+    {"Port controller", "port controllers", "TVRHBA_PortController", "DeviceID", {}, Appears::through},
+    {"FC port",
+     "FC ports",
+     "TVRHBA_FCPort",
+     "DeviceID",
+     {{"state", "OperationalStatus", state, inLine | pictured},
+      {"speed", "Speed", speed, inLine | pictured},
+      {"type", "OtherPortType", type, inLine},
+      {"fabric", "FabricName", worldWideName, inLine | labelled | pictured},
+      {"name", "ElementName", plain},
+      {"node WWN", "OtherIdentifyingInfo", identified, below, "NodeWWN"},
+      {"device", "OtherIdentifyingInfo", identified, below, "OS Device Name"},
+      {"FC ID", "FCID", fabricAddress},
+      {"fastest speed", "MaxSpeed", speed},
+      {"discovered ports", "NumberOfDiscoveredPorts", plain},
+      {"beacon", "LocationIndicator", beacon}},
+     Appears::itself,
+     portProblems},
+    {"Transceiver",
+     "transceivers",
+     "TVRHBA_Transceiver",
+     "PartNumber",
+     {{"manufacturer", "Manufacturer", plain, inLine},
+      {"serial number", "SerialNumber", plain, inLine | labelled},
+      {"temperature", "Temperature", temperature, inLine},
+      {"voltage", "Vcc", measure, below, "V"},
+      {"bias current", "TxBiasCurrent", measure, below, "mA"},
+      {"transmit power", "TxPower", measure, below, "mW"},
+      {"receive power", "RxPower", measure, below, "mW"},
+      {"wave length", "WaveLength", measure, below, "nm"}},
+     Appears::itself,
+     measureProblems<transceiverMeasures>},
+    {"Firmware", "firmware identities", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr,
+     firmware},
+    {"Boot image", "boot images", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr, bootCode},
+    {"Flash image",
+     "flash images",
+     "TVRHBA_FlashImageSoftwareIdentity",
+     "Name",
+     {{"version", "VersionString", plain, inLine},
+      {"size", "ProgramLength", size, inLine},
+      {"description", "Description", plain, inLine},
+      {"wakeup", "IsWakeupParameter", yes, inLine, "runs at the next start"}}},
+    {"Initiator", "initiators", "TVRHBA_SCSIProtocolInitiatorEndpoint", "Name", {}, Appears::through},
+    {"Virtual port",
+     "virtual ports",
+     "TVRHBA_VirtualFCPort",
+     "DeviceID",
+     {{"state", "OperationalStatus", state, inLine | pictured},
+      {"speed", "Speed", speed, inLine},
+      {"fabric", "OtherIdentifyingInfo", identified, inLine | labelled, "Fabric Name"},
+      {"name", "ElementName", plain},
+      {"node WWN", "OtherIdentifyingInfo", identified, below, "NodeWWN"},
+      {"FC ID", "OtherIdentifyingInfo", identified, below, "FC ID"},
+      {"virtual machine", "OtherIdentifyingInfo", identified, pictured | labelled, "Virtual Machine Name"}},
+     Appears::itself,
+     portProblems},
+    {targetKind, "targets", nullptr, "Name", {}, Appears::summed},
+    {"Volume", "volumes", "TVRHBA_StorageVolume", "ElementName", unitFacts, Appears::unit},
+    {"Disk", "disks", "TVRHBA_LogicalDisk", "ElementName", unitFacts, Appears::unit},
+    {"Tape drive", "tape drives", "TVRHBA_TapeDrive", "ElementName", unitFacts, Appears::unit},
+    {"Device", "devices", "TVRHBA_StorageExtent", "ElementName", unitFacts, Appears::unit},
+    {"Controller", "controllers", "TVRHBA_SCSIArbitraryLogicalUnit", "ElementName", unitFacts, Appears::unit},
+    {"Virtual volume",
+     "virtual volumes",
+     "TVRHBA_VirtualStorageVolume",
+     "ElementName",
+     {{"capacity", "Capacity", size, inLine | pictured}, {"description", "Description", plain, inLine | pictured}},
+     Appears::unit},
+    {"PCI device",
+     "PCI devices",
+     "TVRHBA_PCIDevice",
+     "DeviceID",
+     {{"element", "ElementName", plain, inLine},
+      {"bus", "BusNumber", plain, inLine | labelled},
+      {"function", "FunctionNumber", plain, inLine | labelled},
+      {"vendor", "VendorID", id},
+      {"subsystem", "SubsystemID", id},
+      {"revision", "RevisionID", plain}}},
+};
+
+constexpr EdgeRow allEdges[] = {
+    {hostKind, "TVRHBA_InstalledSoftwareIdentity", "Driver"},
+    {hostKind, "TVRHBA_InstalledSoftwareIdentity", "Provider"},
+    {hostKind, "TVRHBA_SystemDevice", "PCI device"},
+    {"Product", "TVRHBA_ProductPhysicalComponent", "Card"},
+    {"Card", "TVRHBA_CardContainsChip", "Chip"},
+    {"Card", "TVRHBA_CardContainsConnector", "Connector"},
+    {"Connector", "TVRHBA_FCRealizes", "FC port"},
+    {"FC port", "TVRHBA_ControlledBy", "Port controller"},
+    {"Port controller", "TVRHBA_TransceiverComponent", "Transceiver"},
+    {"Port controller", "TVRHBA_FirmwareElementSoftwareIdentity", "Firmware"},
+    {"Port controller", "TVRHBA_ElementSoftwareIdentity", "Boot image"},
+    {"Port controller", "TVRHBA_ElementFlashImageSoftwareIdentity", "Flash image"},
+    {"FC port", "TVRHBA_DeviceSAPImplementation", "Initiator"},
+    {"FC port", "TVRHBA_VPortHostedDependency", "Virtual port"},
+    {"Virtual port", "TVRHBA_VirtualDeviceSAPImplementation", "Initiator"},
+    {"Initiator", "TVRHBA_SCSIInitiatorTargetStorageVolumePath", "Volume", "Target"},
+    {"Initiator", "TVRHBA_SCSIInitiatorTargetLogicalDiskPath", "Disk", "Target"},
+    {"Initiator", "TVRHBA_SCSIInitiatorTargetTapeDrivePath", "Tape drive", "Target"},
+    {"Initiator", "TVRHBA_SCSIInitiatorTargetStorageExtentPath", "Device", "Target"},
+    {"Initiator", "TVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath", "Controller", "Target"},
+    {"Initiator", "TVRHBA_VirtualSCSIInitiatorTargetLogicalUnitPath", "Virtual volume", "Target"},
+};
+
+} // namespace
+
+std::span<const KindRow> kinds()
+{
+    return allKinds;
+}
+
+const KindRow& kindNamed(const std::string& name)
+{
+    const auto* row = std::ranges::find(allKinds, name, &KindRow::name);
+    if (row == std::end(allKinds))
+        throw std::out_of_range("there is no kind " + name);
+    return *row;
+}
+
+std::span<const EdgeRow> edges()
+{
+    return allEdges;
+}
+
+} // namespace tvrcim

@@ -1,0 +1,117 @@
+#include "broker/tvrcim/ReadableText.h"
+
+#include "broker/tvrcim/Printing.h"
+
+#include <array>
+#include <cstdio>
+#include <span>
+#include <sstream>
+
+namespace tvrcim
+{
+
+namespace
+{
+
+struct ScaleRow
+{
+    std::uint64_t factor;
+    const char* unit;
+};
+
+constexpr std::array<ScaleRow, 7> sizes{{
+    {1ULL << 60, "EiB"},
+    {1ULL << 50, "PiB"},
+    {1ULL << 40, "TiB"},
+    {1ULL << 30, "GiB"},
+    {1ULL << 20, "MiB"},
+    {1ULL << 10, "KiB"},
+    {1, "bytes"},
+}};
+
+constexpr std::array<ScaleRow, 3> speeds{{{1'000'000'000, "Gbit/s"}, {1'000'000, "Mbit/s"}, {1, "bit/s"}}};
+
+/// In the largest unit that is not above the number, with one decimal where that is not 0.
+std::string scaled(std::uint64_t number, std::span<const ScaleRow> rows)
+{
+    const ScaleRow* row = &rows.back();
+    for (const ScaleRow& larger : rows)
+        if (number >= larger.factor)
+        {
+            row = &larger;
+            break;
+        }
+    std::array<char, 32> text{};
+    std::snprintf(text.data(), text.size(), "%.1f", static_cast<double>(number) / static_cast<double>(row->factor));
+    std::string result = text.data();
+    if (result.ends_with(".0"))
+        result.resize(result.size() - 2);
+    return result + " " + row->unit;
+}
+
+} // namespace
+
+std::string sizeText(std::uint64_t bytes)
+{
+    return scaled(bytes, sizes);
+}
+
+std::string speedText(std::uint64_t bitsPerSecond)
+{
+    return bitsPerSecond == 0 ? std::string() : scaled(bitsPerSecond, speeds);
+}
+
+std::string countText(std::uint64_t count, const char* singular, const char* plural)
+{
+    return std::to_string(count) + " " + (count == 1 ? singular : plural);
+}
+
+std::string inSentence(std::string name)
+{
+    if (name.size() > 1 && broker::lowerLetter(name[1]) == name[1])
+        name[0] = broker::lowerLetter(name[0]);
+    return name;
+}
+
+std::string withSingleBlanks(const std::string& text)
+{
+    std::string result;
+    for (const char c : text)
+        if (c != ' ' || (!result.empty() && result.back() != ' '))
+            result += c;
+    if (result.ends_with(' '))
+        result.pop_back();
+    return result;
+}
+
+std::string shortened(const std::string& text, std::size_t characters)
+{
+    if (displayWidth(text) <= characters)
+        return text;
+    std::string head = text;
+    while (displayWidth(head) >= characters)
+    {
+        constexpr unsigned continuationMask = 0xC0;
+        constexpr unsigned continuation = 0x80;
+        while ((static_cast<unsigned char>(head.back()) & continuationMask) == continuation)
+            head.pop_back();
+        head.pop_back();
+    }
+    return head + "…";
+}
+
+std::vector<std::string> lines(const std::string& text, std::size_t characters)
+{
+    std::vector<std::string> result;
+    std::istringstream words(text);
+    for (std::string word; words >> word;)
+    {
+        if (result.empty() || displayWidth(result.back()) + 1 + displayWidth(word) > characters)
+            result.push_back(shortened(word, characters));
+        else
+            result.back() += " " + word;
+    }
+    return result;
+}
+
+} // namespace tvrcim

@@ -1,0 +1,27 @@
+// Numbers of instances as a person reads them.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace tvrcim
+{
+
+/// "500 GiB", "1.5 TiB", "512 bytes".
+std::string sizeText(std::uint64_t bytes);
+/// "8 Gbit/s", "2.5 Gbit/s"; empty for 0, which is no speed.
+std::string speedText(std::uint64_t bitsPerSecond);
+/// "1 card", "2 cards".
+std::string countText(std::uint64_t count, const char* singular, const char* plural);
+/// The name of a kind inside a sentence: "card" and "FC port".
+std::string inSentence(std::string name);
+/// Blanks at the ends and more than one between words are left out, as fixed fields of devices have them.
+std::string withSingleBlanks(const std::string& text);
+/// The text, or its head with an ellipsis where it shows more characters than that.
+std::string shortened(const std::string& text, std::size_t characters);
+
+/// The text in lines of that many characters, broken at blanks. A longer word is shortened.
+std::vector<std::string> lines(const std::string& text, std::size_t characters);
+
+} // namespace tvrcim
