@@ -1,5 +1,6 @@
 #include "broker/tvrcim/Topology.h"
 
+#include "broker/tvrcim/Printing.h"
 #include "broker/tvrcim/ReadableText.h"
 
 #include <algorithm>
@@ -70,14 +71,19 @@ std::string quoted(const std::vector<std::string>& texts)
     return "\"" + label + "\"";
 }
 
+/// The facts, as many on a line as fit.
 std::vector<std::string> labelOf(const HostNode& node)
 {
     std::vector<std::string> texts = {node.isUnit ? node.name : node.kind + " " + node.name};
     texts.insert(texts.end(), node.problems.begin(), node.problems.end());
-    std::string facts;
+    const std::size_t heading = texts.size();
     for (const std::string& fact : factTexts(node, pictured))
-        facts += (facts.empty() ? "" : ", ") + fact;
-    texts.push_back(facts);
+    {
+        if (texts.size() > heading && displayWidth(texts.back() + ", " + fact) <= lineLength)
+            texts.back() += ", " + fact;
+        else
+            texts.push_back(fact);
+    }
     return texts;
 }
 
@@ -95,7 +101,7 @@ public:
                "  graph [rankdir=LR, nodesep=0.15, ranksep=0.8, fontname=\"Helvetica\"]\n"
                "  node [style=filled, fontname=\"Helvetica\", fontsize=10, color=\"#667788\", margin=\"0.12,0.06\"]\n"
                "  edge [arrowhead=none, fontname=\"Helvetica\", fontsize=9, color=\"#667788\"]\n" +
-               _text + "  {rank=same; " + column() + "}\n}\n";
+               _text + columns() + "}\n";
     }
 
 private:
@@ -107,12 +113,18 @@ private:
         std::set<std::string> identities;
     };
 
-    std::string column() const
+    /// Boxes of a kind stand below each other.
+    std::string columns() const
     {
-        std::string ids;
-        for (const std::string& id : _column)
-            ids += id + "; ";
-        return ids;
+        std::string text;
+        for (const auto& [kind, ids] : _columns)
+        {
+            text += "  {rank=same";
+            for (const std::string& id : ids)
+                text += "; " + id;
+            text += "}\n";
+        }
+        return text;
     }
 
     std::string box(const std::vector<std::string>& texts, const StyleRow& style, bool isWrong)
@@ -135,7 +147,8 @@ private:
         const auto targets = static_cast<std::size_t>(std::ranges::count_if(node.children, isTarget));
         const bool folds = !_all && targets > drawnTargets;
         if (folds)
-            line(id, _column.emplace_back(box(sumOf(node, targets), foldedTargets, false)), edgeOf(isWrong));
+            line(id, _columns[targetKind].emplace_back(box(sumOf(node, targets), foldedTargets, false)),
+                 edgeOf(isWrong));
         for (const HostNode& child : node.children)
         {
             if (!isTarget(child))
@@ -151,7 +164,7 @@ private:
         if (!style)
             return drawBelow(node, parent, isWrong);
         const bool hasProblem = !node.problems.empty();
-        const std::string id = box(labelOf(node), *style, hasProblem);
+        const std::string id = _columns[node.kind].emplace_back(box(labelOf(node), *style, hasProblem));
         line(parent, id, edgeOf(hasProblem));
         drawBelow(node, id, hasProblem);
     }
@@ -160,8 +173,8 @@ private:
     {
         Target& target = _targets[node.name];
         if (target.id.empty())
-            target.id =
-                _column.emplace_back(box({node.kind + " " + node.name}, *styleOf(node), !node.problems.empty()));
+            target.id = _columns[node.kind].emplace_back(
+                box({node.kind + " " + node.name}, *styleOf(node), !node.problems.empty()));
         for (const HostNode& unit : node.children)
             if (target.identities.insert(unit.identity).second)
                 target.units.push_back(&unit);
@@ -217,7 +230,7 @@ private:
     std::string _text;
     std::size_t _boxes = 0;
     std::map<std::string, Target> _targets;
-    std::vector<std::string> _column; ///< boxes of targets, which stand below each other
+    std::map<std::string, std::vector<std::string>> _columns; ///< ids by kind
 };
 
 } // namespace
