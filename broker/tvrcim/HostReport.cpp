@@ -84,8 +84,7 @@ private:
         addParts(node, element);
         if (element.kind->appears == Appears::summed)
             node.facts.push_back({"contents", unitsText(node), inLine | pictured});
-        parent.units += node.units;
-        parent.bytes += node.bytes;
+        parent.count(node);
         parent.children.push_back(std::move(node));
     }
 
@@ -151,10 +150,7 @@ bool fold(HostNode& node, bool (*isOfSort)(const HostNode&), std::size_t limit, 
     HostNode sum{sort, std::to_string(count)};
     for (const HostNode& child : children)
         if (isOfSort(child))
-        {
-            sum.units += child.units;
-            sum.bytes += child.bytes;
-        }
+            sum.count(child);
     sum.facts.push_back({"contents", unitsText(sum), inLine});
     children.erase(std::remove_if(first + 1, children.end(), isOfSort), children.end());
     if (isTarget(node)) // which has the sum in its own line

@@ -33,6 +33,12 @@ struct HostNode
     bool isUnit = false;
     std::uint64_t units = 0; ///< at it and below
     std::uint64_t bytes = 0; ///< what these hold
+
+    void count(const HostNode& part)
+    {
+        units += part.units;
+        bytes += part.bytes;
+    }
 };
 
 /// How a tree is printed.

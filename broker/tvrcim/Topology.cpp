@@ -40,8 +40,6 @@ constexpr const char* wrong = "#f4b6b6"; ///< fill of what has a problem
 
 const StyleRow* styleOf(const HostNode& node)
 {
-    if (node.isUnit)
-        return &unitStyle;
     const auto* row = std::ranges::find(styles, node.kind, &StyleRow::kind);
     return row == std::end(styles) ? nullptr : row;
 }
@@ -95,8 +93,8 @@ public:
     std::string of(const HostNode& host)
     {
         drawBelow(host, box(labelOf(host), *styleOf(host), false), false);
-        for (auto& [name, target] : _targets)
-            drawUnits(target);
+        for (const auto& [name, target] : _targets)
+            drawUnits(target.units, target.id);
         return "digraph host {\n"
                "  graph [rankdir=LR, nodesep=0.15, ranksep=0.8, fontname=\"Helvetica\"]\n"
                "  node [style=filled, fontname=\"Helvetica\", fontsize=10, color=\"#667788\", margin=\"0.12,0.06\"]\n"
@@ -105,11 +103,13 @@ public:
     }
 
 private:
+    using Nodes = std::vector<const HostNode*>;
+
     /// A target as all ports together see it.
     struct Target
     {
         std::string id;
-        std::vector<const HostNode*> units;
+        Nodes units;
         std::set<std::string> identities;
     };
 
@@ -143,19 +143,19 @@ private:
     /// What is inside the node hangs on the box with this id.
     void drawBelow(const HostNode& node, const std::string& id, bool isWrong)
     {
-        const auto isTarget = [](const HostNode& child) { return child.kind == targetKind; };
-        const auto targets = static_cast<std::size_t>(std::ranges::count_if(node.children, isTarget));
-        const bool folds = !_all && targets > drawnTargets;
-        if (folds)
-            line(id, _columns[targetKind].emplace_back(box(sumOf(node, targets), foldedTargets, false)),
-                 edgeOf(isWrong));
+        Nodes targets;
+        Nodes units; // which no target has
         for (const HostNode& child : node.children)
         {
-            if (!isTarget(child))
+            if (child.kind == targetKind)
+                targets.push_back(&child);
+            else if (child.isUnit)
+                units.push_back(&child);
+            else
                 drawInside(child, id, isWrong);
-            else if (!folds)
-                drawTarget(child, id, isWrong);
         }
+        drawTargets(targets, id, isWrong);
+        drawUnits(units, id);
     }
 
     void drawInside(const HostNode& node, const std::string& parent, bool isWrong)
@@ -169,24 +169,36 @@ private:
         drawBelow(node, id, hasProblem);
     }
 
+    void drawTargets(const Nodes& targets, const std::string& port, bool isWrong)
+    {
+        if (!_all && targets.size() > drawnTargets)
+        {
+            const std::vector<std::string> texts = {countText(targets.size(), "target", "targets"),
+                                                    unitsText(sumOf(targets))};
+            line(port, _columns[targetKind].emplace_back(box(texts, foldedTargets, false)), edgeOf(isWrong));
+            return;
+        }
+        for (const HostNode* target : targets)
+            drawTarget(*target, port, isWrong);
+    }
+
     void drawTarget(const HostNode& node, const std::string& port, bool isWrong)
     {
         Target& target = _targets[node.name];
         if (target.id.empty())
-            target.id = _columns[node.kind].emplace_back(
-                box({node.kind + " " + node.name}, *styleOf(node), !node.problems.empty()));
+            target.id = _columns[node.kind].emplace_back(box({node.kind + " " + node.name}, *styleOf(node), false));
         for (const HostNode& unit : node.children)
             if (target.identities.insert(unit.identity).second)
                 target.units.push_back(&unit);
         line(port, target.id, edgeOf(isWrong, countText(node.units, "unit", "units")));
     }
 
-    void drawUnits(const Target& target)
+    void drawUnits(const Nodes& units, const std::string& id)
     {
-        if (!_all && target.units.size() > drawnUnits)
-            return line(target.id, box(sumOf(target.units), foldedUnits, false));
-        for (const HostNode* unit : target.units)
-            line(target.id, box(labelOf(*unit), unitStyle, !unit->problems.empty()));
+        if (!_all && units.size() > drawnUnits)
+            return line(id, box(kindsOf(units), foldedUnits, false));
+        for (const HostNode* unit : units)
+            line(id, box(labelOf(*unit), unitStyle, false));
     }
 
     static std::string edgeOf(bool isWrong, const std::string& label = "")
@@ -197,30 +209,20 @@ private:
         return attributes;
     }
 
-    /// The targets of a port.
-    static std::vector<std::string> sumOf(const HostNode& port, std::size_t targets)
+    static HostNode sumOf(const Nodes& nodes)
     {
         HostNode sum;
-        for (const HostNode& child : port.children)
-            if (child.kind == targetKind)
-            {
-                sum.units += child.units;
-                sum.bytes += child.bytes;
-            }
-        return {countText(targets, "target", "targets"), unitsText(sum)};
+        for (const HostNode* node : nodes)
+            sum.count(*node);
+        return sum;
     }
 
-    static std::vector<std::string> sumOf(const std::vector<const HostNode*>& units)
+    static std::vector<std::string> kindsOf(const Nodes& units)
     {
-        HostNode sum;
         std::map<std::string, std::size_t> counts;
         for (const HostNode* unit : units)
-        {
-            sum.units += unit->units;
-            sum.bytes += unit->bytes;
             ++counts[unit->kind];
-        }
-        std::vector<std::string> texts = {unitsText(sum)};
+        std::vector<std::string> texts = {unitsText(sumOf(units))};
         for (const auto& [kind, count] : counts)
             texts.push_back(countText(count, inSentence(kind).c_str(), kindNamed(kind).plural));
         return texts;

@@ -12,7 +12,10 @@
 #include <fcntl.h>
 #include <filesystem>
 #include <fstream>
+#include <functional>
+#include <map>
 #include <poll.h>
+#include <pty.h>
 #include <string>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -37,11 +40,11 @@ std::string textOf(const std::string& file)
     return {std::istreambuf_iterator<char>(stream), {}};
 }
 
-/// Runs the tool with arguments as a shell would read them.
-Answer tvrcim(const std::string& arguments)
+/// Runs the tool with arguments as a shell would read them, in an environment that assignments may change.
+Answer tvrcim(const std::string& arguments, const std::string& environment = "")
 {
     const std::string errors = testing::TempDir() + "tvrcim-" + std::to_string(getpid()) + ".err";
-    const std::string command = std::string(TVR_TVRCIM) + " " + arguments + " 2>" + errors;
+    const std::string command = environment + TVR_TVRCIM + " " + arguments + " 2>" + errors;
     FILE* pipe = popen(command.c_str(), "r");
     EXPECT_TRUE(pipe);
     std::string out;
@@ -66,10 +69,119 @@ TEST(Tvrcim, ShowsTheHostAsATree)
     const Answer run = tvrcim("host");
     ASSERT_EQ(run.exitCode, 0) << run.err;
     EXPECT_EQ(run.err, "");
-    for (const char* expected : {"Computer system", "2 products, 2 cards, 2 chips, 4 connectors, 4 PCI devices",
-                                 "Card  TVR FCHBA:TV3202:TV32B71155", "TVRHBA_CardContainsChip",
-                                 "WWPN             1000027A51320241", "PCI device  1000027A51160210:0xE200"})
+    for (const char* expected :
+         {"2 products, 2 cards, 2 chips, 4 connectors, 4 FC ports, 3 transceivers,",
+          "6 volumes, 1 disk, 2 tape drives, 2 devices, 1 controller, 1 virtual volume, 4 PCI devices",
+          "│   attention  FC port 1000027A51160211: LINK DOWN\n├── Driver  tvrfc  12.0.0.1\n",
+          "│   └── Card  TVR FCHBA:TV1602:TV16A02417\n",
+          "│       ├── Chip  TVR HBA ASIC:TV1602:TV16A02417  47 °C, warning at 85 °C, critical at 95 °C\n",
+          "│       │   └── FC port  1000027A51160210  up, 8 Gbit/s, N port, fabric 1000063D2000A001\n",
+          "│       │       │   device            /sys/class/fc_host/host5\n",
+          "│       │       ├── Transceiver  OPT8-SW-850  OPTENNA, serial number OP8G440017, 38.5 °C\n",
+          "│       │       ├── Firmware  Operational Firmware  11.4.210.8\n",
+          "│       │       ├── Flash image  Boot BIOS  11.4.204.11, 256 KiB, Multi-boot image\n",
+          "│       │       ├── Target  50063D200110000A  2 units, 600 GiB\n",
+          "│       │       │   └── Volume  Storage Volume: 1  500 GiB, /dev/sdb, OLSTRA MERIDIAN 7 DISK",
+          "│           └── FC port  1000027A51160211  LINK DOWN\n" /* the other port of its card */,
+          "│           │   virtual machine  guest-1\n│       │           └── Target  50063D200110000B  1 unit, 100 GiB",
+          "└── PCI device  1000027A51320241:0x7410  Tavrin:FCAdapter3, bus 8, function 1\n"})
         EXPECT_THAT(run.out, HasSubstr(expected));
+}
+
+/// Each instance of a class that is shown is in the tree once, under what the associations put it in.
+TEST(Tvrcim, TheTreeHasAllInstancesOnce)
+{
+    const std::string scenario = testing::TempDir() + "many-" + std::to_string(getpid()) + ".json";
+    std::ofstream(scenario) << R"({"generate": {"seed": 3, "adapters": 2, "portsPerAdapter": 2, "targetsPerPort": 3,
+        "unitsPerTarget": 9, "deviceTypes": [0, 1, 8, 13, 17]}})";
+    const nlohmann::json host = json("host --scenario " + scenario);
+    EXPECT_FALSE(host.contains("attention")) << host["attention"];
+    std::map<std::string, std::size_t> kinds;
+    std::map<std::string, std::size_t> places;
+    const std::function<void(const nlohmann::json&)> walk = [&](const nlohmann::json& node)
+    {
+        ++kinds[node["kind"]];
+        for (const nlohmann::json& part : node.value("parts", nlohmann::json::array()))
+        {
+            ++places[std::string(node["kind"]) + "/" + std::string(part["kind"])];
+            walk(part);
+        }
+    };
+    walk(host);
+    const std::pair<const char*, const char*> classes[] = {
+        {"FC port", "TVRHBA_FCPort"},       {"Volume", "TVRHBA_StorageVolume"},
+        {"Disk", "TVRHBA_LogicalDisk"},     {"Tape drive", "TVRHBA_TapeDrive"},
+        {"Device", "TVRHBA_StorageExtent"}, {"Controller", "TVRHBA_SCSIArbitraryLogicalUnit"},
+        {"PCI device", "TVRHBA_PCIDevice"}};
+    for (const auto& [kind, className] : classes)
+        EXPECT_EQ(kinds[kind], json(std::string("enum --names ") + className + " --scenario " + scenario).size())
+            << kind;
+    EXPECT_EQ(places["Target/Volume"], kinds["Volume"]);
+    EXPECT_EQ(places["FC port/Target"], kinds["Target"]);
+    EXPECT_EQ(places["Connector/FC port"], 4u);
+
+    const Answer folded = tvrcim("host --scenario " + scenario);
+    EXPECT_THAT(folded.out, HasSubstr("  9 units, "));
+    EXPECT_THAT(folded.out, testing::Not(HasSubstr("Storage Volume: 0")));
+    EXPECT_THAT(folded.out, HasSubstr("(--all lists each target and unit)\n"));
+    EXPECT_THAT(tvrcim("host --all --scenario " + scenario).out, HasSubstr("Storage Volume: 0"));
+    std::remove(scenario.c_str());
+}
+
+/// What the tool writes to a terminal.
+std::string onTerminal()
+{
+    int terminal = -1;
+    const pid_t process = forkpty(&terminal, nullptr, nullptr, nullptr);
+    if (process == 0)
+    {
+        execl(TVR_TVRCIM, TVR_TVRCIM, "host", nullptr);
+        _exit(127);
+    }
+    std::string out;
+    char buffer[4096];
+    for (ssize_t size; (size = read(terminal, buffer, sizeof buffer)) > 0;)
+        out.append(buffer, static_cast<std::size_t>(size));
+    close(terminal);
+    waitpid(process, nullptr, 0);
+    return out;
+}
+
+TEST(Tvrcim, ColoursAreForTerminalsThatWantThem)
+{
+    setenv("TERM", "xterm", 1);
+    unsetenv("NO_COLOR");
+    EXPECT_THAT(onTerminal(), HasSubstr("1000027A51160211  \x1b[1;31mLINK DOWN\x1b[0m"));
+    EXPECT_THAT(tvrcim("host").out, testing::Not(HasSubstr("\x1b")));
+    setenv("NO_COLOR", "1", 1);
+    EXPECT_THAT(onTerminal(), testing::AllOf(HasSubstr("LINK DOWN"), testing::Not(HasSubstr("\x1b"))));
+    unsetenv("NO_COLOR");
+}
+
+TEST(Tvrcim, DrawsTheTopology)
+{
+    const Answer dot = tvrcim("topology");
+    ASSERT_EQ(dot.exitCode, 0) << dot.err;
+    for (const char* expected : {"label=\"Target 50063D200110000A\"", "label=\"FC port 1000027A51160211\\nLINK DOWN\"",
+                                 "label=\"Virtual port 2001027A51320240\\nup, virtual machine guest-1\"",
+                                 "\\n500 GiB\\nOLSTRA MERIDIAN 7 DISK"})
+        EXPECT_THAT(dot.out, HasSubstr(expected));
+
+    const std::string file = testing::TempDir() + "topology-" + std::to_string(getpid());
+    EXPECT_EQ(tvrcim("topology --output " + file + ".dot").exitCode, 0);
+    EXPECT_EQ(textOf(file + ".dot"), dot.out);
+    std::remove((file + ".dot").c_str());
+
+    const Answer without = tvrcim("topology --output " + file + ".svg", "PATH=/nonexistent ");
+    EXPECT_EQ(without.exitCode, 2);
+    EXPECT_THAT(without.err, HasSubstr("apt-get install graphviz"));
+    EXPECT_FALSE(std::filesystem::exists(file + ".svg"));
+    if (std::system("dot -V 2>/dev/null") != 0)
+        GTEST_SKIP() << "graphviz is not installed";
+    const Answer picture = tvrcim("topology --output " + file + ".svg");
+    EXPECT_EQ(picture.exitCode, 0) << picture.err;
+    EXPECT_THAT(textOf(file + ".svg"), testing::AllOf(HasSubstr("<svg "), HasSubstr("LINK DOWN"), HasSubstr("</svg>")));
+    std::remove((file + ".svg").c_str());
 }
 
 TEST(Tvrcim, NamesThatItPrintsLeadToTheirInstances)
@@ -128,6 +240,10 @@ TEST(Tvrcim, ErrorsNameTheStatusOrTheArgument)
         {"set 'TVRHBA_Card.CreationClassName=\"a\",Tag=\"b\"' NoSuchProperty=1", 2, "NoSuchProperty"},
         {"enum TVRHBA_Card --format xml", 2, "xml"},
         {"enum", 2, "CLASS"},
+        {"host --namespace root/none", 1, "CIM_ERR_INVALID_NAMESPACE"},
+        {"topology --output picture.jpg", 2, "picture.jpg"},
+        {"topology --output /nonexistent/picture.dot", 2, "/nonexistent/picture.dot"},
+        {"topology --format json", 2, "--format"},
         {"host --module /nonexistent.so", 2, "/nonexistent.so"},
         {"host --scenario " + wrongScenario, 2, "/adapters/0/name"},
         {"host --scenario " + wrongScenario, 2, wrongScenario},

@@ -2,7 +2,6 @@
 #include "tests/unit/broker/FakeModule.h"
 
 #include "broker/tvrcim/CommandLine.h"
-#include "broker/tvrcim/HostReport.h"
 #include "broker/tvrcim/Printing.h"
 
 #include <gmock/gmock.h>
@@ -48,6 +47,9 @@ TEST(CommandLineTest, OptionsStandBeforeOrBehindTheCommand)
     const Command call = parse({"call", "P.k=1", "Add", "A=1", "B=[1,2]"}).settings.command;
     EXPECT_EQ(call.method, "Add");
     EXPECT_THAT(call.assignments, ElementsAre("A=1", "B=[1,2]"));
+    const Command topology = parse({"topology", "--output", "san.svg", "--all"}).settings.command;
+    EXPECT_EQ(topology.output, "san.svg");
+    EXPECT_TRUE(topology.all);
 }
 
 TEST(CommandLineTest, UsageErrorsExitWithTwo)
@@ -184,27 +186,10 @@ TEST(Commands, ClassesAndMethodsAreShown)
     EXPECT_EQ(tool.violations(), "");
 }
 
-TEST(Printing, TreesShowFactsUnderTheirNodes)
-{
-    HostNode root{"Host", "h", ""};
-    root.facts = {{"a", "1"}, {"long", "2"}};
-    root.children = {{"Card", "c", ""}, {"Card", "d", ""}};
-    root.children[0].children = {{"Chip", "x", ""}};
-    root.children[0].children[0].facts = {{"tag", "t"}};
-    std::ostringstream out;
-    printTree(out, root);
-    EXPECT_EQ(out.str(), "Host  h\n"
-                         "│   a     1\n"
-                         "│   long  2\n"
-                         "├── Card  c\n"
-                         "│   └── Chip  x\n"
-                         "│           tag  t\n"
-                         "└── Card  d\n");
-}
-
 TEST(Printing, ControlCharactersStayOnTheirLine)
 {
     EXPECT_EQ(oneLine("a\tb\nc\x1b[0m\x7f"), "a\\tb\\nc\\x1b[0m\\x7f");
+    EXPECT_EQ(oneLine("\xc2\x9b 5 \xc2\xb0 \xff"), "\\xc2\\x9b 5 \xc2\xb0 \\xff");
     EXPECT_EQ(displayWidth("──é"), 3U);
     std::ostringstream out;
     printJson(out, Json("\xff"));
