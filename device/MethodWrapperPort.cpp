@@ -116,8 +116,8 @@ RM_STATUS TVR_MethodWrapper::GetFlashContents(const char* deviceId, std::vector<
     HBA_WWN wwpn;
     if (idToWwn(&wwpn, deviceId) != 0)
         return RM_ERROR;
-    const auto list = std::make_unique<RM_FlashList>();
-    const RM_STATUS status = LRM_DiagGetLoadListParams(wwpn, list.get());
+    const std::unique_ptr<RM_FlashList> list(new (std::nothrow) RM_FlashList{});
+    const RM_STATUS status = list ? LRM_DiagGetLoadListParams(wwpn, list.get()) : RM_STATUS{RM_ERROR_NO_MEMORY};
     if (status != RM_OK)
     {
         TVR_LOG(TVR_DBG, "Failed to retrieve the flash contents. Exited with ErrorCode %d", status);

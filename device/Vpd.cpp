@@ -109,10 +109,4 @@ std::string vpdName(std::string_view keyword)
     return std::string("VPD:").append(row == std::end(names) ? keyword : row->name);
 }
 
-std::string_view vpdValue(std::span<const VpdField> fields, std::string_view keyword)
-{
-    const auto found = std::ranges::find(fields, keyword, &VpdField::keyword);
-    return found == fields.end() ? std::string_view() : std::string_view(found->value);
-}
-
 } // namespace cimple

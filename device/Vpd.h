@@ -26,7 +26,4 @@ std::vector<VpdField> walkVpd(std::span<const std::uint8_t> area);
 /// Under which name a keyword is published.
 std::string vpdName(std::string_view keyword);
 
-/// Value of the first field of this keyword; empty if there is none.
-std::string_view vpdValue(std::span<const VpdField> fields, std::string_view keyword);
-
 } // namespace cimple

@@ -1,6 +1,6 @@
 #include "model/PhysicalModel.h"
 
-#include "agent/Build.h"
+#include "model/Affects.h"
 #include "schema/TVRHBA_Card.h"
 #include "schema/TVRHBA_CardConformsToProfile.h"
 #include "schema/TVRHBA_CardContainsChip.h"
@@ -244,10 +244,8 @@ std::uint32_t createChipInstances(PortContext& port)
                        "Insert Failed : TVRHBA_Container") == Joined::Refused)
         return BUILD_FAILED;
 
-    using Affects = TVRHBA_InstallServiceAffectsChip;
-    join<Affects>(agent, &Affects::AffectingElement, port.host.installationService, &Affects::AffectedElement,
-                  port.chip, "Insert Failed:TVRHBA_InstallServiceAffectsChip",
-                  [](Affects& affects) { affects.ElementEffects.set({5}); });
+    affect<TVRHBA_InstallServiceAffectsChip>(agent, port.host.installationService, port.chip,
+                                             "Insert Failed:TVRHBA_InstallServiceAffectsChip");
     return BUILD_DONE;
 }
 

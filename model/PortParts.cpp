@@ -182,8 +182,9 @@ Ref<FlashImage> makeFlashImage(const PortContext& port, const RM_FlashRegion& re
 std::uint32_t createFlashImage(PortContext& port, const RM_FlashRegion& region)
 {
     ProviderAgent& agent = port.host.agent;
-    const FlashImage* image = mapOf<FlashImage>(agent).insert(
-        makeFlashImage(port, region), "Insert Failed : m_TVRHBA_FlashImageSoftwareIdentity_map");
+    const FlashImage* image =
+        mapOf<FlashImage>(agent).insert(unlessOutOfMemory([&] { return makeFlashImage(port, region); }),
+                                        "Insert Failed : m_TVRHBA_FlashImageSoftwareIdentity_map");
     if (!image)
         return BUILD_FAILED;
     using OfController = TVRHBA_ElementFlashImageSoftwareIdentity;
@@ -211,10 +212,10 @@ std::uint32_t createTransceiver(PortContext& port)
 {
     std::unique_ptr<RM_SffData> data;
     TVR_MethodWrapper::tvrcimGetDigitalDiagnosticsData(port.port.name.c_str(), data);
-    const Transceiver* transceiver =
-        data ? mapOf<Transceiver>(port.host.agent)
-                   .insert(makeTransceiver(port, *data), "Insert Failed : m_TVRHBA_Transceiver_map")
-             : nullptr;
+    const Transceiver* transceiver = data ? mapOf<Transceiver>(port.host.agent)
+                                                .insert(unlessOutOfMemory([&] { return makeTransceiver(port, *data); }),
+                                                        "Insert Failed : m_TVRHBA_Transceiver_map")
+                                          : nullptr;
     if (!transceiver)
         return failed({TVR_DBG, "Failed Creating TVRHBA_Transceiver"}, BUILD_DONE);
     using Component = TVRHBA_TransceiverComponent;

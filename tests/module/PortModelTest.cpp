@@ -562,16 +562,6 @@ TEST(PortModel, FlashListsAreBoundedByTheirRoom)
     }
 }
 
-TEST(PortModel, PortsOfOneNameAreOnePort)
-{
-    Host host(R"({"adapters": [
-        {"name": "a", "serialNumber": "S1", "model": "M", "ports": [{"wwpn": "10:00:00:00:00:00:00:01"}]},
-        {"name": "b", "serialNumber": "S2", "model": "M", "ports": [{"wwpn": "10:00:00:00:00:00:00:02"}]}]})");
-    host.addFault(R"({"function": "HBA_GetAdapterPortAttributes", "subject": "b", "hostile": "allOnes"})");
-    EXPECT_THAT(host.instancesOf("TVRHBA_FCPort"), SizeIs(1));
-    host.unload();
-}
-
 // --- the beacon
 
 TEST(PortModel, BeaconIsShownAsTheLibraryHasIt)

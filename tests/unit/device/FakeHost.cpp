@@ -213,6 +213,30 @@ RM_STATUS LRM_GetQoS(HBA_WWN, RM_QosInfo* info)
     return host->enter("LRM_GetQoS");
 }
 
+RM_STATUS LRM_DiagBeaconState(HBA_WWN, std::uint32_t* state)
+{
+    *state = host->beacon;
+    return host->enter("LRM_DiagBeaconState");
+}
+
+RM_STATUS LRM_DiagBeacon(HBA_WWN, std::uint32_t state)
+{
+    host->beacon = state;
+    return host->enter("LRM_DiagBeacon");
+}
+
+RM_STATUS LRM_GetSffData(HBA_WWN, RM_SffData* data)
+{
+    *data = host->transceiver;
+    return host->enter("LRM_GetSffData");
+}
+
+RM_STATUS LRM_DiagGetLoadListParams(HBA_WWN, RM_FlashList* list)
+{
+    *list = host->flash;
+    return host->enter("LRM_DiagGetLoadListParams");
+}
+
 RM_STATUS LRM_GetVPD(HBA_WWN, RM_VpdArea* area)
 {
     *area = host->vpd;
@@ -381,6 +405,10 @@ const std::map<std::string, void*>& symbols()
         {"LRM_GetOASLunList", address(LRM_GetOASLunList)},
         {"LRM_GetVMFromVPort", address(LRM_GetVMFromVPort)},
         {"LRM_GetQoS", address(LRM_GetQoS)},
+        {"LRM_DiagBeacon", address(LRM_DiagBeacon)},
+        {"LRM_DiagBeaconState", address(LRM_DiagBeaconState)},
+        {"LRM_DiagGetLoadListParams", address(LRM_DiagGetLoadListParams)},
+        {"LRM_GetSffData", address(LRM_GetSffData)},
         {"LRM_GetVPD", address(LRM_GetVPD)},
         {"LRM_VpScsiReportLUNs", address(LRM_VpScsiReportLUNs)},
         {"LRM_VpScsiInquiry", address(LRM_VpScsiInquiry)},

@@ -59,6 +59,9 @@ public:
         laneList;
     std::string reportLuns;
     RM_VpdArea vpd{};
+    std::uint32_t beacon = RM_BEACON_OFF;
+    RM_SffData transceiver{};
+    RM_FlashList flash{1, {}}; ///< without a region
     std::string version = "7.1";
 
     // SCSI answers by page; page 0 is the standard Inquiry.
