@@ -1,7 +1,9 @@
 #include "agent/Build.h"
 
+#include <algorithm>
 #include <cstdarg>
 #include <cstdio>
+#include <memory>
 #include <string>
 
 namespace cimple
@@ -26,11 +28,13 @@ String joinTexts(std::initializer_list<std::string_view> parts)
     std::size_t size = 0;
     for (const std::string_view part : parts)
         size += part.size();
-    String text;
-    text.reserve(size);
+    char brief[256] = ""; // most texts fit
+    const std::unique_ptr<char[]> more(size > sizeof brief ? new char[size] : nullptr);
+    char* const text = more ? more.get() : brief;
+    char* end = text;
     for (const std::string_view part : parts)
-        text.append(part.data(), part.size());
-    return text;
+        end = std::copy(part.begin(), part.end(), end);
+    return String(text, size);
 }
 
 String formatText(const char* format, ...)

@@ -1,5 +1,6 @@
 #include "agent/Instance_Map.h"
 
+#include "agent/SharedEnds.h"
 #include "runtime/meta/InstanceSlots.h"
 
 #include <algorithm>
@@ -63,6 +64,15 @@ std::uint64_t hashProperty(std::uint64_t hash, const Instance* instance, const M
 /// Adds the keys of `as`, which is the instance's class or one of its superclasses.
 bool hashKeys(std::uint64_t& hash, const Instance* instance, const Meta_Class* as);
 
+/// Of these keys alone; nothing when they cannot be reduced safely.
+std::optional<std::uint64_t> hashOf(const Instance* instance, const Meta_Class* as)
+{
+    std::uint64_t hash = 0x243F6A8885A308D3ULL;
+    if (!is_subclass(as, instance->__meta_class) || !hashKeys(hash, instance, as))
+        return std::nullopt;
+    return hash;
+}
+
 bool hashKey(std::uint64_t& hash, const Instance* instance, const Meta_Feature* key)
 {
     if (const Meta_Property* property = as_property(key))
@@ -80,7 +90,10 @@ bool hashKey(std::uint64_t& hash, const Instance* instance, const Meta_Feature* 
         return true;
     }
     // Ends of different subclasses can be equal, so only what all of them have is looked at.
-    return is_subclass(reference->meta_class, end->__meta_class) && hashKeys(hash, end, reference->meta_class);
+    const auto keys =
+        SharedEnds::keyHash(end, reference->meta_class, [&] { return hashOf(end, reference->meta_class); });
+    hash = mix(hash, keys.value_or(0));
+    return keys.has_value();
 }
 
 bool hashKeys(std::uint64_t& hash, const Instance* instance, const Meta_Class* as)
@@ -91,10 +104,10 @@ bool hashKeys(std::uint64_t& hash, const Instance* instance, const Meta_Class* a
 /// 32 bits of the instance's keys, those of `as` alone; nothing when they cannot be reduced safely.
 std::optional<std::uint32_t> reduce(const Instance* instance, const Meta_Class* as)
 {
-    std::uint64_t hash = 0x243F6A8885A308D3ULL;
-    if (!hashKeys(hash, instance, as))
+    const std::optional<std::uint64_t> hash = hashOf(instance, as);
+    if (!hash)
         return std::nullopt;
-    return static_cast<std::uint32_t>(hash ^ (hash >> 32));
+    return static_cast<std::uint32_t>(*hash ^ (*hash >> 32));
 }
 
 /// From so many entries on a map has a table: up to there a pass over the fingerprints is as fast.

@@ -19,6 +19,16 @@ SharedEnds::~SharedEnds()
     current = _outer;
 }
 
+SharedEnds* SharedEnds::running()
+{
+    return current;
+}
+
+void SharedEnds::remember(const Instance* end, const Meta_Class* as, std::uint64_t hash)
+{
+    _keyHashes[_nextKeyHash++ % _keyHashes.size()] = {Ref<const Instance>(ref(end)), as, hash};
+}
+
 Ref<> SharedEnds::of(const Instance* instance)
 {
     if (!current || !instance)

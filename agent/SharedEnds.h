@@ -3,6 +3,9 @@
 
 #include "runtime/meta/Instance.h"
 
+#include <array>
+#include <cstdint>
+#include <optional>
 #include <unordered_map>
 
 namespace cimple
@@ -20,8 +23,38 @@ public:
 
     static Ref<> of(const Instance* instance);
 
+    /// What `hash()` gives of the keys that an end has as an instance of the class `as`: a number, or false. The run
+    /// remembers the last few, since an end stands in several associations.
+    template <class Hash>
+    static std::optional<std::uint64_t> keyHash(const Instance* end, const Meta_Class* as, Hash hash)
+    {
+        SharedEnds* run = running();
+        if (!run)
+            return hash();
+        for (const KeyHash& known : run->_keyHashes)
+            if (known.end.get() == end && known.as == as)
+                return known.hash;
+        const std::optional<std::uint64_t> made = hash();
+        if (made)
+            run->remember(end, as, *made);
+        return made;
+    }
+
 private:
+    /// The end is held: another instance at its address would be taken for it.
+    struct KeyHash
+    {
+        Ref<const Instance> end;
+        const Meta_Class* as = nullptr;
+        std::uint64_t hash = 0;
+    };
+
+    static SharedEnds* running();
+    void remember(const Instance* end, const Meta_Class* as, std::uint64_t hash);
+
     std::unordered_map<const Instance*, Ref<>> _ends; ///< by the instance that each was made of
+    std::array<KeyHash, 8> _keyHashes;
+    std::size_t _nextKeyHash = 0;
     SharedEnds* const _outer;
 };
 

@@ -18,11 +18,16 @@ std::string wwnText(const HBA_WWN& wwn)
 
 std::string lunText(std::uint64_t field)
 {
+    char text[17];
+    lunToText(field, text);
+    return text;
+}
+
+void lunToText(std::uint64_t field, char (&text)[17])
+{
     std::uint8_t bytes[sizeof field];
     std::memcpy(bytes, &field, sizeof field);
-    char text[17];
     wwnToUpperHex(bytes, text);
-    return text;
 }
 
 HBA_WWN wwnOf(const std::string& text)

@@ -35,6 +35,7 @@ std::string wwnText(const HBA_WWN& wwn);
 
 /// A LUN field, eight bytes as they lie in memory: 16 upper-case hexadecimal digits.
 std::string lunText(std::uint64_t field);
+void lunToText(std::uint64_t field, char (&text)[17]);
 
 /// The name behind wwnText(). Logs a text of another form and throws std::exception.
 HBA_WWN wwnOf(const std::string& text);

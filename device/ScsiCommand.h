@@ -35,7 +35,8 @@ template <std::uint32_t Size, class Command> ScsiAnswer<Size> sendScsi(const Com
     ScsiAnswer<Size> answer;
     for (int i = 0; i < 3; ++i)
     {
-        answer = {};
+        if (i != 0)
+            answer = {};
         answer.status = static_cast<std::int32_t>(command(answer));
         if (answer.status != RM_ERROR_CHECK_CONDITION)
             break;

@@ -4,9 +4,9 @@
 #include "model/LogicalDevices.h"
 #include "schema/TVRHBA_LocalHostedAccessPoint.h"
 
-#include <cstdio>
 #include <optional>
 #include <string_view>
+#include <tuple>
 
 namespace cimple
 {
@@ -56,7 +56,9 @@ struct SanContext
     Ref<CIM_ComputerSystem> system;
     Prototype<TVRHBA_SCSIProtocolEndpoint> endpoint;
     DevicePrototypes devices;
-    RepeatedText targetWwpn, targetWwnn, product, inquiry;
+    RepeatedText targetWwpn, targetWwnn, product;
+    const Target* lastTarget = nullptr; ///< that an inquiry text was made of
+    String inquiry;
 };
 
 /// A port with the initiator endpoint that stands for it.
@@ -101,36 +103,42 @@ std::uint32_t createEndpoint(SanContext& san, LogicalUnit& unit, const String& n
     return hosted == Joined::Refused ? BUILD_FAILED : BUILD_DONE;
 }
 
-/// "%.8s %.16s Revision %.4s" of vendor, product and revision.
+std::string_view cut(const std::string& text, std::size_t size)
+{
+    return std::string_view(text).substr(0, size);
+}
+
+/// What the units before said of themselves often holds for the next one.
 const String& inquiryText(SanContext& san, const Target& target)
 {
-    char text[8 + 1 + 16 + 10 + 4 + 1];
-    const int size = std::snprintf(text, sizeof text, "%.8s %.16s Revision %.4s", target.vendor.c_str(),
-                                   target.product.c_str(), target.revision.c_str());
-    return san.inquiry.of({text, static_cast<std::size_t>(size)});
+    const auto product = [](const Target& of) { return std::tie(of.vendor, of.product, of.revision); };
+    if (!san.lastTarget || product(*san.lastTarget) != product(target))
+        san.inquiry =
+            joinTexts({cut(target.vendor, 8), " ", cut(target.product, 16), " Revision ", cut(target.revision, 4)});
+    return san.inquiry;
 }
 
 /// Notes a pair of ports. The units of a target follow each other.
-void noteRemotePort(HostContext& host, const std::string& wwpn, const std::string& remote)
+void noteRemotePort(SanContext& san, const std::string& wwpn, const Target& target, unsigned index)
 {
-    const std::string pair = wwpn + "|" + remote;
-    if (host.remotePorts.empty() || *host.remotePorts.rbegin() != pair)
-        host.remotePorts.insert(pair);
+    if (index == 0 || san.lastTarget->portWWN != target.portWWN)
+        san.host.remotePorts.insert(wwpn + "|" + target.portWWN);
 }
 
 std::uint32_t createLogicalUnit(const InitiatorPort& on, unsigned index)
 {
     SanContext& san = on.san;
     const Target& target = *on.port.getTarget(index);
-    noteRemotePort(san.host, on.port.name, target.portWWN);
-    const std::string lun = lunText(target.fcpLun);
     const std::string& wwpn = on.port.name;
+    char lun[17];
+    lunToText(target.fcpLun, lun);
+    noteRemotePort(san, wwpn, target, index);
     LogicalUnit unit{san.host.agent, san.devices, target, san.system, on.initiator, inquiryText(san, target)};
-    unit.description =
-        joinTexts({unit.inquiry.view(), " Serial Number ", std::string_view(target.serialNumber).substr(0, 40)});
+    san.lastTarget = &target;
+    unit.description = joinTexts({unit.inquiry.view(), " Serial Number ", cut(target.serialNumber, 40)});
     unit.osDeviceName = target.osDeviceName;
-    if (const std::uint32_t status = createEndpoint(san, unit, joinTexts({wwpn, ":", target.portWWN, ":", lun}));
-        status != BUILD_DONE)
+    const String name = joinTexts({wwpn, ":", target.portWWN, ":", lun});
+    if (const std::uint32_t status = createEndpoint(san, unit, name); status != BUILD_DONE)
         return status;
     TVR_LOG(TVR_DBG, "Target %d is of type %d.", static_cast<int>(index), static_cast<int>(target.deviceType));
     descriptorToString(unit.identifier, &target.designator);

@@ -14,19 +14,17 @@ Prototype_Base::Prototype_Base(Ref<> model) : _model(std::move(model))
         switch (slot_kind(mf))
         {
         case Slot_Kind::scalar:
-            CIMPLE_ASSERT(mp->type != DATETIME || null_byte(_model.get(), mp));
-            if (mp->type == STRING && !slot<String>(_model.get(), mp->offset).empty())
+            if (mp->type == DATETIME)
+                _times.push_back(mp);
+            else if (mp->type == STRING && !slot<String>(_model.get(), mp->offset).empty())
                 _texts.push_back(mp);
             break;
         case Slot_Kind::array:
-            if (array_slot(_model.get(), mp->offset).size() != 0)
-                _arrays.push_back(mp);
+            _arrays.push_back(mp);
             break;
         case Slot_Kind::reference:
-            CIMPLE_ASSERT(!reference_slot(_model.get(), static_cast<const Meta_Reference*>(mf)));
-            break;
         case Slot_Kind::reference_array:
-            CIMPLE_ASSERT(array_slot(_model.get(), static_cast<const Meta_Reference*>(mf)->offset).size() == 0);
+            CIMPLE_ASSERT(!"a prototype without references");
             break;
         case Slot_Kind::none:
             break;
@@ -42,8 +40,11 @@ Instance* Prototype_Base::copy() const
         std::construct_at(&array_slot(copied.get(), mp->offset), array_traits(mp->type));
     for (const Meta_Property* mp : _texts)
         std::construct_at(&slot<String>(copied.get(), mp->offset), slot<String>(_model.get(), mp->offset));
+    for (const Meta_Property* mp : _times)
+        std::construct_at(&slot<Datetime>(copied.get(), mp->offset), slot<Datetime>(_model.get(), mp->offset));
     for (const Meta_Property* mp : _arrays)
-        array_slot(copied.get(), mp->offset) = array_slot(_model.get(), mp->offset);
+        if (const Array_Base& elements = array_slot(_model.get(), mp->offset); elements.size() != 0)
+            array_slot(copied.get(), mp->offset) = elements;
     return copied.release();
 }
 

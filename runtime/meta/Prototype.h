@@ -20,10 +20,11 @@ public:
 private:
     Ref<> _model;
     std::vector<const Meta_Property*> _texts;  ///< slots with a text of their own
-    std::vector<const Meta_Property*> _arrays; ///< with elements
+    std::vector<const Meta_Property*> _times;  ///< all of them
+    std::vector<const Meta_Property*> _arrays; ///< all of them, since an empty one may have memory
 };
 
-/// The model has no references, and is not changed any more.
+/// The model has no references and no arrays of them, and is not changed any more.
 template <class Record> class Prototype : private Prototype_Base
 {
 public:

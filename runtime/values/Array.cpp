@@ -115,6 +115,19 @@ private:
     Array_Base::Rep* _rep;
 };
 
+Array_Base::Rep* fresh_rep(const Array_Traits* traits)
+{
+    return is_known(traits) ? &empty_reps[static_cast<std::size_t>(traits - known_traits.data())]
+                            : make_rep(traits, first_capacity);
+}
+
+Array_Base::Rep* filled_rep(const Array_Traits* traits, const void* elements, std::size_t count)
+{
+    Draft draft(traits, std::max(count, first_capacity));
+    draft.append(elements, count);
+    return draft.take();
+}
+
 bool equal_bytes_or_values(const Array_Traits* traits, const void* a, const void* b)
 {
     return traits->equal ? traits->equal(a, b) : std::memcmp(a, b, traits->element_size) == 0;
@@ -133,15 +146,13 @@ const Array_Traits* instance_array_traits()
     return &known_traits[num_types];
 }
 
-Array_Base::Array_Base(const Array_Traits* traits)
-    : _rep(is_known(traits) ? &empty_reps[static_cast<std::size_t>(traits - known_traits.data())]
-                            : make_rep(traits, first_capacity))
+Array_Base::Array_Base(const Array_Traits* traits) : _rep(fresh_rep(traits)) {}
+
+Array_Base::Array_Base(const Array_Traits* traits, const void* elements, std::size_t count)
+    : _rep(count == 0 ? fresh_rep(traits) : filled_rep(traits, elements, count))
 {}
 
-Array_Base::Array_Base(const Array_Base& other) : Array_Base(other.traits())
-{
-    append(other.data(), other.size());
-}
+Array_Base::Array_Base(const Array_Base& other) : Array_Base(other.traits(), other.data(), other.size()) {}
 
 Array_Base::Array_Base(Array_Base&& other) noexcept : _rep(std::exchange(other._rep, nullptr)) {}
 

@@ -30,6 +30,7 @@ class Array_Base
 {
 public:
     explicit Array_Base(const Array_Traits* traits);
+    Array_Base(const Array_Traits* traits, const void* elements, std::size_t count);
     Array_Base(const Array_Base& other);
     Array_Base(Array_Base&& other) noexcept; // leaves `other` without a representation: destroy or assign only
     ~Array_Base();
@@ -131,7 +132,7 @@ template <class T> class Array : public Array_Base
 {
 public:
     Array() : Array_Base(array_traits_of<T>()) {}
-    Array(std::initializer_list<T> elements) : Array() { Array_Base::append(elements.begin(), elements.size()); }
+    Array(std::initializer_list<T> elements) : Array_Base(array_traits_of<T>(), elements.begin(), elements.size()) {}
 
     T* data() { return static_cast<T*>(Array_Base::data()); }
     const T* data() const { return static_cast<const T*>(Array_Base::data()); }

@@ -246,6 +246,46 @@ TEST(InstanceMap, RemoveAtKeepsTheOthersFindable)
     EXPECT_EQ(map.insert(taken.release()), 0);
 }
 
+/// Where a large map keeps its fingerprints, entries come, go and move up like those of a vector.
+TEST(InstanceMap, LargeMapBehavesAsANaiveVector)
+{
+    Instance_Map map(&TVRHBA_Card::static_meta_class);
+    NaiveMap naive;
+    std::uint32_t random = 1;
+    const auto below = [&](std::uint32_t limit) { return ((random = random * 1664525 + 1013904223) >> 8) % limit; };
+    for (int step = 0; step < 1500; step++)
+    {
+        const Ref<> card(makeCard<TVRHBA_Card>(std::to_string(below(400)), false).release());
+        const bool removes = below(8) == 0 || (step > 1000 && below(2) == 0);
+        if (removes)
+        {
+            ASSERT_EQ(map.remove(card.get()) == 0, naive.remove(card.get())) << step;
+        }
+        else
+        {
+            Ref<> owned(clone(card.get()));
+            const std::ptrdiff_t index = map.insert(owned.get());
+            if (index != -1)
+                static_cast<void>(owned.release());
+            ASSERT_EQ(index, naive.insert(card)) << step;
+        }
+        const Ref<TVRHBA_Card> sought = makeCard<TVRHBA_Card>(std::to_string(below(400)), false);
+        ASSERT_EQ(map.find(sought.get()), naive.find(sought.get())) << step;
+        ASSERT_EQ(map.size(), naive.size());
+    }
+    EXPECT_GT(map.size(), 100u);
+    while (map.size() != 0) // from the front, until it is small again
+    {
+        Ref<> first(map.remove_at(0));
+        ASSERT_EQ(map.find(first.get()), -1);
+        if (map.size() != 0)
+        {
+            ASSERT_EQ(map.find(map.at(map.size() - 1)), static_cast<std::ptrdiff_t>(map.size()) - 1);
+        }
+    }
+    EXPECT_EQ(map.insert(makeCard<TVRHBA_Card>("1", false).release()), 0);
+}
+
 TEST(InstanceMap, CopiesForReadersKnowNothingOfLaterChanges)
 {
     Instance_Map map(&TVRHBA_SystemDevice::static_meta_class);

@@ -1,5 +1,7 @@
 // Life and content of instances.
 #include "runtime/meta/Print.h"
+#include "runtime/meta/Prototype.h"
+#include "schema/TVRHBA_TapeDrive.h"
 #include "tests/unit/runtime/Records.h"
 
 #include <gtest/gtest.h>
@@ -91,6 +93,28 @@ TEST(InstanceLife, ACloneIsIdenticalAndItsOwn)
     EXPECT_EQ(disk->Name.value, "sda");
     EXPECT_EQ(disk->Notes.value[0], "x");
     EXPECT_EQ(disk->Twin->Name.value, "sdb");
+}
+
+TEST(InstanceLife, CopiesOfAPrototypeAreClonesOfTheirOwn)
+{
+    Ref<TVRHBA_TapeDrive> model(create<TVRHBA_TapeDrive>(true));
+    model->__name_space = "root/x";
+    model->Name.set("name");
+    model->InstallDate.set(Datetime::timestamp(5, 60));
+    model->OperationalStatus.set({1, 2});
+    model->OtherIdentifyingInfo.set({"a", "b"});
+    model->IdentifyingDescriptions.set({"c"});
+    model->IdentifyingDescriptions.value.clear(); // with memory of its own
+    const Prototype<TVRHBA_TapeDrive> prototype(model);
+    const Ref<TVRHBA_TapeDrive> first = prototype.copy();
+    const Ref<TVRHBA_TapeDrive> second = prototype.copy();
+    EXPECT_TRUE(identical(first.get(), model.get()));
+    first->OtherIdentifyingInfo.value[0] = "changed";
+    first->OperationalStatus.value.append(3);
+    first->IdentifyingDescriptions.value.append("d");
+    first->Name.set("another");
+    EXPECT_TRUE(identical(second.get(), model.get()));
+    EXPECT_EQ(second->Name.value.shares_count(), 2u) << "the model's and the copy's";
 }
 
 TEST(InstanceLife, ACopyForReadersSharesWhatItRefersTo)
