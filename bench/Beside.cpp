@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <cstdio>
 #include <iterator>
-#include <malloc.h>
 
 namespace bench
 {
@@ -62,12 +61,6 @@ private:
 };
 
 } // namespace
-
-std::size_t heapBytes()
-{
-    const struct mallinfo2 info = mallinfo2();
-    return info.uordblks + info.hblkhd;
-}
 
 Row::~Row()
 {

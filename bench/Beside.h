@@ -6,6 +6,7 @@
 #include <chrono>
 #include <cstddef>
 #include <limits>
+#include <malloc.h>
 #include <string>
 
 namespace bench
@@ -21,7 +22,11 @@ template <class Work> double nanosecondsOf(Work work)
 }
 
 /// Bytes on the heap that are in use, of all threads.
-std::size_t heapBytes();
+inline std::size_t heapBytes()
+{
+    const struct mallinfo2 info = mallinfo2();
+    return info.uordblks + info.hblkhd;
+}
 
 /// What one row of the table says. The figures are those of the best round: other load on the machine makes rounds
 /// longer, and nothing makes them shorter.

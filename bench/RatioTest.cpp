@@ -1,13 +1,23 @@
 // The figures that must hold on any machine: each is a ratio of two measured in the same run, best of several rounds.
 #include "bench/HostAndFloor.h"
 #include "bench/Workloads.h"
+#include "device/Target.h"
 #include "schema/TVRHBA_Card.h"
+#include "schema/TVRHBA_LocalHostedAccessPoint.h"
+#include "schema/TVRHBA_SCSIInitiatorTargetStorageVolumePath.h"
+#include "schema/TVRHBA_SCSIProtocolEndpoint.h"
+#include "schema/TVRHBA_StorageVolume.h"
+#include "schema/TVRHBA_StorageVolumeSystemDevice.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <chrono>
+#include <ctime>
 #include <limits>
+#include <set>
+#include <string>
+#include <utility>
 
 using namespace cimple;
 
@@ -81,7 +91,8 @@ TEST(Ratio, CloneCostsWhatItCannotAvoid)
     const bench::CloneFloor floor(card.get());
     const double least = nanoseconds(1000, [&] { floor.run(); });
     const double cloned = nanoseconds(1000, [&] { unref(clone(card.get())); });
-    // 1.3 to 2.2 on the machines that were measured; what this must catch is an allocation for each text, at 5 and more.
+    // 1.3 to 2.2 on the machines that were measured; what this must catch is an allocation for each text, at 5 and
+    // more.
     EXPECT_LE(cloned, 3 * least) << cloned << " ns against " << least << " ns";
 }
 
@@ -139,6 +150,155 @@ TEST(Ratio, SearchesInALargeMapAreOneTightPass)
     EXPECT_LE(large.get, 3 * small.get) << large.get << " ns against " << small.get << " ns";
     EXPECT_LE(large.associatorNames, 3 * small.associatorNames)
         << large.associatorNames << " ns against " << small.associatorNames << " ns";
+}
+
+// --- the SAN ---------------------------------------------------------------------------------------------
+
+constexpr const char* volumeClass = "TVRHBA_StorageVolume";
+constexpr const char* emptyClass = "TVRHBA_TapeDrive"; ///< of a host of disks: its reader waits, and gets nothing
+
+bench::HostSize hostOfUnits(std::uint32_t units)
+{
+    constexpr std::uint32_t perTarget = 64;
+    return {.adapters = 2, .targetsPerPort = units / perTarget / 2, .unitsPerTarget = perTarget};
+}
+
+/// Nanoseconds for which this process had a processor: other load on the machine does not count.
+double processorTime()
+{
+    timespec now;
+    clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &now);
+    return static_cast<double>(now.tv_sec) * 1e9 + static_cast<double>(now.tv_nsec);
+}
+
+struct RefreshTimes
+{
+    double total = std::numeric_limits<double>::max(); ///< for each unit
+    double libraries = total;                          ///< of them, inside the simulated libraries
+};
+
+RefreshTimes refreshOf(std::uint32_t units, int rounds)
+{
+    bench::BenchHost host(hostOfUnits(units));
+    RefreshTimes best;
+    for (int round = 0; round < rounds; round++)
+    {
+        host.reload();
+        host.load(emptyClass);
+        host.enumerate(bench::smallClass);
+        bench::BenchHost::awaitEndOfRefresh();
+        const auto libraries = static_cast<double>(bench::BenchHost::nanosecondsInLibraries());
+        const double before = processorTime();
+        EXPECT_TRUE(host.enumerate(emptyClass).empty());
+        bench::BenchHost::awaitEndOfRefresh();
+        best.total = std::min(best.total, (processorTime() - before) / units);
+        best.libraries = std::min(
+            best.libraries, (static_cast<double>(bench::BenchHost::nanosecondsInLibraries()) - libraries) / units);
+    }
+    return best;
+}
+
+TEST(Ratio, RefreshOfTheSanIsLinear)
+{
+    const RefreshTimes small = refreshOf(1024, 12);
+    const RefreshTimes large = refreshOf(16384, 3);
+    for (const auto& [name, times] : {std::pair("small", small), std::pair("large", large)})
+    {
+        RecordProperty(std::string(name) + "_ns_a_unit", std::to_string(times.total));
+        RecordProperty(std::string(name) + "_ns_in_libraries", std::to_string(times.libraries));
+    }
+    EXPECT_LE(large.total, 2 * small.total) << large.total << " ns a unit against " << small.total << " ns";
+    // What this must catch is a walk over all units for each of them, and a copy of each end for each association.
+    EXPECT_LE(small.total - small.libraries, 6 * small.libraries) << "of " << small.total << " ns a unit";
+}
+
+struct UnitTimes
+{
+    double get, associatorNames, associators;
+};
+
+/// Of one volume, and of the system for each of its volumes. The processor's time, best of a few.
+UnitTimes operationsAmong(std::uint32_t units)
+{
+    bench::BenchHost host(hostOfUnits(units));
+    const broker::Path volume = host.enumerate(volumeClass).back().path;
+    const broker::AssociationFilter ofUnit{.assocClass = "TVRHBA_StorageVolumeSystemDevice"};
+    const broker::NamesReply system = host.broker().associatorNames(volume, ofUnit);
+    EXPECT_EQ(system.paths.size(), 1u);
+    const auto bestOf = [](int rounds, int calls, auto work)
+    {
+        double best = std::numeric_limits<double>::max();
+        for (int round = 0; round < rounds; round++)
+        {
+            const double before = processorTime();
+            for (int i = 0; i < calls; i++)
+                work();
+            best = std::min(best, (processorTime() - before) / calls);
+        }
+        return best;
+    };
+    return {
+        .get = bestOf(20, 50, [&] { keep(host.broker().getInstance(volume).objects.size()); }),
+        .associatorNames = bestOf(20, 50, [&] { keep(host.broker().associatorNames(volume, ofUnit).paths.size()); }),
+        .associators =
+            bestOf(units > 1024 ? 1 : 3, 1,
+                   [&] { EXPECT_EQ(host.broker().associators(system.paths[0], ofUnit).objects.size(), units); }) /
+            units,
+    };
+}
+
+TEST(Ratio, OperationsOnAVolumeDoNotGrowWithTheSan)
+{
+    const UnitTimes few = operationsAmong(128);
+    const UnitTimes some = operationsAmong(1024);
+    const UnitTimes many = operationsAmong(16384);
+    for (const auto& [size, times] : {std::pair("128", few), std::pair("1024", some), std::pair("16384", many)})
+    {
+        RecordProperty(std::string("get_ns_among_") + size, std::to_string(times.get));
+        RecordProperty(std::string("names_ns_among_") + size, std::to_string(times.associatorNames));
+        RecordProperty(std::string("associators_ns_among_") + size, std::to_string(times.associators));
+    }
+    EXPECT_LE(many.get, 3 * few.get) << many.get << " ns against " << few.get << " ns";
+    EXPECT_LE(many.associatorNames, 3 * few.associatorNames)
+        << many.associatorNames << " ns against " << few.associatorNames << " ns";
+    EXPECT_LE(many.associators, 2 * some.associators)
+        << many.associators << " ns a volume against " << some.associators << " ns";
+}
+
+/// Bytes of the texts of an object, each counted once.
+std::size_t textBytes(const broker::Object& object, std::set<std::string>& counted)
+{
+    std::size_t bytes = 0;
+    for (const auto& [name, value] : object.properties)
+        if (value.type() == CMPI_string && !value.isNull() && counted.insert(value.asString()).second)
+            bytes += value.asString().size();
+    return bytes;
+}
+
+TEST(Ratio, UnitKeepsAtMostTwiceItsRecordsAndItsText)
+{
+    constexpr std::uint32_t units = 4096;
+    bench::BenchHost host(hostOfUnits(units));
+    host.load(emptyClass);
+    host.enumerate(bench::smallClass);
+    bench::BenchHost::awaitEndOfRefresh();
+    const std::size_t before = bench::heapBytes();
+    host.enumerate(emptyClass);
+    bench::BenchHost::awaitEndOfRefresh();
+    const std::size_t kept = (bench::heapBytes() - before) / units - sizeof(Target);
+
+    const std::size_t records = TVRHBA_SCSIProtocolEndpoint::static_meta_class.size +
+                                TVRHBA_StorageVolume::static_meta_class.size +
+                                TVRHBA_LocalHostedAccessPoint::static_meta_class.size +
+                                TVRHBA_StorageVolumeSystemDevice::static_meta_class.size +
+                                TVRHBA_SCSIInitiatorTargetStorageVolumePath::static_meta_class.size;
+    std::set<std::string> counted;
+    std::size_t texts = 0;
+    for (const char* className : {volumeClass, "TVRHBA_SCSIProtocolEndpoint"})
+        texts += textBytes(host.enumerate(className).back(), counted);
+    RecordProperty("kept", std::to_string(kept) + " of " + std::to_string(records) + " and " + std::to_string(texts));
+    EXPECT_LE(kept, 2 * records + texts) << kept << " bytes of " << records << " of records and " << texts
+                                         << " of text";
 }
 
 } // namespace
