@@ -474,6 +474,7 @@ int closeFile(void* library)
 FakeHost::FakeHost()
     : _previous(cimple::setDynamicLoader({openFile, findSymbol, closeFile, [] { return "fake error"; }}))
 {
+    symbols(); // made now, and not where a test has memory run out
     host = this;
 }
 
