@@ -474,7 +474,9 @@ int closeFile(void* library)
 FakeHost::FakeHost()
     : _previous(cimple::setDynamicLoader({openFile, findSymbol, closeFile, [] { return "fake error"; }}))
 {
-    symbols(); // made now, and not where a test has memory run out
+    // Made now, and not where a test has memory run out: the C library may need some to note a static object's end.
+    symbols();
+    cimple::TVR_Logger::instance();
     host = this;
 }
 
