@@ -1,6 +1,7 @@
 #include "model/PortModel.h"
 
 #include "agent/Build.h"
+#include "model/FcpEndpoint.h"
 #include "model/PortFacts.h"
 #include "model/PortValues.h"
 #include "schema/TVRHBA_Card.h"
@@ -167,20 +168,11 @@ Ref<TVRHBA_PortController> makePortController(const PortContext& port)
 Ref<TVRHBA_SCSIProtocolInitiatorEndpoint> makeInitiatorEndpoint(const PortContext& port)
 {
     const FCAdapterAttributes& adapter = port.on.attributes;
-    Ref<TVRHBA_SCSIProtocolInitiatorEndpoint> made = fresh<TVRHBA_SCSIProtocolInitiatorEndpoint>();
+    Ref<TVRHBA_SCSIProtocolInitiatorEndpoint> made =
+        makeFcpEndpoint<TVRHBA_SCSIProtocolInitiatorEndpoint>(*port.host.system, EndpointRole::Initiator);
     made->Description.set(adapter.modelDescription);
-    setSystem(*made, *port.host.system);
-    made->CreationClassName.set(className<TVRHBA_SCSIProtocolInitiatorEndpoint>());
     made->ElementName.set(adapter.nodeSymbolicName);
     made->Name.set(port.port.name);
-    made->ProtocolType.set(18);
-    made->ProtocolIFType.set(56);
-    made->ConnectionType.set(2);
-    made->Role.set(2);
-    made->EnabledDefault.set(5);
-    made->EnabledState.set(0);
-    made->RequestedState.set(0);
-    made->OperationalStatus.set({0});
     return made;
 }
 

@@ -3,6 +3,7 @@
 #include "agent/Build.h"
 #include "device/ForeignText.h"
 #include "device/TVR_MethodWrapper.h"
+#include "model/FcpEndpoint.h"
 #include "model/PortValues.h"
 #include "model/UnitNames.h"
 #include "schema/TVRHBA_DriverParamAffectsVirtualFCPort.h"
@@ -245,20 +246,11 @@ String description(const VirtualUnit& unit)
 
 Ref<TVRHBA_VirtualSCSIProtocolTargetEndpoint> makeTargetEndpoint(const VirtualUnit& unit)
 {
-    Ref<TVRHBA_VirtualSCSIProtocolTargetEndpoint> made = fresh<TVRHBA_VirtualSCSIProtocolTargetEndpoint>();
+    Ref<TVRHBA_VirtualSCSIProtocolTargetEndpoint> made =
+        makeFcpEndpoint<TVRHBA_VirtualSCSIProtocolTargetEndpoint>(*unit.system(), EndpointRole::Target);
     made->Description.set(description(unit));
-    setSystem(*made, *unit.system());
-    made->CreationClassName.set(className<TVRHBA_VirtualSCSIProtocolTargetEndpoint>());
     made->ElementName.set(unit.attributes.inquiry.product);
     made->Name.set(formatText("%s:%s:%s", unit.behind.wwpn.c_str(), unit.target.c_str(), unit.lun.c_str()));
-    made->ProtocolType.set(18);
-    made->ProtocolIFType.set(56);
-    made->ConnectionType.set(2);
-    made->Role.set(3);
-    made->EnabledDefault.set(5);
-    made->EnabledState.set(0);
-    made->RequestedState.set(0);
-    made->OperationalStatus.set({0});
     return made;
 }
 

@@ -1,6 +1,7 @@
 #include "model/SanModel.h"
 
 #include "device/ForeignText.h"
+#include "model/FcpEndpoint.h"
 #include "model/LogicalDevices.h"
 #include "schema/TVRHBA_LocalHostedAccessPoint.h"
 
@@ -31,17 +32,8 @@ private:
 
 Prototype<TVRHBA_SCSIProtocolEndpoint> endpointPrototype(const CIM_ComputerSystem& system)
 {
-    Ref<TVRHBA_SCSIProtocolEndpoint> endpoint = fresh<TVRHBA_SCSIProtocolEndpoint>();
-    setSystem(*endpoint, system);
-    endpoint->CreationClassName.set(className<TVRHBA_SCSIProtocolEndpoint>());
-    endpoint->ProtocolType.set(18);
-    endpoint->ProtocolIFType.set(56);
-    endpoint->ConnectionType.set(2);
-    endpoint->Role.set(3);
-    endpoint->EnabledDefault.set(5);
-    endpoint->EnabledState.set(0);
-    endpoint->RequestedState.set(0);
-    endpoint->OperationalStatus.set({0});
+    Ref<TVRHBA_SCSIProtocolEndpoint> endpoint =
+        makeFcpEndpoint<TVRHBA_SCSIProtocolEndpoint>(system, EndpointRole::Target);
     endpoint->IdentifyingDescriptions.set({"OS Device Name"});
     return Prototype<TVRHBA_SCSIProtocolEndpoint>(endpoint);
 }
