@@ -3,6 +3,9 @@
 #include "agent/Reading.h"
 
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
+
+#include <exception>
 
 namespace cimple
 {
@@ -51,7 +54,29 @@ void copyFabricWhenReady(ProviderAgent& agent, Reading& reading)
     }
 }
 
-void copyAfterLiveRefresh(ProviderAgent& agent, Mutex& classMutex, LiveRefresh refresh, Reading& reading)
+/// While it lives, what goes missing for want of memory leaves the maps marked as incomplete, and a refresh due.
+class WatchMemory
+{
+public:
+    explicit WatchMemory(ProviderAgent& agent) : _agent(agent) {}
+    ~WatchMemory()
+    {
+        if (left_out_for_memory == _leftOutBefore && std::uncaught_exceptions() == _exceptions)
+            return;
+        _agent.m_bAdapterMapsIncomplete = true;
+        _agent.m_bAdapterRefreshPending = true;
+    }
+    WatchMemory(const WatchMemory&) = delete;
+    WatchMemory& operator=(const WatchMemory&) = delete;
+
+private:
+    ProviderAgent& _agent;
+    const unsigned _leftOutBefore = left_out_for_memory;
+    const int _exceptions = std::uncaught_exceptions();
+};
+
+void copyAfterLiveRefresh(ProviderAgent& agent, Mutex& classMutex, LiveRefresh refresh, const Selection& selection,
+                          Reading& reading)
 {
     Auto_Mutex adapterDataLock(agent.m_AdapterDataReadyMutex);
     agent.adapterData().waitIfNotReady();
@@ -60,7 +85,8 @@ void copyAfterLiveRefresh(ProviderAgent& agent, Mutex& classMutex, LiveRefresh r
     Auto_Mutex dataLock(agent.m_DataMutex);
     {
         Auto_Mutex classLock(classMutex);
-        refresh(agent);
+        const WatchMemory watch(agent);
+        refresh(agent, selection);
     }
     reading.copy(agent.adapterMaps());
 }
@@ -123,7 +149,7 @@ int enumerateActive(Instance_Map InstanceCache::*map, const char* providerName, 
         }
         agent.BuildCimpleInfo();
         Reading reading(agent.*map, selection);
-        copyAfterLiveRefresh(agent, classMutex, refresh, reading);
+        copyAfterLiveRefresh(agent, classMutex, refresh, selection, reading);
         reading.deliver(providerName, handler, client);
     }
     catch (...)

@@ -22,8 +22,8 @@ int enumeratePlain(Instance_Map InstanceCache::*map, const char* providerName, I
 int enumerateSan(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client,
                  const Selection& selection);
 
-/// Updates a map from the hardware; the caller holds all locks of the refresh.
-using LiveRefresh = void (*)(ProviderAgent& agent);
+/// Updates what is selected of a map from the hardware; the caller holds all locks of the refresh.
+using LiveRefresh = void (*)(ProviderAgent& agent, const Selection& selection);
 
 /// The same after a live refresh, serialised by the class's own mutex.
 int enumerateActive(Instance_Map InstanceCache::*map, const char* providerName, Mutex& classMutex, LiveRefresh refresh,

@@ -270,7 +270,8 @@ void ProviderAgent::sanStage()
         TVR_LOG(TVR_DBG, "PERF: Updating SAN Maps...");
         run.contain("the SAN maps", [&] { updateSANMaps(); });
     }
-    m_bSANMapsIncomplete = !m_bLoaded || !run.isWhole();
+    // The ports that the SAN hangs on may be missing too.
+    m_bSANMapsIncomplete = !m_bLoaded || !run.isWhole() || m_bAdapterMapsIncomplete;
     if (!run.isWhole())
         m_bSANRefreshPending = true;
     sanMaps().complete();

@@ -3,6 +3,7 @@
 
 #include "device/Bindings.h"
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
 
 #include <algorithm>
 #include <new>
@@ -100,6 +101,7 @@ RM_STATUS TVR_MethodWrapper::tvrcimGetDigitalDiagnosticsData(const char* deviceI
     std::unique_ptr<RM_SffData> buffer(new (std::nothrow) RM_SffData{});
     if (!buffer)
     {
+        ++left_out_for_memory;
         TVR_LOG(TVR_DBG, "ERROR: tvrcimGetDigitalDiagnosticsData: Error - Unable to allocate buffer.");
         return RM_ERROR_NO_MEMORY;
     }
@@ -117,6 +119,8 @@ RM_STATUS TVR_MethodWrapper::GetFlashContents(const char* deviceId, std::vector<
     if (idToWwn(&wwpn, deviceId) != 0)
         return RM_ERROR;
     const std::unique_ptr<RM_FlashList> list(new (std::nothrow) RM_FlashList{});
+    if (!list)
+        ++left_out_for_memory;
     const RM_STATUS status = list ? LRM_DiagGetLoadListParams(wwpn, list.get()) : RM_STATUS{RM_ERROR_NO_MEMORY};
     if (status != RM_OK)
     {

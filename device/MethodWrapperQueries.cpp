@@ -44,6 +44,7 @@ RM_STATUS fetchList(std::vector<Entry>& out, const char* noMemory, const Call& c
         const std::unique_ptr<std::byte[]> buffer(new (std::nothrow) std::byte[size]{});
         if (!buffer)
         {
+            ++left_out_for_memory;
             TVR_LOG(level, "%s", noMemory);
             return RM_ERROR_NO_MEMORY;
         }
@@ -80,6 +81,7 @@ RM_STATUS thrownStatus() noexcept
     }
     catch (const std::bad_alloc&)
     {
+        ++left_out_for_memory;
         TVR_LOG(TVR_DBG, "Unable to allocate the memory");
         return RM_ERROR_NO_MEMORY;
     }
@@ -346,10 +348,7 @@ try
     const RM_STATUS fetched = fetchList<RM_DriverParamList>(
         list, "ERROR: tvrcimGetDriverParamsGlobal: Unable to allocate buffer", call, callAndRepeat, TVR_CRIT);
     if (fetched == RM_ERROR_NO_MEMORY && status != RM_ERROR_NO_MEMORY)
-    {
-        ++left_out_for_memory;
         return fetched;
-    }
     if (status != RM_OK)
     {
         if (deviceId)
@@ -365,7 +364,6 @@ try
 }
 catch (...)
 {
-    note_missing_memory();
     return thrownStatus();
 }
 

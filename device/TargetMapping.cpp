@@ -1,6 +1,7 @@
 #include "device/TargetMapping.h"
 
 #include "foundation/Log.h"
+#include "runtime/base/Memory.h"
 
 #include <algorithm>
 #include <cstddef>
@@ -39,6 +40,7 @@ HBA_STATUS TargetMapping::fetch(const HbaAdapter& adapter)
         TVR_LOG(TVR_DBG, "Deleting the allocated memory");
         if (!allocate())
         {
+            ++left_out_for_memory;
             TVR_LOG(TVR_CRIT, "Could not allocate memory..break ");
             return status;
         }

@@ -13,6 +13,7 @@
 #include "schema/TVRHBA_FCPort.h"
 #include "schema/TVRHBA_GlobalDriverServiceElementSettingData.h"
 
+#include <algorithm>
 #include <cctype>
 #include <vector>
 
@@ -142,6 +143,26 @@ void insert(ProviderAgent& agent, const TVRHBA_FCHBADriverParamService* service,
                         flags<OfService>(parameter->current, parameter->glbl));
 }
 
+/// Gives the parameters of one port their present values. False if they are no longer the same parameters.
+bool updateParameters(ProviderAgent& agent, const TVRHBA_FCPort& port)
+{
+    std::vector<RM_DriverParam> records;
+    if (TVR_MethodWrapper::tvrcimGetDriverParam(port.DeviceID.value.c_str(), &records) != RM_OK)
+        return true;
+    const std::vector<Ref<TVRHBA_DriverParams>> present = presentOf(agent, lowerCase(port.DeviceID.value));
+    const auto isOf = [](const Ref<TVRHBA_DriverParams>& parameter, const RM_DriverParam& record)
+    { return parameter->paramname.value == String(foreignText(record.name)); };
+    if (!std::ranges::equal(present, records, isOf))
+        return false;
+    for (std::uint32_t number = 0; number < records.size(); number++)
+    {
+        TVR_LOG(TVR_DBG, "saving the values of driver parameter %d", static_cast<int>(number));
+        fill(*present[number], number, records[number]);
+        present[number]->def.set(records[number].def);
+    }
+    return true;
+}
+
 /// The caller holds the data mutex. A port whose list the library does not give keeps what it has.
 void rebuildDriverParameters(ProviderAgent& agent)
 {
@@ -185,13 +206,20 @@ void rebuildGlobalDriverParameters(ProviderAgent& agent)
 
 } // namespace
 
-template <> void liveRefresh<TVRHBA_DriverParams>(ProviderAgent& agent)
+/// A get reads the parameters of the one port, as the associators of a service get each of them.
+template <> void liveRefresh<TVRHBA_DriverParams>(ProviderAgent& agent, const Selection& selection)
 {
     const SharedEnds ends;
-    rebuildDriverParameters(agent);
+    const auto* wanted = selection.keys ? mapOf<TVRHBA_DriverParams>(agent).withKeysOf(selection.keys) : nullptr;
+    const auto* port = wanted ? mapOf<TVRHBA_FCPort>(agent).findFirst(
+                                    [&](const TVRHBA_FCPort& known)
+                                    { return lowerCase(known.DeviceID.value) == wanted->deviceID.value; })
+                              : nullptr;
+    if (!port || !updateParameters(agent, *port))
+        rebuildDriverParameters(agent);
 }
 
-template <> void liveRefresh<TVRHBA_DriverParamGlobal>(ProviderAgent& agent)
+template <> void liveRefresh<TVRHBA_DriverParamGlobal>(ProviderAgent& agent, const Selection&)
 {
     const SharedEnds ends;
     rebuildGlobalDriverParameters(agent);

@@ -12,15 +12,18 @@ namespace cimple
 namespace
 {
 
-/// Brings the instance of each port up to date by `update(instance, port)`; `instanceOf(wwpn)` finds it, or not.
-template <class InstanceOf, class Update> void updatePorts(ProviderAgent& agent, InstanceOf instanceOf, Update update)
+/// Brings the selected instances of ports up to date by `update(instance, port)`; `instanceOf(wwpn)` finds that of a
+/// port, or none. A get asks the one port, and names change with a refresh alone.
+template <class InstanceOf, class Update>
+void updatePorts(ProviderAgent& agent, const Selection& selection, InstanceOf instanceOf, Update update)
 {
-    if (!agent.m_pData)
+    if (!agent.m_pData || selection.names)
         return;
     for (Port* port : agent.m_pData->ports)
         if (auto* fcPort = dynamic_cast<FCPort*>(port))
             if (auto* instance = instanceOf(String(port->name)))
-                update(*instance, *fcPort);
+                if (!selection.keys || key_eq(selection.keys, instance))
+                    update(*instance, *fcPort);
 }
 
 std::unique_ptr<FCPortAttributes> askPort(const FCPort& port)
@@ -38,26 +41,27 @@ std::unique_ptr<FCPortAttributes> askPort(const FCPort& port)
 
 } // namespace
 
-template <> void liveRefresh<TVRHBA_FCPort>(ProviderAgent& agent)
+template <> void liveRefresh<TVRHBA_FCPort>(ProviderAgent& agent, const Selection& selection)
 {
     const auto map = mapOf<TVRHBA_FCPort>(agent);
     updatePorts(
-        agent,
+        agent, selection,
         [&](const String& wwpn)
         { return map.findFirst([&](const auto& known) { return known.DeviceID.value == wwpn; }); },
         [](TVRHBA_FCPort& instance, const FCPort& port)
         {
-            if (const auto facts = askPort(port))
+            // An adapter that was replaced since the refresh answers for another port.
+            if (const auto facts = askPort(port); facts && facts->portWWN == port.name)
                 setPortFacts(instance, *facts);
             setBeacon(instance);
         });
 }
 
-template <> void liveRefresh<TVRHBA_FCPortStatistics>(ProviderAgent& agent)
+template <> void liveRefresh<TVRHBA_FCPortStatistics>(ProviderAgent& agent, const Selection& selection)
 {
     const auto map = mapOf<TVRHBA_FCPortStatistics>(agent);
     updatePorts(
-        agent,
+        agent, selection,
         [&](const String& wwpn)
         { return map.findFirst([&](const auto& known) { return known.ElementName.value == wwpn; }); },
         [](TVRHBA_FCPortStatistics& instance, FCPort& port)

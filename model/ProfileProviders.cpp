@@ -93,7 +93,10 @@ int enumerateReferencedProfiles(Instance_Handler handler, void* client)
 
 int enumerateBaseServerReferencedProfiles(Instance_Handler handler, void* client)
 {
+    const unsigned leftOutBefore = left_out_for_memory;
     const Ref<CIM_RegisteredProfile> server = unlessOutOfMemory(findBaseServerProfile);
+    if (!server && left_out_for_memory != leftOutBefore)
+        handler(nullptr, ENUM_INSTANCES_FAILED, client);
     if (!server)
         return 0;
     return deliver(

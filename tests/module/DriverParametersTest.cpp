@@ -289,4 +289,22 @@ TEST(DriverParameters, AreBoundedByTheirRoom)
     }
 }
 
+/// Whoever follows an association gets each end by itself: that must not read all of them each time.
+TEST(DriverParameters, FollowingAnAssociationReadsEachEndOnce)
+{
+    Host host;
+    const auto callsOf = [&](const char* service, const char* association, const char* function)
+    {
+        const broker::Object from = host.instancesOf(service).at(0);
+        const std::uint64_t before = host.calls(function);
+        const broker::Reply reply = host.broker().associators(from.path, {association});
+        EXPECT_TRUE(reply.ok()) << reply.message;
+        EXPECT_FALSE(reply.objects.empty());
+        EXPECT_EQ(host.calls(function) - before, reply.objects.size()) << association;
+    };
+    callsOf("TVRHBA_FCHBADriverParamService", "TVRHBA_DriverServiceElementSettingData", "LRM_GetDriverParams");
+    callsOf("TVRHBA_FCHBAWWNService", "TVRHBA_FCHBAWWNServiceAffectsFCPort", "LRM_GetPortAttributes");
+    host.unload();
+}
+
 } // namespace

@@ -284,12 +284,18 @@ TEST(Operations, SearchesAreEnumerationsToTheLog)
     EXPECT_EQ(logOf([&] { EXPECT_EQ(host.broker().associatorNames(card, filter).paths.size(), 1u); }), chips);
     EXPECT_EQ(logOf([&] { EXPECT_EQ(host.broker().references(card, filter).objects.size(), 1u); }), chips);
 
-    // of the fabric, and refreshed live
+    // of the fabric, and refreshed live: of what the ports say as they are asked, a search of none shows nothing
     for (const char* className : {"TVRHBA_LogicalDisk", "TVRHBA_FCPort"})
     {
         host.enumerate(className); // loads its provider, and brings about the refresh that it needs
         ASSERT_TRUE(host.awaitRefresh(host.logged(created)));
-        const auto all = logOf([&] { host.enumerate(className); });
+        auto all = logOf([&] { host.enumerate(className); });
+        const auto ofPorts = [](const std::string& line)
+        {
+            return line.find("PERF") == line.npos && line.find("TimeOut") == line.npos &&
+                   line.find("BuildCimpleInfo") == line.npos && line.find("enum_instances") == line.npos;
+        };
+        std::erase_if(all, ofPorts);
         Path absent{"root/tavrin", className, {}};
         for (const char* key : {"SystemCreationClassName", "SystemName", "CreationClassName", "DeviceID"})
             absent.setKey(key, broker::Value::string("none"));
