@@ -16,8 +16,6 @@ namespace cimple
 namespace
 {
 
-constexpr std::uint32_t fibreChannel = 1;
-
 /// The largest cards have four ports; a count beyond this is no count.
 constexpr std::uint32_t maxPorts = 256;
 
