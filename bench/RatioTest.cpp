@@ -207,7 +207,8 @@ TEST(Ratio, RefreshOfTheSanIsLinear)
         RecordProperty(std::string(name) + "_ns_a_unit", std::to_string(times.total));
         RecordProperty(std::string(name) + "_ns_in_libraries", std::to_string(times.libraries));
     }
-    EXPECT_LE(large.total, 2 * small.total) << large.total << " ns a unit against " << small.total << " ns";
+    // 1.3 to 1.9 on the machines that were measured, by what their caches hold; a walk over all units gives 16.
+    EXPECT_LE(large.total, 3 * small.total) << large.total << " ns a unit against " << small.total << " ns";
     // What this must catch is a walk over all units for each of them, and a copy of each end for each association.
     EXPECT_LE(small.total - small.libraries, 6 * small.libraries) << "of " << small.total << " ns a unit";
 }
@@ -261,7 +262,7 @@ TEST(Ratio, OperationsOnAVolumeDoNotGrowWithTheSan)
     EXPECT_LE(many.get, 3 * few.get) << many.get << " ns against " << few.get << " ns";
     EXPECT_LE(many.associatorNames, 3 * few.associatorNames)
         << many.associatorNames << " ns against " << few.associatorNames << " ns";
-    EXPECT_LE(many.associators, 2 * some.associators)
+    EXPECT_LE(many.associators, 3 * some.associators)
         << many.associators << " ns a volume against " << some.associators << " ns";
 }
 
