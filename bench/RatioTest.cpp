@@ -262,7 +262,7 @@ TEST(Ratio, OperationsOnAVolumeDoNotGrowWithTheSan)
     EXPECT_LE(many.get, 3 * few.get) << many.get << " ns against " << few.get << " ns";
     EXPECT_LE(many.associatorNames, 3 * few.associatorNames)
         << many.associatorNames << " ns against " << few.associatorNames << " ns";
-    EXPECT_LE(many.associators, 3 * some.associators)
+    EXPECT_LE(many.associators, 2 * some.associators)
         << many.associators << " ns a volume against " << some.associators << " ns";
 }
 

@@ -31,6 +31,8 @@
 #include "schema/TVRHBA_SCSIProtocolControllerSystemDevice.h"
 #include "schema/TVRHBA_SCSIProtocolInitiatorEndpoint.h"
 
+#include <span>
+
 namespace cimple
 {
 
@@ -91,28 +93,17 @@ constexpr ConformanceRow controllerProfiles[] = {
     {"FC HBA", "FC HBA"},
 };
 
-void conformFCPort(PortContext& port)
+/// Relates an element of the port, of a kind that the log names, to its profiles. A refused one is logged.
+template <class Conforms, class Element>
+void conform(const PortContext& port, std::span<const ConformanceRow> profiles, const char* kind,
+             const Element* element, const LogText& refused)
 {
-    using Conforms = TVRHBA_FCPortConformsToProfile;
-    for (const ConformanceRow& row : portProfiles)
+    for (const ConformanceRow& row : profiles)
     {
-        TVR_LOG(TVR_DBG, "Generating TVRHBA_FCPortConformsToProfile (FC Port %s:%s, %s)",
+        TVR_LOG(TVR_DBG, "Generating %s (%s %s:%s, %s)", Conforms::static_meta_class.name, kind,
                 port.on.attributes.model.c_str(), port.port.name.c_str(), row.logged);
         join<Conforms>(port.host.agent, &Conforms::ConformantStandard, port.host.profiles.find(row.profile),
-                       &Conforms::ManagedElement, port.fcPort, "Insert Failed : m_TVRHBA_FCPortConformsToProfile_map");
-    }
-}
-
-void conformController(PortContext& port)
-{
-    using Conforms = TVRHBA_PortControllerConformsToProfile;
-    for (const ConformanceRow& row : controllerProfiles)
-    {
-        TVR_LOG(TVR_DBG, "Generating TVRHBA_PortControllerConformsToProfile (Port Controller %s:%s, %s)",
-                port.on.attributes.model.c_str(), port.port.name.c_str(), row.logged);
-        join<Conforms>(port.host.agent, &Conforms::ConformantStandard, port.host.profiles.find(row.profile),
-                       &Conforms::ManagedElement, port.controller,
-                       "Insert Failed : m_TVRHBA_PortControllerConformsToProfile_map");
+                       &Conforms::ManagedElement, element, refused);
     }
 }
 
@@ -190,7 +181,8 @@ std::uint32_t createFCPort(PortContext& port)
     port.fcPort = mapOf<TVRHBA_FCPort>(agent).insert(makeFCPort(port), "Insert Failed : m_TVRHBA_FCPort_map");
     if (!port.fcPort)
         return BUILD_NO_INSTANCE;
-    conformFCPort(port);
+    conform<TVRHBA_FCPortConformsToProfile>(port, portProfiles, "FC Port", port.fcPort,
+                                            "Insert Failed : m_TVRHBA_FCPortConformsToProfile_map");
 
     using OfSystem = TVRHBA_FCPortSystemDevice;
     using Member = TVRHBA_MemberOfCollection;
@@ -246,7 +238,8 @@ std::uint32_t createPortController(PortContext& port)
         join<Realizes>(agent, &Realizes::Antecedent, port.connector, &Realizes::Dependent, port.controller,
                        "Insert Failed (HBA): m_TVRHBA_PHYConnectorRealizesPortController_map") == Joined::Refused)
         return BUILD_NO_INSTANCE;
-    conformController(port);
+    conform<TVRHBA_PortControllerConformsToProfile>(port, controllerProfiles, "Port Controller", port.controller,
+                                                    "Insert Failed : m_TVRHBA_PortControllerConformsToProfile_map");
     return BUILD_DONE;
 }
 
