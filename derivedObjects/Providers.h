@@ -9,6 +9,7 @@
 #include "model/ProfileProviders.h"
 #include "runtime/base/Immortal.h"
 #include "schema/AllClasses.h"
+#include "services/ProviderSettings.h"
 
 #include <type_traits>
 

@@ -56,11 +56,13 @@ inline constexpr Binding<entryRow("HBA_RefreshInformation"), decltype(::HBA_Refr
 inline constexpr Binding<entryRow("HBA_SendReadCapacity"), decltype(::HBA_SendReadCapacity)> HBA_SendReadCapacity;
 inline constexpr Binding<entryRow("HBA_SendScsiInquiry"), decltype(::HBA_SendScsiInquiry)> HBA_SendScsiInquiry;
 
+inline constexpr Binding<entryRow("LRM_ChangeWWN"), RM_ChangeWWN_t> LRM_ChangeWWN;
 inline constexpr Binding<entryRow("LRM_DiagBeacon"), RM_DiagBeacon_t> LRM_DiagBeacon;
 inline constexpr Binding<entryRow("LRM_DiagBeaconState"), RM_DiagBeaconState_t> LRM_DiagBeaconState;
 inline constexpr Binding<entryRow("LRM_DiagGetLoadListParams"), RM_DiagGetLoadListParams_t> LRM_DiagGetLoadListParams;
 inline constexpr Binding<entryRow("LRM_DiagReadPCIRegistersV2"), RM_DiagReadPCIRegistersV2_t>
     LRM_DiagReadPCIRegistersV2;
+inline constexpr Binding<entryRow("LRM_DownloadFirmware"), RM_DownloadFirmware_t> LRM_DownloadFirmware;
 inline constexpr Binding<entryRow("LRM_GetDriverParams"), RM_GetDriverParams_t> LRM_GetDriverParams;
 inline constexpr Binding<entryRow("LRM_GetDriverParamsGlobal"), RM_GetDriverParamsGlobal_t> LRM_GetDriverParamsGlobal;
 inline constexpr Binding<entryRow("LRM_GetDriverType"), RM_GetDriverType_t> LRM_GetDriverType;
@@ -76,9 +78,18 @@ inline constexpr Binding<entryRow("LRM_GetServerAttributes"), RM_GetServerAttrib
 inline constexpr Binding<entryRow("LRM_GetSffData"), RM_GetSffData_t> LRM_GetSffData;
 inline constexpr Binding<entryRow("LRM_GetVMFromVPort"), RM_GetVMFromVPort_t> LRM_GetVMFromVPort;
 inline constexpr Binding<entryRow("LRM_GetVPD"), RM_GetVPD_t> LRM_GetVPD;
+inline constexpr Binding<entryRow("LRM_GetWWNCapability"), RM_GetWWNCapability_t> LRM_GetWWNCapability;
 inline constexpr Binding<entryRow("LRM_InitLib"), RM_InitLib_t> LRM_InitLib;
+inline constexpr Binding<entryRow("LRM_ReadWWN"), RM_ReadWWN_t> LRM_ReadWWN;
+inline constexpr Binding<entryRow("LRM_ResetHBA"), RM_ResetHBA_t> LRM_ResetHBA;
+inline constexpr Binding<entryRow("LRM_RestoreWWN"), RM_RestoreWWN_t> LRM_RestoreWWN;
 inline constexpr Binding<entryRow("LRM_ScsiInquiry"), RM_ScsiInquiry_t> LRM_ScsiInquiry;
+inline constexpr Binding<entryRow("LRM_SetAdapterAttribute"), RM_SetAdapterAttribute_t> LRM_SetAdapterAttribute;
+inline constexpr Binding<entryRow("LRM_SetBootBiosState"), RM_SetBootBiosState_t> LRM_SetBootBiosState;
 inline constexpr Binding<entryRow("LRM_SetDebugTraces"), RM_SetDebugTraces_t> LRM_SetDebugTraces;
+inline constexpr Binding<entryRow("LRM_SetDriverParam"), RM_SetDriverParam_t> LRM_SetDriverParam;
+inline constexpr Binding<entryRow("LRM_SetOASLunState"), RM_SetOASLunState_t> LRM_SetOASLunState;
+inline constexpr Binding<entryRow("LRM_SetPortEnabled"), RM_SetPortEnabled_t> LRM_SetPortEnabled;
 inline constexpr Binding<entryRow("LRM_VPGetAttributes"), RM_VPGetAttributes_t> LRM_VPGetAttributes;
 inline constexpr Binding<entryRow("LRM_VPList"), RM_VPList_t> LRM_VPList;
 inline constexpr Binding<entryRow("LRM_VPListTargets"), RM_VPListTargets_t> LRM_VPListTargets;
@@ -87,9 +98,23 @@ inline constexpr Binding<entryRow("LRM_VpScsiReadCapacity"), RM_VpScsiReadCapaci
 inline constexpr Binding<entryRow("LRM_VpScsiReportLUNs"), RM_VpScsiReportLUNs_t> LRM_VpScsiReportLUNs;
 
 inline constexpr Binding<entryRow("RM_GetAttributeValue"), RM_GetAttributeValue_t> RM_GetAttributeValue;
+inline constexpr Binding<entryRow("RM_GetLocalHBAInfo"), RM_GetLocalHBAInfo_t> RM_GetLocalHBAInfo;
+inline constexpr Binding<entryRow("RM_GetNumberOfLocalAdapters"), RM_GetNumberOfLocalAdapters_t>
+    RM_GetNumberOfLocalAdapters;
 inline constexpr Binding<entryRow("RM_GetVersion"), RM_GetVersion_t> RM_GetVersion;
+inline constexpr Binding<entryRow("RM_ImportHBAFileA"), RM_ImportHBAFileA_t> RM_ImportHBAFileA;
 inline constexpr Binding<entryRow("RM_IsLocalHBA"), RM_IsLocalHBA_t> RM_IsLocalHBA;
 inline constexpr Binding<entryRow("RM_MiliVersion"), RM_MiliVersion_t> RM_MiliVersion;
 inline constexpr Binding<entryRow("RM_StatusString"), RM_StatusString_t> RM_StatusString;
+inline constexpr Binding<entryRow("RM_ValidateWwn"), RM_ValidateWwn_t> RM_ValidateWwn;
+inline constexpr Binding<entryRow("RM_VerifyFirmwareA"), RM_VerifyFirmwareA_t> RM_VerifyFirmwareA;
+
+inline constexpr Binding<entryRow("CPQFC_CloseAdapter"), CPQFC_CloseAdapter_t> CPQFC_CloseAdapter;
+inline constexpr Binding<entryRow("CPQFC_GetNumberOfAdapters"), CPQFC_GetNumberOfAdapters_t> CPQFC_GetNumberOfAdapters;
+inline constexpr Binding<entryRow("CPQFC_OpenAdapter"), CPQFC_OpenAdapter_t> CPQFC_OpenAdapter;
+inline constexpr Binding<entryRow("CPQFC_QoSGetConfig"), CPQFC_QoSGetConfig_t> CPQFC_QoSGetConfig;
+inline constexpr Binding<entryRow("CPQFC_QoSGetGlobalFlag"), CPQFC_QoSGetGlobalFlag_t> CPQFC_QoSGetGlobalFlag;
+inline constexpr Binding<entryRow("CPQFC_QoSSetConfig"), CPQFC_QoSSetConfig_t> CPQFC_QoSSetConfig;
+inline constexpr Binding<entryRow("CPQFC_QoSSetGlobalFlag"), CPQFC_QoSSetGlobalFlag_t> CPQFC_QoSSetGlobalFlag;
 
 } // namespace cimple

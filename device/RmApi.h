@@ -34,6 +34,7 @@ enum RM_StatusCode : std::int32_t
     RM_ERROR_MAILBOX_TIMEOUT = 149,
     RM_ERROR_MAILBOX_BUSY = 150,
     RM_ERROR_BUFFER_TOO_SMALL = 191, ///< RM_ERROR_MORE_DATA in the words of the driver parameter calls
+    RM_ERROR_NO_RESET = 247,         ///< a download whose firmware no reset would activate
     RM_ERROR_FIRMWARE_LACKS = 251,   ///< the firmware of the adapter does not have the function
 };
 
@@ -239,6 +240,99 @@ extern "C"
 
     typedef RM_STATUS RM_GetSffData_t(HBA_WWN wwpn, RM_SffData* data);
 
+    // World Wide Names.
+
+    /// A port of this host.
+    struct RM_LocalHBAInfo
+    {
+        HBA_WWN wwpn;
+        HBA_WWN wwnn;
+        std::uint32_t handle; ///< of the adapter
+        char model[84];
+        char serialNumber[68];
+    };
+    static_assert(sizeof(RM_LocalHBAInfo) == 172 && offsetof(RM_LocalHBAInfo, handle) == 16);
+
+    typedef std::uint32_t RM_GetNumberOfLocalAdapters_t();
+    typedef RM_STATUS RM_GetLocalHBAInfo_t(std::uint32_t index, RM_LocalHBAInfo* info);
+
+    /// RM_ERROR_INVALID_WWN for a name that no port may have.
+    typedef RM_STATUS RM_ValidateWwn_t(HBA_WWN wwn);
+
+    /// Bits of what an adapter can do with its names.
+    enum RM_WwnCapability : std::uint32_t
+    {
+        RM_WWN_READ_ONLY = 1U << 0, ///< the library is in its read-only mode
+        RM_WWN_CAN_CHANGE_NON_VOLATILE = 1U << 2,
+        RM_WWN_CAN_CHANGE_VOLATILE = 1U << 3,
+        RM_WWN_NEEDS_REBOOT = 1U << 12,
+        RM_WWN_NEEDS_RESET = 1U << 13,
+    };
+
+    typedef RM_STATUS RM_GetWWNCapability_t(HBA_WWN wwpn, std::uint32_t* capability);
+
+    /// When changed names come into force. The codes 2 to 4 say nothing more.
+    enum RM_WwnActivation : std::uint32_t
+    {
+        RM_WWN_ACTIVE = 1,
+        RM_WWN_AT_REBOOT_VOLATILE_UNTIL = 5, ///< until then the volatile names stay in force
+        RM_WWN_AT_REBOOT = 6,
+        RM_WWN_AT_RESET_VOLATILE_UNTIL = 7,
+        RM_WWN_AT_RESET = 8,
+    };
+
+    /// `type` is 0 for the volatile and 1 for the non-volatile names.
+    typedef RM_STATUS RM_ChangeWWN_t(HBA_WWN wwpn, HBA_WWN newWwpn, HBA_WWN newWwnn, std::uint32_t type,
+                                     std::uint32_t* activation);
+    /// `type` is 0 for the names of the factory and 1 for the non-volatile ones.
+    typedef RM_STATUS RM_RestoreWWN_t(HBA_WWN wwpn, std::uint32_t type, std::uint32_t* activation);
+
+    enum RM_WwnType : std::uint32_t
+    {
+        RM_WWN_TYPE_VOLATILE = 0,
+        RM_WWN_TYPE_NON_VOLATILE = 1,
+        RM_WWN_TYPE_FACTORY = 2,
+        RM_WWN_TYPE_CURRENT = 3,
+        RM_WWN_TYPE_CONFIGURED = 4, ///< those in force from the next activation on
+    };
+
+    /// What kind of names was read.
+    enum RM_WwnKind : std::uint32_t
+    {
+        RM_WWN_KIND_NONE = 0, ///< the adapter has no such names
+        RM_WWN_KIND_VOLATILE = 1,
+        RM_WWN_KIND_NON_VOLATILE = 2,
+        RM_WWN_KIND_NOT_SUPPORTED = 3, ///< the adapter cannot have such names
+    };
+
+    struct RM_WwnNames
+    {
+        HBA_WWN wwpn;
+        HBA_WWN wwnn;
+        std::uint32_t kind;       ///< an RM_WwnKind
+        std::uint32_t activation; ///< of configured names: an RM_WwnActivation
+    };
+    static_assert(sizeof(RM_WwnNames) == 24);
+
+    /// `type` is an RM_WwnType.
+    typedef RM_STATUS RM_ReadWWN_t(HBA_WWN wwpn, std::uint32_t type, RM_WwnNames* names);
+
+    // Firmware, boot code and the port as a whole.
+
+    /// Takes a file over into the library's own folder.
+    typedef RM_STATUS RM_ImportHBAFileA_t(const char* file);
+    /// Whether the firmware of a file is one for the adapter; the first two arguments are 0.
+    typedef RM_STATUS RM_VerifyFirmwareA_t(std::uint32_t group, std::uint32_t flags, HBA_WWN wwpn, const char* file);
+    /// Writes the firmware of an imported file to the flash memory; `flags` is 0.
+    typedef RM_STATUS RM_DownloadFirmware_t(HBA_WWN wwpn, const char* file, std::uint32_t flags);
+    /// `mode` is 1 for a restart of the firmware.
+    typedef RM_STATUS RM_ResetHBA_t(HBA_WWN wwpn, std::uint32_t mode);
+    /// `dynamic` gets 1 if the port changed at once, and 0 if it changes with the next reboot.
+    typedef RM_STATUS RM_SetPortEnabled_t(HBA_WWN wwpn, std::uint32_t enabled, std::uint32_t* dynamic);
+    /// Writes a numbered value of an adapter port, of the length and form that reading it gives.
+    typedef RM_STATUS RM_SetAdapterAttribute_t(HBA_WWN wwpn, std::uint32_t id, const void* value, std::uint32_t length);
+    typedef RM_STATUS RM_SetBootBiosState_t(HBA_WWN wwpn, std::uint32_t enabled);
+
     /// A program in the flash memory of an adapter.
     struct RM_FlashRegion
     {
@@ -304,6 +398,16 @@ extern "C"
 
     typedef RM_STATUS RM_GetDriverParams_t(HBA_WWN wwpn, RM_DriverParamList* list);
     typedef RM_STATUS RM_GetDriverParamsGlobal_t(RM_DriverParamList* list);
+
+    /// Bits of RM_SetDriverParam's control value.
+    enum RM_DriverParamControl : std::uint32_t
+    {
+        RM_PARAM_PERMANENT = 1, ///< the value outlives the driver
+        RM_PARAM_GLOBAL = 2,    ///< it holds for all adapters
+    };
+
+    /// `text` is "name=value", at most 255 characters.
+    typedef RM_STATUS RM_SetDriverParam_t(HBA_WWN wwpn, const char* text, std::uint32_t control);
 
     // Virtual ports.
 
@@ -431,5 +535,40 @@ extern "C"
     /// The lanes from a port to a target. `vport` is a virtual port of the port, or zero for the port itself.
     typedef RM_STATUS RM_GetOASLunList_t(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, std::uint32_t option,
                                          RM_OASLunList* list);
+
+    /// `lun` is the operating system's number of a unit, or -1 for all units of the target; `state` is 1 for a unit
+    /// that is to be served with priority, else 0.
+    typedef RM_STATUS RM_SetOASLunState_t(HBA_WWN wwpn, HBA_WWN target, HBA_WWN vport, std::int32_t lun,
+                                          std::uint32_t state, std::uint32_t option);
+
+    // Frame tagging, by adapters that are named as in the HBA API.
+
+    /// Frames from `src_wwpn` to `tgt_wwpn` get `tag`.
+    struct CPQFC_QosEntry
+    {
+        HBA_WWN src_wwpn;
+        HBA_WWN tgt_wwpn;
+        std::uint8_t reserved1[16];
+        std::uint8_t tag;
+        std::uint8_t reserved2[3];
+    };
+
+    struct CPQFC_QosTable
+    {
+        std::uint32_t count;
+        CPQFC_QosEntry entry[1];
+    };
+    static_assert(sizeof(CPQFC_QosEntry) == 36 && offsetof(CPQFC_QosEntry, tag) == 32);
+    static_assert(offsetof(CPQFC_QosTable, entry) == 4);
+
+    typedef std::uint32_t CPQFC_GetNumberOfAdapters_t();
+    typedef RM_STATUS CPQFC_OpenAdapter_t(const char* name, std::uint32_t* handle);
+    typedef void CPQFC_CloseAdapter_t(std::uint32_t handle);
+    /// A list as above, but that a count of 0 asks for the number available, which is then no failure.
+    typedef RM_STATUS CPQFC_QoSGetConfig_t(std::uint32_t handle, CPQFC_QosTable* table);
+    /// Takes the place of the adapter's table.
+    typedef RM_STATUS CPQFC_QoSSetConfig_t(std::uint32_t handle, const CPQFC_QosTable* table);
+    typedef RM_STATUS CPQFC_QoSGetGlobalFlag_t(std::uint32_t handle, std::uint32_t* state);
+    typedef RM_STATUS CPQFC_QoSSetGlobalFlag_t(std::uint32_t handle, std::uint32_t state);
 
 } // extern "C"

@@ -30,6 +30,11 @@ broker::Object theOne(Host& host, const std::string& className, const std::strin
     return objects.empty() ? broker::Object{} : objects.front();
 }
 
+broker::Object changed(const broker::Object& instance, const char* property, broker::Value value)
+{
+    return {instance.path, {{property, std::move(value)}}};
+}
+
 std::vector<std::string> logAbout(const Host& host, const std::vector<std::string>& words)
 {
     std::vector<std::string> lines = host.log();

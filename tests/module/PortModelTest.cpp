@@ -590,14 +590,6 @@ TEST(PortModel, BeaconIsShownAsTheLibraryHasIt)
     }
 }
 
-/// The port with another value of one property, as a client sends it.
-broker::Object changed(const broker::Object& port, const char* property, broker::Value value)
-{
-    broker::Object object{port.path, {}};
-    object.properties.push_back({property, std::move(value)});
-    return object;
-}
-
 TEST(PortModel, BeaconIsLitByLocationIndicatorAlone)
 {
     Host host;

@@ -1,4 +1,5 @@
 // The module itself as instances: its identity, settings, record log and profiles.
+#include "tests/module/Clock.h"
 #include "tests/module/Describe.h"
 #include "tests/module/HostNames.h"
 
@@ -102,6 +103,84 @@ TEST(ProviderInstances, SettingsShowWhatTheirFileSays)
                "TVR_PROVIDER_CACHE_TIMEOUT = 3\nTVR_PROVIDER_REFRESH_ADAPTERDATA = TRUE\n"
                "TVR_PROVIDER_REFRESH_SANDATA = FALSE\n");
     EXPECT_EQ(described(host, "TVRHBA_ProviderConfigSetting"), settings(3, 1, 0));
+    host.unload();
+}
+
+broker::Object changedSetting(Host& host, const char* name, broker::Value current)
+{
+    return changed(theOne(host, "TVRHBA_ProviderConfigSetting", "paramname", name), "current", std::move(current));
+}
+
+TEST(ProviderInstances, ChangedSettingsAreShownAtOnceAndKeptInTheirFile)
+{
+    constexpr const char* file = "/etc/tavrin_fc_provider.conf";
+    struct Change
+    {
+        const char* name;
+        std::uint32_t value;
+        CMPIrc status;
+        const char* line;
+    };
+    const Change changes[] = {
+        {"cachetimeout", 3, CMPI_RC_OK,
+         "[TVR_WARN] Cache time-out is modified successfully"}, // below what is published
+        {"cachetimeout", 31, CMPI_RC_ERR_INVALID_PARAMETER,
+         "[TVR_ERR] The value provided for cache time-out is out of range"},
+        {"cachetimeout", 0, CMPI_RC_ERR_INVALID_PARAMETER,
+         "[TVR_ERR] The value provided for cache time-out is out of range"},
+        {"adapterrefresh", 1, CMPI_RC_OK, "[TVR_WARN] Adapter refresh is modified successfully"},
+        {"adapterrefresh", 0xFFFF'FFFF, CMPI_RC_ERR_INVALID_PARAMETER,
+         "[TVR_ERR] The value provided for adapter refresh out is out of range"},
+        {"sanrefresh", 0, CMPI_RC_OK, "[TVR_WARN] SAN refresh is modified successfully"},
+        {"sanrefresh", 2, CMPI_RC_ERR_INVALID_PARAMETER,
+         "[TVR_ERR] The value provided for SAN refresh out is out of range"},
+    };
+    Host host;
+    for (const Change& change : changes)
+    {
+        SCOPED_TRACE(change.name + (" = " + std::to_string(change.value)));
+        const std::size_t before = host.logged(change.line);
+        const auto setting = changedSetting(host, change.name, broker::Value::uint32(change.value));
+        EXPECT_EQ(host.broker().modifyInstance(setting).status, change.status);
+        EXPECT_EQ(host.logged(change.line), before + 1);
+    }
+    EXPECT_EQ(described(host, "TVRHBA_ProviderConfigSetting"), settings(3, 1, 0));
+    EXPECT_FALSE(std::filesystem::exists(host.root() / "etc/tavrin_fc_provider.conf"));
+
+    host.unload();
+    EXPECT_THAT(host.read(file), testing::HasSubstr("TVR_PROVIDER_CACHE_TIMEOUT = 3\n"
+                                                    "TVR_PROVIDER_REFRESH_ADAPTERDATA = TRUE\n"
+                                                    "TVR_PROVIDER_REFRESH_SANDATA = FALSE\n"));
+    EXPECT_EQ(described(host, "TVRHBA_ProviderConfigSetting"), settings(3, 1, 0));
+    host.unload();
+}
+
+TEST(ProviderInstances, AChangedTimeoutDecidesWhenTheNextRequestRefreshes)
+{
+    stopClock();
+    Host host;
+    described(host, "TVRHBA_ProviderConfigSetting");
+    ASSERT_TRUE(host.awaitRefresh());
+    host.broker().modifyInstance(changedSetting(host, "cachetimeout", broker::Value::uint32(2)));
+    advanceClock(std::chrono::minutes(2));
+    described(host, "TVRHBA_ProviderConfigSetting");
+    EXPECT_TRUE(host.awaitRefresh(2));
+    host.unload();
+}
+
+TEST(ProviderInstances, ChangesOfNoSettingOrOfNothingAreRefused)
+{
+    Host host;
+    const auto refused = [&](const broker::Object& object) { return host.broker().modifyInstance(object).status; };
+    auto unknown = changedSetting(host, "sanrefresh", broker::Value::uint32(0));
+    unknown.path.keys.at(0).value = broker::Value::string("Tavrin HBA Provider:colour");
+    EXPECT_EQ(refused(unknown), CMPI_RC_ERR_FAILED);
+    EXPECT_EQ(refused(changedSetting(host, "sanrefresh", broker::Value::null(CMPI_uint32))),
+              CMPI_RC_ERR_INVALID_PARAMETER);
+    const auto setting = changedSetting(host, "sanrefresh", broker::Value::uint32(0));
+    EXPECT_EQ(host.broker().modifyInstance(setting, {{"ElementName"}}).status, CMPI_RC_ERR_FAILED);
+    EXPECT_EQ(host.logged("[TVR_ERR] Instance does not exist"), 2u);
+    EXPECT_EQ(described(host, "TVRHBA_ProviderConfigSetting"), settings(10, 0, 1));
     host.unload();
 }
 
