@@ -272,8 +272,7 @@ void ProviderAgent::sanStage()
     }
     // The ports that the SAN hangs on may be missing too.
     m_bSANMapsIncomplete = !m_bLoaded || !run.isWhole() || m_bAdapterMapsIncomplete;
-    if (!run.isWhole())
-        m_bSANRefreshPending = true;
+    m_bSANRefreshPending = !run.isWhole(); // who asked meanwhile gets what was built
     sanMaps().complete();
     m_bSANMapsBuilt = true;
 }
