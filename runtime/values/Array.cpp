@@ -123,7 +123,9 @@ Array_Base::Rep* fresh_rep(const Array_Traits* traits)
 
 Array_Base::Rep* filled_rep(const Array_Traits* traits, const void* elements, std::size_t count)
 {
-    Draft draft(traits, std::max(count, first_capacity));
+    if (count == 0)
+        return fresh_rep(traits);
+    Draft draft(traits, count); // most are never added to
     draft.append(elements, count);
     return draft.take();
 }
@@ -149,7 +151,7 @@ const Array_Traits* instance_array_traits()
 Array_Base::Array_Base(const Array_Traits* traits) : _rep(fresh_rep(traits)) {}
 
 Array_Base::Array_Base(const Array_Traits* traits, const void* elements, std::size_t count)
-    : _rep(count == 0 ? fresh_rep(traits) : filled_rep(traits, elements, count))
+    : _rep(filled_rep(traits, elements, count))
 {}
 
 Array_Base::Array_Base(const Array_Base& other) : Array_Base(other.traits(), other.data(), other.size()) {}
