@@ -78,6 +78,14 @@ public:
     /// The WWPN that a port's DeviceID is the text of.
     HBA_WWN wwpn(const String& deviceId, const ServiceTexts& texts);
 
+    /// All three, for a method of a service with a port as its target: the port's WWPN.
+    template <class Service, class Target>
+    HBA_WWN portOf(const Instance* reference, const Target* port, const ServiceTexts& texts)
+    {
+        self<Service>(reference, texts);
+        return wwpn(target(port, texts).DeviceID.value, texts);
+    }
+
     /// Logs the text and ends the method.
     [[noreturn]] static void end(const LogText& why, const MethodEnd& with);
 

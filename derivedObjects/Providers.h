@@ -9,7 +9,9 @@
 #include "model/ProfileProviders.h"
 #include "runtime/base/Immortal.h"
 #include "schema/AllClasses.h"
+#include "services/BootBiosService.h"
 #include "services/ProviderSettings.h"
+#include "services/WwnService.h"
 
 #include <type_traits>
 
