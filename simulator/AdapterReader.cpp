@@ -106,12 +106,44 @@ RM_QosInfo readQos(JsonNode node)
     return qos;
 }
 
+PortNames readPortNames(JsonNode node)
+{
+    PortNames names;
+    names.wwpn = node.at("wwpn").asWwn();
+    names.wwnn = names.wwpn;
+    node.readWwn("wwnn", names.wwnn);
+    node.finish();
+    return names;
+}
+
+NameManagement readNames(JsonNode node)
+{
+    NameManagement names;
+    node.read("available", names.available);
+    node.read("capability", names.capability);
+    if (node.has("activation"))
+        names.activation = static_cast<std::uint32_t>(node.at("activation").asNumber(UINT32_MAX));
+    const auto pair = [&](const char* key, std::optional<PortNames>& out)
+    {
+        if (node.has(key))
+            out = readPortNames(node.at(key));
+    };
+    pair("factory", names.factory);
+    pair("nonVolatile", names.nonVolatile);
+    pair("volatile", names.volatileNames);
+    node.finish();
+    return names;
+}
+
 Port readPort(JsonNode& node, const std::vector<Target>& targets)
 {
     Port port;
     port.wwpn = node.at("wwpn").asWwn();
     port.wwnn = port.wwpn;
     node.readWwn("wwnn", port.wwnn);
+    if (node.has("names"))
+        port.names = readNames(node.at("names"));
+    node.read("listedTwice", port.listedTwice);
     node.readWwn("fabricName", port.fabricName);
     node.read("fcId", port.fcId);
     node.readNamed("type", port.type, portTypes);

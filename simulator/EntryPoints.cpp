@@ -38,6 +38,7 @@ constexpr unsigned attributesOut =
 using enum Family;
 
 constexpr Row rows[] = {
+    {"ChangeWWN", dual, numberOut},
     {"DiagBeacon", dual, statusOnly},
     {"DiagBeaconState", dual, numberOut},
     {"DiagGetLoadListParams", dual, countedRecordOut},
@@ -58,8 +59,12 @@ constexpr Row rows[] = {
     {"GetSffData", dual, textRecordOut},
     {"GetVMFromVPort", dual, textRecordOut},
     {"GetVPD", dual, vpdOut},
+    {"GetWWNCapability", dual, numberOut},
     {"InitLib", dual, statusOnly},
+    {"ReadWWN", dual, recordOut},
+    {"RestoreWWN", dual, numberOut},
     {"ScsiInquiry", dual, scsiOut},
+    {"SetBootBiosState", dual, statusOnly},
     {"SetDebugTraces", dual, statusOnly},
     {"VPGetAttributes", dual, textRecordOut},
     {"VPList", dual, listOut},
@@ -69,10 +74,13 @@ constexpr Row rows[] = {
     {"VpScsiReportLUNs", dual, scsiOut},
 
     {"GetAttributeValue", rmOnly, bit(Hostile::hugeLength)},
+    {"GetLocalHBAInfo", rmOnly, textRecordOut},
+    {"GetNumberOfLocalAdapters", rmOnly, bit(Hostile::hugeCount)},
     {"GetVersion", rmOnly, textOut},
     {"IsLocalHBA", rmOnly, numberOut},
     {"MiliVersion", rmOnly, textOut},
     {"StatusString", rmOnly, textOut},
+    {"ValidateWwn", rmOnly, statusOnly},
 
     {"CloseAdapter", hba, statusOnly},
     {"FreeLibrary", hba, statusOnly},

@@ -58,6 +58,12 @@ inline void fillTexts(RM_VirtualMachine& record)
     fillText(record.uuid);
 }
 
+inline void fillTexts(RM_LocalHBAInfo& record)
+{
+    fillText(record.model);
+    fillText(record.serialNumber);
+}
+
 inline void fillTexts(RM_SffData& record)
 {
     fillText(record.vendorName);

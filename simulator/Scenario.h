@@ -84,9 +84,32 @@ struct VirtualPort
     std::optional<RM_VirtualMachine> machine;
 };
 
+/// The pair of World Wide Names of a port.
+struct PortNames
+{
+    Wwn wwpn = 0, wwnn = 0;
+    bool operator==(const PortNames&) const = default;
+};
+
+/// What a port has beside the names in force. The configured names, those of the next activation, are the volatile ones
+/// if there are any and the non-volatile ones otherwise.
+struct NameManagement
+{
+    bool available = true;
+    std::uint32_t capability = RM_WWN_CAN_CHANGE_NON_VOLATILE | RM_WWN_CAN_CHANGE_VOLATILE | RM_WWN_NEEDS_RESET;
+    std::optional<std::uint32_t> activation; ///< answered in place of the RM_WwnActivation that follows
+    /// Those in force if a scenario does not say.
+    std::optional<PortNames> factory, nonVolatile;
+    std::optional<PortNames> volatileNames;
+    bool volatileInForce = false;
+    std::uint32_t waitsFor = RM_WWN_ACTIVE; ///< the RM_WwnActivation of the configured names
+};
+
 struct Port
 {
     Wwn wwpn = 0, wwnn = 0, fabricName = 0;
+    NameManagement names;
+    bool listedTwice = false; ///< the RM library lists it among the local ports twice
     std::uint32_t fcId = 0;
     std::uint32_t type = HBA_PORTTYPE_NPORT;
     std::uint32_t state = HBA_PORTSTATE_ONLINE;

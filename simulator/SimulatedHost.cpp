@@ -59,6 +59,7 @@ void SimulatedHost::load(Scenario scenario)
                 for (const LogicalUnit& unit : _scenario.targets[target].units)
                     units.push_back(names.next(unit.deviceType));
             }
+    completeNames();
 }
 
 void SimulatedHost::index()

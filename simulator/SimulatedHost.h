@@ -67,6 +67,21 @@ public:
     RM_STATUS vportMachine(Wwn wwpn, Wwn vport, RM_VirtualMachine& out) const;
     RM_STATUS vportScsi(Wwn wwpn, Wwn vport, Wwn target, HBA_UINT64 lun, const ScsiCommand& command, ScsiReply& out);
 
+    // Names of ports and boot code, in NameCalls.cpp.
+
+    std::uint32_t localPortCount() const;
+    RM_STATUS localPort(std::uint32_t index, RM_LocalHBAInfo& out) const;
+    RM_STATUS validateName(Wwn name) const;
+    RM_STATUS nameCapability(Wwn wwpn, std::uint32_t& out) const;
+    /// `activation` gets an RM_WwnActivation. What waits for nothing is in force at once.
+    RM_STATUS changeNames(Wwn wwpn, const PortNames& names, std::uint32_t type, std::uint32_t& activation);
+    RM_STATUS restoreNames(Wwn wwpn, std::uint32_t type, std::uint32_t& activation);
+    RM_STATUS readNames(Wwn wwpn, std::uint32_t type, RM_WwnNames& out) const;
+    RM_STATUS setBootCode(Wwn wwpn, bool enabled);
+    /// Configured names come into force, also those that wait for more than a reset. Without power the volatile names
+    /// are lost before.
+    void reboot(bool powerDown);
+
     // What a test sees and changes. A false result means that there is no such adapter or port.
 
     std::size_t openHandles() const;
@@ -91,6 +106,16 @@ private:
     const Adapter* adapterAt(HBA_HANDLE handle) const;
     const Adapter* findAdapter(Wwn wwpn) const;
     const Port* findPort(Wwn wwpn) const;
+    /// What follows from the names of a scenario.
+    void completeNames();
+    /// For a reset of an adapter or of the host: the names that wait for that come into force. The port is found by its
+    /// new name from then on.
+    void activateNames(Adapter& adapter, bool isReboot);
+    bool activateNames(Adapter& adapter, Port& port);
+    /// After a change of what is configured: answers when it comes into force, and lets it.
+    std::uint32_t settleNames(Adapter& adapter, Port& port);
+    /// Whether a port, virtual port or target other than `except` has, or can get, the WWPN.
+    bool isTaken(Wwn wwpn, const Port& except) const;
     /// Index in Scenario::targets of a target that is among `targets`, from a port in `state`; only an online port
     /// reaches its targets.
     std::optional<std::size_t> reach(std::uint32_t state, const std::vector<std::size_t>& targets, Wwn wwpn) const;
@@ -99,6 +124,8 @@ private:
     template <class Use> RM_STATUS onAdapter(Wwn wwpn, Use use) const;
     template <class Use> RM_STATUS onPort(Wwn wwpn, Use use) const;
     template <class Use> RM_STATUS onVport(Wwn wwpn, Wwn vport, Use use) const;
+    /// To change what `use` gets, the adapter and the port.
+    template <class Use> RM_STATUS changePort(Wwn wwpn, Use use);
 
     mutable std::mutex _mutex;
     Scenario _scenario;

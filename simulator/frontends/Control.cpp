@@ -163,3 +163,8 @@ int tvrsim_set_driver_parameter(const char* wwpn, const char* name, std::uint32_
     const std::optional<Wwn> port = wwpn ? parseWwn(wwpn) : std::nullopt;
     return (port || !wwpn) && tvrsim_simulation()->host.setDriverParameter(port, name, current);
 }
+
+void tvrsim_reboot(int powerDown)
+{
+    tvrsim_simulation()->host.reboot(powerDown != 0);
+}

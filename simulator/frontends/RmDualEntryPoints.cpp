@@ -42,6 +42,11 @@ extern "C"
     TVRSIM_EXPORT RM_VpScsiInquiry_t DUAL(VpScsiInquiry);
     TVRSIM_EXPORT RM_VpScsiReadCapacity_t DUAL(VpScsiReadCapacity);
     TVRSIM_EXPORT RM_GetVMFromVPort_t DUAL(GetVMFromVPort);
+    TVRSIM_EXPORT RM_GetWWNCapability_t DUAL(GetWWNCapability);
+    TVRSIM_EXPORT RM_ChangeWWN_t DUAL(ChangeWWN);
+    TVRSIM_EXPORT RM_RestoreWWN_t DUAL(RestoreWWN);
+    TVRSIM_EXPORT RM_ReadWWN_t DUAL(ReadWWN);
+    TVRSIM_EXPORT RM_SetBootBiosState_t DUAL(SetBootBiosState);
 
     RM_STATUS DUAL(InitLib)()
     {
@@ -251,6 +256,43 @@ extern "C"
         Call call = callOf(__func__, port(vport));
         return call.record(machine, [&](auto& record)
                            { return call.host().vportMachine(fromHba(wwpn), fromHba(vport), record); });
+    }
+
+    RM_STATUS DUAL(GetWWNCapability)(HBA_WWN wwpn, std::uint32_t* capability)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(capability,
+                           [&](std::uint32_t& out) { return call.host().nameCapability(fromHba(wwpn), out); });
+    }
+
+    RM_STATUS DUAL(ChangeWWN)(HBA_WWN wwpn, HBA_WWN newWwpn, HBA_WWN newWwnn, std::uint32_t type,
+                              std::uint32_t* activation)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(
+            activation,
+            [&](std::uint32_t& out) {
+                return call.host().changeNames(fromHba(wwpn), {fromHba(newWwpn), fromHba(newWwnn)}, type, out);
+            });
+    }
+
+    RM_STATUS DUAL(RestoreWWN)(HBA_WWN wwpn, std::uint32_t type, std::uint32_t* activation)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(activation,
+                           [&](std::uint32_t& out) { return call.host().restoreNames(fromHba(wwpn), type, out); });
+    }
+
+    RM_STATUS DUAL(ReadWWN)(HBA_WWN wwpn, std::uint32_t type, RM_WwnNames* names)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(names, [&](auto& record) { return call.host().readNames(fromHba(wwpn), type, record); });
+    }
+
+    RM_STATUS DUAL(SetBootBiosState)(HBA_WWN wwpn, std::uint32_t enabled)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().setBootCode(fromHba(wwpn), enabled != 0); });
     }
 
 } // extern "C"

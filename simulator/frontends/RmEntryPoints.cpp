@@ -11,6 +11,9 @@ extern "C"
     TVRSIM_EXPORT RM_MiliVersion_t RM_MiliVersion;
     TVRSIM_EXPORT RM_StatusString_t RM_StatusString;
     TVRSIM_EXPORT RM_IsLocalHBA_t RM_IsLocalHBA;
+    TVRSIM_EXPORT RM_GetNumberOfLocalAdapters_t RM_GetNumberOfLocalAdapters;
+    TVRSIM_EXPORT RM_GetLocalHBAInfo_t RM_GetLocalHBAInfo;
+    TVRSIM_EXPORT RM_ValidateWwn_t RM_ValidateWwn;
 
     const void* RM_GetAttributeValue(const void* buffer, std::uint32_t id, std::uint32_t* length, RM_STATUS* status)
     {
@@ -57,6 +60,26 @@ extern "C"
     {
         Call call = callOf(__func__, port(wwpn));
         return call.record(isLocal, [&](std::uint32_t& out) { return call.host().isLocal(fromHba(wwpn), out); });
+    }
+
+    std::uint32_t RM_GetNumberOfLocalAdapters()
+    {
+        Call call = callOf(__func__);
+        if (call.isHostile(Hostile::hugeCount))
+            return 0xFFFF'FFFF;
+        return call.fails() ? 0 : call.host().localPortCount();
+    }
+
+    RM_STATUS RM_GetLocalHBAInfo(std::uint32_t index, RM_LocalHBAInfo* info)
+    {
+        Call call = callOf(__func__);
+        return call.record(info, [&](auto& record) { return call.host().localPort(index, record); });
+    }
+
+    RM_STATUS RM_ValidateWwn(HBA_WWN wwn)
+    {
+        Call call = callOf(__func__, port(wwn));
+        return call.status([&] { return call.host().validateName(fromHba(wwn)); });
     }
 
 } // extern "C"

@@ -219,6 +219,11 @@ void Host::setDriverParameter(const char* wwpn, const char* name, std::uint32_t 
         throw std::runtime_error(std::string("no driver parameter ") + name);
 }
 
+void Host::reboot(bool powerDown)
+{
+    TVR_CONTROL(tvrsim_reboot)(powerDown);
+}
+
 void Host::openGate(const std::string& gate)
 {
     TVR_CONTROL(tvrsim_open_gate)(gate.c_str());

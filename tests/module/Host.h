@@ -66,6 +66,8 @@ public:
     void setAttribute(const char* wwpn, const char* attribute);
     /// Of the adapter behind a port, or of the driver where `wwpn` is null.
     void setDriverParameter(const char* wwpn, const char* name, std::uint32_t current);
+    /// Names of ports come into force that wait for a restart of the host; without power the volatile ones are lost.
+    void reboot(bool powerDown = false);
     /// Lets calls go on that a fault row holds at a gate.
     void openGate(const std::string& gate);
     /// Waits until so many calls are held at a gate; false if that does not happen in time.
