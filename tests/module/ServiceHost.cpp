@@ -70,6 +70,25 @@ Answer ServiceHost::call(const std::string& method, const std::string& entry, co
     return {reply.returnValue.asUnsigned(), reply.out, lines};
 }
 
+void ServiceHost::expectRefusals(const std::string& method, const std::string& entry, const std::string& wrongService,
+                                 const std::string& wrongPort)
+{
+    const auto expect = [&](std::uint64_t value, const std::string& line, const std::vector<broker::Property>& in)
+    {
+        const Answer answer = call(method, entry, in);
+        EXPECT_EQ(answer.value, value) << method;
+        EXPECT_EQ(answer.lines, std::vector<std::string>{line});
+    };
+    const broker::Path known = service;
+    service.setKey("Name", broker::Value::string("another"));
+    expect(33068, wrongService, {{"Target", broker::Value::reference(port)}});
+    service = known;
+    broker::Path unknown = port;
+    unknown.setKey("DeviceID", broker::Value::string("1000027A51160299"));
+    expect(32968, wrongPort, {{"Target", broker::Value::reference(unknown)}});
+    expect(32968, wrongPort, {});
+}
+
 std::vector<std::string> ServiceHost::portsAfterRefresh()
 {
     const std::size_t done = logged(ended);

@@ -26,6 +26,10 @@ public:
     /// Calls a method whose first log line is `entry`, with `port` as its target.
     Answer callOnPort(const std::string& method, const std::string& entry, std::vector<broker::Property> in = {});
     Answer call(const std::string& method, const std::string& entry, const std::vector<broker::Property>& in);
+    /// Calls the method on another service, without a target and on a port that is not there: what it answers, and the
+    /// lines that tell so.
+    void expectRefusals(const std::string& method, const std::string& entry, const std::string& wrongService,
+                        const std::string& wrongPort);
     /// The DeviceIDs of the ports after the refresh that is due; `port` is the first of them.
     std::vector<std::string> portsAfterRefresh();
 

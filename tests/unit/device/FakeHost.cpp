@@ -225,6 +225,21 @@ RM_STATUS LRM_DiagBeacon(HBA_WWN, std::uint32_t state)
     return host->enter("LRM_DiagBeacon");
 }
 
+RM_STATUS LRM_ChangeWWN(HBA_WWN, HBA_WWN, HBA_WWN, std::uint32_t, std::uint32_t*)
+{
+    return host->enter("LRM_ChangeWWN");
+}
+
+RM_STATUS LRM_RestoreWWN(HBA_WWN, std::uint32_t, std::uint32_t*)
+{
+    return host->enter("LRM_RestoreWWN");
+}
+
+RM_STATUS LRM_SetBootBiosState(HBA_WWN, std::uint32_t)
+{
+    return host->enter("LRM_SetBootBiosState");
+}
+
 RM_STATUS LRM_GetSffData(HBA_WWN, RM_SffData* data)
 {
     *data = host->transceiver;
@@ -408,6 +423,9 @@ const std::map<std::string, void*>& symbols()
         {"LRM_DiagBeacon", address(LRM_DiagBeacon)},
         {"LRM_DiagBeaconState", address(LRM_DiagBeaconState)},
         {"LRM_DiagGetLoadListParams", address(LRM_DiagGetLoadListParams)},
+        {"LRM_ChangeWWN", address(LRM_ChangeWWN)},
+        {"LRM_RestoreWWN", address(LRM_RestoreWWN)},
+        {"LRM_SetBootBiosState", address(LRM_SetBootBiosState)},
         {"LRM_GetSffData", address(LRM_GetSffData)},
         {"LRM_GetVPD", address(LRM_GetVPD)},
         {"LRM_VpScsiReportLUNs", address(LRM_VpScsiReportLUNs)},
