@@ -45,6 +45,18 @@ public:
     {
         return static_cast<Record*>(insertInstance(_map, Ref<>(instance.release()), failure));
     }
+    /// Destroys the entries for which `matches(record)` holds; how many there were.
+    template <class Predicate> std::size_t removeIf(Predicate matches) const
+    {
+        std::size_t removed = 0;
+        for (std::size_t i = size(); i-- > 0;)
+            if (const Record* entry = at(i); entry && matches(*entry))
+            {
+                Ref<>(_map.remove_at(i)).reset();
+                removed++;
+            }
+        return removed;
+    }
     void clear() const { _map.clear(); }
 
 private:

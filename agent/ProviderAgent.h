@@ -2,6 +2,7 @@
 #pragma once
 
 #include "agent/InstanceCache.h"
+#include "agent/LaneName.h"
 #include "device/Data.h"
 #include "device/TVR_MethodWrapper.h"
 #include "foundation/TVR_CIMLogger.h"
@@ -14,6 +15,7 @@
 #include <atomic>
 #include <cstdint>
 #include <memory>
+#include <set>
 #include <sys/types.h>
 
 namespace cimple
@@ -120,6 +122,10 @@ public:
     bool m_bOwnComputerSystem = false;       ///< the computer system was generated here
     PlatformAnswer m_platformComputerSystem; ///< both of the refresh's thread
     PlatformAnswer m_platformChassis;
+
+    /// Between which ports there may be priority lanes: with the fabric, those whose adapter has them; and those of all
+    /// lanes that a client has made. Under m_DataMutex.
+    std::set<LanePath> m_lanePaths;
 
     // --- status thread of the D-Port test
     Thread m_dportThread;

@@ -10,6 +10,8 @@
 #include "runtime/base/Immortal.h"
 #include "schema/AllClasses.h"
 #include "services/BootBiosService.h"
+#include "services/DriverParameterService.h"
+#include "services/LaneInstances.h"
 #include "services/ProviderSettings.h"
 #include "services/WwnService.h"
 

@@ -1,10 +1,12 @@
 #include "model/DriverParameters.h"
 
 #include "agent/Build.h"
+#include "agent/DriverSetting.h"
 #include "device/ForeignText.h"
 #include "device/TVR_MethodWrapper.h"
 #include "model/LiveRefresh.h"
 #include "model/PortVirtualization.h"
+#include "model/PriorityLanes.h"
 #include "schema/TVRHBA_DriverParamGlobal.h"
 #include "schema/TVRHBA_DriverParameterAffectsFCPort.h"
 #include "schema/TVRHBA_DriverParams.h"
@@ -14,7 +16,6 @@
 #include "schema/TVRHBA_GlobalDriverServiceElementSettingData.h"
 
 #include <algorithm>
-#include <cctype>
 #include <vector>
 
 namespace cimple
@@ -50,14 +51,6 @@ template <class Parameter> void fill(Parameter& made, std::uint32_t number, cons
     made.help.set(help);
 }
 
-String lowerCase(const String& text)
-{
-    std::string lower(text.c_str());
-    for (char& c : lower)
-        c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
-    return String(lower);
-}
-
 /// Makes an instance of each record by `make(number, record)`.
 template <class Make> auto makeEach(const std::vector<RM_DriverParam>& records, Make make)
 {
@@ -71,13 +64,13 @@ template <class Make> auto makeEach(const std::vector<RM_DriverParam>& records, 
     return made;
 }
 
-/// What the map has of a port.
+/// What the map has of a port, without its priority lanes.
 std::vector<Ref<TVRHBA_DriverParams>> presentOf(ProviderAgent& agent, const String& deviceId)
 {
     std::vector<Ref<TVRHBA_DriverParams>> present;
     const TypedMap<TVRHBA_DriverParams> map = mapOf<TVRHBA_DriverParams>(agent);
     for (std::size_t i = 0; TVRHBA_DriverParams* entry = map.at(i); i++)
-        if (entry->deviceID.value == deviceId)
+        if (entry->deviceID.value == deviceId && !parseLane(entry->InstanceID.value.view()))
         {
             ref(entry);
             present.emplace_back(entry);
@@ -88,7 +81,7 @@ std::vector<Ref<TVRHBA_DriverParams>> presentOf(ProviderAgent& agent, const Stri
 PortParameters readPort(ProviderAgent& agent, const TVRHBA_FCPort& port)
 {
     const String& id = port.DeviceID.value;
-    const String deviceId = lowerCase(id);
+    const String deviceId = settingDeviceId(id.view());
     std::vector<RM_DriverParam> records;
     if (TVR_MethodWrapper::tvrcimGetDriverParam(id.c_str(), &records) != RM_OK)
         return {&port, presentOf(agent, deviceId)};
@@ -104,33 +97,6 @@ PortParameters readPort(ProviderAgent& agent, const TVRHBA_FCPort& port)
                             })};
 }
 
-/// Fills the flags of an association with a parameter that has this value for its default.
-template <class SettingData> auto flags(const Property<std::uint32_t>& current, const Property<std::uint32_t>& def)
-{
-    return [isDefault = current.value == def.value](SettingData& of)
-    {
-        of.IsDefault.set(isDefault ? 1 : 2);
-        of.IsCurrent.set(1);
-    };
-}
-
-void insert(ProviderAgent& agent, const TVRHBA_FCHBADriverParamService* service, const TVRHBA_FCPort* port,
-            const Ref<TVRHBA_DriverParams>& made)
-{
-    const TVRHBA_DriverParams* parameter =
-        mapOf<TVRHBA_DriverParams>(agent).insert(made, "Insert Failed : m_TVRHBA_DriverParams_map");
-    if (!parameter)
-        return;
-    using OfService = TVRHBA_DriverServiceElementSettingData;
-    join<OfService>(agent, &OfService::ManagedElement, service, &OfService::SettingData, parameter,
-                    "Insert Failed : m_TVRHBA_DriverServiceElementSettingData_map",
-                    flags<OfService>(parameter->current, parameter->def));
-    using OfPort = TVRHBA_DriverParameterAffectsFCPort;
-    join<OfPort>(agent, &OfPort::ManagedElement, port, &OfPort::SettingData, parameter,
-                 "Insert Failed : m_TVRHBA_DriverParameterAffectsFCPort_map",
-                 flags<OfPort>(parameter->current, parameter->def));
-}
-
 void insert(ProviderAgent& agent, const TVRHBA_FCHBADriverParamService* service,
             const Ref<TVRHBA_DriverParamGlobal>& made)
 {
@@ -140,7 +106,7 @@ void insert(ProviderAgent& agent, const TVRHBA_FCHBADriverParamService* service,
     if (parameter)
         join<OfService>(agent, &OfService::ManagedElement, service, &OfService::SettingData, parameter,
                         "Insert Failed : m_TVRHBA_GlobalDriverServiceElementSettingData_map",
-                        flags<OfService>(parameter->current, parameter->glbl));
+                        settingFlags<OfService>(parameter->current, parameter->glbl));
 }
 
 /// Gives the parameters of one port their present values. False if they are no longer the same parameters.
@@ -149,7 +115,7 @@ bool updateParameters(ProviderAgent& agent, const TVRHBA_FCPort& port)
     std::vector<RM_DriverParam> records;
     if (TVR_MethodWrapper::tvrcimGetDriverParam(port.DeviceID.value.c_str(), &records) != RM_OK)
         return true;
-    const std::vector<Ref<TVRHBA_DriverParams>> present = presentOf(agent, lowerCase(port.DeviceID.value));
+    const std::vector<Ref<TVRHBA_DriverParams>> present = presentOf(agent, settingDeviceId(port.DeviceID.value.view()));
     const auto isOf = [](const Ref<TVRHBA_DriverParams>& parameter, const RM_DriverParam& record)
     { return parameter->paramname.value == String(foreignText(record.name)); };
     if (!std::ranges::equal(present, records, isOf))
@@ -163,7 +129,7 @@ bool updateParameters(ProviderAgent& agent, const TVRHBA_FCPort& port)
     return true;
 }
 
-/// The caller holds the data mutex. A port whose list the library does not give keeps what it has.
+/// The caller holds the data mutex. A port whose list the library does not give keeps what it has. Priority lanes go.
 void rebuildDriverParameters(ProviderAgent& agent)
 {
     const TypedMap<TVRHBA_FCPort> ports = mapOf<TVRHBA_FCPort>(agent);
@@ -174,10 +140,9 @@ void rebuildDriverParameters(ProviderAgent& agent)
     mapOf<TVRHBA_DriverParams>(agent).clear();
     mapOf<TVRHBA_DriverServiceElementSettingData>(agent).clear();
     mapOf<TVRHBA_DriverParameterAffectsFCPort>(agent).clear();
-    const auto* service = mapOf<TVRHBA_FCHBADriverParamService>(agent).first();
     for (const PortParameters& of : all)
         for (const Ref<TVRHBA_DriverParams>& parameter : of.parameters)
-            insert(agent, service, of.port, parameter);
+            insertDriverSetting(agent, parameter, of.port, nullptr);
     rebuildVirtualPortParameters(agent);
 }
 
@@ -206,17 +171,22 @@ void rebuildGlobalDriverParameters(ProviderAgent& agent)
 
 } // namespace
 
-/// A get reads the parameters of the one port, as the associators of a service get each of them.
+/// A get reads the parameters of the one port, or the one lane, as the associators of a service get each of them.
 template <> void liveRefresh<TVRHBA_DriverParams>(ProviderAgent& agent, const Selection& selection)
 {
     const SharedEnds ends;
     const auto* wanted = selection.keys ? mapOf<TVRHBA_DriverParams>(agent).withKeysOf(selection.keys) : nullptr;
+    if (const auto lane = wanted ? parseLane(wanted->InstanceID.value.view()) : std::nullopt)
+        return refreshPriorityLane(agent, *lane);
     const auto* port = wanted ? mapOf<TVRHBA_FCPort>(agent).findFirst(
                                     [&](const TVRHBA_FCPort& known)
-                                    { return lowerCase(known.DeviceID.value) == wanted->deviceID.value; })
+                                    { return settingDeviceId(known.DeviceID.value.view()) == wanted->deviceID.value; })
                               : nullptr;
-    if (!port || !updateParameters(agent, *port))
-        rebuildDriverParameters(agent);
+    if (port && updateParameters(agent, *port))
+        return;
+    const std::set<Lane> lanes = priorityLanes(agent);
+    rebuildDriverParameters(agent);
+    restorePriorityLanes(agent, lanes);
 }
 
 template <> void liveRefresh<TVRHBA_DriverParamGlobal>(ProviderAgent& agent, const Selection&)

@@ -6,6 +6,7 @@
 #include "model/PhysicalModel.h"
 #include "model/PortModel.h"
 #include "model/PortVirtualization.h"
+#include "model/PriorityLanes.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
 #include "model/SanModel.h"
@@ -54,6 +55,7 @@ constexpr HostStep cardSteps[] = {
      {TVR_ERR, "CreatePortVirtualizationClasses failed: %d"},
      {TVR_ERR, "Exception in port virtualization class creation"},
      MapGroup::PortVirtualization},
+    {createPriorityLanes, GoOn, {}},
 };
 
 constexpr AdapterStep adapterSteps[] = {

@@ -65,6 +65,18 @@ RM_VirtualMachine readMachine(JsonNode node)
     return machine;
 }
 
+PriorityLane readPriorityLane(JsonNode& node, const std::vector<Target>& targets)
+{
+    PriorityLane lane;
+    lane.target = readTargetName(node.at("target"), targets);
+    lane.lun = static_cast<std::uint32_t>(node.at("lun").asNumber(maximumUnits - 1));
+    node.read("state", lane.states[RM_LANE_DRIVER]);
+    lane.states[RM_LANE_CONFIG] = lane.states[RM_LANE_DRIVER];
+    node.read("configState", lane.states[RM_LANE_CONFIG]);
+    node.finish();
+    return lane;
+}
+
 VirtualPort readVirtualPort(JsonNode& node, const std::vector<Target>& targets)
 {
     VirtualPort vport;
@@ -78,22 +90,14 @@ VirtualPort readVirtualPort(JsonNode& node, const std::vector<Target>& targets)
     vport.targets = readTargetNames(node, targets);
     if (node.has("virtualMachine"))
         vport.machine = readMachine(node.at("virtualMachine"));
+    node.forEach("priorityLanes",
+                 [&](JsonNode& item) { vport.priorityLanes.push_back(readPriorityLane(item, targets)); });
     node.finish();
     return vport;
 }
 
 constexpr NamedNumber beaconStates[] = {
     {"notAvailable", RM_BEACON_NOT_AVAILABLE}, {"off", RM_BEACON_OFF}, {"on", RM_BEACON_ON}};
-
-PriorityLane readPriorityLane(JsonNode& node, const std::vector<Target>& targets)
-{
-    PriorityLane lane;
-    lane.target = readTargetName(node.at("target"), targets);
-    lane.lun = static_cast<std::uint32_t>(node.at("lun").asNumber(maximumUnits - 1));
-    node.read("state", lane.state);
-    node.finish();
-    return lane;
-}
 
 RM_QosInfo readQos(JsonNode node)
 {
@@ -232,10 +236,15 @@ RM_DriverParam readDriverParameter(JsonNode& node)
 
 } // namespace
 
-std::vector<RM_DriverParam> readDriverParameters(JsonNode& owner)
+std::vector<DriverParameter> readDriverParameters(JsonNode& owner)
 {
-    std::vector<RM_DriverParam> parameters;
-    owner.forEach("driverParameters", [&](JsonNode& item) { parameters.push_back(readDriverParameter(item)); });
+    std::vector<DriverParameter> parameters;
+    owner.forEach("driverParameters",
+                  [&](JsonNode& item)
+                  {
+                      const RM_DriverParam parameter = readDriverParameter(item);
+                      parameters.push_back({parameter, parameter});
+                  });
     return parameters;
 }
 

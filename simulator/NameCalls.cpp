@@ -291,6 +291,7 @@ void SimulatedHost::reboot(bool powerDown)
                 port.names.volatileNames.reset();
         activateNames(adapter, true);
     }
+    loadDriver();
 }
 
 } // namespace tvrsim

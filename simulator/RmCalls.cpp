@@ -98,23 +98,6 @@ template <class Use> RM_STATUS SimulatedHost::onVport(Wwn wwpn, Wwn vport, Use u
                   });
 }
 
-RM_STATUS SimulatedHost::driverParameters(Wwn wwpn, std::vector<RM_DriverParam>& out) const
-{
-    return onAdapter(wwpn,
-                     [&](const Adapter& adapter)
-                     {
-                         out = adapter.driverParameters;
-                         return RM_OK;
-                     });
-}
-
-RM_STATUS SimulatedHost::globalDriverParameters(std::vector<RM_DriverParam>& out) const
-{
-    std::lock_guard lock(_mutex);
-    out = _scenario.driverParameters;
-    return RM_OK;
-}
-
 RM_STATUS SimulatedHost::driverType(Wwn wwpn, std::uint32_t& out) const
 {
     return onAdapter(wwpn,
@@ -288,23 +271,6 @@ RM_STATUS SimulatedHost::luns(Wwn wwpn, Wwn target, std::vector<RM_Lun>& out) co
                           return RM_ERROR_INVALID_WWN;
                       for (const LogicalUnit& unit : _scenario.targets[*place].units)
                           out.push_back({encodeLun(unit.number), unit.number, unit.blocks ? unit.blockLength : 0});
-                      return RM_OK;
-                  });
-}
-
-RM_STATUS SimulatedHost::priorityLanes(Wwn wwpn, Wwn vport, Wwn target, std::vector<RM_OASLun>& out) const
-{
-    return onPort(wwpn,
-                  [&](const Port& port) -> RM_STATUS
-                  {
-                      if (!port.priorityLanes)
-                          return RM_ERROR_NOT_SUPPORTED;
-                      const std::optional<std::size_t> place = reach(port.state, port.targets, target);
-                      if (!place)
-                          return RM_ERROR_INVALID_WWN;
-                      for (const PriorityLane& lane : *port.priorityLanes)
-                          if (lane.target == *place && vport == 0)
-                              out.push_back({encodeLun(lane.lun), lane.lun, lane.state});
                       return RM_OK;
                   });
 }

@@ -71,7 +71,7 @@ struct PriorityLane
 {
     std::size_t target = 0; ///< index in Scenario::targets
     std::uint32_t lun = 0;
-    std::uint32_t state = 1; ///< 0 or 1
+    std::array<std::uint32_t, 2> states{1, 1}; ///< 0 or 1, by RM_LaneOption
 };
 
 struct VirtualPort
@@ -82,6 +82,7 @@ struct VirtualPort
     std::string symbolicName;
     std::vector<std::size_t> targets; ///< indexes in Scenario::targets
     std::optional<RM_VirtualMachine> machine;
+    std::vector<PriorityLane> priorityLanes; ///< where the port has them
 };
 
 /// The pair of World Wide Names of a port.
@@ -133,6 +134,12 @@ struct Port
     std::optional<std::vector<PriorityLane>> priorityLanes; ///< none: the hardware does not have them
 };
 
+/// A parameter of the driver, and what it will be once the driver has been loaded anew.
+struct DriverParameter
+{
+    RM_DriverParam running{}, stored{};
+};
+
 /// One adapter of the HBA API: a card, or one function of a card.
 struct Adapter
 {
@@ -146,7 +153,7 @@ struct Adapter
     bool stale = false; ///< the HBA API answers "stale data" until the next refresh
     AttributeList attributes;
     std::vector<RM_Feature> features; ///< in ascending order of tag
-    std::vector<RM_DriverParam> driverParameters;
+    std::vector<DriverParameter> driverParameters;
     std::vector<Port> ports;
 };
 
@@ -155,7 +162,7 @@ struct Scenario
     std::string libraryVersion = "12.0.100.0";
     std::string miliVersion = "2.0.30.0";
     AttributeList serverAttributes;
-    std::vector<RM_DriverParam> driverParameters; ///< those for all adapters
+    std::vector<DriverParameter> driverParameters; ///< those for all adapters
     std::vector<Adapter> adapters;
     std::vector<Target> targets;
     std::vector<Fault> faults;

@@ -16,7 +16,7 @@ void readAttributeMembers(JsonNode& node, std::span<const AttributeRow> rows, At
 /// The same for the object that is member `key` of `owner`, if there is one.
 void readAttributes(JsonNode& owner, const char* key, std::span<const AttributeRow> rows, AttributeList& out);
 
-std::vector<RM_DriverParam> readDriverParameters(JsonNode& owner);
+std::vector<DriverParameter> readDriverParameters(JsonNode& owner);
 RM_PciRegisters readPci(JsonNode node);
 RM_VpdArea readVpd(JsonNode node);
 RM_SffData readTransceiver(JsonNode node);

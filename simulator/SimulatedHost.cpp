@@ -155,22 +155,6 @@ bool SimulatedHost::setPortState(Wwn wwpn, std::uint32_t state)
     return true;
 }
 
-bool SimulatedHost::setDriverParameter(std::optional<Wwn> wwpn, const std::string& name, std::uint32_t current)
-{
-    std::lock_guard lock(_mutex);
-    const auto place = wwpn ? _portByName.find(*wwpn) : _portByName.end();
-    if (wwpn && place == _portByName.end())
-        return false;
-    auto& parameters = wwpn ? _scenario.adapters[place->second.adapter].driverParameters : _scenario.driverParameters;
-    for (RM_DriverParam& parameter : parameters)
-        if (parameter.name == name)
-        {
-            parameter.current = current;
-            return true;
-        }
-    return false;
-}
-
 bool SimulatedHost::setAttributeOf(Wwn wwpn, const Attribute& attribute)
 {
     // The numbers of a kind share their digits above the lowest eight bits.

@@ -41,8 +41,6 @@ public:
     RM_STATUS libraryVersion(std::string& out) const;
     RM_STATUS miliVersion(std::string& out) const;
     RM_STATUS isLocal(Wwn wwpn, std::uint32_t& out) const;
-    RM_STATUS driverParameters(Wwn wwpn, std::vector<RM_DriverParam>& out) const;
-    RM_STATUS globalDriverParameters(std::vector<RM_DriverParam>& out) const;
     RM_STATUS driverType(Wwn wwpn, std::uint32_t& out) const;
     RM_STATUS feature(Wwn wwpn, std::uint32_t tag, std::uint32_t& out) const;
     RM_STATUS features(Wwn wwpn, std::vector<RM_Feature>& out) const;
@@ -58,8 +56,6 @@ public:
     RM_STATUS portStatistics(Wwn wwpn, AttributeList& out) const;
     RM_STATUS serverAttributes(Wwn wwpn, AttributeList& out) const;
     RM_STATUS luns(Wwn wwpn, Wwn target, std::vector<RM_Lun>& out) const;
-    /// A virtual port has no lanes of its own.
-    RM_STATUS priorityLanes(Wwn wwpn, Wwn vport, Wwn target, std::vector<RM_OASLun>& out) const;
     RM_STATUS scsi(Wwn wwpn, Wwn target, HBA_UINT64 lun, const ScsiCommand& command, ScsiReply& out);
     RM_STATUS vports(Wwn wwpn, std::vector<RM_VPortEntry>& out) const;
     RM_STATUS vportAttributes(Wwn wwpn, Wwn vport, RM_VPortAttributes& out) const;
@@ -79,8 +75,20 @@ public:
     RM_STATUS readNames(Wwn wwpn, std::uint32_t type, RM_WwnNames& out) const;
     RM_STATUS setBootCode(Wwn wwpn, bool enabled);
     /// Configured names come into force, also those that wait for more than a reset. Without power the volatile names
-    /// are lost before.
+    /// are lost before. Driver parameters and priority lanes are then what was stored of them.
     void reboot(bool powerDown);
+
+    // RM library, in DriverCalls.cpp: driver parameters and priority lanes.
+
+    RM_STATUS driverParameters(Wwn wwpn, std::vector<RM_DriverParam>& out) const;
+    RM_STATUS globalDriverParameters(std::vector<RM_DriverParam>& out) const;
+    /// `text` is "name=value". RM_ERROR for what the adapter does not have, or a value out of its range.
+    RM_STATUS setDriverParameter(Wwn wwpn, std::string_view text, std::uint32_t control);
+    /// Without a virtual port, which is a `vport` of 0, those of the port itself.
+    RM_STATUS priorityLanes(Wwn wwpn, Wwn vport, Wwn target, std::uint32_t option, std::vector<RM_OASLun>& out);
+    /// A `lun` of -1 is every unit of the target.
+    RM_STATUS setPriorityLane(Wwn wwpn, Wwn vport, Wwn target, std::int32_t lun, std::uint32_t state,
+                              std::uint32_t option);
 
     // What a test sees and changes. A false result means that there is no such adapter or port.
 
@@ -119,6 +127,10 @@ private:
     /// Index in Scenario::targets of a target that is among `targets`, from a port in `state`; only an online port
     /// reaches its targets.
     std::optional<std::size_t> reach(std::uint32_t state, const std::vector<std::size_t>& targets, Wwn wwpn) const;
+    /// The lanes of a port or virtual port, and the place of a target that it reaches, or why there are none.
+    struct LaneTable;
+    LaneTable lanesTo(Wwn wwpn, Wwn vport, Wwn target);
+    void loadDriver();
 
     /// These take the lock, and give RM_ERROR_INVALID_WWN for a name that is not there.
     template <class Use> RM_STATUS onAdapter(Wwn wwpn, Use use) const;

@@ -22,6 +22,7 @@ extern "C"
     TVRSIM_EXPORT RM_GetServerAttributes_t DUAL(GetServerAttributes);
     TVRSIM_EXPORT RM_GetDriverParams_t DUAL(GetDriverParams);
     TVRSIM_EXPORT RM_GetDriverParamsGlobal_t DUAL(GetDriverParamsGlobal);
+    TVRSIM_EXPORT RM_SetDriverParam_t DUAL(SetDriverParam);
     TVRSIM_EXPORT RM_GetDriverType_t DUAL(GetDriverType);
     TVRSIM_EXPORT RM_GetHBAFeature_t DUAL(GetHBAFeature);
     TVRSIM_EXPORT RM_GetHBAFeatureList_t DUAL(GetHBAFeatureList);
@@ -34,6 +35,7 @@ extern "C"
     TVRSIM_EXPORT RM_GetVPD_t DUAL(GetVPD);
     TVRSIM_EXPORT RM_GetLunList_t DUAL(GetLunList);
     TVRSIM_EXPORT RM_GetOASLunList_t DUAL(GetOASLunList);
+    TVRSIM_EXPORT RM_SetOASLunState_t DUAL(SetOASLunState);
     TVRSIM_EXPORT RM_ScsiInquiry_t DUAL(ScsiInquiry);
     TVRSIM_EXPORT RM_VPList_t DUAL(VPList);
     TVRSIM_EXPORT RM_VPGetAttributes_t DUAL(VPGetAttributes);
@@ -105,6 +107,13 @@ extern "C"
                          [&](auto& entries) { return call.host().globalDriverParameters(entries); });
     }
 
+    RM_STATUS DUAL(SetDriverParam)(HBA_WWN wwpn, const char* text, std::uint32_t control)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&]
+                           { return text ? call.host().setDriverParameter(fromHba(wwpn), text, control) : RM_ERROR; });
+    }
+
     RM_STATUS DUAL(GetDriverType)(HBA_WWN wwpn, std::uint32_t* driverType)
     {
         Call call = callOf(__func__, port(wwpn));
@@ -173,13 +182,24 @@ extern "C"
                          [&](auto& entries) { return call.host().luns(fromHba(wwpn), fromHba(target), entries); });
     }
 
-    RM_STATUS DUAL(GetOASLunList)(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, std::uint32_t, RM_OASLunList* list)
+    RM_STATUS DUAL(GetOASLunList)(HBA_WWN wwpn, HBA_WWN vport, HBA_WWN target, std::uint32_t option,
+                                  RM_OASLunList* list)
     {
         Call call = callOf(__func__, port(wwpn));
-        return call.list(list, &RM_OASLunList::count,
-                         [&](auto& entries) {
-                             return call.host().priorityLanes(fromHba(wwpn), fromHba(vport), fromHba(target), entries);
-                         });
+        return call.list(
+            list, &RM_OASLunList::count,
+            [&](auto& entries)
+            { return call.host().priorityLanes(fromHba(wwpn), fromHba(vport), fromHba(target), option, entries); });
+    }
+
+    RM_STATUS DUAL(SetOASLunState)(HBA_WWN wwpn, HBA_WWN target, HBA_WWN vport, std::int32_t lun, std::uint32_t state,
+                                   std::uint32_t option)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status(
+            [&] {
+                return call.host().setPriorityLane(fromHba(wwpn), fromHba(vport), fromHba(target), lun, state, option);
+            });
     }
 
     RM_STATUS DUAL(ScsiInquiry)(HBA_WWN wwpn, HBA_WWN target, HBA_UINT64 lun, std::uint8_t evpd, std::uint32_t page,
