@@ -66,6 +66,8 @@ constexpr Row rows[] = {
     {"ScsiInquiry", dual, scsiOut},
     {"SetBootBiosState", dual, statusOnly},
     {"SetDebugTraces", dual, statusOnly},
+    {"SetDriverParam", dual, statusOnly},
+    {"SetOASLunState", dual, statusOnly},
     {"VPGetAttributes", dual, textRecordOut},
     {"VPList", dual, listOut},
     {"VPListTargets", dual, listOut},
