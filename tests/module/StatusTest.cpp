@@ -10,6 +10,7 @@
 
 #include <cstdlib>
 #include <functional>
+#include <map>
 #include <set>
 
 using namespace module_test;
@@ -23,15 +24,24 @@ namespace
 
 TEST(Status, InstancesAreNotCreatedChangedOrDeleted)
 {
+    // What an instance without keys and values meets where there is such an operation.
+    const std::map<std::string, CMPIrc> created = {{"TVRHBA_DriverParams", CMPI_RC_ERR_INVALID_PARAMETER}};
+    const std::map<std::string, CMPIrc> deleted = {{"TVRHBA_DriverParams", CMPI_RC_ERR_NOT_FOUND}};
+    const std::map<std::string, CMPIrc> modified = {{"TVRHBA_FCPort", CMPI_RC_ERR_INVALID_PARAMETER},
+                                                    {"TVRHBA_ProviderConfigSetting", CMPI_RC_ERR_FAILED}};
     Host host;
     for (const std::string& className : host.broker().servedClasses())
     {
         SCOPED_TRACE(className);
         const broker::Object object{{"root/tavrin", className, {}}, {}};
-        EXPECT_EQ(host.broker().createInstance(object).status, CMPI_RC_ERR_NOT_SUPPORTED);
-        EXPECT_EQ(host.broker().deleteInstance(object.path).status, CMPI_RC_ERR_NOT_SUPPORTED);
-        EXPECT_EQ(host.broker().modifyInstance(object).status,
-                  className == "TVRHBA_FCPort" ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_NOT_SUPPORTED);
+        const auto expected = [&](const std::map<std::string, CMPIrc>& known)
+        {
+            const auto place = known.find(className);
+            return place == known.end() ? CMPI_RC_ERR_NOT_SUPPORTED : place->second;
+        };
+        EXPECT_EQ(host.broker().createInstance(object).status, expected(created));
+        EXPECT_EQ(host.broker().deleteInstance(object.path).status, expected(deleted));
+        EXPECT_EQ(host.broker().modifyInstance(object).status, expected(modified));
     }
     host.unload();
 }
