@@ -66,7 +66,7 @@ public:
     // Status and checks.
 
     static void logStatus(const RM_STATUS& status);
-    /// 0 if the port is one of this host, else 1. Precedes every command that changes an adapter.
+    /// 0 if the port is one of this host, else 1.
     static int Validatewwpn(const HBA_WWN& wwpn);
     static bool IsKestorCNA(const HBA_WWN& wwpn);
 

@@ -8,7 +8,7 @@
 namespace cimple
 {
 
-/// 1 if it is enabled, else 0. Returns 0, or 1 for any failure.
+/// `state` gets the library's number, 1 if it is enabled, and stays on a failure. Returns 0, or 1 for any failure.
 std::uint32_t tvrcimGetBootBiosState(const HBA_WWN& wwpn, std::uint32_t* state);
 
 /// `control` begins with "e" to enable or "d" to disable, in either case. The library's status; 4 for a null and 1 for

@@ -37,11 +37,11 @@ constexpr SettingAction actions[] = {
      {TVR_ERR, "The value provided for SAN refresh out is out of range"}},
 };
 
-void apply(ProviderAgent& agent, const SettingAction& action, std::uint32_t value)
+void apply(ProviderAgent& agent, const SettingAction& action, const Property<std::uint32_t>& wanted)
 {
-    if ((agent.m_config.*action.store)(value) != 0)
+    if (wanted.null || (agent.m_config.*action.store)(wanted.value) != 0)
         MethodCall::end(action.refused, invalid);
-    action.use(agent, value);
+    action.use(agent, wanted.value);
     action.done.log();
 }
 
@@ -56,13 +56,10 @@ int modifySetting(const TVRHBA_ProviderConfigSetting* instance, const TVRHBA_Pro
     TVRHBA_ProviderConfigSetting* setting = model->current.null ? nullptr : settings.withKeysOf(instance);
     if (!setting)
         MethodCall::end({TVR_ERR, "Instance does not exist"}, notThere);
-    if (instance->current.null)
-        MethodCall::end({}, invalid);
-    const std::uint32_t value = instance->current.value;
     for (std::size_t i = 0; i < std::size(actions); i++)
         if (settings.at(i) == setting)
-            apply(call.agent(), actions[i], value);
-    setting->current.set(value);
+            apply(call.agent(), actions[i], instance->current);
+    setting->current = instance->current;
     return 0;
 }
 

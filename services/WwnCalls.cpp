@@ -2,11 +2,11 @@
 
 #include "agent/LogText.h"
 #include "device/Bindings.h"
+#include "runtime/log/Shielded.h"
 
 #include <algorithm>
 #include <cstdio>
 #include <cstring>
-#include <cxxabi.h>
 #include <memory>
 #include <new>
 #include <vector>
@@ -17,8 +17,9 @@ namespace cimple
 namespace
 {
 
-/// Local ports that are looked at, and virtual ports of one of them: a library that tells of more is not believed.
+/// Local ports that are looked at, whatever number the library tells.
 constexpr std::uint32_t maxLocalPorts = 4096;
+/// Virtual ports of one of them: with more, none is compared.
 constexpr std::uint32_t maxVPorts = 1023;
 
 /// Calls in all while the adapter is busy.
@@ -58,22 +59,6 @@ template <std::size_t Lines> void logActivation(std::uint32_t code, LogText (Act
 }
 
 // --- calls that may have to be repeated
-
-/// What the calls of `body` answer; what they throw is logged, and a failure.
-template <class Body> RM_STATUS contained(const LogText& thrown, const Body& body)
-try
-{
-    return body();
-}
-catch (const abi::__forced_unwind&) // the end of the thread
-{
-    throw;
-}
-catch (...)
-{
-    thrown.log();
-    return RM_ERROR;
-}
 
 /// Repeats a call without a pause while the adapter is busy.
 template <class Call> RM_STATUS whileBusy(const LogText& repeating, const Call& call)
@@ -117,7 +102,7 @@ bool isDuplicateEntryInWWPNList(std::vector<HBA_WWN>& seen, const HBA_WWN& wwpn)
     catch (const std::bad_alloc&)
     {
         TVR_LOG(TVR_DBG, "\nERROR: isDuplicateEntryInWWPNList: realloc failed");
-        seen = {};
+        std::vector<HBA_WWN>().swap(seen);
     }
     return false;
 }
@@ -177,6 +162,25 @@ bool isRefused(const HBA_WWN& name, const LogText& refused)
     refused.log();
     return true;
 }
+
+// --- what the log says of an adapter's capability
+
+struct CapabilityRow
+{
+    RM_WwnCapability bit;
+    LogText set;
+    LogText clear;
+};
+
+constexpr CapabilityRow capabilityTexts[] = {
+    {RM_WWN_READ_ONLY, {TVR_INFO, "Read Only mode: World Wide Name Management is not supported in this mode"}, {}},
+    {RM_WWN_CAN_CHANGE_NON_VOLATILE,
+     {TVR_DBG, "Can change Non-Volatile WWNs"},
+     {TVR_DBG, "Cannot change Non-Volatile WWNs"}},
+    {RM_WWN_CAN_CHANGE_VOLATILE, {TVR_DBG, "Can change Volatile WWNs"}, {TVR_DBG, "Cannot change Volatile WWNs"}},
+    {RM_WWN_NEEDS_REBOOT, {TVR_INFO, "Activation requirement: Reboot"}, {}},
+    {RM_WWN_NEEDS_RESET, {TVR_INFO, "Activation requirement: Reset HBA"}, {}},
+};
 
 // --- what the log says of names that were read
 
@@ -278,13 +282,14 @@ RM_STATUS ChangeWWN(const HBA_WWN& wwpn, const HBA_WWN& newWwpn, const HBA_WWN& 
     }
     TVR_LOG(TVR_INFO, "ChangeWWN operation initiated");
     std::uint32_t activation = 0;
-    const RM_STATUS status =
-        contained({TVR_ERR, "Error in RM_ChangeWWN"},
-                  [&]
-                  {
-                      return whileBusy({TVR_DBG, "Validating new WWNs..."},
-                                       [&] { return LRM_ChangeWWN(wwpn, newWwpn, newWwnn, type, &activation); });
-                  });
+    const RM_STATUS status = shielded(
+        RM_STATUS{RM_ERROR},
+        [&]
+        {
+            return whileBusy({TVR_DBG, "Validating new WWNs..."},
+                             [&] { return LRM_ChangeWWN(wwpn, newWwpn, newWwnn, type, &activation); });
+        },
+        [](const char*) { TVR_LOG(TVR_ERR, "Error in RM_ChangeWWN"); });
     if (status == RM_OK)
     {
         TVR_LOG(TVR_WARN, "New WWNs written successfully");
@@ -303,11 +308,12 @@ RM_STATUS RestoreWWN(const HBA_WWN& wwpn, std::uint32_t type)
 {
     TVR_LOG(TVR_INFO, "RestoreWWN operation initiated.");
     std::uint32_t activation = 0;
-    const RM_STATUS status = contained(
-        {TVR_ERR, "Error in RestoreWWN"},
+    const RM_STATUS status = shielded(
+        RM_STATUS{RM_ERROR},
         [&] {
             return whileBusy({TVR_DBG, "Restoring WWNs..."}, [&] { return LRM_RestoreWWN(wwpn, type, &activation); });
-        });
+        },
+        [](const char*) { TVR_LOG(TVR_ERR, "Error in RestoreWWN"); });
     if (status == RM_OK)
         logActivation(activation, &ActivationRow::restored);
     return status;
@@ -317,12 +323,14 @@ RM_STATUS ReadWWN(const HBA_WWN& wwpn, std::uint32_t type, std::string* wwpnText
 {
     RM_WwnNames names{};
     const RM_STATUS status = LRM_ReadWWN(wwpn, type, &names);
-    if (status == RM_ERROR_WWN_NOT_AVAILABLE)
-        TVR_LOG(TVR_ERR, "WWN Management is NOT AVAILABLE on this adapter");
-    else if (status != RM_OK)
-        TVR_LOG(TVR_ERR, "ReadWWN: RM_ReadWWN call failed with error: %d", status);
     if (status != RM_OK)
+    {
+        if (status == RM_ERROR_WWN_NOT_AVAILABLE)
+            TVR_LOG(TVR_ERR, "WWN Management is NOT AVAILABLE on this adapter");
+        else
+            TVR_LOG(TVR_ERR, "ReadWWN: RM_ReadWWN call failed with error: %d", status);
         return status;
+    }
     logRead(type, names);
     if (names.kind != RM_WWN_KIND_VOLATILE && names.kind != RM_WWN_KIND_NON_VOLATILE)
         return status;
@@ -337,23 +345,15 @@ RM_STATUS GetWWNCapability(const HBA_WWN& wwpn, std::uint32_t* capability)
 {
     std::uint32_t bits = 0;
     const RM_STATUS status = LRM_GetWWNCapability(wwpn, &bits);
-    if (status == RM_ERROR_WWN_NOT_AVAILABLE)
-        TVR_LOG(TVR_ERR, "WWN Management is not available on this HBA");
     if (status != RM_OK)
     {
+        if (status == RM_ERROR_WWN_NOT_AVAILABLE)
+            TVR_LOG(TVR_ERR, "WWN Management is not available on this HBA");
         TVR_LOG(TVR_ERR, "GetWWNCapability: RM_ReadWWNCapability call failed with error: %d", status);
         return status;
     }
-    if (bits & RM_WWN_READ_ONLY)
-        TVR_LOG(TVR_INFO, "Read Only mode: World Wide Name Management is not supported in this mode");
-    const bool nonVolatile = bits & RM_WWN_CAN_CHANGE_NON_VOLATILE;
-    TVR_LOG(TVR_DBG, "%s", nonVolatile ? "Can change Non-Volatile WWNs" : "Cannot change Non-Volatile WWNs");
-    const bool canChangeVolatile = bits & RM_WWN_CAN_CHANGE_VOLATILE;
-    TVR_LOG(TVR_DBG, "%s", canChangeVolatile ? "Can change Volatile WWNs" : "Cannot change Volatile WWNs");
-    if (bits & RM_WWN_NEEDS_REBOOT)
-        TVR_LOG(TVR_INFO, "Activation requirement: Reboot");
-    if (bits & RM_WWN_NEEDS_RESET)
-        TVR_LOG(TVR_INFO, "Activation requirement: Reset HBA");
+    for (const CapabilityRow& row : capabilityTexts)
+        (bits & row.bit ? row.set : row.clear).log();
     *capability = bits;
     return status;
 }

@@ -21,7 +21,8 @@ RM_STATUS ChangeWWN(const HBA_WWN& wwpn, const HBA_WWN& newWwpn, const HBA_WWN& 
 /// Gives the port back its names of the factory, or its non-volatile ones, by `type` as RM_RestoreWWN_t has it.
 RM_STATUS RestoreWWN(const HBA_WWN& wwpn, std::uint32_t type);
 
-/// The names of one kind, an RM_WwnType, as "10:00:00:90:fa:94:27:79". The texts stay where the port has none.
+/// The names of one kind, an RM_WwnType, as "10:00:00:90:fa:94:27:79". The texts are left as they are
+/// where the port has none. Throws std::bad_alloc.
 RM_STATUS ReadWWN(const HBA_WWN& wwpn, std::uint32_t type, std::string* wwpnText, std::string* wwnnText);
 
 /// What the adapter can do with names, in bits of RM_WwnCapability.

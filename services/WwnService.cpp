@@ -52,6 +52,13 @@ std::uint32_t knownType(const Property<std::uint16_t>& type, std::span<const Log
     MethodCall::end({}, texts.ofName);
 }
 
+/// A status in the room of the out parameter; all ones for one that has no room there.
+std::uint16_t operationStatus(RM_STATUS status)
+{
+    constexpr std::uint16_t most = 0xFFFF;
+    return status < 0 || status > most ? most : static_cast<std::uint16_t>(status);
+}
+
 /// The name that a client sent: 16 digits, which may stand in quotes. What follows them is not cut away.
 HBA_WWN newName(MethodCall& call, const Property<String>& name, const LogText& missing)
 {
@@ -99,7 +106,7 @@ std::uint32_t readWWN(const Instance* reference, TVRHBA_FCHBAWWNService_ReadWWN_
         parameters.WWPN.set(wwpnText.c_str());
         parameters.WWNN.set(wwnnText.c_str());
     }
-    parameters.WWNOperationStatus.set(static_cast<std::uint16_t>(status));
+    parameters.WWNOperationStatus.set(operationStatus(status));
     return static_cast<std::uint32_t>(status);
 }
 
@@ -110,7 +117,7 @@ std::uint32_t restoreWWN(const Instance* reference, TVRHBA_FCHBAWWNService_Resto
     const std::uint32_t type =
         knownType(parameters.Type, restoreTypes, {TVR_ERR, "RestoreWWN: Type %d not recognized..."});
     const RM_STATUS status = RestoreWWN(wwpn, type);
-    parameters.WWNOperationStatus.set(static_cast<std::uint16_t>(status));
+    parameters.WWNOperationStatus.set(operationStatus(status));
     if (status == RM_OK)
         call.agent().m_bAdapterRefreshPending = true;
     return static_cast<std::uint32_t>(status);

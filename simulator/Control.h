@@ -64,8 +64,8 @@ extern "C"
     /// `wwpn` is null.
     TVRSIM_EXPORT int tvrsim_set_driver_parameter(const char* wwpn, const char* name, std::uint32_t current);
 
-    /// Names of ports come into force that wait for a restart of the host. With `powerDown` volatile names are lost
-    /// before.
+    /// What waits for a restart of the host comes into force: names of ports, stored driver parameters and priority
+    /// lanes. With `powerDown` volatile names are lost before.
     TVRSIM_EXPORT void tvrsim_reboot(int powerDown);
 
     /// For the front ends: what they share. Loads a scenario first if none was loaded.

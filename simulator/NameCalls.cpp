@@ -228,6 +228,8 @@ RM_STATUS SimulatedHost::restoreNames(Wwn wwpn, std::uint32_t type, std::uint32_
                           constexpr std::uint32_t toFactory = 0;
                           if (!port.names.available)
                               return RM_ERROR_WWN_NOT_AVAILABLE;
+                          if (port.names.capability & RM_WWN_READ_ONLY)
+                              return RM_ERROR_WWN_NOT_SUPPORTED;
                           if (type > 1)
                               return RM_ERROR;
                           if (type == toFactory)

@@ -168,6 +168,35 @@ TEST(ProviderInstances, AChangedTimeoutDecidesWhenTheNextRequestRefreshes)
     host.unload();
 }
 
+TEST(ProviderInstances, ChangedFlagsDecideWhatTheNextRefreshBuilds)
+{
+    const std::string adapters = "[TVR_DBG] PERF: Building Adapter Data...";
+    const std::string fabric = "[TVR_DBG] PERF: Building SAN Data...";
+    stopClock();
+    Host host;
+    described(host, "TVRHBA_ProviderConfigSetting");
+    ASSERT_TRUE(host.awaitRefresh());
+    const auto set = [&](const char* name, std::uint32_t value)
+    {
+        const auto setting = changedSetting(host, name, broker::Value::uint32(value));
+        EXPECT_EQ(host.broker().modifyInstance(setting).status, CMPI_RC_OK);
+    };
+    set("sanrefresh", 0);
+    const std::size_t scans = host.logged(fabric);
+    advanceClock(std::chrono::minutes(10));
+    described(host, "TVRHBA_ProviderConfigSetting");
+    ASSERT_TRUE(host.awaitRefresh(2));
+    EXPECT_EQ(host.logged(fabric), scans) << "a timeout alone scans no fabric any more";
+
+    set("adapterrefresh", 1);
+    const std::size_t builds = host.logged(adapters);
+    host.instancesOf("TVRHBA_StorageVolume");
+    ASSERT_TRUE(host.awaitRefresh(3));
+    EXPECT_EQ(host.logged(adapters), builds + 1) << "a scan that a reader asks for brings the adapters along";
+    EXPECT_EQ(host.logged(fabric), scans + 1);
+    host.unload();
+}
+
 TEST(ProviderInstances, ChangesOfNoSettingOrOfNothingAreRefused)
 {
     Host host;
@@ -180,6 +209,8 @@ TEST(ProviderInstances, ChangesOfNoSettingOrOfNothingAreRefused)
     const auto setting = changedSetting(host, "sanrefresh", broker::Value::uint32(0));
     EXPECT_EQ(host.broker().modifyInstance(setting, {{"ElementName"}}).status, CMPI_RC_ERR_FAILED);
     EXPECT_EQ(host.logged("[TVR_ERR] Instance does not exist"), 2u);
+    EXPECT_EQ(host.logged("[TVR_ERR] The value provided for SAN refresh out is out of range"), 1u) << "for a null";
+    EXPECT_EQ(host.logged("[TVR_DBG] TVRHBA_ProviderConfigSetting_Provider::modify_instance()"), 3u);
     EXPECT_EQ(described(host, "TVRHBA_ProviderConfigSetting"), settings(10, 0, 1));
     host.unload();
 }

@@ -268,6 +268,8 @@ TEST(Wwn, WrongArgumentsChangeNothing)
     } rows[] = {
         {Value::null(CMPI_string), good, type, missingWwpn},
         {Value::string(""), good, type, missingWwpn},
+        {Value::null(CMPI_string), Value::null(CMPI_string), typeValue(2), missingWwpn},
+        {good, Value::null(CMPI_string), typeValue(2), missingWwnn},
         {good, Value::null(CMPI_string), type, missingWwnn},
         {good, Value::string(""), type, missingWwnn},
         {Value::string("1000027A511602A"), good, type, noName},
@@ -286,8 +288,8 @@ TEST(Wwn, WrongArgumentsChangeNothing)
     {
         const Answer answer = host.change(row.wwpn, row.wwnn, row.type);
         EXPECT_EQ(answer.value, 32968u) << row.lastLine;
-        EXPECT_THAT(answer.lines, testing::Not(IsEmpty()));
-        EXPECT_EQ(answer.lines.empty() ? "" : answer.lines.back(), row.lastLine);
+        ASSERT_FALSE(answer.lines.empty()) << row.lastLine;
+        EXPECT_EQ(answer.lines.back(), row.lastLine);
         EXPECT_TRUE(answer.at("WWNOperationStatus").isNull());
     }
     EXPECT_EQ(host.restore(2).value, 32968u);
@@ -339,12 +341,18 @@ TEST(Wwn, NamesOfVirtualPortsAreRefused)
         EXPECT_THAT(answer.lines, ElementsAre("[TVR_DBG] Writing Non-Volatile World Wide Name.",
                                               "[TVR_DBG] ChangeWWN: Duplication of vport WWPN detected."));
     }
+    EXPECT_EQ(host.calls("RM_GetLocalHBAInfo"), 8u) << "the search goes on to the last of four ports";
     EXPECT_EQ(host.calls("LRM_ChangeWWN"), 0u);
+    EXPECT_EQ(host.change(nonVolatileNames, newWwpn, "2002027A51320240").value, 0u)
+        << "the node's name of a virtual port is not looked at";
     // The library itself knows more names: here that of another port.
     const Answer ofPort = host.change(nonVolatileNames, "1000027A51160211");
     EXPECT_EQ(ofPort.value, 91u);
     EXPECT_EQ(operationStatus(ofPort), 0u);
-    EXPECT_EQ(host.calls("LRM_ChangeWWN"), 1u);
+    EXPECT_EQ(host.calls("LRM_ChangeWWN"), 2u);
+
+    host.addFault(fault("RM_GetLocalHBAInfo", R"("status": 1, "to": 1)"));
+    EXPECT_EQ(operationStatus(host.change(nonVolatileNames, vport)), 1u) << "a port that cannot be read is passed over";
     host.unload();
 }
 
@@ -371,15 +379,16 @@ TEST(Wwn, TheSearchForNamesKeepsItsBounds)
         std::string wwpn;
         std::uint64_t value;
         std::uint64_t lists; ///< calls of LRM_VPList
+        std::uint64_t ports = 1;
     } rows[] = {
         {"one call has room for one", withNames("", vports(1)), "", "2000000000000001", 91, 1},
         {"two need another call", withNames("", vports(2)), "", "2000000000000002", 91, 2},
         {"the most that are looked at", withNames("", vports(1023)), "", lastOf1023, 91, 2},
-        {"listed twice", withNames("", R"(, "listedTwice": true)"), "", newWwpn, 0, 1},
+        {"listed twice", withNames("", R"(, "listedTwice": true)"), "", newWwpn, 0, 1, 2},
         {"no such port at that index", withNames("", vports(1)), fault("RM_GetLocalHBAInfo", R"("status": 1)"), newWwpn,
          0, 0},
         {"more local ports than can be", withNames("", vports(1)),
-         fault("RM_GetNumberOfLocalAdapters", R"("hostile": "hugeCount")"), newWwpn, 0, 1},
+         fault("RM_GetNumberOfLocalAdapters", R"("hostile": "hugeCount")"), newWwpn, 0, 1, 4096},
         {"a list that cannot be read", withNames("", vports(1)), fault("LRM_VPList", R"("status": 1)"), newWwpn, 0, 1},
         {"a count that lies", withNames("", vports(2)), fault("LRM_VPList", R"("hostile": "hugeCount")"), newWwpn, 0,
          1},
@@ -393,7 +402,7 @@ TEST(Wwn, TheSearchForNamesKeepsItsBounds)
         const std::uint64_t before = host.calls("LRM_VPList");
         EXPECT_EQ(host.change(nonVolatileNames, row.wwpn).value, row.value);
         EXPECT_EQ(host.calls("LRM_VPList") - before, row.lists);
-        EXPECT_LE(host.calls("RM_GetLocalHBAInfo"), 4096u);
+        EXPECT_EQ(host.calls("RM_GetLocalHBAInfo"), row.ports);
         host.unload();
     }
     // One virtual port more, and none of them is compared: the library itself refuses the name.
