@@ -5,6 +5,7 @@
 #include "agent/MethodOutcome.h"
 #include "agent/ProviderAgent.h"
 #include "device/TVR_MethodWrapper.h"
+#include "schema/CIM_LogicalDevice.h"
 
 #include <cstdint>
 
@@ -63,16 +64,37 @@ public:
     /// The port, or port controller, in the cache that a parameter refers to by its DeviceID.
     template <class Target> Target& target(const Target* reference, const ServiceTexts& texts)
     {
+        return target<Target>(static_cast<const Instance*>(reference), texts);
+    }
+    /// The same for a parameter that may refer to anything: what is no device is not in the model.
+    template <class Target> Target& target(const Instance* reference, const ServiceTexts& texts)
+    {
         if (!reference)
             end(texts.noTarget, texts.ofTarget);
-        Target* found = mapOf<Target>(_agent).findFirst(
-            [&](const Target& known) {
-                return !known.DeviceID.null && !reference->DeviceID.null &&
-                       known.DeviceID.value == reference->DeviceID.value;
-            });
+        const auto* named = cast<CIM_LogicalDevice>(reference);
+        Target* found = !named ? nullptr
+                               : mapOf<Target>(_agent).findFirst(
+                                     [&](const Target& known) {
+                                         return !known.DeviceID.null && !named->DeviceID.null &&
+                                                known.DeviceID.value == named->DeviceID.value;
+                                     });
         if (!found)
             end(texts.unknownTarget, texts.ofTarget);
         return *found;
+    }
+
+    /// Does what takes long and needs nothing of the cache, without the data lock. What was looked up before may be
+    /// gone then.
+    template <class Work> auto withoutLock(Work work)
+    {
+        struct Released
+        {
+            explicit Released(Mutex& mutex) : mutex(mutex) { mutex.unlock(); }
+            ~Released() { mutex.lock(); }
+            Mutex& mutex;
+        };
+        const Released released(_agent.m_DataMutex);
+        return work();
     }
 
     /// The WWPN that a port's DeviceID is the text of.

@@ -14,6 +14,7 @@
 #include "services/LaneInstances.h"
 #include "services/ProviderSettings.h"
 #include "services/WwnService.h"
+#include "services/SoftwareInstallation.h"
 
 #include <type_traits>
 

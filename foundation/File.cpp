@@ -71,6 +71,16 @@ File_Descriptor openForWriting(const char* path, WriteMode mode)
     return open_regular(place.name.c_str(), flags, newFile, place.folder.get());
 }
 
+File_Descriptor createNamedFile(const std::string& name)
+{
+    if (name.empty() || name == "." || name == ".." || name.find_first_of(std::string_view("/\0", 2)) != name.npos)
+    {
+        errno = EINVAL;
+        return File_Descriptor();
+    }
+    return open_regular(name.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, S_IRUSR | S_IWUSR);
+}
+
 std::optional<std::string> readTextFile(const char* path, std::size_t limit)
 {
     const File_Descriptor file = open_regular(path, O_RDONLY);

@@ -22,6 +22,10 @@ enum class WriteMode
 /// a symbolic link is refused.
 File_Descriptor openForWriting(const char* path, WriteMode mode);
 
+/// Makes a file for what a client sends or asks for, in the current directory and for this user alone. None with errno
+/// where the name has a folder in it or is none, or where anything stands under it, a link included.
+File_Descriptor createNamedFile(const std::string& name);
+
 /// The first `limit` bytes of a file; nothing, with errno, if it does not open or cannot be read.
 std::optional<std::string> readTextFile(const char* path, std::size_t limit);
 

@@ -1,9 +1,9 @@
 // What a port controller has: its transceiver, and the programs in its flash memory.
 #include "agent/Build.h"
+#include "agent/SoftwareVersion.h"
 #include "device/ForeignText.h"
 #include "device/TVR_MethodWrapper.h"
 #include "model/PortModel.h"
-#include "model/SoftwareVersion.h"
 #include "schema/TVRHBA_ElementFlashImageSoftwareIdentity.h"
 #include "schema/TVRHBA_FlashImageSoftwareIdentity.h"
 #include "schema/TVRHBA_PortController.h"

@@ -1,8 +1,8 @@
 #include "model/SoftwareIdentities.h"
 
+#include "agent/SoftwareVersion.h"
 #include "device/Data.h"
 #include "model/Affects.h"
-#include "model/SoftwareVersion.h"
 #include "schema/TVRHBA_ElementSoftwareIdentity.h"
 #include "schema/TVRHBA_FCDriverServiceAffectsDriver.h"
 #include "schema/TVRHBA_FCHBADriverParamService.h"
@@ -17,7 +17,6 @@
 #include "schema/TVRHBA_SoftwareIdentity.h"
 #include "schema/TVRHBA_SoftwareInstallationService.h"
 
-#include <charconv>
 #include <string>
 #include <vector>
 
@@ -40,38 +39,6 @@ constexpr std::uint16_t ownerUpgradeable = 3;
 constexpr std::uint16_t current = 2;
 constexpr std::uint16_t next = 3;
 constexpr std::uint16_t installed = 6;
-
-// --- versions
-
-constexpr Property<std::uint16_t> Identity::*versionNumbers[] = {&Identity::MajorVersion, &Identity::MinorVersion,
-                                                                 &Identity::RevisionNumber, &Identity::BuildNumber};
-
-/// Two to four numbers with dots between, each within what its property holds; none of a text of another form.
-std::vector<std::uint16_t> dottedNumbers(const std::string& version)
-{
-    std::vector<std::uint16_t> numbers;
-    const char* const end = version.data() + version.size();
-    for (const char* at = version.data(); numbers.size() < std::size(versionNumbers);)
-    {
-        const auto [behind, error] = std::from_chars(at, end, numbers.emplace_back());
-        if (error != std::errc() || (behind != end && *behind != '.'))
-            return {};
-        if (behind == end)
-            return numbers.size() > 1 ? numbers : std::vector<std::uint16_t>();
-        at = behind + 1;
-    }
-    return {};
-}
-
-/// Newer firmware and other software has versions of the dotted form; a text of neither is a version without numbers.
-void setVersion(Identity& identity, const std::string& version)
-{
-    if (setFirmwareVersion(identity, String(version)))
-        return;
-    const std::vector<std::uint16_t> numbers = dottedNumbers(version);
-    for (std::size_t i = 0; i < numbers.size(); i++)
-        (identity.*versionNumbers[i]).set(numbers[i]);
-}
 
 // --- driver
 

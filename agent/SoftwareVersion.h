@@ -3,6 +3,8 @@
 
 #include "foundation/FirmwareVersion.h"
 
+#include <string>
+
 namespace cimple
 {
 
@@ -21,5 +23,11 @@ template <class Identity> bool setFirmwareVersion(Identity& identity, const Stri
     identity.TestReleaseVersion.set(version.testRelease);
     return true;
 }
+
+class TVRHBA_SoftwareIdentity;
+
+/// The version of a software in the place of what it was. Newer firmware and other software has versions of dotted
+/// numbers; a text of neither form is a version without numbers.
+void setVersion(TVRHBA_SoftwareIdentity& identity, const std::string& version);
 
 } // namespace cimple
