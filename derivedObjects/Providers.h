@@ -13,8 +13,8 @@
 #include "services/DriverParameterService.h"
 #include "services/LaneInstances.h"
 #include "services/ProviderSettings.h"
-#include "services/WwnService.h"
 #include "services/SoftwareInstallation.h"
+#include "services/WwnService.h"
 
 #include <type_traits>
 

@@ -23,6 +23,10 @@ namespace
 using Service = TVRHBA_SoftwareInstallationService;
 using ByteStream = CIM_SoftwareInstallationService_InstallFromByteStream_method;
 using FromURI = CIM_SoftwareInstallationService_InstallFromURI_method;
+using ResetHBA = TVRHBA_SoftwareInstallationService_ResetHBA_method;
+using PortEnabled = TVRHBA_SoftwareInstallationService_SetPortEnabled_method;
+using HBAFeatures = TVRHBA_SoftwareInstallationService_GetHBAFeatures_method;
+using FECState = TVRHBA_SoftwareInstallationService_SetFECState_method;
 using Options = Array<std::uint16_t>;
 
 constexpr MethodEnd notSaved = {4};
@@ -175,8 +179,6 @@ void save(std::string_view image, const std::string& name)
         MethodCall::end({}, notSaved);
 }
 
-} // namespace
-
 std::uint32_t installFromByteStream(const Instance* reference, ByteStream& parameters)
 {
     MethodCall call({TVR_DBG, "Entering InstallFromByteStream"});
@@ -225,7 +227,7 @@ std::uint32_t installFromURI(const Instance* reference, FromURI& parameters)
 
 // --- commands to a port
 
-std::uint32_t resetHBA(const Instance* reference, TVRHBA_SoftwareInstallationService_ResetHBA_method& parameters)
+std::uint32_t resetHBA(const Instance* reference, ResetHBA& parameters)
 {
     MethodCall call({TVR_DBG, "Entering ResetHBA"});
     const auto* named = cast<Service>(reference);
@@ -248,8 +250,7 @@ std::uint32_t resetHBA(const Instance* reference, TVRHBA_SoftwareInstallationSer
     return static_cast<std::uint32_t>(status);
 }
 
-std::uint32_t setPortEnabled(const Instance* reference,
-                             TVRHBA_SoftwareInstallationService_SetPortEnabled_method& parameters)
+std::uint32_t setPortEnabled(const Instance* reference, PortEnabled& parameters)
 {
     TVR_LOG(TVR_DBG, "Input PortEnable : %d", parameters.PortEnabled.value);
     MethodCall call({});
@@ -271,8 +272,7 @@ std::uint32_t setPortEnabled(const Instance* reference,
     return static_cast<std::uint32_t>(status);
 }
 
-std::uint32_t getHBAFeatures(const Instance* reference,
-                             TVRHBA_SoftwareInstallationService_GetHBAFeatures_method& parameters)
+std::uint32_t getHBAFeatures(const Instance* reference, HBAFeatures& parameters)
 {
     MethodCall call({TVR_DBG, "Entering TVRHBA_SoftwareInstallationService_Provider::GetHBAFeatures"});
     call.self<Service>(reference, texts);
@@ -292,7 +292,7 @@ std::uint32_t getHBAFeatures(const Instance* reference,
     return 0;
 }
 
-std::uint32_t setFECState(const Instance* reference, TVRHBA_SoftwareInstallationService_SetFECState_method& parameters)
+std::uint32_t setFECState(const Instance* reference, FECState& parameters)
 {
     TVR_LOG(TVR_DBG, "Input FEC Flag : %d", parameters.EnableFlag.value);
     MethodCall call({});
@@ -307,6 +307,14 @@ std::uint32_t setFECState(const Instance* reference, TVRHBA_SoftwareInstallation
                 : "TVRHBA_SoftwareInstallationService_Provider::SetFECPortState failed for target %s",
             target.c_str());
     return static_cast<std::uint32_t>(status);
+}
+
+} // namespace
+
+std::span<const MethodRow> softwareInstallationMethods()
+{
+    return methodTable<Service, &installFromByteStream, &installFromURI, &resetHBA, &setPortEnabled, &getHBAFeatures,
+                       &setFECState>;
 }
 
 } // namespace cimple

@@ -263,6 +263,7 @@ Adapter readAdapter(JsonNode& node, const std::vector<Target>& targets)
     node.read("optionRomVersion", adapter.optionRomVersion);
     node.read("firmwareVersion", adapter.firmwareVersion);
     node.read("driverName", adapter.driverName);
+    node.read("firmwareFamily", adapter.firmwareFamily);
     node.read("vendorSpecificId", adapter.vendorSpecificId);
     node.read("driverType", adapter.driverType);
     node.read("stale", adapter.stale);

@@ -67,16 +67,6 @@ RM_STATUS changeable(const NameManagement& names, std::uint32_t type)
 
 } // namespace
 
-template <class Use> RM_STATUS SimulatedHost::changePort(Wwn wwpn, Use use)
-{
-    std::lock_guard lock(_mutex);
-    const auto place = _portByName.find(wwpn);
-    if (place == _portByName.end())
-        return RM_ERROR_INVALID_WWN;
-    Adapter& adapter = _scenario.adapters[place->second.adapter];
-    return use(adapter, adapter.ports[place->second.port]);
-}
-
 void SimulatedHost::completeNames()
 {
     for (Adapter& adapter : _scenario.adapters)
@@ -291,6 +281,7 @@ void SimulatedHost::reboot(bool powerDown)
         if (powerDown)
             for (Port& port : adapter.ports)
                 port.names.volatileNames.reset();
+        activateFirmware(adapter);
         activateNames(adapter, true);
     }
     loadDriver();

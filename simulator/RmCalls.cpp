@@ -31,6 +31,10 @@ constexpr StatusRow statusTexts[] = {
     {RM_ERROR_MAILBOX_FAILED, "The mailbox command failed"},
     {RM_ERROR_MAILBOX_TIMEOUT, "The mailbox command timed out"},
     {RM_ERROR_MAILBOX_BUSY, "The mailbox is busy"},
+    {RM_ERROR_NO_RESET, "The firmware is written and waits for a restart of the host"},
+    {notFirmware, "The file is no firmware"},
+    {firmwareOfAnother, "The firmware is for another family of adapters"},
+    {firmwareDamaged, "The firmware does not have its checksum"},
     {RM_ERROR_FIRMWARE_LACKS, "The firmware does not have the function"},
 };
 

@@ -132,6 +132,13 @@ struct Port
     std::vector<std::size_t> targets; ///< indexes in Scenario::targets; the position is the SCSI target number
     std::vector<VirtualPort> virtualPorts;
     std::optional<std::vector<PriorityLane>> priorityLanes; ///< none: the hardware does not have them
+
+    struct LinkState
+    {
+        std::uint32_t state = 0;
+        std::optional<Attribute> link;
+    };
+    std::optional<LinkState> beforeDisabling; ///< of a port that was disabled
 };
 
 /// A parameter of the driver, and what it will be once the driver has been loaded anew.
@@ -150,7 +157,8 @@ struct Adapter
     Wwn nodeWwn = 0;
     std::uint32_t vendorSpecificId = 0;
     std::uint32_t driverType = 0;
-    bool stale = false; ///< the HBA API answers "stale data" until the next refresh
+    std::string firmwareFamily; ///< whose firmware it takes; that of its model if empty
+    bool stale = false;         ///< the HBA API answers "stale data" until the next refresh
     AttributeList attributes;
     std::vector<RM_Feature> features; ///< in ascending order of tag
     std::vector<DriverParameter> driverParameters;

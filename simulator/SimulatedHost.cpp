@@ -47,6 +47,7 @@ void SimulatedHost::load(Scenario scenario)
 {
     std::lock_guard lock(_mutex);
     _scenario = std::move(scenario);
+    _imported.clear();
     index();
 
     _osDeviceNames.clear();

@@ -4,6 +4,7 @@
 // mirror a library call return that library's status, and fill their output only with status 0 or as they say.
 #pragma once
 
+#include "simulator/FirmwareFile.h"
 #include "simulator/Scenario.h"
 #include "simulator/ScsiResponses.h"
 
@@ -90,6 +91,16 @@ public:
     RM_STATUS setPriorityLane(Wwn wwpn, Wwn vport, Wwn target, std::int32_t lun, std::uint32_t state,
                               std::uint32_t option);
 
+    // Firmware and the state of ports, in FirmwareCalls.cpp. A file that is to be verified or downloaded must have been
+    // imported under the same path.
+
+    RM_STATUS importFile(const char* path);
+    RM_STATUS verifyFirmware(Wwn wwpn, const char* path);
+    RM_STATUS downloadFirmware(Wwn wwpn, const char* path);
+    RM_STATUS resetAdapter(Wwn wwpn);
+    RM_STATUS setPortEnabled(Wwn wwpn, std::uint32_t enabled, std::uint32_t& dynamic);
+    RM_STATUS setPortAttribute(Wwn wwpn, std::uint32_t id, const void* value, std::uint32_t length);
+
     // What a test sees and changes. A false result means that there is no such adapter or port.
 
     std::size_t openHandles() const;
@@ -138,9 +149,13 @@ private:
     template <class Use> RM_STATUS onVport(Wwn wwpn, Wwn vport, Use use) const;
     /// To change what `use` gets, the adapter and the port.
     template <class Use> RM_STATUS changePort(Wwn wwpn, Use use);
+    /// For a reset of an adapter or of the host: what the flash memory holds is what runs. Called with the lock held.
+    static void activateFirmware(Adapter& adapter);
+    template <class Use> RM_STATUS withImported(Wwn wwpn, const char* path, Use use);
 
     mutable std::mutex _mutex;
     Scenario _scenario;
+    std::map<std::string, FirmwareFile> _imported; ///< by path
     bool _libraryLoaded = false;
     HBA_HANDLE _lastHandle = 0;
     std::map<HBA_HANDLE, std::string> _handles; ///< name of the adapter
@@ -152,6 +167,16 @@ private:
     /// For each port of the host, for each of its targets, the names of the units.
     std::unordered_map<Wwn, std::vector<std::vector<std::string>>> _osDeviceNames;
 };
+
+template <class Use> RM_STATUS SimulatedHost::changePort(Wwn wwpn, Use use)
+{
+    std::lock_guard lock(_mutex);
+    const auto place = _portByName.find(wwpn);
+    if (place == _portByName.end())
+        return RM_ERROR_INVALID_WWN;
+    Adapter& adapter = _scenario.adapters[place->second.adapter];
+    return use(adapter, adapter.ports[place->second.port]);
+}
 
 /// Copies `text` into a field, cut to leave room for the zero byte.
 template <std::size_t Size> void setText(char (&field)[Size], const std::string& text)

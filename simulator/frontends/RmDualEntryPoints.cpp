@@ -49,6 +49,10 @@ extern "C"
     TVRSIM_EXPORT RM_RestoreWWN_t DUAL(RestoreWWN);
     TVRSIM_EXPORT RM_ReadWWN_t DUAL(ReadWWN);
     TVRSIM_EXPORT RM_SetBootBiosState_t DUAL(SetBootBiosState);
+    TVRSIM_EXPORT RM_DownloadFirmware_t DUAL(DownloadFirmware);
+    TVRSIM_EXPORT RM_ResetHBA_t DUAL(ResetHBA);
+    TVRSIM_EXPORT RM_SetPortEnabled_t DUAL(SetPortEnabled);
+    TVRSIM_EXPORT RM_SetAdapterAttribute_t DUAL(SetAdapterAttribute);
 
     RM_STATUS DUAL(InitLib)()
     {
@@ -313,6 +317,30 @@ extern "C"
     {
         Call call = callOf(__func__, port(wwpn));
         return call.status([&] { return call.host().setBootCode(fromHba(wwpn), enabled != 0); });
+
+    RM_STATUS DUAL(DownloadFirmware)(HBA_WWN wwpn, const char* file, std::uint32_t)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().downloadFirmware(fromHba(wwpn), file); });
+    }
+
+    RM_STATUS DUAL(ResetHBA)(HBA_WWN wwpn, std::uint32_t)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().resetAdapter(fromHba(wwpn)); });
+    }
+
+    RM_STATUS DUAL(SetPortEnabled)(HBA_WWN wwpn, std::uint32_t enabled, std::uint32_t* dynamic)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(dynamic,
+                           [&](std::uint32_t& out) { return call.host().setPortEnabled(fromHba(wwpn), enabled, out); });
+    }
+
+    RM_STATUS DUAL(SetAdapterAttribute)(HBA_WWN wwpn, std::uint32_t id, const void* value, std::uint32_t length)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().setPortAttribute(fromHba(wwpn), id, value, length); });
     }
 
 } // extern "C"

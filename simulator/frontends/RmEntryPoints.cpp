@@ -14,6 +14,8 @@ extern "C"
     TVRSIM_EXPORT RM_GetNumberOfLocalAdapters_t RM_GetNumberOfLocalAdapters;
     TVRSIM_EXPORT RM_GetLocalHBAInfo_t RM_GetLocalHBAInfo;
     TVRSIM_EXPORT RM_ValidateWwn_t RM_ValidateWwn;
+    TVRSIM_EXPORT RM_ImportHBAFileA_t RM_ImportHBAFileA;
+    TVRSIM_EXPORT RM_VerifyFirmwareA_t RM_VerifyFirmwareA;
 
     const void* RM_GetAttributeValue(const void* buffer, std::uint32_t id, std::uint32_t* length, RM_STATUS* status)
     {
@@ -80,6 +82,17 @@ extern "C"
     {
         Call call = callOf(__func__, port(wwn));
         return call.status([&] { return call.host().validateName(fromHba(wwn)); });
+
+    RM_STATUS RM_ImportHBAFileA(const char* file)
+    {
+        Call call = callOf(__func__);
+        return call.status([&] { return call.host().importFile(file); });
+    }
+
+    RM_STATUS RM_VerifyFirmwareA(std::uint32_t, std::uint32_t, HBA_WWN wwpn, const char* file)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().verifyFirmware(fromHba(wwpn), file); });
     }
 
 } // extern "C"

@@ -11,6 +11,7 @@ namespace
 
 std::mutex mutex;
 std::string present;
+bool isReal = false; ///< `present` is the machine's libcurl
 std::vector<std::string> tried;
 bool isSet = false; ///< a test asks what is tried
 
@@ -29,17 +30,30 @@ void* openOf(const char* file, int mode)
     const std::lock_guard lock(mutex);
     if (isSet)
         tried.push_back(file);
-    return file == present ? next(nullptr, mode) : nullptr; // a handle that can be closed
+    if (file != present)
+        return nullptr;
+    return next(isReal ? "libcurl.so.4" : nullptr, mode); // the other is a handle that can be closed
+}
+
+void set(const std::string& file, bool real)
+{
+    const std::lock_guard lock(mutex);
+    present = file;
+    isReal = real;
+    isSet = true;
+    tried.clear();
 }
 
 } // namespace
 
 void setLibCurl(const std::string& file)
 {
-    const std::lock_guard lock(mutex);
-    present = file;
-    isSet = true;
-    tried.clear();
+    set(file, false);
+}
+
+void setRealLibCurl(const std::string& file)
+{
+    set(file, true);
 }
 
 std::vector<std::string> triedLibCurls()

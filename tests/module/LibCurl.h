@@ -11,6 +11,9 @@ namespace module_test
 /// machine's own.
 void setLibCurl(const std::string& file);
 
+/// The same, but what is found is the machine's own library.
+void setRealLibCurl(const std::string& file);
+
 /// The files under which it was looked for since then.
 std::vector<std::string> triedLibCurls();
 
