@@ -317,6 +317,7 @@ extern "C"
     {
         Call call = callOf(__func__, port(wwpn));
         return call.status([&] { return call.host().setBootCode(fromHba(wwpn), enabled != 0); });
+    }
 
     RM_STATUS DUAL(DownloadFirmware)(HBA_WWN wwpn, const char* file, std::uint32_t)
     {

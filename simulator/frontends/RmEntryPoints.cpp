@@ -82,6 +82,7 @@ extern "C"
     {
         Call call = callOf(__func__, port(wwn));
         return call.status([&] { return call.host().validateName(fromHba(wwn)); });
+    }
 
     RM_STATUS RM_ImportHBAFileA(const char* file)
     {
