@@ -61,7 +61,7 @@ void disable(Port& port)
 {
     if (port.beforeDisabling)
         return;
-    Port::LinkState& before = port.beforeDisabling.emplace();
+    LinkState& before = port.beforeDisabling.emplace();
     before.state = port.state;
     if (const Attribute* link = find(port.attributes, RM_PA_LINK_STATE))
         before.link = *link;

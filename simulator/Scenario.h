@@ -106,6 +106,13 @@ struct NameManagement
     std::uint32_t waitsFor = RM_WWN_ACTIVE; ///< the RM_WwnActivation of the configured names
 };
 
+/// What a port is in, and the attribute that shows it.
+struct LinkState
+{
+    std::uint32_t state = 0;
+    std::optional<Attribute> link;
+};
+
 struct Port
 {
     Wwn wwpn = 0, wwnn = 0, fabricName = 0;
@@ -132,13 +139,7 @@ struct Port
     std::vector<std::size_t> targets; ///< indexes in Scenario::targets; the position is the SCSI target number
     std::vector<VirtualPort> virtualPorts;
     std::optional<std::vector<PriorityLane>> priorityLanes; ///< none: the hardware does not have them
-
-    struct LinkState
-    {
-        std::uint32_t state = 0;
-        std::optional<Attribute> link;
-    };
-    std::optional<LinkState> beforeDisabling; ///< of a port that was disabled
+    std::optional<LinkState> beforeDisabling;               ///< of a port that was disabled
 };
 
 /// A parameter of the driver, and what it will be once the driver has been loaded anew.

@@ -55,6 +55,7 @@ struct FileServer::Server
         server->Get(".*",
                     [this](const httplib::Request& request, httplib::Response& answer)
                     {
+                        work();
                         const std::lock_guard lock(mutex);
                         const auto file = files.find(request.path);
                         answer.status = file == files.end() ? 404 : 200;
@@ -84,6 +85,7 @@ struct FileServer::Server
     const std::string scheme;
     std::mutex mutex;
     std::map<std::string, std::string> files, received;
+    std::function<void()> work = [] {};
     std::unique_ptr<httplib::Server> server;
     int port = 0;
     std::thread thread;
@@ -101,6 +103,11 @@ void FileServer::put(const std::string& path, const std::string& content)
 {
     const std::lock_guard lock(_server->mutex);
     _server->files[path] = content;
+}
+
+void FileServer::whileServing(std::function<void()> work)
+{
+    _server->work = std::move(work);
 }
 
 std::string FileServer::received(const std::string& path) const

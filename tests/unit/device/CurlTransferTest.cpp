@@ -122,7 +122,10 @@ CURLcode fakeSetOption(CURL*, CURLoption option, ...)
     if (option == fake->refused)
         return CURLE_UNKNOWN_OPTION;
     va_list arguments;
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wvarargs" // the enumeration is as wide as what it is promoted to
     va_start(arguments, option);
+#pragma GCC diagnostic pop
     if (option == CURLOPT_WRITEFUNCTION)
         fake->write = va_arg(arguments, decltype(fake->write));
     else if (option == CURLOPT_WRITEDATA)
