@@ -41,8 +41,6 @@ constexpr std::size_t maxFileSize = std::size_t{256} << 20;
 /// Older libraries count the users of their global state without a lock.
 constinit std::mutex globalState;
 
-using Transfer = std::remove_pointer_t<CURL*>;
-
 /// libcurl, open, and its one transfer. At the end of its life both are given back, whatever came between.
 class Curl
 {

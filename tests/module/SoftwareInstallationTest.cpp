@@ -228,7 +228,8 @@ TEST(InstallFromURI, TakesLocalFilesWithoutLibCurl)
 {
     Installation on;
     const std::string path = on.folder / "fw.grp";
-    for (const std::string& uri : {path, "file://" + path, "file://localhost" + path, std::string("fw.grp")})
+    for (const std::string& uri :
+         {path, "file://" + path, "file://localhost" + path, "see file://" + path, std::string("fw.grp")})
     {
         on.write("/work/fw.grp", firmware);
         on.write("/work/beside", "");

@@ -203,36 +203,6 @@ void expectGivenBack(const FakeCurl& curl, const std::string& row)
 
 using CurlDownload = Folder;
 
-TEST_F(CurlDownload, WhatIsThereNeedsNoLibrary)
-{
-    write("fw.grp", "x");
-    const std::string path = folder / "fw.grp";
-    struct Row
-    {
-        std::string uri, file;
-    };
-    const Row rows[] = {
-        {path, path},
-        {"fw.grp", "fw.grp"},
-        {"file://" + path, path},
-        {"file://localhost" + path, path},
-        {"see file://" + path, path},
-        {"see file://localhost" + path, path},
-    };
-    FakeCurl curl;
-    for (const Row& row : rows)
-    {
-        const LogCapture log;
-        std::string file;
-        EXPECT_EQ(downloadFileUsingCurl(row.uri, file), 0) << row.uri;
-        EXPECT_EQ(file, row.file);
-        EXPECT_THAT(log.lines, ElementsAre("5 TVR_MethodWrapper::downloadFileUsingCurl: " + row.uri,
-                                           "5 TVR_MethodWrapper::Firmware file path: " + row.file,
-                                           "5 File found in local file system."));
-    }
-    EXPECT_THAT(curl.calls, IsEmpty());
-}
-
 TEST_F(CurlDownload, IsMadeOfTheStepsInTheirOrder)
 {
     FakeCurl curl;
@@ -448,31 +418,6 @@ struct RealCurl
 };
 
 using RealTransfer = Folder;
-
-TEST_F(RealTransfer, FetchesAFile)
-{
-    const RealCurl real;
-    for (const auto protocol : {FileServer::Protocol::http, FileServer::Protocol::https})
-    {
-        FileServer server(protocol);
-        std::string content(100'000, '\0');
-        for (std::size_t i = 0; i < content.size(); i++)
-            content[i] = static_cast<char>(i * 7);
-        server.put("/d/fw.grp", content);
-        const LogCapture log;
-        std::string file;
-        EXPECT_EQ(downloadFileUsingCurl(server.uri("/d/fw.grp", "joe:secret@"), file), 0);
-        EXPECT_EQ(file, "fw.grp");
-        EXPECT_TRUE(read(file) == content);
-        fs::remove(file);
-
-        // What a server says instead of a file is none.
-        EXPECT_EQ(downloadFileUsingCurl(server.uri("/absent"), file), CURLE_HTTP_RETURNED_ERROR);
-        EXPECT_EQ(log.count("5 download failed 22"), 1);
-        EXPECT_THAT(files(), IsEmpty());
-        EXPECT_THAT(log.lines, Not(Contains(HasSubstr("secret"))));
-    }
-}
 
 TEST_F(RealTransfer, FollowsNoOtherServer)
 {
