@@ -8,11 +8,11 @@
 #include "services/SoftwareInstallationCalls.h"
 
 #include <algorithm>
-#include <optional>
 #include <string>
 #include <string_view>
 #include <unistd.h>
 #include <utility>
+#include <vector>
 
 namespace cimple
 {
