@@ -23,6 +23,8 @@ enum class AttributeForm : std::uint8_t
 
 struct Attribute
 {
+    bool operator==(const Attribute&) const = default;
+
     std::uint32_t id;
     AttributeForm form;
     std::string value; ///< the bytes as they travel, a text without its zero byte

@@ -49,6 +49,12 @@ extern "C"
     /// Adapters that are open through the HBA API.
     TVRSIM_EXPORT std::size_t tvrsim_open_handles();
 
+    /// Remembers the state of the host as it is.
+    TVRSIM_EXPORT void tvrsim_remember_host();
+    /// What differs from the state that was remembered, such as "port 1000027A51160210"; empty if nothing does. Cut to
+    /// `size` bytes.
+    TVRSIM_EXPORT void tvrsim_host_difference(char* text, std::size_t size);
+
     // Changes of the host. 0 if there is no such adapter or port.
 
     /// The adapter and its ports vanish; handles of it become invalid.

@@ -19,6 +19,8 @@ namespace tvrsim
 /// One row. Exactly one of the effects is set.
 struct Fault
 {
+    bool operator==(const Fault&) const = default;
+
     std::string function;                    ///< the exported name
     std::string subject;                     ///< adapter name or WWPN that the call must concern; empty for any
     std::uint64_t from = 1, to = UINT64_MAX; ///< calls that the row hits, counted from 1 since it was added

@@ -7,9 +7,19 @@
 
 #include <array>
 #include <cstdint>
+#include <cstring>
 #include <optional>
 #include <string>
+#include <type_traits>
 #include <vector>
+
+/// Records of the libraries are equal by their bytes.
+template <class Record>
+    requires(std::is_class_v<Record> && std::is_trivial_v<Record>)
+bool operator==(const Record& a, const Record& b)
+{
+    return std::memcmp(&a, &b, sizeof(Record)) == 0;
+}
 
 namespace tvrsim
 {
@@ -26,6 +36,8 @@ enum class ScsiOperation : std::uint8_t
 /// A command that ends with sense data instead of its result.
 struct CheckCondition
 {
+    bool operator==(const CheckCondition&) const = default;
+
     ScsiOperation operation = ScsiOperation::any;
     std::optional<std::uint8_t> page;     ///< of vital product data; every page if not given
     std::uint32_t times = 0xFFFF'FFFF;    ///< commands that still end this way; all ones for ever
@@ -36,6 +48,8 @@ struct CheckCondition
 /// One designator of the device identification page (SPC-4, 7.8.6.1).
 struct Designator
 {
+    bool operator==(const Designator&) const = default;
+
     std::uint8_t type = 3;    ///< 3 is NAA
     std::uint8_t codeSet = 1; ///< 1 binary, 2 ASCII
     std::uint8_t association = 0;
@@ -44,6 +58,8 @@ struct Designator
 
 struct LogicalUnit
 {
+    bool operator==(const LogicalUnit&) const = default;
+
     std::uint32_t number = 0; ///< below 16384
     std::uint8_t deviceType = 0;
     std::uint8_t deviceQualifier = 0;
@@ -60,6 +76,8 @@ struct LogicalUnit
 /// A port in the fabric with logical units behind it.
 struct Target
 {
+    bool operator==(const Target&) const = default;
+
     std::string name; ///< by which ports refer to it
     Wwn wwpn = 0, wwnn = 0;
     std::uint32_t fcId = 0;
@@ -69,6 +87,8 @@ struct Target
 /// A unit that a port may serve with priority.
 struct PriorityLane
 {
+    bool operator==(const PriorityLane&) const = default;
+
     std::size_t target = 0; ///< index in Scenario::targets
     std::uint32_t lun = 0;
     std::array<std::uint32_t, 2> states{1, 1}; ///< 0 or 1, by RM_LaneOption
@@ -76,6 +96,8 @@ struct PriorityLane
 
 struct VirtualPort
 {
+    bool operator==(const VirtualPort&) const = default;
+
     Wwn wwpn = 0, wwnn = 0, fabricName = 0;
     std::uint32_t fcId = 0;
     std::uint32_t state = HBA_PORTSTATE_ONLINE;
@@ -115,6 +137,8 @@ struct LinkState
 
 struct Port
 {
+    bool operator==(const Port&) const = default;
+
     Wwn wwpn = 0, wwnn = 0, fabricName = 0;
     NameManagement names;
     bool listedTwice = false; ///< the RM library lists it among the local ports twice
@@ -151,6 +175,8 @@ struct DriverParameter
 /// One adapter of the HBA API: a card, or one function of a card.
 struct Adapter
 {
+    bool operator==(const Adapter&) const = default;
+
     std::string name; ///< at most 255 bytes
     std::string manufacturer = "Tavrin Corporation";
     std::string serialNumber, model, modelDescription, nodeSymbolicName, hardwareVersion, driverVersion,
@@ -168,6 +194,8 @@ struct Adapter
 
 struct Scenario
 {
+    bool operator==(const Scenario&) const = default;
+
     std::string libraryVersion = "12.0.100.0";
     std::string miliVersion = "2.0.30.0";
     AttributeList serverAttributes;

@@ -146,6 +146,32 @@ bool SimulatedHost::makeStale(const std::string& name)
     return true;
 }
 
+void SimulatedHost::remember()
+{
+    std::lock_guard lock(_mutex);
+    _remembered = _scenario;
+}
+
+std::string SimulatedHost::difference() const
+{
+    std::lock_guard lock(_mutex);
+    if (_scenario == _remembered)
+        return {};
+    if (_scenario.adapters.size() != _remembered.adapters.size())
+        return "number of adapters";
+    for (std::size_t i = 0; i < _scenario.adapters.size(); i++)
+    {
+        const Adapter& adapter = _scenario.adapters[i];
+        const Adapter& former = _remembered.adapters[i];
+        for (std::size_t j = 0; j < std::min(adapter.ports.size(), former.ports.size()); j++)
+            if (adapter.ports[j] != former.ports[j])
+                return "port " + wwnText(former.ports[j].wwpn);
+        if (adapter != former)
+            return "adapter " + former.name;
+    }
+    return "host";
+}
+
 bool SimulatedHost::setPortState(Wwn wwpn, std::uint32_t state)
 {
     std::lock_guard lock(_mutex);

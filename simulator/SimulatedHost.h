@@ -106,6 +106,9 @@ public:
     std::size_t openHandles() const;
     /// Name of the adapter behind a handle; empty if there is none.
     std::string adapterOf(HBA_HANDLE handle) const;
+    /// Keeps a copy of the host's state, and names what differs from it; empty if nothing does.
+    void remember();
+    std::string difference() const;
     bool removeAdapter(const std::string& name);
     bool makeStale(const std::string& name);
     bool setPortState(Wwn wwpn, std::uint32_t state);
@@ -156,6 +159,7 @@ private:
     mutable std::mutex _mutex;
     Scenario _scenario;
     std::map<std::string, FirmwareFile> _imported; ///< by path
+    Scenario _remembered;
     bool _libraryLoaded = false;
     HBA_HANDLE _lastHandle = 0;
     std::map<HBA_HANDLE, std::string> _handles; ///< name of the adapter

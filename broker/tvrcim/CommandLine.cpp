@@ -30,7 +30,10 @@ public:
     }
     CommandOptions& path()
     {
-        _current->add_option("PATH", _command.target, "Class.key=\"value\",...")->required();
+        _current
+            ->add_option("PATH", _command.target,
+                         "Class.key=\"value\",...; keys that the others settle may be left out")
+            ->required();
         return *this;
     }
     CommandOptions& names()
@@ -46,13 +49,15 @@ public:
     }
     CommandOptions& assignments(bool required)
     {
-        _current->add_option("ASSIGNMENTS", _command.assignments, "name=value; arrays as [a,b], null for none")
+        _current
+            ->add_option("ASSIGNMENTS", _command.assignments,
+                         "name=value; arrays as [a,b], null for none, @FILE for the bytes of a file")
             ->required(required);
         return *this;
     }
-    CommandOptions& method()
+    CommandOptions& method(bool required)
     {
-        _current->add_option("METHOD", _command.method, "name of a method")->required();
+        _current->add_option("METHOD", _command.method, "name of a method")->required(required);
         return *this;
     }
     CommandOptions& all(const char* help)
@@ -96,6 +101,7 @@ void addCommands(CommandOptions& options)
 {
     options.add("classes", "list the classes that the module serves").all("list all classes of its repository");
     options.add("class", "show the definition of a class").className();
+    options.add("methods", "show parameters and values of a class's methods").className().method(false);
     options.add("enum", "show the instances of a class and its subclasses").className().names().properties();
     options.add("get", "show one instance").path().properties();
     options.add("assoc", "show what associations join to an instance")
@@ -112,7 +118,7 @@ void addCommands(CommandOptions& options)
     options.add("set", "change properties of an instance").path().assignments(true);
     options.add("create", "create an instance").className().assignments(false);
     options.add("delete", "delete an instance").path();
-    options.add("call", "call a method").path().method().assignments(false);
+    options.add("call", "call a method; 'methods CLASS' shows what it takes").path().method(true).assignments(false);
     options.add("host", "show the host, its adapters and what they reach as a tree")
         .all("list each target and unit, however many");
     options.add("topology", "draw cards, ports, targets and units as a graph for graphviz")

@@ -31,6 +31,7 @@ struct CommandLine
 inline constexpr int exitCimError = 1;
 inline constexpr int exitUsage = 2;
 inline constexpr int exitViolation = 3;
+inline constexpr int exitRefusal = 4; ///< of a method, by its return value
 
 /// Help goes to standard output, errors to standard error with exit code 2.
 CommandLine parseCommandLine(int argc, const char* const* argv);

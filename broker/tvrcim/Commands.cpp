@@ -1,9 +1,12 @@
 #include "broker/tvrcim/Commands.h"
 
+#include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/Graphviz.h"
 #include "broker/tvrcim/HostReport.h"
+#include "broker/tvrcim/Progress.h"
 #include "broker/tvrcim/Topology.h"
 #include "broker/values/PathText.h"
+#include "broker/values/ValueMap.h"
 
 #include <nlohmann/json.hpp>
 
@@ -25,27 +28,6 @@ template <class Answer> Answer checked(Answer answer)
     if (!answer.ok())
         throw CimError(answer);
     return answer;
-}
-
-Path pathOf(const Session& session, const std::string& text)
-{
-    try
-    {
-        return parsePath(text, session.broker.classes(), session.nameSpace);
-    }
-    catch (const std::invalid_argument& error)
-    {
-        throw UsageError("PATH: " + std::string(error.what()));
-    }
-}
-
-/// A path that names an instance.
-Path instancePathOf(const Session& session, const std::string& text)
-{
-    Path path = pathOf(session, text);
-    if (const std::string key = missingKey(path, session.broker.classes()); !key.empty())
-        throw UsageError("PATH: the key '" + key + "' of " + path.className + " is missing");
-    return path;
 }
 
 const ClassInfo& classOf(const Session& session, const std::string& name)
@@ -70,6 +52,13 @@ void done(Session& session, const Json& json, const std::string& text)
         printJson(session.out, json);
     else
         session.out << text << '\n';
+}
+
+/// Runs an operation that may take long.
+template <class Operation> auto changing(Session& session, const std::string& what, Operation operation)
+{
+    const Progress progress(session.progress, what);
+    return checked(operation());
 }
 
 // --- one function a command ----------------------------------------------------------------------------
@@ -151,42 +140,66 @@ void set(Session& session, const Command& command)
 {
     const Path path = instancePathOf(session, command.target);
     const ClassInfo& info = classOf(session, path.className);
-    const Object object{path, parseAssignments(session.broker.classes(), path.nameSpace, info.properties, info.name,
-                                               command.assignments)};
+    const Object object{path,
+                        parseAssignments(session, {path.nameSpace, info.properties, info.name}, command.assignments)};
     const std::vector<std::string> names = namesOf(object.properties);
-    checked(session.broker.modifyInstance(object, names));
+    changing(session, command.name, [&] { return session.broker.modifyInstance(object, names); });
     done(session, {{"path", pathText(path)}, {"changed", names}}, "changed " + pathText(path));
 }
 
 void create(Session& session, const Command& command)
 {
     const ClassInfo& info = classOf(session, command.target);
-    Object object{
-        {session.nameSpace, info.name, {}},
-        parseAssignments(session.broker.classes(), session.nameSpace, info.properties, info.name, command.assignments)};
+    Object object{{session.nameSpace, info.name, {}},
+                  parseAssignments(session, {session.nameSpace, info.properties, info.name}, command.assignments)};
     for (const std::string& key : info.keys)
         if (object.has(key))
             object.path.setKey(key, object.get(key));
-    printPaths(session.out, session.format, checked(session.broker.createInstance(object)).paths);
+    const NamesReply made = changing(session, command.name, [&] { return session.broker.createInstance(object); });
+    printPaths(session.out, session.format, made.paths);
 }
 
 void remove(Session& session, const Command& command)
 {
     const Path path = instancePathOf(session, command.target);
-    checked(session.broker.deleteInstance(path));
+    changing(session, command.name, [&] { return session.broker.deleteInstance(path); });
     done(session, {{"path", pathText(path)}, {"deleted", true}}, "deleted " + pathText(path));
+}
+
+const MethodInfo& methodOf(const ClassInfo& info, const std::string& name)
+{
+    const MethodInfo* method = info.method(name);
+    if (!method)
+        throw CimError({CMPI_RC_ERR_METHOD_NOT_FOUND, info.name + " has no method '" + name + "'"});
+    return *method;
+}
+
+void showMethods(Session& session, const Command& command)
+{
+    const ClassInfo& info = classOf(session, command.target);
+    std::vector<const MethodInfo*> methods;
+    if (command.method.empty())
+        for (const MethodInfo& method : info.methods)
+            methods.push_back(&method);
+    else
+        methods.push_back(&methodOf(info, command.method));
+    printMethods(session.out, session.format, info, methods);
 }
 
 void call(Session& session, const Command& command)
 {
-    const Path path = pathOf(session, command.target);
-    const ClassInfo& info = classOf(session, path.className);
-    const MethodInfo* method = info.method(command.method);
-    if (!method)
-        throw CimError({CMPI_RC_ERR_METHOD_NOT_FOUND, info.name + " has no method '" + command.method + "'"});
-    const std::vector<Property> in = parseAssignments(session.broker.classes(), path.nameSpace, method->parameters,
-                                                      method->name, command.assignments);
-    printMethodReply(session.out, session.format, checked(session.broker.invokeMethod(path, method->name, in)));
+    const Path named = pathOf(session, command.target);
+    const ClassInfo& info = classOf(session, named.className);
+    const MethodInfo& method = methodOf(info, command.method);
+    const Path path = method.flags & cimple::META_STATIC ? named : instancePathOf(session, command.target);
+    const std::vector<Property> in =
+        parseAssignments(session, {path.nameSpace, method.parameters, method.name}, command.assignments);
+    const MethodReply reply =
+        changing(session, method.name, [&] { return session.broker.invokeMethod(path, method.name, in); });
+    printMethodReply(session.out, session.format, info, method, reply);
+    const Value& returned = reply.returnValue;
+    if (!returned.isNull() && isInteger(returned.type()) && returned.asUnsigned() != 0)
+        throw MethodRefusal(method.name + " returned " + namedValueText(valueNames(info, method.name), returned));
 }
 
 void showHost(Session& session, const Command& command)
@@ -237,9 +250,10 @@ struct CommandRow
     void (*run)(Session& session, const Command& command);
 };
 
-constexpr std::array<CommandRow, 12> commands{{
+constexpr std::array<CommandRow, 13> commands{{
     {"classes", listClasses},
     {"class", showClass},
+    {"methods", showMethods},
     {"enum", enumerate},
     {"get", get},
     {"assoc", followAssociations},
@@ -257,35 +271,6 @@ constexpr std::array<CommandRow, 12> commands{{
 CimError::CimError(const Outcome& outcome)
     : std::runtime_error(statusName(outcome.status) + (outcome.message.empty() ? "" : ": " + outcome.message))
 {}
-
-std::vector<Property> parseAssignments(const ClassTable& classes, std::string_view nameSpace,
-                                       const std::vector<FeatureInfo>& features, const std::string& owner,
-                                       const std::vector<std::string>& texts)
-{
-    std::vector<Property> result;
-    for (const std::string& text : texts)
-    {
-        const std::size_t mark = text.find('=');
-        const std::string name = text.substr(0, mark);
-        const auto feature = std::find_if(features.begin(), features.end(),
-                                          [&](const FeatureInfo& f) { return sameName(f.name, name); });
-        if (mark == std::string::npos || feature == features.end())
-        {
-            throw UsageError(
-                "'" + text + "': " +
-                (mark == std::string::npos ? "an assignment is written name=value" : owner + " has no '" + name + "'"));
-        }
-        try
-        {
-            setNamed(result, feature->name, parseValue(Target(classes, nameSpace, *feature), text.substr(mark + 1)));
-        }
-        catch (const std::invalid_argument& error)
-        {
-            throw UsageError("'" + text + "': " + error.what());
-        }
-    }
-    return result;
-}
 
 void runCommand(Session& session, const Command& command)
 {

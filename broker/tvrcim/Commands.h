@@ -26,6 +26,13 @@ public:
     explicit CimError(const broker::Outcome& outcome);
 };
 
+/// A method that was called and returned another number than 0.
+class MethodRefusal : public std::runtime_error
+{
+public:
+    using std::runtime_error::runtime_error;
+};
+
 /// One command with its arguments; what a command does not use stays empty.
 struct Command
 {
@@ -47,15 +54,11 @@ struct Session
     std::string nameSpace;
     Format format;
     std::ostream& out;
-    bool colour = false; ///< what is wrong may be in colour
+    bool colour = false;              ///< what is wrong may be in colour
+    std::ostream* progress = nullptr; ///< a terminal that shows what is at work
 };
 
-/// Runs a command and prints its result. Throws UsageError or CimError.
+/// Runs a command and prints its result. Throws UsageError or CimError, and MethodRefusal once that is printed.
 void runCommand(Session& session, const Command& command);
-
-/// Properties or parameters from name=value texts, typed by the features that may be named. Throws UsageError.
-std::vector<broker::Property> parseAssignments(const broker::ClassTable& classes, std::string_view nameSpace,
-                                               const std::vector<broker::FeatureInfo>& features,
-                                               const std::string& owner, const std::vector<std::string>& texts);
 
 } // namespace tvrcim

@@ -3,6 +3,7 @@
 #include "broker/values/PathText.h"
 #include "broker/values/QualifierText.h"
 #include "broker/values/Utf8.h"
+#include "broker/values/ValueMap.h"
 
 #include <nlohmann/json.hpp>
 
@@ -67,17 +68,56 @@ std::string typeOf(const FeatureInfo& feature)
                                           : typeText(feature.type) + " " + feature.referenceClass;
 }
 
+std::string directionOf(const FeatureInfo& parameter)
+{
+    const bool in = parameter.flags & cimple::META_IN;
+    const bool out = parameter.flags & cimple::META_OUT;
+    return in && out ? "in out" : out ? "out" : "in";
+}
+
 std::string parameterList(const MethodInfo& method)
 {
     std::vector<std::string> texts;
     for (const FeatureInfo& parameter : method.parameters)
-    {
-        const bool in = parameter.flags & cimple::META_IN;
-        const bool out = parameter.flags & cimple::META_OUT;
-        const std::string direction = in && out ? "in out " : out ? "out " : "in ";
-        texts.push_back(direction + typeOf(parameter) + " " + parameter.name);
-    }
+        texts.push_back(directionOf(parameter) + " " + typeOf(parameter) + " " + parameter.name);
     return joined(texts);
+}
+
+constexpr const char* returned = "(returned)";
+
+void printNames(std::ostream& out, const std::string& of, ValueNames names)
+{
+    if (names.empty())
+        return;
+    std::size_t width = 0;
+    for (const cimple::Value_Name& row : names)
+        width = std::max(width, std::string_view(row.values).size());
+    out << '\n' << of << '\n';
+    for (const cimple::Value_Name& row : names)
+        out << "    " << padded(row.values, width) << "  " << row.name << '\n';
+}
+
+/// Qualifiers of a parameter that its direction does not say.
+std::string furtherQualifiers(const FeatureInfo& parameter)
+{
+    constexpr std::uint32_t direction = cimple::META_IN | cimple::META_OUT;
+    return joined(qualifierNames(parameter.flags & ~direction));
+}
+
+void printMethod(std::ostream& out, const ClassInfo& info, const MethodInfo& method)
+{
+    out << info.name << '.' << method.name;
+    if (method.origin != &info)
+        out << ", declared in " << method.origin->name;
+    out << "\n\n";
+    Table table({"PARAMETER", "DIRECTION", "TYPE", "QUALIFIERS"});
+    for (const FeatureInfo& parameter : method.parameters)
+        table.add({parameter.name, directionOf(parameter), typeOf(parameter), furtherQualifiers(parameter)});
+    table.add({returned, "", typeText(method.returnType), ""});
+    table.print(out);
+    for (const FeatureInfo& parameter : method.parameters)
+        printNames(out, parameter.name, valueNames(info, method.name, parameter.name));
+    printNames(out, returned, valueNames(info, method.name));
 }
 
 void printClassTable(std::ostream& out, const ClassInfo& info)
@@ -244,17 +284,43 @@ void printClasses(std::ostream& out, Format format, const std::vector<const Clas
     table.print(out);
 }
 
-void printMethodReply(std::ostream& out, Format format, const MethodReply& reply)
+void printMethods(std::ostream& out, Format format, const ClassInfo& info,
+                  const std::vector<const MethodInfo*>& methods)
 {
     if (format == Format::json)
     {
-        printJson(out, {{"returnValue", toJson(reply.returnValue)}, {"out", propertiesToJson(reply.out)}});
+        Json list = Json::array();
+        for (const MethodInfo* method : methods)
+            list.push_back(toJson(info, *method));
+        printJson(out, list);
+        return;
+    }
+    for (const MethodInfo* method : methods)
+    {
+        if (format == Format::mof)
+            out << mofText(*method);
+        else
+            printMethod(out << (method == methods.front() ? "" : "\n"), info, *method);
+    }
+}
+
+void printMethodReply(std::ostream& out, Format format, const ClassInfo& info, const MethodInfo& method,
+                      const MethodReply& reply)
+{
+    const ValueNames names = valueNames(info, method.name);
+    if (format == Format::json)
+    {
+        const std::string_view meaning = valueName(names, reply.returnValue);
+        printJson(out, {{"returnValue", toJson(reply.returnValue)},
+                        {"meaning", meaning.empty() ? Json(nullptr) : Json(meaning)},
+                        {"out", propertiesToJson(reply.out)}});
         return;
     }
     Table table({"PARAMETER", "VALUE"});
-    table.add({"(returned)", oneLine(valueText(reply.returnValue))});
+    table.add({returned, oneLine(namedValueText(names, reply.returnValue))});
     for (const Property& parameter : reply.out)
-        table.add({parameter.name, oneLine(valueText(parameter.value))});
+        table.add(
+            {parameter.name, oneLine(namedValueText(valueNames(info, method.name, parameter.name), parameter.value))});
     table.print(out);
 }
 

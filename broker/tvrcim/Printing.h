@@ -45,7 +45,11 @@ void printObjects(std::ostream& out, Format format, const std::vector<broker::Ob
 void printPaths(std::ostream& out, Format format, const std::vector<broker::Path>& paths);
 void printClass(std::ostream& out, Format format, const broker::ClassInfo& info);
 void printClasses(std::ostream& out, Format format, const std::vector<const broker::ClassInfo*>& classes);
-void printMethodReply(std::ostream& out, Format format, const broker::MethodReply& reply);
+/// What methods of a class take and return, with the names of their values.
+void printMethods(std::ostream& out, Format format, const broker::ClassInfo& info,
+                  const std::vector<const broker::MethodInfo*>& methods);
+void printMethodReply(std::ostream& out, Format format, const broker::ClassInfo& info, const broker::MethodInfo& method,
+                      const broker::MethodReply& reply);
 /// JSON with indentation; bytes that are no UTF-8 are replaced.
 void printJson(std::ostream& out, const broker::Json& json);
 

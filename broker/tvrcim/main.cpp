@@ -42,10 +42,20 @@ int runAndReport(Session& session, const Command& command, SignalEnd& signals)
         signals.passIfNone(); // a signal unloads the module under the command
         return report("", error, exitCimError);
     }
+    catch (const MethodRefusal& error)
+    {
+        return report("", error, exitRefusal);
+    }
     catch (const UsageError& error)
     {
         return report("", error, exitUsage);
     }
+}
+
+/// Where the tool shows that it is at work: people see it, and who reads the output does not.
+std::ostream* progressTerminal(const Settings& settings)
+{
+    return settings.format != Format::json && isatty(STDERR_FILENO) ? &std::cerr : nullptr;
 }
 
 /// Sets up the host, runs the command, then unloads the module and tells what it did wrong on the way.
@@ -64,7 +74,7 @@ int run(const Settings& settings)
     const UnloadedBySignal entrusted(signals, broker);
     if (!settings.platform.empty())
         broker::loadPlatformFile(broker.store(), broker.classes(), settings.platform);
-    Session session{broker, settings.nameSpace, settings.format, std::cout, wantsColour()};
+    Session session{broker, settings.nameSpace, settings.format, std::cout, wantsColour(), progressTerminal(settings)};
     int exitCode = runAndReport(session, settings.command, signals);
     std::cout.flush();
     broker.unload();

@@ -2,6 +2,7 @@
 
 #include "broker/values/PathText.h"
 #include "broker/values/QualifierText.h"
+#include "broker/values/ValueMap.h"
 
 #include <nlohmann/json.hpp>
 
@@ -28,16 +29,11 @@ Json featureToJson(const FeatureInfo& feature)
     return json;
 }
 
-Json methodToJson(const MethodInfo& method)
+/// The names of values, by the values; nothing where there are none.
+void addNames(Json& json, ValueNames names)
 {
-    Json parameters = Json::array();
-    for (const FeatureInfo& parameter : method.parameters)
-        parameters.push_back(featureToJson(parameter));
-    return {{"name", method.name},
-            {"returns", typeText(method.returnType)},
-            {"parameters", std::move(parameters)},
-            {"qualifiers", qualifierNames(method.flags)},
-            {"origin", method.origin ? method.origin->name : ""}};
+    for (const cimple::Value_Name& row : names)
+        json["values"][row.values] = row.name;
 }
 
 [[noreturn]] void refuse(const Json& json, CMPIType type)
@@ -118,6 +114,20 @@ Json toJson(const Object& object)
             {"properties", propertiesToJson(object.properties)}};
 }
 
+Json toJson(const ClassInfo& info, const MethodInfo& method)
+{
+    Json parameters = Json::array();
+    for (const FeatureInfo& parameter : method.parameters)
+        addNames(parameters.emplace_back(featureToJson(parameter)), valueNames(info, method.name, parameter.name));
+    Json json{{"name", method.name},
+              {"returns", typeText(method.returnType)},
+              {"parameters", std::move(parameters)},
+              {"qualifiers", qualifierNames(method.flags)},
+              {"origin", method.origin ? method.origin->name : ""}};
+    addNames(json, valueNames(info, method.name));
+    return json;
+}
+
 Json toJson(const ClassInfo& info)
 {
     Json properties = Json::array();
@@ -125,7 +135,7 @@ Json toJson(const ClassInfo& info)
         properties.push_back(featureToJson(property));
     Json methods = Json::array();
     for (const MethodInfo& method : info.methods)
-        methods.push_back(methodToJson(method));
+        methods.push_back(toJson(info, method));
     return {{"name", info.name},
             {"superclass", info.superclass ? Json(info.superclass->name) : Json(nullptr)},
             {"qualifiers", qualifierNames(info.flags)},

@@ -23,6 +23,8 @@ Json toJson(const Value& value);
 /// {"class", "namespace", "path", "properties": {...}}
 Json toJson(const Object& object);
 Json toJson(const ClassInfo& info);
+/// A method of the class.
+Json toJson(const ClassInfo& info, const MethodInfo& method);
 /// The properties alone, by name.
 Json propertiesToJson(const std::vector<Property>& properties);
 

@@ -39,21 +39,6 @@ std::string propertyText(const FeatureInfo& property)
     return qualifierList(property.flags, "    ") + "    " + declaration(property) + initial + ";\n";
 }
 
-std::string methodText(const MethodInfo& method)
-{
-    std::string text =
-        qualifierList(method.flags, "    ") + "    " + typeText(method.returnType) + " " + method.name + "(";
-    for (const FeatureInfo& parameter : method.parameters)
-    {
-        std::string qualifiers = qualifierList(parameter.flags, "");
-        if (!qualifiers.empty())
-            qualifiers.back() = ' ';
-        text += (&parameter == &method.parameters.front() ? "\n        " : ",\n        ") + qualifiers +
-                declaration(parameter);
-    }
-    return text + ");\n";
-}
-
 } // namespace
 
 std::uint32_t qualifierMask(std::string_view name)
@@ -73,6 +58,21 @@ std::vector<std::string> qualifierNames(std::uint32_t flags)
     return names;
 }
 
+std::string mofText(const MethodInfo& method)
+{
+    std::string text =
+        qualifierList(method.flags, "    ") + "    " + typeText(method.returnType) + " " + method.name + "(";
+    for (const FeatureInfo& parameter : method.parameters)
+    {
+        std::string qualifiers = qualifierList(parameter.flags, "");
+        if (!qualifiers.empty())
+            qualifiers.back() = ' ';
+        text += (&parameter == &method.parameters.front() ? "\n        " : ",\n        ") + qualifiers +
+                declaration(parameter);
+    }
+    return text + ");\n";
+}
+
 std::string mofText(const ClassInfo& info)
 {
     std::string text = qualifierList(info.flags, "") + "class " + info.name;
@@ -80,7 +80,7 @@ std::string mofText(const ClassInfo& info)
     for (const FeatureInfo& property : info.properties)
         text += property.origin == &info ? propertyText(property) : "";
     for (const MethodInfo& method : info.methods)
-        text += method.origin == &info ? methodText(method) : "";
+        text += method.origin == &info ? mofText(method) : "";
     return text + "};\n";
 }
 

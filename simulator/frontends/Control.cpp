@@ -131,6 +131,16 @@ std::size_t tvrsim_open_handles()
     return simulation().host.openHandles();
 }
 
+void tvrsim_remember_host()
+{
+    tvrsim_simulation()->host.remember();
+}
+
+void tvrsim_host_difference(char* text, std::size_t size)
+{
+    std::snprintf(text, size, "%s", tvrsim_simulation()->host.difference().c_str());
+}
+
 int tvrsim_remove_adapter(const char* adapter)
 {
     return tvrsim_simulation()->host.removeAdapter(adapter);

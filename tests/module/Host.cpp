@@ -188,6 +188,18 @@ bool Host::awaitRefresh(std::size_t refreshes) const
     return awaitLog(ended, refreshes);
 }
 
+void Host::rememberState()
+{
+    TVR_CONTROL(tvrsim_remember_host)();
+}
+
+std::string Host::stateDifference() const
+{
+    char text[256] = "";
+    TVR_CONTROL(tvrsim_host_difference)(text, sizeof(text));
+    return text;
+}
+
 void Host::addFault(const std::string& row)
 {
     char error[1024] = "";

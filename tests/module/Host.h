@@ -59,6 +59,9 @@ public:
     /// Waits until the module has done so many refreshes.
     bool awaitRefresh(std::size_t refreshes = 1) const;
 
+    /// Remembers the state of the simulated host, and names what differs from it; empty if nothing does.
+    void rememberState();
+    std::string stateDifference() const;
     void addFault(const std::string& row);
     std::uint64_t calls(const std::string& function) const;
     void setPortState(const char* wwpn, std::uint32_t state);

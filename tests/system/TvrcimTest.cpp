@@ -129,13 +129,15 @@ TEST(Tvrcim, TheTreeHasAllInstancesOnce)
 }
 
 /// What the tool writes to a terminal.
-std::string onTerminal()
+std::string onTerminal(std::vector<const char*> words = {"host"})
 {
+    words.insert(words.begin(), TVR_TVRCIM);
+    words.push_back(nullptr);
     int terminal = -1;
     const pid_t process = forkpty(&terminal, nullptr, nullptr, nullptr);
     if (process == 0)
     {
-        execl(TVR_TVRCIM, TVR_TVRCIM, "host", nullptr);
+        execv(words[0], const_cast<char* const*>(words.data()));
         _exit(127);
     }
     std::string out;
@@ -156,6 +158,21 @@ TEST(Tvrcim, ColoursAreForTerminalsThatWantThem)
     setenv("NO_COLOR", "1", 1);
     EXPECT_THAT(onTerminal(), testing::AllOf(HasSubstr("LINK DOWN"), testing::Not(HasSubstr("\x1b"))));
     unsetenv("NO_COLOR");
+}
+
+/// Long work shows on a terminal that it goes on, and leaves nothing of that behind.
+TEST(Tvrcim, ShowsThatItIsAtWork)
+{
+    const std::string scenario = testing::TempDir() + "slow-" + std::to_string(getpid()) + ".json";
+    std::ofstream(scenario) << R"({"faults": [{"function": "HBA_GetNumberOfAdapters", "delayMs": 1300, "to": 1}]})";
+    std::vector<const char*> words{"--scenario", scenario.c_str(), "delete", "TVRHBA_Card.Tag=none"};
+    EXPECT_THAT(onTerminal(words), testing::StartsWith("\rTVRHBA_Card ... 1 s\r                   \r"
+                                                       "tvrcim: CIM_ERR_NOT_FOUND: PATH: "));
+    const Answer piped = tvrcim("--scenario " + scenario + " delete TVRHBA_Card.Tag=none");
+    EXPECT_THAT(piped.err, testing::StartsWith("tvrcim: CIM_ERR_NOT_FOUND: PATH: "));
+    words.insert(words.end(), {"--format", "json"});
+    EXPECT_THAT(onTerminal(words), testing::StartsWith("tvrcim: CIM_ERR_NOT_FOUND: PATH: "));
+    std::remove(scenario.c_str());
 }
 
 TEST(Tvrcim, DrawsTheTopology)

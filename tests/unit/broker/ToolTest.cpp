@@ -1,8 +1,10 @@
 // The tool's commands, command line and reports.
 #include "tests/unit/broker/FakeModule.h"
 
+#include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/CommandLine.h"
 #include "broker/tvrcim/Printing.h"
+#include "broker/values/ValueMap.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -10,6 +12,7 @@
 
 #include <fstream>
 #include <sstream>
+#include <unistd.h>
 
 namespace
 {
@@ -148,11 +151,18 @@ TEST(Commands, WrongArgumentsAreNamed)
         }
         return "";
     };
-    EXPECT_THAT(refusal({"get", "IBMSD_ComputerSystem.Name=x"}), HasSubstr("'CreationClassName'"));
+    EXPECT_THAT(refusal({"get", "IBMSD_ComputerSystem.Name=x"}), HasSubstr("CIM CIM_ERR_NOT_FOUND: PATH: there is no"));
     EXPECT_THAT(refusal({"get", "IBMSD_ComputerSystem.Nam=x"}), HasSubstr("'Nam'"));
-    EXPECT_THAT(refusal({"set", tool.path, "", {"Colour=red"}}), HasSubstr("'Colour=red'"));
+    EXPECT_THAT(refusal({"set", tool.path, "", {"Colour=red"}}), HasSubstr("'Colour'"));
+    EXPECT_THAT(refusal({"set", tool.path, "", {"ElementName=a", "elementname=b"}}),
+                HasSubstr("ElementName: it is given twice"));
     EXPECT_THAT(refusal({"set", tool.path, "", {"ElementName"}}), HasSubstr("'ElementName'"));
-    EXPECT_THAT(refusal({"call", "root/tavrin:TST_Base.Id=a", "Add", {"A=-1"}}), HasSubstr("'A=-1'"));
+    EXPECT_THAT(refusal({"call", "root/tavrin:TST_Base.Id=a", "Add", {"A=-1"}}), HasSubstr("A: '-1'"));
+    EXPECT_THAT(refusal({"call", "root/tavrin:TST_Base.Id=a", "Add", {"Sum=1"}}), HasSubstr("'Sum'"));
+    EXPECT_THAT(refusal({"set", "root/tavrin:TST_Base.Id=a", "", {"Next=TST_Link.Left=a"}}),
+                HasSubstr("Next: TST_Link is no TST_Port"));
+    EXPECT_THAT(refusal({"set", "root/tavrin:TST_Base.Id=a", "", {"Next=TST_None.Left=a"}}),
+                HasSubstr("Next: there is no class 'TST_None'"));
     EXPECT_THAT(refusal({"call", "root/tavrin:TST_Base.Id=a", "Sub"}), HasSubstr("CIM CIM_ERR_METHOD_NOT_FOUND"));
     EXPECT_THAT(refusal({"enum", "Nope"}), HasSubstr("CIM CIM_ERR_INVALID_CLASS"));
     EXPECT_THAT(refusal({"class", "Nope"}), HasSubstr("'Nope'"));
@@ -182,8 +192,85 @@ TEST(Commands, ClassesAndMethodsAreShown)
             });
     const Command call{"call", "root/tavrin:TST_Base.Id=a", "Add", {"A=0x10"}};
     EXPECT_EQ(tool.run(call), "PARAMETER   VALUE\n(returned)  null\nSum         32\n");
-    EXPECT_EQ(Json::parse(tool.run(call, Format::json)), Json::parse(R"({"returnValue":null,"out":{"Sum":32}})"));
+    EXPECT_EQ(Json::parse(tool.run(call, Format::json)),
+              Json::parse(R"({"returnValue":null,"meaning":null,"out":{"Sum":32}})"));
     EXPECT_EQ(tool.violations(), "");
+}
+
+/// Scripts see that a method refused, and still get what it answered.
+TEST(Commands, AMethodThatReturnsAnotherNumberThanZeroIsARefusal)
+{
+    Tool tool;
+    tool.on("invokeMethod",
+            [](const broker_test::Call& call)
+            {
+                CMPIValue value{};
+                value.uint32 = CMGetArg(call.in, "A", nullptr).value.uint32;
+                CMReturnData(call.result, &value, CMPI_uint32);
+                return CMReturnDone(call.result);
+            });
+    std::ostringstream out;
+    Session session{*tool.broker, "root/tavrin", Format::json, out};
+    runCommand(session, {"call", "TST_Base.Id=a", "Add", {"A=0"}});
+    out.str("");
+    EXPECT_THROW(runCommand(session, {"call", "TST_Base.Id=a", "Add", {"A=7"}}), MethodRefusal);
+    EXPECT_EQ(Json::parse(out.str()), Json::parse(R"({"returnValue":7,"meaning":null,"out":{}})"));
+}
+
+TEST(Commands, KeysThatTheOthersSettleMayBeLeftOut)
+{
+    Tool tool;
+    const std::string other = "IBMSD_ComputerSystem.CreationClassName=\"C\",Name=\"other\"";
+    EXPECT_THAT(tool.run({"get", "IBMSD_ComputerSystem"}), testing::StartsWith(tool.path));
+    tool.run({"create", "IBMSD_ComputerSystem", "", {"CreationClassName=C", "Name=other"}});
+    EXPECT_EQ(tool.run({"set", "IBMSD_ComputerSystem.name=other", "", {"ElementName="}}), "changed " + other + "\n");
+    EXPECT_THAT(tool.run({"get", other}), HasSubstr("    ElementName        \n"));
+    EXPECT_EQ(tool.run({"set", other, "", {"ElementName=null"}}), "changed " + other + "\n");
+    EXPECT_THAT(tool.run({"get", other}), testing::Not(HasSubstr("ElementName")));
+    for (const char* several : {"IBMSD_ComputerSystem", "IBMSD_ComputerSystem.CreationClassName=C"})
+        EXPECT_THROW(tool.run({"get", several}), UsageError) << several;
+    EXPECT_EQ(tool.run({"delete", "IBMSD_ComputerSystem.Name=other"}), "deleted " + other + "\n");
+    EXPECT_THROW(tool.run({"delete", "IBMSD_ComputerSystem.Name=other"}), CimError);
+}
+
+/// What goes out for an array of bytes is what the file holds; for another type @ is a character like others.
+TEST(Commands, BytesComeFromAFile)
+{
+    const std::string file = testing::TempDir() + "bytes-" + std::to_string(getpid());
+    std::ofstream(file, std::ios::binary) << std::string("\0\xff\n", 3);
+    std::vector<FeatureInfo> features(2);
+    features[0].name = "Image";
+    features[0].type = CMPI_uint8A;
+    features[1].name = "URI";
+    features[1].type = CMPI_string;
+    const std::string owner = "Install";
+    Tool tool;
+    std::ostringstream out;
+    const Session session{*tool.broker, "root/tavrin", Format::table, out};
+    const auto values = parseAssignments(session, {"root/tavrin", features, owner}, {"image=@" + file, "URI=@" + file});
+    EXPECT_EQ(values[0].value, Value::array(CMPI_uint8, {Value::uint8(0), Value::uint8(0xff), Value::uint8('\n')}));
+    EXPECT_EQ(values[1].value, Value::string("@" + file));
+    for (const std::string& unreadable : {file + "-none", testing::TempDir()})
+        EXPECT_THROW(parseAssignments(session, {"root/tavrin", features, owner}, {"Image=@" + unreadable}), UsageError);
+    std::remove(file.c_str());
+}
+
+TEST(ValueMaps, NameValuesRangesAndAllOthers)
+{
+    const cimple::Value_Name rows[] = {
+        {"..", "Reserved"}, {"0", "Done"}, {"5..0x0F", "Range"}, {"0x10", "Busy"}, {"0x8000..", "Vendor"}};
+    const struct
+    {
+        std::uint32_t value;
+        const char* name;
+    } expected[] = {{0, "Done"},      {1, "Reserved"},      {5, "Range"},       {15, "Range"},  {16, "Busy"},
+                    {17, "Reserved"}, {0x7fff, "Reserved"}, {0x8000, "Vendor"}, {~0U, "Vendor"}};
+    for (const auto& row : expected)
+        EXPECT_EQ(valueName(rows, Value::uint32(row.value)), row.name) << row.value;
+    EXPECT_EQ(valueName(std::span(rows).subspan(1), Value::uint32(1)), "");
+    EXPECT_EQ(valueName(rows, Value::null(CMPI_uint32)), "");
+    EXPECT_EQ(namedValueText(rows, Value::array(CMPI_uint16, {Value::uint16(0), Value::null(CMPI_uint16)})),
+              "[0 (Done), null]");
 }
 
 TEST(Printing, ControlCharactersStayOnTheirLine)

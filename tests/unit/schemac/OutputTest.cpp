@@ -131,6 +131,25 @@ TEST(Tables, EveryClassStandsInOneChunk)
     }
 }
 
+TEST(ValueMaps, AreThoseOfMethodsAndParameters)
+{
+    const OutputFiles files = write_value_maps(
+        checked("Qualifier Values : string[], Scope(property, method, parameter);\n"
+                "class T_Pump : T_Disk {\n"
+                "   [ValueMap { \"0\", \"..\" }, Values { \"Done\", \"Not \\\"done\\\"\" }]\n"
+                "   uint32 Run([In, ValueMap { \"1..\" }, Values { \"Any\" }] uint16 Level, [In] uint16 Time);\n"
+                "   [ValueMap { \"2\" }, Values { \"of a property\" }] uint16 Speed;\n"
+                "};\n"));
+    const std::string& text = text_of_file(files, "schema/ValueMaps.cpp");
+    EXPECT_THAT(text, HasSubstr("constexpr Value_Name T_Pump_Run_method_names[] = {\n    {\"0\", \"Done\"},\n"
+                                "    {\"..\", \"Not \\\"done\\\"\"},\n};\n"));
+    EXPECT_THAT(text, HasSubstr("const Value_Map value_maps[] = {\n"
+                                "    {\"T_Pump\", \"Run\", \"\", T_Pump_Run_method_names, "
+                                "std::size(T_Pump_Run_method_names)},\n"
+                                "    {\"T_Pump\", \"Run\", \"Level\", T_Pump_Run_method_Level_names, "
+                                "std::size(T_Pump_Run_method_Level_names)},\n};\n"));
+}
+
 TEST(ServerFiles, ClassesStandAfterWhatTheyName)
 {
     const OutputFiles files = write_server_files(checked(served_classes), "1.2");

@@ -1,0 +1,83 @@
+#include "broker/values/ValueMap.h"
+
+#include "broker/values/ValueText.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cstdint>
+#include <limits>
+
+namespace broker
+{
+
+namespace
+{
+
+constexpr std::string_view rangeMark = "..";
+
+/// Decimal or 0x1F; `otherwise` for a text that is no number, as the open end of a range is none.
+std::uint64_t numberIn(std::string_view text, std::uint64_t otherwise)
+{
+    const bool hexadecimal = text.starts_with("0x") || text.starts_with("0X");
+    if (hexadecimal)
+        text.remove_prefix(2);
+    std::uint64_t number = otherwise;
+    std::from_chars(text.data(), text.data() + text.size(), number, hexadecimal ? 16 : 10);
+    return number;
+}
+
+bool covers(std::string_view values, std::uint64_t number)
+{
+    constexpr std::uint64_t highest = std::numeric_limits<std::uint64_t>::max();
+    const std::size_t mark = values.find(rangeMark);
+    if (mark == std::string_view::npos)
+        return !values.empty() && numberIn(values, ~number) == number;
+    return numberIn(values.substr(0, mark), 0) <= number &&
+           number <= numberIn(values.substr(mark + rangeMark.size()), highest);
+}
+
+} // namespace
+
+ValueNames valueNames(const ClassInfo& info, std::string_view method, std::string_view parameter)
+{
+    const std::span maps(cimple::value_maps, cimple::num_value_maps);
+    for (const ClassInfo* owner = &info; owner; owner = owner->superclass)
+        for (const cimple::Value_Map& map : maps)
+            if (map.class_name == owner->name && sameName(map.method, method) && sameName(map.parameter, parameter))
+                return {map.names, map.num_names};
+    return {};
+}
+
+std::string_view valueName(ValueNames names, const Value& value)
+{
+    if (value.isNull() || !isInteger(value.type()))
+        return {};
+    const std::uint64_t number = value.asUnsigned();
+    const auto covering = [&](bool all)
+    {
+        return std::find_if(names.begin(), names.end(),
+                            [&](const cimple::Value_Name& row)
+                            { return (row.values == rangeMark) == all && covers(row.values, number); });
+    };
+    auto row = covering(false);
+    if (row == names.end())
+        row = covering(true);
+    return row == names.end() ? std::string_view() : row->name;
+}
+
+std::string namedValueText(ValueNames names, const Value& value)
+{
+    if (names.empty() || value.isNull())
+        return valueText(value);
+    if (value.isArray())
+    {
+        std::string text;
+        for (const Value& element : value.asList())
+            text += (text.empty() ? "" : ", ") + namedValueText(names, element);
+        return "[" + text + "]";
+    }
+    const std::string_view name = valueName(names, value);
+    return valueText(value) + (name.empty() ? "" : " (" + std::string(name) + ")");
+}
+
+} // namespace broker
