@@ -13,10 +13,12 @@
 #include <type_traits>
 #include <vector>
 
-/// Records of the libraries are equal by their bytes.
+/// What the libraries' interfaces declare, as far as a scenario holds it.
 template <class Record>
-    requires(std::is_class_v<Record> && std::is_trivial_v<Record>)
-bool operator==(const Record& a, const Record& b)
+concept LibraryRecord = std::is_class_v<Record> && std::is_trivial_v<Record>;
+
+/// Equal by their bytes.
+template <LibraryRecord Record> bool operator==(const Record& a, const Record& b)
 {
     return std::memcmp(&a, &b, sizeof(Record)) == 0;
 }
