@@ -120,6 +120,8 @@ struct PortNames
 /// if there are any and the non-volatile ones otherwise.
 struct NameManagement
 {
+    bool operator==(const NameManagement&) const = default;
+
     bool available = true;
     std::uint32_t capability = RM_WWN_CAN_CHANGE_NON_VOLATILE | RM_WWN_CAN_CHANGE_VOLATILE | RM_WWN_NEEDS_RESET;
     std::optional<std::uint32_t> activation; ///< answered in place of the RM_WwnActivation that follows

@@ -120,6 +120,20 @@ std::string valueOf(const AttributeList& list, std::uint32_t id)
     return value.data() ? std::string(reinterpret_cast<const char*>(value.data()), value.size()) : "absent";
 }
 
+TEST_F(Host, DifferencesFromTheRememberedStateAreNamed)
+{
+    host.remember();
+    EXPECT_EQ(host.difference(), "");
+    EXPECT_TRUE(host.setPortState(portB, HBA_PORTSTATE_LINKDOWN));
+    EXPECT_EQ(host.difference(), "port 1000027A000000B0");
+    EXPECT_TRUE(host.setPortState(portB, HBA_PORTSTATE_ONLINE));
+    EXPECT_EQ(host.difference(), "");
+    EXPECT_TRUE(host.makeStale("Tavrin-A"));
+    EXPECT_EQ(host.difference(), "adapter Tavrin-A");
+    EXPECT_TRUE(host.removeAdapter("Tavrin-A"));
+    EXPECT_EQ(host.difference(), "number of adapters");
+}
+
 TEST_F(Host, AttributesFollowTheMembersUnlessListed)
 {
     AttributeList list;
