@@ -51,7 +51,7 @@ extern "C"
 
     /// Remembers the state of the host as it is.
     TVRSIM_EXPORT void tvrsim_remember_host();
-    /// What differs from the state that was remembered, such as "port 1000027A51160210"; empty if nothing does. Cut to
+    /// What differs from the state that was remembered, such as "port 10:00:02:7A:51:16:02:10"; empty if nothing does. Cut to
     /// `size` bytes.
     TVRSIM_EXPORT void tvrsim_host_difference(char* text, std::size_t size);
 

@@ -97,11 +97,12 @@ void printNames(std::ostream& out, const std::string& of, ValueNames names)
         out << "    " << padded(row.values, width) << "  " << row.name << '\n';
 }
 
-/// Qualifiers of a parameter that its direction does not say.
-std::string furtherQualifiers(const FeatureInfo& parameter)
+/// The type with the qualifiers that are not the direction.
+std::string qualifiedType(const FeatureInfo& parameter)
 {
     constexpr std::uint32_t direction = cimple::META_IN | cimple::META_OUT;
-    return joined(qualifierNames(parameter.flags & ~direction));
+    const std::string qualifiers = joined(qualifierNames(parameter.flags & ~direction));
+    return typeOf(parameter) + (qualifiers.empty() ? "" : " (" + qualifiers + ")");
 }
 
 void printMethod(std::ostream& out, const ClassInfo& info, const MethodInfo& method)
@@ -110,10 +111,10 @@ void printMethod(std::ostream& out, const ClassInfo& info, const MethodInfo& met
     if (method.origin != &info)
         out << ", declared in " << method.origin->name;
     out << "\n\n";
-    Table table({"PARAMETER", "DIRECTION", "TYPE", "QUALIFIERS"});
+    Table table({"PARAMETER", "DIRECTION", "TYPE"});
     for (const FeatureInfo& parameter : method.parameters)
-        table.add({parameter.name, directionOf(parameter), typeOf(parameter), furtherQualifiers(parameter)});
-    table.add({returned, "", typeText(method.returnType), ""});
+        table.add({parameter.name, directionOf(parameter), qualifiedType(parameter)});
+    table.add({returned, "", typeText(method.returnType)});
     table.print(out);
     for (const FeatureInfo& parameter : method.parameters)
         printNames(out, parameter.name, valueNames(info, method.name, parameter.name));

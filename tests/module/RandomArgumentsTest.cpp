@@ -316,7 +316,7 @@ TEST_F(RandomArguments, OfMethods)
             }
         }
     }
-    RecordProperty("answered", static_cast<int>(answered));
+    EXPECT_GT(answered, 0u);
     expectNoPasswords();
     host.unload();
 }

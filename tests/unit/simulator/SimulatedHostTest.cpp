@@ -125,7 +125,7 @@ TEST_F(Host, DifferencesFromTheRememberedStateAreNamed)
     host.remember();
     EXPECT_EQ(host.difference(), "");
     EXPECT_TRUE(host.setPortState(portB, HBA_PORTSTATE_LINKDOWN));
-    EXPECT_EQ(host.difference(), "port 1000027A000000B0");
+    EXPECT_EQ(host.difference(), "port 10:00:02:7A:00:00:00:B0");
     EXPECT_TRUE(host.setPortState(portB, HBA_PORTSTATE_ONLINE));
     EXPECT_EQ(host.difference(), "");
     EXPECT_TRUE(host.makeStale("Tavrin-A"));
