@@ -173,6 +173,8 @@ struct Port
 /// A parameter of the driver, and what it will be once the driver has been loaded anew.
 struct DriverParameter
 {
+    bool operator==(const DriverParameter&) const = default;
+
     RM_DriverParam running{}, stored{};
 };
 

@@ -78,14 +78,17 @@ public:
         return path;
     }
 
-    /// Values of a class's properties under the path's keys.
+    /// Values of a class's properties, with those of the path's keys among them.
     Object object(const ClassInfo& info)
     {
         Object object{path(info.name), {}};
         object.path.className = info.name;
-        for (Property& argument : of(info.properties))
+        for (const Property& argument : of(info.properties))
             if (oneIn(2) && !endsServer(*info.property(argument.name), argument.value))
                 object.set(argument.name, argument.value);
+        for (const Property& key : object.path.keys)
+            if (info.property(key.name) && !oneIn(8) && !endsServer(*info.property(key.name), key.value))
+                object.set(key.name, key.value);
         return object;
     }
 
@@ -196,6 +199,26 @@ private:
         return Value::string(anyOf(texts));
     }
 
+    /// A key of an instance, whole or with an error.
+    std::string knownText()
+    {
+        const Path path = known({});
+        std::string text = path.keys.empty() ? "" : broker::valueText(anyOf(path.keys).value);
+        return oneIn(2) ? text : spoiled(std::move(text));
+    }
+
+    std::string spoiled(std::string text)
+    {
+        static const std::string characters = "0129aF:=/.\\\xff";
+        if (!text.empty() && oneIn(2))
+            text[below(text.size())] = anyOf(characters);
+        else if (oneIn(2))
+            text.erase(below(text.size() + 1));
+        else
+            text += anyOf(characters);
+        return text;
+    }
+
     /// One of an instance of these classes, or of any.
     Path known(const std::vector<const ClassInfo*>& classes)
     {
@@ -210,17 +233,21 @@ private:
 
     void spoil(Path& path)
     {
-        FeatureInfo key;
-        key.name = path.keys.empty() ? "Key" : anyOf(path.keys).name;
-        switch (below(5))
+        if (path.keys.empty())
+            return path.setKey("Key", number(CMPI_uint16));
+        Property& key = path.keys[below(path.keys.size())];
+        switch (below(6))
         {
         case 0:
             return path.keys.clear();
         case 1:
-            return path.setKey(key.name, text(key));
         case 2:
-            return path.setKey(key.name, number(CMPI_uint16));
+            key.value = Value::string(spoiled(broker::valueText(key.value)));
+            return;
         case 3:
+            key.value = number(CMPI_uint16);
+            return;
+        case 4:
             path.className = oneIn(2) ? "CIM_ManagedElement" : "TVRHBA_NoSuchClass";
             return;
         default:
