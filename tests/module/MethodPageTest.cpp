@@ -27,7 +27,7 @@ bool shows(const std::vector<std::string>& commands, const std::string& verb, co
            const std::string& method = "")
 {
     const testing::Matcher<std::string> example = testing::MatchesRegex(
-        "\\$ tvrcim " + verb + " '?" + className + "[. ].*" + (method.empty() ? "" : method + " ") + ".*");
+        "\\$ tvrcim (.* )?" + verb + " '?" + className + "[. ].*" + (method.empty() ? "" : method + " ") + ".*");
     return std::any_of(commands.begin(), commands.end(),
                        [&](const std::string& command) { return testing::Matches(example)(command); });
 }

@@ -30,7 +30,7 @@ namespace
 constexpr const char* password = "c0rrect-h0rse";
 /// For what has no body, and for what answers more than that this is not supported.
 constexpr unsigned briefRounds = 1;
-constexpr unsigned rounds = TVR_SANITIZED ? 20 : 60;
+constexpr unsigned rounds = TVR_SANITIZED ? 10 : 40;
 
 std::uint64_t seed()
 {
@@ -277,10 +277,10 @@ struct Operation
     }
 };
 
-class RandomArguments : public testing::Test
+class RandomArguments : public testing::TestWithParam<const char*>
 {
 protected:
-    RandomArguments() : seed(::seed()), trace(__FILE__, __LINE__, "TVR_SEED=" + std::to_string(seed))
+    RandomArguments() : host(GetParam()), seed(::seed()), trace(__FILE__, __LINE__, "TVR_SEED=" + std::to_string(seed))
     {
         addPlatform(host.broker());
         host.write("/file", "TAVRIN FIRMWARE\n");
@@ -317,7 +317,7 @@ protected:
     std::optional<Arguments> arguments;
 };
 
-TEST_F(RandomArguments, OfMethods)
+TEST_P(RandomArguments, OfMethods)
 {
     unsigned answered = 0;
     for (const std::string& className : host.broker().servedClasses())
@@ -348,7 +348,7 @@ TEST_F(RandomArguments, OfMethods)
     host.unload();
 }
 
-TEST_F(RandomArguments, OfInstances)
+TEST_P(RandomArguments, OfInstances)
 {
     for (const std::string& className : host.broker().servedClasses())
     {
@@ -372,5 +372,8 @@ TEST_F(RandomArguments, OfInstances)
     expectNoPasswords();
     host.unload();
 }
+
+INSTANTIATE_TEST_SUITE_P(Hosts, RandomArguments, testing::Values("default", "lanes"),
+                         [](const auto& info) { return std::string(info.param); });
 
 } // namespace
