@@ -112,9 +112,8 @@ private:
                               : number(CMPI_uint64);
         if (!isArray)
             return value(feature, scalar);
-        if (oneIn(30)) // far more than anyone needs
-            return Value::array(
-                scalar, Value::List(20'000, scalar == CMPI_string ? Value::string("x") : value(feature, scalar)));
+        if (oneIn(30)) // far more than anyone needs, of short ones
+            return Value::array(scalar, Value::List(20'000, shortValue(scalar)));
         Value::List elements;
         for (std::size_t size = below(4); elements.size() < size;)
             elements.push_back(oneIn(10) ? Value::null(scalar) : value(feature, scalar));
@@ -141,6 +140,21 @@ private:
             return Value::instance({path(feature.referenceClass), {{"InstanceID", text(feature)}}});
         default:
             return number(type);
+        }
+    }
+
+    Value shortValue(CMPIType type)
+    {
+        switch (type)
+        {
+        case CMPI_string:
+            return Value::string("x");
+        case CMPI_ref:
+            return Value::reference(known({}));
+        case CMPI_instance:
+            return Value::instance({known({}), {}});
+        default:
+            return value({}, type);
         }
     }
 
