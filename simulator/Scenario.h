@@ -135,6 +135,8 @@ struct NameManagement
 /// What a port is in, and the attribute that shows it.
 struct LinkState
 {
+    bool operator==(const LinkState&) const = default;
+
     std::uint32_t state = 0;
     std::optional<Attribute> link;
 };

@@ -3,6 +3,7 @@
 // into the log. The environment variable TVR_SEED repeats a run.
 #include "broker/values/PathText.h"
 #include "broker/values/ValueText.h"
+#include "simulator/FirmwareFile.h"
 #include "tests/module/Host.h"
 #include "tests/module/Walk.h"
 #include "tests/support/Sanitized.h"
@@ -28,6 +29,7 @@ namespace
 {
 
 constexpr const char* password = "c0rrect-h0rse";
+const std::string firmware = tvrsim::firmwareText("TV1602", "11.8.1.0", "program");
 /// For what has no body, and for what answers more than that this is not supported.
 constexpr unsigned briefRounds = 1;
 constexpr unsigned rounds = TVR_SANITIZED ? 10 : 40;
@@ -112,6 +114,8 @@ private:
                               : number(CMPI_uint64);
         if (!isArray)
             return value(feature, scalar);
+        if ((feature.flags & cimple::META_OCTET_STRING) && oneIn(2))
+            return bytes(firmware);
         if (oneIn(30)) // far more than anyone needs, of short ones
             return Value::array(scalar, Value::List(20'000, shortValue(scalar)));
         Value::List elements;
@@ -141,6 +145,14 @@ private:
         default:
             return number(type);
         }
+    }
+
+    static Value bytes(const std::string& text)
+    {
+        Value::List list;
+        for (const char byte : text)
+            list.push_back(Value::uint8(static_cast<std::uint8_t>(byte)));
+        return Value::array(CMPI_uint8, std::move(list));
     }
 
     Value shortValue(CMPIType type)
@@ -297,7 +309,6 @@ protected:
     RandomArguments() : host(GetParam()), seed(::seed()), trace(__FILE__, __LINE__, "TVR_SEED=" + std::to_string(seed))
     {
         addPlatform(host.broker());
-        host.write("/file", "TAVRIN FIRMWARE\n");
         host.write("/work/file", "in the way\n");
         std::filesystem::current_path(host.root() / "work");
         arguments.emplace(seed, host);
@@ -346,6 +357,8 @@ TEST_P(RandomArguments, OfMethods)
                 if (!arguments->oneIn(8))
                     path.className = className;
                 const std::vector<Property> in = arguments->of(method.parameters);
+                if (!std::filesystem::exists(host.root() / "file")) // those who install it take it away
+                    host.write("/file", firmware);
                 const Operation operation{method.name, path, in};
                 const broker::MethodReply reply = host.broker().invokeMethod(path, method.name, in);
                 const bool hasValue = !reply.returnValue.isNull();
