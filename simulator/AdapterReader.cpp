@@ -234,6 +234,25 @@ RM_DriverParam readDriverParameter(JsonNode& node)
     return parameter;
 }
 
+CPQFC_QosEntry readTag(JsonNode& node)
+{
+    CPQFC_QosEntry entry{};
+    entry.src_wwpn = toHba(node.at("source").asWwn());
+    entry.tgt_wwpn = toHba(node.at("target").asWwn());
+    node.read("tag", entry.tag);
+    node.finish();
+    return entry;
+}
+
+void readTagging(JsonNode node, Adapter& adapter)
+{
+    bool isOn = false;
+    node.read("on", isOn);
+    adapter.tagging = isOn;
+    node.forEach("table", [&](JsonNode& item) { adapter.tags.push_back(readTag(item)); });
+    node.finish();
+}
+
 } // namespace
 
 std::vector<DriverParameter> readDriverParameters(JsonNode& owner)
@@ -272,6 +291,8 @@ Adapter readAdapter(JsonNode& node, const std::vector<Target>& targets)
     if (node.has("features"))
         adapter.features = readFeatures(node.at("features"));
     adapter.driverParameters = readDriverParameters(node);
+    if (node.has("tagging"))
+        readTagging(node.at("tagging"), adapter);
     node.forEach("ports", [&](JsonNode& item) { adapter.ports.push_back(readPort(item, targets)); });
     node.finish();
     return adapter;

@@ -46,7 +46,7 @@ extern "C"
     /// Waits until so many calls are held at a gate. 0 if that does not happen within the time.
     TVRSIM_EXPORT int tvrsim_await_gate(const char* gate, unsigned calls, unsigned milliseconds);
 
-    /// Adapters that are open through the HBA API.
+    /// Adapters that are open through the HBA API or for frame tagging.
     TVRSIM_EXPORT std::size_t tvrsim_open_handles();
 
     /// Remembers the state of the host as it is.

@@ -14,6 +14,8 @@ enum class Family : std::uint8_t
     dual,   ///< LRM_ and the name in the local library, RM_ and the name in the fallback library
     rmOnly, ///< RM_ and the name in both
     hba,    ///< HBA_ and the name in the HBA API library and the fallback library
+    tag,    ///< CPQFC_ and the name in the library for frame tagging
+    tagEnd, ///< the same, and in the fallback library
 };
 
 struct Row
@@ -103,6 +105,14 @@ constexpr Row rows[] = {
     {"RefreshInformation", hba, statusOnly},
     {"SendReadCapacity", hba, scsiOut},
     {"SendScsiInquiry", hba, scsiOut},
+
+    {"CloseAdapter", tagEnd, statusOnly},
+    {"GetNumberOfAdapters", tag, bit(Hostile::hugeCount)},
+    {"OpenAdapter", tag, numberOut},
+    {"QoSGetConfig", tag, listOut},
+    {"QoSGetGlobalFlag", tag, numberOut},
+    {"QoSSetConfig", tag, statusOnly},
+    {"QoSSetGlobalFlag", tag, statusOnly},
 };
 
 /// Prefix of the family's names in a library; null where the library does not export them.
@@ -113,14 +123,18 @@ const char* prefixIn(Family family, Library library)
     case dual:
         return library == Library::local ? "LRM_" : library == Library::fallback ? "RM_" : nullptr;
     case rmOnly:
-        return library == Library::hbaApi ? nullptr : "RM_";
+        return library == Library::local || library == Library::fallback ? "RM_" : nullptr;
     case hba:
-        return library == Library::local ? nullptr : "HBA_";
+        return library == Library::hbaApi || library == Library::fallback ? "HBA_" : nullptr;
+    case tag:
+        return library == Library::tagging ? "CPQFC_" : nullptr;
+    case tagEnd:
+        return library == Library::tagging || library == Library::fallback ? "CPQFC_" : nullptr;
     }
     return nullptr;
 }
 
-constexpr Library libraries[] = {Library::local, Library::fallback, Library::hbaApi};
+constexpr Library libraries[] = {Library::local, Library::fallback, Library::hbaApi, Library::tagging};
 
 } // namespace
 

@@ -14,6 +14,7 @@ enum class Library : std::uint8_t
     local,    ///< liblrmapi.so
     fallback, ///< librmapi.so
     hbaApi,   ///< libHBAAPI.so.2
+    tagging,  ///< libtvrsim_tagging.so
 };
 
 /// Ways in which an output can be hostile.

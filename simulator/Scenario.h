@@ -198,6 +198,10 @@ struct Adapter
     std::vector<RM_Feature> features; ///< in ascending order of tag
     std::vector<DriverParameter> driverParameters;
     std::vector<Port> ports;
+
+    // Frame tagging, which the ports of the adapter share.
+    std::uint32_t tagging = 0; ///< 0 or 1
+    std::vector<CPQFC_QosEntry> tags;
 };
 
 struct Scenario
@@ -206,6 +210,7 @@ struct Scenario
 
     std::string libraryVersion = "12.0.100.0";
     std::string miliVersion = "2.0.30.0";
+    bool hasTagging = true; ///< the RM library loads the functions for frame tagging
     AttributeList serverAttributes;
     std::vector<DriverParameter> driverParameters; ///< those for all adapters
     std::vector<Adapter> adapters;

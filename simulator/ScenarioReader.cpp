@@ -111,6 +111,7 @@ void readLibrary(JsonNode node, Scenario& scenario)
 {
     node.read("version", scenario.libraryVersion);
     node.read("miliVersion", scenario.miliVersion);
+    node.read("tagging", scenario.hasTagging);
     node.finish();
 }
 

@@ -115,7 +115,7 @@ std::optional<std::size_t> SimulatedHost::reach(std::uint32_t state, const std::
 std::size_t SimulatedHost::openHandles() const
 {
     std::lock_guard lock(_mutex);
-    return _handles.size();
+    return _handles.size() + _tagHandles.size();
 }
 
 std::string SimulatedHost::adapterOf(HBA_HANDLE handle) const

@@ -101,8 +101,23 @@ public:
     RM_STATUS setPortEnabled(Wwn wwpn, std::uint32_t enabled, std::uint32_t& dynamic);
     RM_STATUS setPortAttribute(Wwn wwpn, std::uint32_t id, const void* value, std::uint32_t length);
 
+    // Frame tagging, in TagCalls.cpp.
+
+    bool hasTagging() const;
+    std::uint32_t tagAdapterCount() const;
+    RM_STATUS openTagAdapter(const std::string& name, std::uint32_t& handle);
+    void closeTagAdapter(std::uint32_t handle);
+    RM_STATUS tagTable(std::uint32_t handle, std::vector<CPQFC_QosEntry>& out) const;
+    RM_STATUS setTagTable(std::uint32_t handle, std::vector<CPQFC_QosEntry> table);
+    RM_STATUS tagging(std::uint32_t handle, std::uint32_t& out) const;
+    /// Takes 0 and 1.
+    RM_STATUS setTagging(std::uint32_t handle, std::uint32_t state);
+    /// Name of the adapter behind a handle; empty if there is none.
+    std::string tagAdapterOf(std::uint32_t handle) const;
+
     // What a test sees and changes. A false result means that there is no such adapter or port.
 
+    /// Of the HBA API, and of frame tagging.
     std::size_t openHandles() const;
     /// Name of the adapter behind a handle; empty if there is none.
     std::string adapterOf(HBA_HANDLE handle) const;
@@ -155,6 +170,7 @@ private:
     /// For a reset of an adapter or of the host: what the flash memory holds is what runs. Called with the lock held.
     static void activateFirmware(Adapter& adapter);
     template <class Use> RM_STATUS withImported(Wwn wwpn, const char* path, Use use);
+    template <class Self, class Use> static RM_STATUS onTagAdapter(Self& self, std::uint32_t handle, Use use);
 
     mutable std::mutex _mutex;
     Scenario _scenario;
@@ -163,6 +179,8 @@ private:
     bool _libraryLoaded = false;
     HBA_HANDLE _lastHandle = 0;
     std::map<HBA_HANDLE, std::string> _handles; ///< name of the adapter
+    std::uint32_t _lastTagHandle = 0;
+    std::map<std::uint32_t, std::string> _tagHandles; ///< name of the adapter
 
     // Made from the scenario by index().
     std::unordered_map<std::string, std::size_t> _adapterByName;

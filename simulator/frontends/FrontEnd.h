@@ -25,4 +25,8 @@ inline Call::Subject adapter(HBA_HANDLE handle)
     return [handle] { return tvrsim_simulation()->host.adapterOf(handle); };
 }
 
+/// The functions for frame tagging are looked for in the global scope of the process: an RM library that is initialised
+/// loads them into it, where the host has them.
+void loadTaggingLibrary(SimulatedHost& host);
+
 } // namespace tvrsim

@@ -56,7 +56,13 @@ extern "C"
 
     RM_STATUS DUAL(InitLib)()
     {
-        return callOf(__func__).status([] { return RM_OK; });
+        Call call = callOf(__func__);
+        return call.status(
+            [&]
+            {
+                loadTaggingLibrary(call.host());
+                return RM_OK;
+            });
     }
 
     RM_STATUS DUAL(ExitLib)()

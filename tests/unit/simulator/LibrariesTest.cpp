@@ -51,6 +51,7 @@ TEST(Libraries, ExportTheirEntryPointsAndNothingElse)
     EXPECT_THAT(definedSymbols(fileOf("liblrmapi.so")), ElementsAreArray(exportedNames(Library::local)));
     EXPECT_THAT(definedSymbols(fileOf("librmapi.so")), ElementsAreArray(exportedNames(Library::fallback)));
     EXPECT_THAT(definedSymbols(fileOf("libHBAAPI.so.2")), ElementsAreArray(exportedNames(Library::hbaApi)));
+    EXPECT_THAT(definedSymbols(fileOf("libtvrsim_tagging.so")), ElementsAreArray(exportedNames(Library::tagging)));
     EXPECT_THAT(definedSymbols(fileOf("libtvrsim_vendor.so")), testing::ElementsAre("HBA_RegisterLibraryV2"));
     EXPECT_THAT(definedSymbols(fileOf("libtvrsim.so")), testing::Each(testing::StartsWith("tvrsim_")));
     EXPECT_THAT(exportedNames(Library::fallback), testing::Not(testing::Contains(testing::StartsWith("LRM_"))));
