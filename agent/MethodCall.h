@@ -38,6 +38,7 @@ struct ServiceTexts
     LogText noWwn = {};         ///< str2HBAName failed
     MethodEnd ofService = {33068};
     MethodEnd ofTarget = {32968};
+    MethodEnd ofNoTarget = ofTarget;
     MethodEnd ofName = {32968};
     bool anyServiceWithoutOne = false; ///< with no service in the cache, each instance passes for it
 };
@@ -70,7 +71,7 @@ public:
     template <class Target> Target& target(const Instance* reference, const ServiceTexts& texts)
     {
         if (!reference)
-            end(texts.noTarget, texts.ofTarget);
+            end(texts.noTarget, texts.ofNoTarget);
         const auto* named = cast<CIM_LogicalDevice>(reference);
         Target* found = !named ? nullptr
                                : mapOf<Target>(_agent).findFirst(

@@ -173,16 +173,6 @@ bool setCommon(Curl& curl)
 
 // --- download
 
-/// The path of a local file that the URI may mean.
-std::string pathIn(const std::string& uri)
-{
-    if (const std::size_t place = uri.find("file:///"); place != uri.npos)
-        return uri.substr(place + 7);
-    if (const std::size_t place = uri.find("file://localhost/"); place != uri.npos)
-        return uri.substr(place + 16);
-    return uri;
-}
-
 void* openForDownload()
 {
     for (const char* file : downloadLibraries)
@@ -368,7 +358,7 @@ int downloadFileUsingCurl(const std::string& uri, std::string& file)
 try
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::downloadFileUsingCurl: %s", uriForLog(uri).c_str());
-    const std::string path = pathIn(uri);
+    const std::string path = localPathOf(uri);
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::Firmware file path: %s", uriForLog(path).c_str());
     struct stat status;
     if (stat(path.c_str(), &status) == 0)

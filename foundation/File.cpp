@@ -81,9 +81,9 @@ File_Descriptor createNamedFile(const std::string& name)
     return open_regular(name.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, S_IRUSR | S_IWUSR);
 }
 
-std::optional<std::string> readTextFile(const char* path, std::size_t limit)
+std::optional<std::string> readTextFile(const char* path, std::size_t limit, int flags)
 {
-    const File_Descriptor file = open_regular(path, O_RDONLY);
+    const File_Descriptor file = open_regular(path, O_RDONLY | flags);
     if (!file)
         return std::nullopt;
     std::string text;
@@ -198,6 +198,8 @@ public:
     {
         return write_all(_file.get(), text.data(), text.size()) && fsync(_file.get()) == 0 && _file.close();
     }
+    /// False if anything stands under the name.
+    bool appearAs(const char* name) { return linkat(_folder.get(), _name, _folder.get(), name, 0) == 0; }
     bool takePlaceOf(const char* name)
     {
         _isThere = renameat(_folder.get(), _name, _folder.get(), name) != 0;
@@ -262,6 +264,15 @@ Replacement replaceAt(const Place& place, std::string_view text)
 }
 
 } // namespace
+
+bool createTextFile(const char* path, std::string_view text)
+{
+    const Place place = placeOf(path);
+    if (!place.folder)
+        return false;
+    TemporaryFile file(place.folder, S_IRUSR | S_IWUSR);
+    return file && file.write(text) && file.appearAs(place.name.c_str());
+}
 
 Replacement replaceFile(const char* path, std::string_view text) noexcept
 try

@@ -26,8 +26,13 @@ File_Descriptor openForWriting(const char* path, WriteMode mode);
 /// where the name has a folder in it or is none, or where anything stands under it, a link included.
 File_Descriptor createNamedFile(const std::string& name);
 
-/// The first `limit` bytes of a file; nothing, with errno, if it does not open or cannot be read.
-std::optional<std::string> readTextFile(const char* path, std::size_t limit);
+/// The first `limit` bytes of a file; nothing, with errno, if it does not open or cannot be read. `flags` are further
+/// ones of open(), such as O_NOFOLLOW.
+std::optional<std::string> readTextFile(const char* path, std::size_t limit, int flags = 0);
+
+/// Makes a new file with this text, for the process's user alone. False with errno, and nothing made, where something
+/// stands under the name already, be it a link to nowhere, or the text does not reach the disk. Nobody sees a part.
+bool createTextFile(const char* path, std::string_view text);
 
 enum class Replacement
 {

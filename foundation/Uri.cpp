@@ -60,6 +60,14 @@ std::optional<std::string> lastPartOf(View uri)
     return std::string(uri.substr(slash + 1));
 }
 
+std::string localPathOf(View uri)
+{
+    for (const View form : {View("file:///"), View("file://localhost/")})
+        if (const std::size_t place = uri.find(form); place != View::npos)
+            return std::string(uri.substr(place + form.size() - 1));
+    return std::string(uri);
+}
+
 UriAndLogin takeLogin(View uri)
 {
     const std::size_t begin = authorityOf(uri);

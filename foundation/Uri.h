@@ -15,6 +15,9 @@ std::string uriForLog(std::string_view uri);
 /// What stands behind the last "/"; nothing if there is none.
 std::optional<std::string> lastPartOf(std::string_view uri);
 
+/// The path that a file URI has in it, wherever it stands; any other text is one itself.
+std::string localPathOf(std::string_view uri);
+
 struct UriAndLogin
 {
     std::string uri;                  ///< without the login

@@ -75,6 +75,7 @@ TEST_P(NoFile, IsNeitherReadNorWrittenNorReplacedAndNothingWaits)
     EXPECT_FALSE(openForWriting(path.c_str(), WriteMode::Append));
     EXPECT_FALSE(openForWriting(path.c_str(), WriteMode::Truncate));
     EXPECT_EQ(replaceFile(path.c_str(), "text"), Replacement::NotOpened);
+    EXPECT_FALSE(createTextFile(path.c_str(), "text"));
     EXPECT_EQ(std::filesystem::symlink_status(path).type(), before);
     EXPECT_THAT(namesIn(root / "etc"), ElementsAre("file"));
 }
@@ -110,6 +111,28 @@ INSTANTIATE_TEST_SUITE_P(Rows, NoFile,
                                                        return File_Descriptor();
                                                    }}),
                          [](const auto& info) { return info.param.name; });
+
+TEST(CreateTextFile, MakesNewFilesAlone)
+{
+    const TemporaryRoot root;
+    const std::string path = root / "etc/file", link = root / "etc/link";
+    EXPECT_TRUE(createTextFile(path.c_str(), "text"));
+    EXPECT_EQ(readTextFile(path.c_str(), 10), "text");
+    EXPECT_EQ(std::filesystem::status(path).permissions(), std::filesystem::perms(0600));
+    EXPECT_FALSE(createTextFile(path.c_str(), "other"));
+    EXPECT_EQ(errno, EEXIST);
+    EXPECT_EQ(readTextFile(path.c_str(), 10), "text");
+    std::filesystem::create_symlink(root / "etc/nowhere", link);
+    EXPECT_FALSE(createTextFile(link.c_str(), "other"));
+    EXPECT_EQ(readTextFile(link.c_str(), 10), std::nullopt);
+    EXPECT_FALSE(createTextFile((root / "none/file").c_str(), "text"));
+    EXPECT_THAT(namesIn(root / "etc"), testing::UnorderedElementsAre("file", "link"));
+
+    std::filesystem::remove(link);
+    std::filesystem::create_symlink(path, link);
+    EXPECT_EQ(readTextFile(link.c_str(), 10), "text");
+    EXPECT_EQ(readTextFile(link.c_str(), 10, O_NOFOLLOW), std::nullopt);
+}
 
 // --- replacing -----------------------------------------------------------------------------------------
 

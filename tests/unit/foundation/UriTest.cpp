@@ -47,4 +47,13 @@ TEST(Uri, IsTakenApartAndShowsNoLogin)
     }
 }
 
+TEST(Uri, OfAFileHasItsPath)
+{
+    EXPECT_EQ(localPathOf("file:///tmp/fw"), "/tmp/fw");
+    EXPECT_EQ(localPathOf("file://localhost/tmp/fw"), "/tmp/fw");
+    EXPECT_EQ(localPathOf("http://host/file:///tmp/fw"), "/tmp/fw");
+    for (const char* other : {"/tmp/fw", "file://host/tmp/fw", "file://localhostile/fw", "http://host/fw", ""})
+        EXPECT_EQ(localPathOf(other), other);
+}
+
 } // namespace
