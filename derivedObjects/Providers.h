@@ -14,6 +14,7 @@
 #include "services/LaneInstances.h"
 #include "services/ProviderSettings.h"
 #include "services/SoftwareInstallation.h"
+#include "services/TagService.h"
 #include "services/WwnService.h"
 
 #include <type_traits>
