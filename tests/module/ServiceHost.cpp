@@ -37,8 +37,8 @@ std::string Answer::text(const std::string& name) const
     return value.isNull() ? std::string() : value.asString();
 }
 
-ServiceHost::ServiceHost(const std::string& serviceClass, const std::string& scenario)
-    : Host(scenario), _serviceClass(serviceClass)
+ServiceHost::ServiceHost(const std::string& serviceClass, const std::string& scenario, Libraries libraries)
+    : Host(scenario, libraries), _serviceClass(serviceClass)
 {
     setHostNames({});
     port = instancesOf("TVRHBA_FCPort").at(0).path; // the log begins with the first class

@@ -21,7 +21,7 @@ struct Answer
 class ServiceHost : public Host
 {
 public:
-    ServiceHost(const std::string& serviceClass, const std::string& scenario);
+    ServiceHost(const std::string& serviceClass, const std::string& scenario, Libraries libraries = {});
 
     /// Calls a method whose first log line is `entry`, with `port` as its target.
     Answer callOnPort(const std::string& method, const std::string& entry, std::vector<broker::Property> in = {});
