@@ -8,6 +8,7 @@
 #include "schema/CIM_LogicalDevice.h"
 
 #include <cstdint>
+#include <optional>
 
 namespace cimple
 {
@@ -84,8 +85,9 @@ public:
         return *found;
     }
 
-    /// Does what takes long and needs nothing of the cache, without the data lock. What was looked up before may be
-    /// gone then.
+    /// Does what takes long and needs nothing of the cache, without the data lock, and gives what `work` returns. What
+    /// was looked up before may be gone then. Ends the method if the agent has ended meanwhile, and its libraries with
+    /// it.
     template <class Work> auto withoutLock(Work work)
     {
         struct Released
@@ -94,9 +96,19 @@ public:
             ~Released() { mutex.lock(); }
             Mutex& mutex;
         };
-        const Released released(_agent.m_DataMutex);
-        return work();
+        _hold.emplace();
+        auto result = [&]
+        {
+            const Released released(_agent.m_DataMutex);
+            return work();
+        }();
+        if (!_agent.m_bLoaded)
+            end({}, {methodFailed});
+        return result;
     }
+
+    /// What the method changed is seen once the adapters have been read again, which the next request begins.
+    void refreshAfterwards() { _agent.m_bAdapterRefreshPending = true; }
 
     /// The WWPN that a port's DeviceID is the text of.
     HBA_WWN wwpn(const String& deviceId, const ServiceTexts& texts);
@@ -116,6 +128,7 @@ private:
     static ProviderAgent& enter(const LogText& entry);
 
     ProviderAgent& _agent;
+    std::optional<ProviderAgent::Hold> _hold; ///< outlives the guard, which unlocks a mutex of the agent
     MethodGuard _guard;
 };
 

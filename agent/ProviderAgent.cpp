@@ -97,6 +97,23 @@ void ProviderAgent::releaseRef()
 {
     Auto_Mutex lock(*singletonMutex);
     TVR_LOG(TVR_DBG, "ProviderAgent::releaseRef[%d]", references);
+    releaseRefLocked();
+}
+
+ProviderAgent::Hold::Hold()
+{
+    Auto_Mutex lock(*singletonMutex);
+    references++;
+}
+
+ProviderAgent::Hold::~Hold()
+{
+    Auto_Mutex lock(*singletonMutex);
+    releaseRefLocked();
+}
+
+void ProviderAgent::releaseRefLocked()
+{
     if (--references + failedLoads != 0)
         return;
     if (singleton.load() && singleton.load()->m_process != getpid())

@@ -64,6 +64,15 @@ public:
     static bool join();
     /// Deletes the agent when as many references came back as loads were made; that of a parent process stays.
     static void releaseRef();
+    /// Keeps the agent beyond its last provider while a thread that works for it has none of its locks.
+    class Hold
+    {
+    public:
+        Hold();
+        ~Hold();
+        Hold(const Hold&) = delete;
+        Hold& operator=(const Hold&) = delete;
+    };
 
     /// Starts a refresh if one is due; returns 0 at once.
     int BuildCimpleInfo();
@@ -137,9 +146,10 @@ private:
 
     ProviderAgent();
     ~ProviderAgent();
-    /// Both under the singleton mutex.
+    /// Under the singleton mutex.
     static ProviderAgent* makeLocked();
     static void addRefLocked();
+    static void releaseRefLocked();
 
     void start();
     void readSettings();

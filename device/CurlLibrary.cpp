@@ -12,7 +12,9 @@ namespace cimple
 namespace
 {
 
-constexpr const char* libraryFiles[] = {"/lib/libcurl.so.4", "/usr/lib/libcurl.so.4", "libcurl.so", "curl.dll"};
+/// The last where the loader's own folders have it, as on hosts with a folder of libraries for each architecture.
+constexpr const char* libraryFiles[] = {"/lib/libcurl.so.4", "/usr/lib/libcurl.so.4", "libcurl.so", "curl.dll",
+                                        "libcurl.so.4"};
 
 /// ftp, http, https and tftp.
 constexpr std::uint16_t curlSchemes[] = {4, 5, 6, 8};

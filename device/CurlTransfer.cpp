@@ -28,15 +28,22 @@ namespace
 constexpr int downloadFailed = 1;
 constexpr int uploadFailed = -1;
 
+/// Those of CurlLibrary.cpp and the folder of 64-bit libraries that some systems have.
 constexpr const char* downloadLibraries[] = {"/lib/libcurl.so.4", "/usr/lib/libcurl.so.4", "/usr/lib64/libcurl.so.4",
-                                             "libcurl.so"};
+                                             "libcurl.so", "libcurl.so.4"};
 constexpr int openMode = RTLD_LAZY | RTLD_GLOBAL;
 
 // A server that does not answer, or does not stop, must not hold a method.
 constexpr long connectSeconds = 30;
 constexpr long idleSeconds = 60;
+constexpr long downloadSeconds = 3600;
 constexpr long uploadSeconds = 100;
 constexpr std::size_t maxFileSize = std::size_t{256} << 20;
+
+/// Local files are this module's own to open: libcurl would wait at a pipe, and write through a link. A login by
+/// telnet is no transfer.
+constexpr long protocols = ~((1L << 10) | (1L << 6)) & 0x7FFF'FFFF; // CURLPROTO_FILE, CURLPROTO_TELNET
+constexpr auto setProtocols = static_cast<CURLoption>(181);         // CURLOPT_PROTOCOLS, of which newer headers warn
 
 /// Older libraries count the users of their global state without a lock.
 constinit std::mutex globalState;
@@ -57,8 +64,6 @@ public:
     /// False, with the line, whose "%d" is the code, when libcurl does not take the option.
     template <class Value> bool set(CURLoption option, Value value, const char* refused)
     {
-        if (!_setOption)
-            return false;
         _code = _setOption(_transfer, option, value);
         if (_code == CURLE_OK)
             return true;
@@ -163,7 +168,8 @@ Curl::~Curl()
 /// one.
 bool setCommon(Curl& curl)
 {
-    return curl.set(CURLOPT_SSL_VERIFYPEER, 0L, "Error Sending the CURLOPT_SSL_VERIFYPEER to the Curl library %d") &&
+    return curl.set(setProtocols, protocols, "Error Sending the CURLOPT_PROTOCOLS to the Curl library %d") &&
+           curl.set(CURLOPT_SSL_VERIFYPEER, 0L, "Error Sending the CURLOPT_SSL_VERIFYPEER to the Curl library %d") &&
            curl.set(CURLOPT_SSL_VERIFYHOST, 0L, "Error Sending the CURLOPT_SSL_VERIFYHOST to the Curl library %d") &&
            curl.set(CURLOPT_NOSIGNAL, 1L, "Error Sending the CURLOPT_NOSIGNAL to the Curl library %d") &&
            curl.set(CURLOPT_FAILONERROR, 1L, "Error Sending the CURLOPT_FAILONERROR to the Curl library %d") &&
@@ -234,7 +240,8 @@ bool setDownload(Curl& curl, const std::string& uri, Arriving& file, char (&erro
            setCommon(curl) &&
            curl.set(CURLOPT_LOW_SPEED_LIMIT, 1L, "Error Sending the CURLOPT_LOW_SPEED_LIMIT to the Curl library %d") &&
            curl.set(CURLOPT_LOW_SPEED_TIME, idleSeconds,
-                    "Error Sending the CURLOPT_LOW_SPEED_TIME to the Curl library %d");
+                    "Error Sending the CURLOPT_LOW_SPEED_TIME to the Curl library %d") &&
+           curl.set(CURLOPT_TIMEOUT, downloadSeconds, "Error Sending the CURLOPT_TIMEOUT to the Curl library %d");
 }
 
 int download(const std::string& uri, std::string& file)

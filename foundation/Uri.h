@@ -9,7 +9,7 @@ namespace cimple
 {
 
 /// For the log: with "***" in the place of a user and a password. All before the last "@" is taken for these, so that
-/// a password with separators in it does not show either; a path from the root has none.
+/// a password with separators in it does not show either; a path from the root has none, unless it has a URI in it.
 std::string uriForLog(std::string_view uri);
 
 /// What stands behind the last "/"; nothing if there is none.

@@ -19,8 +19,8 @@ constexpr ServiceTexts texts = {
     .wrongService = {TVR_ERR, "Invalid instance of HBA Driver Parameter Service"},
     .noTarget = {TVR_ERR, "TVRHBA_FCHBADriverParamService_Provider invald fc port ...return"},
     .unknownTarget = {TVR_ERR, "TVRHBA_FCHBADriverParamService_Provider invald fc port ...return"},
-    .noPlainName = {TVR_ERR, "TVRHBA_FCHBADriverParamService_Provider::Id2HBAName failed"},
-    .noWwn = {TVR_ERR, "TVRHBA_FCHBADriverParamService_Provider::str2HBAName failed"},
+    .noPlainName = {TVR_DBG, "TVRHBA_FCHBADriverParamService_Provider::Id2HBAName failed"},
+    .noWwn = {TVR_DBG, "TVRHBA_FCHBADriverParamService_Provider::str2HBAName failed"},
 };
 
 /// A flag that the client did not send is not set.

@@ -125,7 +125,7 @@ int deleteLane(const TVRHBA_DriverParams* instance)
     if (setState(initiator, *lane, 0) != RM_OK)
         MethodCall::end({TVR_ERR, "TVRHBA_DriverParams_Provider::SetOASLunState failed"}, notDeleted);
     if (!removeWithOthers(agent, *lane))
-        TVR_LOG(TVR_ERR, "TVRHBA_DriverParams_Provider:: Invalid associations ");
+        TVR_LOG(TVR_DBG, "TVRHBA_DriverParams_Provider:: Invalid associations ");
     return 0;
 }
 

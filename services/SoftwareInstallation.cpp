@@ -57,19 +57,14 @@ String targetOf(MethodCall& call, const Instance* reference, const ServiceTexts&
     return call.target<TVRHBA_FCPort>(reference, with).DeviceID.value;
 }
 
-void refreshAdapterData(ProviderAgent& agent)
-{
-    agent.m_bAdapterRefreshPending = true;
-}
-
 // --- install options
 
 constexpr std::uint16_t resetAfterwards = 2;
-constexpr std::uint16_t fileName = 32768; ///< with a value, of byte streams alone
+constexpr std::uint16_t namesTheFile = 32768; ///< by its value, of byte streams alone
 
 /// The others have no effect of their own.
 constexpr std::uint16_t uriOptions[] = {resetAfterwards, 4, 5, 6, 7, 11};
-constexpr std::uint16_t byteStreamOptions[] = {resetAfterwards, 4, 5, 6, 7, 11, fileName};
+constexpr std::uint16_t byteStreamOptions[] = {resetAfterwards, 4, 5, 6, 7, 11, namesTheFile};
 
 /// Those that the client gave, if all are among the known ones.
 template <class Known> Options checkedOptions(const Property<Options>& given, const Known& known)
@@ -103,23 +98,16 @@ void removeInstalled(const std::string& file)
         TVR_LOG(TVR_DBG, "tvrcimDownloadFW: Can't stat file %s", file.c_str());
 }
 
+/// Once, however often the client asks.
 RM_STATUS resetWhereAsked(const HBA_WWN& wwpn, const Options& options)
 {
-    RM_STATUS result = RM_OK;
-    for (const std::uint16_t option : options)
-    {
-        if (option != resetAfterwards)
-            continue;
-        TVR_LOG(TVR_DBG, "HBA RESET OPTION SELECTED");
-        if (const RM_STATUS status = tvrcimReset(wwpn); status != RM_OK)
-        {
-            TVR_LOG(TVR_DBG, "TVRHBA_SoftwareInstallationService_Provider::tvrcimResetHBA failed");
-            result = status;
-        }
-        else
-            TVR_LOG(TVR_DBG, "Fiwmware download functionality complete with Reset on the HBA");
-    }
-    return result;
+    if (std::ranges::find(options, resetAfterwards) == options.end())
+        return RM_OK;
+    TVR_LOG(TVR_DBG, "HBA RESET OPTION SELECTED");
+    const RM_STATUS status = tvrcimReset(wwpn);
+    TVR_LOG(TVR_DBG, status == RM_OK ? "Fiwmware download functionality complete with Reset on the HBA"
+                                     : "TVRHBA_SoftwareInstallationService_Provider::tvrcimResetHBA failed");
+    return status;
 }
 
 std::uint32_t install(MethodCall& call, const Installation& installation)
@@ -128,6 +116,7 @@ std::uint32_t install(MethodCall& call, const Installation& installation)
     if (installation.service.Name.value != "TVRHBA_FCSoftwareInstallationService")
         MethodCall::end({TVR_DBG, "Error - The SoftwareInstallationService instance selected is incorrect "}, invalid);
     RM_STATUS status = tvrcimDownloadFW(wwpn, installation.file.c_str());
+    call.refreshAfterwards();
     if (status == RM_OK)
     {
         installation.done(call.agent(), installation, wwpn);
@@ -135,7 +124,6 @@ std::uint32_t install(MethodCall& call, const Installation& installation)
     }
     else // the file stays, and no reset would help: also of firmware that none activates (RM_ERROR_NO_RESET)
         TVR_LOG(TVR_ERR, "Error - in the firmware download functionality");
-    refreshAdapterData(call.agent());
     return static_cast<std::uint32_t>(status);
 }
 
@@ -155,7 +143,7 @@ std::string_view withoutLength(const Array<std::uint8_t>& image)
 /// The value of the option that names the file; empty where the client gave none.
 std::string givenFileName(const Options& options, const Property<Array<String>>& values)
 {
-    const auto place = std::ranges::find(options, fileName);
+    const auto place = std::ranges::find(options, namesTheFile);
     if (place == options.end())
         MethodCall::end({TVR_ERR, "InstallOptions does not have the value 32768"}, invalid);
     const auto index = static_cast<std::size_t>(place - options.begin());
@@ -242,7 +230,7 @@ std::uint32_t resetHBA(const Instance* reference, ResetHBA& parameters)
                 "TVRHBA_SoftwareInstallationService_Provider::tvrcimResetHBA for target %s is Successful.. Updating "
                 "the Provider Data",
                 target.c_str());
-        refreshAdapterData(call.agent());
+        call.refreshAfterwards();
     }
     else
         TVR_LOG(TVR_ERR, "TVRHBA_SoftwareInstallationService_Provider::tvrcimResetHBA failed for target %s",

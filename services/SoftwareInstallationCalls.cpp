@@ -104,8 +104,6 @@ RM_STATUS tvrcimDownloadFW(const HBA_WWN& wwpn, const char* file)
 RM_STATUS tvrcimReset(const HBA_WWN& wwpn)
 {
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::tvrcimReset");
-    if (!isLocal(wwpn))
-        return RM_ERROR;
     const RM_STATUS status = LRM_ResetHBA(wwpn, 1);
     if (status == RM_OK)
         TVR_LOG(TVR_WARN, "WWN %s is reset", TVR_MethodWrapper::hbaNameToString(wwpn).c_str());
@@ -133,8 +131,6 @@ void UpdateFirmwareOnFlash(ProviderAgent& agent, const HBA_WWN& wwpn)
 RM_STATUS SetPortEnabled(const HBA_WWN& wwpn, std::uint32_t enabled, std::uint32_t& dynamic)
 {
     TVR_LOG(TVR_DBG, "Entered SetPortEnabled %s %d", TVR_MethodWrapper::hbaNameToString(wwpn).c_str(), enabled);
-    if (!isLocal(wwpn))
-        return RM_ERROR;
     TVR_LOG(TVR_DBG, "Invoking RM_SetPortEnabled API ");
     const RM_STATUS status = LRM_SetPortEnabled(wwpn, enabled, &dynamic);
     TVR_LOG(TVR_DBG, " SetPortEnabled RM Status: %d", status);
@@ -144,8 +140,6 @@ RM_STATUS SetPortEnabled(const HBA_WWN& wwpn, std::uint32_t enabled, std::uint32
 
 RM_STATUS SetFECState(const HBA_WWN& wwpn, std::uint32_t enabled)
 {
-    if (!isLocal(wwpn))
-        return RM_ERROR;
     const RM_STATUS status = LRM_SetAdapterAttribute(wwpn, RM_PA_FEC_STATE, &enabled, sizeof enabled);
     if (status != RM_OK)
         TVR_MethodWrapper::logStatus(status);

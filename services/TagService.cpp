@@ -11,6 +11,7 @@
 #include <cerrno>
 #include <climits>
 #include <exception>
+#include <memory>
 #include <new>
 #include <unistd.h>
 
@@ -77,11 +78,11 @@ std::uint32_t setConfigTable(const Instance* reference, TVRHBA_FCTagService_SetC
     const TVRHBA_FCPort& port = targetOf(call, reference, parameters.Target);
     const std::string uri = uriOf(parameters.URI, {TVR_DBG, "TVRHBA_FCTagService_Provider::Null sized URI"});
     const std::string name = adapterName(call, port);
-    const TagSource source = call.withoutLock([&] { return TagSource(uri); });
+    const auto source = call.withoutLock([&] { return std::make_unique<TagSource>(uri); });
     const TagAdapter adapter(name);
     try
     {
-        return adapter.setTable(readTagTable(source.text())) == RM_OK ? 0 : refusedByLibrary;
+        return adapter.setTable(readTagTable(source->text())) == RM_OK ? 0 : refusedByLibrary;
     }
     catch (const std::bad_alloc&)
     {

@@ -89,7 +89,7 @@ std::uint32_t changeWWN(const Instance* reference, TVRHBA_FCHBAWWNService_Change
     if (status != RM_OK)
         return static_cast<std::uint32_t>(status);
     TVR_LOG(TVR_INFO, "ChangeWWN operation completed. Please restart the CIMOM to use Tavrin CIM provider");
-    call.agent().m_bAdapterRefreshPending = true;
+    call.refreshAfterwards();
     return 0;
 }
 
@@ -119,7 +119,7 @@ std::uint32_t restoreWWN(const Instance* reference, TVRHBA_FCHBAWWNService_Resto
     const RM_STATUS status = RestoreWWN(wwpn, type);
     parameters.WWNOperationStatus.set(operationStatus(status));
     if (status == RM_OK)
-        call.agent().m_bAdapterRefreshPending = true;
+        call.refreshAfterwards();
     return static_cast<std::uint32_t>(status);
 }
 

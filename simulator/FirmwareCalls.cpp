@@ -84,12 +84,12 @@ void enable(Port& port)
 
 std::optional<FirmwareFile> readFirmware(std::string_view text)
 {
-    if (!takeLine(text, "TVRSIM-FIRMWARE 1"))
+    if (takeLine(text, "TVRSIM-FIRMWARE 1") != "")
         return std::nullopt;
     const auto family = takeLine(text, "family: ");
     const auto version = takeLine(text, "version: ");
     const auto checksum = takeLine(text, "checksum: ");
-    if (!family || !version || version->size() > 31 || !checksum || !takeLine(text, ""))
+    if (!family || !version || version->size() > 31 || !checksum || takeLine(text, "") != "")
         return std::nullopt;
     std::uint32_t expected = 0;
     const auto [end, error] = std::from_chars(checksum->data(), checksum->data() + checksum->size(), expected, 16);

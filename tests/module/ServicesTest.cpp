@@ -140,7 +140,7 @@ TEST(Services, InstallationTakesMoreUrisWithLibCurl)
         std::size_t absentLines;
     };
     const Row rows[] = {
-        {"", "{3}", {"/lib/libcurl.so.4", "/usr/lib/libcurl.so.4", "libcurl.so", "curl.dll"}, 1},
+        {"", "{3}", {"/lib/libcurl.so.4", "/usr/lib/libcurl.so.4", "libcurl.so", "curl.dll", "libcurl.so.4"}, 1},
         {"/lib/libcurl.so.4", "{3, 4, 5, 6, 8}", {"/lib/libcurl.so.4"}, 0},
         {"libcurl.so", "{3, 4, 5, 6, 8}", {"/lib/libcurl.so.4", "/usr/lib/libcurl.so.4", "libcurl.so"}, 0},
     };

@@ -45,6 +45,19 @@ constexpr ServiceTexts changeTexts = {
     .anyServiceWithoutOne = true,
 };
 
+bool isDataLocked(ProviderAgent& agent)
+{
+    return std::async(std::launch::async,
+                      [&]
+                      {
+                          if (agent.m_DataMutex.try_lock() == EBUSY)
+                              return true;
+                          agent.m_DataMutex.unlock();
+                          return false;
+                      })
+        .get();
+}
+
 std::uint32_t changeWWN(const Instance* reference, Change& parameters)
 {
     MethodCall call({TVR_DBG, "Entering ChangeWWN"});
@@ -53,8 +66,7 @@ std::uint32_t changeWWN(const Instance* reference, Change& parameters)
     const HBA_WWN wwpn = call.wwpn(port.DeviceID.value, texts);
     parameters.WWNOperationStatus.set(wwpn.wwn[7]);
     // The data stay locked as long as the call lives.
-    const int held = std::async(std::launch::async, [&] { return call.agent().m_DataMutex.try_lock(); }).get();
-    return held == EBUSY ? 0 : 77;
+    return isDataLocked(call.agent()) ? 0 : 77;
 }
 
 std::uint32_t restoreWWN(const Instance*, Restore&)
@@ -145,6 +157,26 @@ TEST_F(MethodCalls, ServiceTargetAndNameAreGivenUnderTheLock)
     EXPECT_EQ(change->return_value.value, 0u);
     EXPECT_EQ(change->return_value.null, 0);
     EXPECT_EQ(change->WWNOperationStatus.value, 0xEF);
+}
+
+TEST_F(MethodCalls, LongWorkIsDoneWithoutTheLockAndOutlivesTheLastProvider)
+{
+    {
+        MethodCall call(LogText{});
+        EXPECT_TRUE(isDataLocked(agent));
+        EXPECT_FALSE(call.withoutLock([&] { return isDataLocked(agent); }));
+        EXPECT_THROW(call.withoutLock([]() -> int { throw std::runtime_error("broken"); }), std::runtime_error);
+        EXPECT_TRUE(isDataLocked(agent));
+        call.withoutLock(
+            [&]
+            {
+                ProviderAgent::releaseRef(); // the last one
+                return 0;
+            });
+        EXPECT_EQ(mapOf<Service>(call.agent()).size(), 1u) << "as long as the method needs it";
+    }
+    EXPECT_EQ(mapOf<Service>(*ProviderAgent::instance()).size(), 0u) << "another agent";
+    ProviderAgent::addRef();
 }
 
 TEST_F(MethodCalls, WhatIsWrongEndsTheMethodWithItsTextAndValue)

@@ -25,7 +25,8 @@ std::vector<std::uint16_t> widened()
 
 TEST(CurlLibrary, IsLookedForInOrderAndClosed)
 {
-    const std::string files[] = {"/lib/libcurl.so.4", "/usr/lib/libcurl.so.4", "libcurl.so", "curl.dll"};
+    const std::string files[] = {"/lib/libcurl.so.4", "/usr/lib/libcurl.so.4", "libcurl.so", "curl.dll",
+                                 "libcurl.so.4"};
     std::vector<std::string> calls;
     for (const std::string& file : files)
     {

@@ -69,6 +69,9 @@ protected:
 
 // --- a libcurl of which each function can fail
 
+using Number = std::pair<int, long>;
+const Number noLocalFiles(181, 0x7FFF'FBBF); ///< all protocols but file and telnet
+
 struct FakeCurl
 {
     FakeCurl();
@@ -224,9 +227,8 @@ TEST_F(CurlDownload, IsMadeOfTheStepsInTheirOrder)
                                        "5 Curl version = libcurl/test",
                                        "5 Sending the URI ftp://***@host/d/fw.grp to the Curl library",
                                        "5 Successfully closed curl so"));
-    using Number = std::pair<int, long>;
-    EXPECT_THAT(curl.numbers, ElementsAre(Number(64, 0), Number(81, 0), Number(99, 1), Number(45, 1), Number(78, 30),
-                                          Number(19, 1), Number(20, 60)));
+    EXPECT_THAT(curl.numbers, ElementsAre(noLocalFiles, Number(64, 0), Number(81, 0), Number(99, 1), Number(45, 1),
+                                          Number(78, 30), Number(19, 1), Number(20, 60), Number(13, 3600)));
 }
 
 TEST_F(CurlDownload, EndsWithItsTextAndGivesAllBack)
@@ -332,10 +334,9 @@ TEST_F(CurlUpload, IsMadeOfTheStepsInTheirOrder)
                 ElementsAre("5 Inside TVR_MethodWrapper::uploadFileUsingCurl",
                             "5 Searching for /lib Curl on the machine", "5 Successfully Set CURLOPT_UPLOAD = 1",
                             "5 iFileSize size:: 4", "5 Successfully closed curl so"));
-    using Number = std::pair<int, long>;
     EXPECT_THAT(curl.numbers, ElementsAre(Number(46, 1), Number(54, 1), Number(13, 100), Number(14, 4),
-                                          Number(30115, 4), Number(64, 0), Number(81, 0), Number(99, 1), Number(45, 1),
-                                          Number(78, 30), Number(107, 1)));
+                                          Number(30115, 4), noLocalFiles, Number(64, 0), Number(81, 0), Number(99, 1),
+                                          Number(45, 1), Number(78, 30), Number(107, 1)));
 }
 
 TEST_F(CurlUpload, EndsWithItsTextAndGivesAllBack)
@@ -427,6 +428,21 @@ TEST_F(RealTransfer, FollowsNoOtherServer)
     std::string file;
     EXPECT_EQ(downloadFileUsingCurl(server.uri("/moved"), file), 0);
     EXPECT_EQ(read("moved"), "");
+}
+
+TEST_F(RealTransfer, LeavesLocalFilesAlone)
+{
+    const RealCurl real;
+    ASSERT_EQ(mkfifo("pipe", 0600), 0); // a reader would wait for ever
+    write("own", "own");
+    for (const std::string& uri : {"FILE://" + (folder / "pipe").string(), "file://" + (folder / "pi%70e").string()})
+    {
+        std::string file;
+        EXPECT_EQ(downloadFileUsingCurl(uri, file), CURLE_UNSUPPORTED_PROTOCOL) << uri;
+    }
+    write("table", "table");
+    EXPECT_EQ(uploadFileUsingCurl("file://" + (folder / "own").string(), "table"), CURLE_UNSUPPORTED_PROTOCOL);
+    EXPECT_EQ(read("own"), "own");
 }
 
 TEST_F(RealTransfer, PutsAFileForAUser)
