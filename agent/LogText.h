@@ -14,7 +14,7 @@ struct LogText
     /// Takes a literal with one "%d" at the most: any other conversion does not build.
     consteval LogText(int level, const char* text, const char* file = __builtin_FILE(),
                       unsigned line = __builtin_LINE())
-        : level(level), text(text), file(file), line(line)
+        : text(text), file(file), level(level), line(line)
     {
         int values = 0;
         for (const char* c = text; c && *c; c++)
@@ -31,9 +31,10 @@ struct LogText
     /// `status` is the value of the text's "%d", if it has one.
     void log(std::uint32_t status = 0) const;
 
-    int level;
+    // Without padding between: clang 14 loses it where it makes a temporary at compile time, and shifts what follows.
     const char* text;
     const char* file;
+    int level;
     unsigned line;
 };
 
