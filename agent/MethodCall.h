@@ -8,7 +8,6 @@
 #include "schema/CIM_LogicalDevice.h"
 
 #include <cstdint>
-#include <optional>
 
 namespace cimple
 {
@@ -96,13 +95,12 @@ public:
             ~Released() { mutex.lock(); }
             Mutex& mutex;
         };
-        _hold.emplace();
         auto result = [&]
         {
             const Released released(_agent.m_DataMutex);
             return work();
         }();
-        if (!_agent.m_bLoaded)
+        if (_agent.hasEnded())
             end({}, {methodFailed});
         return result;
     }
@@ -127,8 +125,8 @@ public:
 private:
     static ProviderAgent& enter(const LogText& entry);
 
+    ProviderAgent::Hold _hold; ///< before all locks; outlives the guard, which unlocks a mutex of the agent
     ProviderAgent& _agent;
-    std::optional<ProviderAgent::Hold> _hold; ///< outlives the guard, which unlocks a mutex of the agent
     MethodGuard _guard;
 };
 

@@ -64,7 +64,7 @@ public:
     static bool join();
     /// Deletes the agent when as many references came back as loads were made; that of a parent process stays.
     static void releaseRef();
-    /// Keeps the agent beyond its last provider while a thread that works for it has none of its locks.
+    /// Keeps the agent beyond its last provider. To be made without a lock of the agent.
     class Hold
     {
     public:
@@ -73,6 +73,9 @@ public:
         Hold(const Hold&) = delete;
         Hold& operator=(const Hold&) = delete;
     };
+
+    /// The process ends, or has ended, what the agent stands on: data, maps and libraries.
+    bool hasEnded() const { return m_bFinished; }
 
     /// Starts a refresh if one is due; returns 0 at once.
     int BuildCimpleInfo();

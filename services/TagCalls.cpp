@@ -126,11 +126,18 @@ std::vector<CPQFC_QosEntry> TagAdapter::table() const
     CPQFC_QosTable header{};
     const std::size_t room = std::min(read(&header), maximumTagEntries);
     TagBlock block(room, missing);
-    std::vector<CPQFC_QosEntry> entries(std::min(read(block.table()), room));
-    if (!entries.empty())
-        std::memcpy(entries.data(), block.entries(), entries.size() * sizeof(CPQFC_QosEntry));
-    printEntries(entries);
-    return entries;
+    try
+    {
+        std::vector<CPQFC_QosEntry> entries(std::min(read(block.table()), room));
+        if (!entries.empty())
+            std::memcpy(entries.data(), block.entries(), entries.size() * sizeof(CPQFC_QosEntry));
+        printEntries(entries);
+        return entries;
+    }
+    catch (const std::bad_alloc&)
+    {
+        MethodCall::end(missing, noMemory);
+    }
 }
 
 } // namespace cimple

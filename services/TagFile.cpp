@@ -74,11 +74,12 @@ namespace
 /// Those that a file can be sent by. libcurl knows more, among them ways into files of this host.
 constexpr std::string_view sendingSchemes[] = {"ftp", "http", "https", "tftp"};
 
+/// A name that might end a login is none: it would be logged.
 bool isName(const std::string& name)
 {
     return !name.empty() && name != "." && name != ".." &&
            std::none_of(name.begin(), name.end(),
-                        [](char c) { return c == '/' || std::iscntrl(static_cast<unsigned char>(c)); });
+                        [](char c) { return c == '/' || c == '@' || std::iscntrl(static_cast<unsigned char>(c)); });
 }
 
 /// The part behind the last slash of the path of a URI; empty where it has no path. All before the last "@" is taken

@@ -10,7 +10,7 @@
 
 #include <cerrno>
 #include <climits>
-#include <exception>
+#include <cxxabi.h>
 #include <memory>
 #include <new>
 #include <unistd.h>
@@ -52,16 +52,16 @@ std::string adapterName(MethodCall& call, const TVRHBA_FCPort& port)
     MethodCall::end(texts.unknownTarget, texts.ofTarget);
 }
 
-std::string uriOf(const Property<String>& uri, const LogText& empty)
+std::string uriOf(const Property<String>& uri, const LogText& empty, const MethodEnd& with)
 {
     if (uri.null || uri.value.empty())
-        MethodCall::end(empty, noUri);
+        MethodCall::end(empty, with);
     return uri.value.c_str();
 }
 
 std::string hostName()
 {
-    char name[HOST_NAME_MAX + 1] = {};
+    char name[HOST_NAME_MAX + 2] = {};
     if (gethostname(name, sizeof name - 1) == 0)
         return name;
     TVR_LOG(TVR_DBG,
@@ -76,7 +76,7 @@ std::uint32_t setConfigTable(const Instance* reference, TVRHBA_FCTagService_SetC
 {
     MethodCall call(LogText{});
     const TVRHBA_FCPort& port = targetOf(call, reference, parameters.Target);
-    const std::string uri = uriOf(parameters.URI, {TVR_DBG, "TVRHBA_FCTagService_Provider::Null sized URI"});
+    const std::string uri = uriOf(parameters.URI, {TVR_DBG, "TVRHBA_FCTagService_Provider::Null sized URI"}, noUri);
     const std::string name = adapterName(call, port);
     const auto source = call.withoutLock([&] { return std::make_unique<TagSource>(uri); });
     const TagAdapter adapter(name);
@@ -89,7 +89,15 @@ std::uint32_t setConfigTable(const Instance* reference, TVRHBA_FCTagService_SetC
         TVR_LOG(TVR_DBG, "SetConfigTable: Memory allocation failed");
         return noMemory;
     }
-    catch (const std::exception&)
+    catch (const MethodEnd&)
+    {
+        throw;
+    }
+    catch (const abi::__forced_unwind&) // the end of the thread
+    {
+        throw;
+    }
+    catch (...) // the parser's, and whatever the library throws
     {
         TVR_LOG(TVR_DBG, "unknown exectiion is caught");
         return noTable;
@@ -102,7 +110,7 @@ std::uint32_t getConfigTable(const Instance* reference, TVRHBA_FCTagService_GetC
 
     MethodCall call(LogText{});
     const TVRHBA_FCPort& port = targetOf(call, reference, parameters.Target);
-    const std::string uri = uriOf(parameters.URI, {TVR_DBG, "Null sized URI..returning"});
+    const std::string uri = uriOf(parameters.URI, {TVR_DBG, "Null sized URI..returning"}, wrongArgument);
     const std::optional<TagTarget> target = tagTargetOf(uri);
     if (!target)
         MethodCall::end(noFile, wrongArgument);
@@ -115,8 +123,13 @@ std::uint32_t getConfigTable(const Instance* reference, TVRHBA_FCTagService_GetC
         MethodCall::end(noFile, {methodFailed});
     if (!target->isElsewhere)
         return 0;
-    const int status = call.withoutLock([&] { return uploadFileUsingCurl(uri, target->file); });
-    unlink(target->file.c_str()); // also unsent: the next request makes it anew
+    const int status = call.withoutLock(
+        [&]
+        {
+            const int sent = uploadFileUsingCurl(uri, target->file);
+            unlink(target->file.c_str()); // also unsent: the next request makes it anew
+            return sent;
+        });
     return status == 0 ? 0 : methodFailed;
 }
 

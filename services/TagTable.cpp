@@ -72,6 +72,7 @@ public:
         for (std::size_t tag = _rest.find('<'); tag != std::string_view::npos; tag = _rest.find('<'))
         {
             _rest.remove_prefix(tag + 1);
+            require(++_tags <= maximumTags); // also a comment, since the text behind it is a node
             if (take("!--"))
                 pass("-->");
             else if (take("![CDATA["))
@@ -89,6 +90,7 @@ private:
     static constexpr unsigned maximumDepth = 64;
     /// Six of a row, and room for what stands around them.
     static constexpr std::size_t maximumElements = 6 * maximumTagEntries + 1000;
+    static constexpr std::size_t maximumTags = 2 * maximumElements;
     static constexpr std::size_t maximumAttributes = 1000;
 
     static void require(bool condition)
@@ -159,6 +161,7 @@ private:
     std::string_view _rest;
     unsigned _depth = 0;
     std::size_t _elements = 0;
+    std::size_t _tags = 0;
     std::size_t _attributes = 0;
 };
 
@@ -190,9 +193,8 @@ std::optional<long> numberOf(const Node& node)
     return end == text + node.value_size() ? std::optional(number) : std::nullopt;
 }
 
-void readName(HBA_WWN& out, const Node& row, const char* name, const LogText& missing)
+void readName(HBA_WWN& out, const Node& node)
 {
-    const Node& node = childOf(row, name, missing);
     if (stringToWwn(out.wwn, String(node.value(), node.value_size())) != 0)
         MethodCall::end({TVR_DBG, "SetConfigTable::unable to convert string to hbaname "}, malformed);
 }
@@ -201,8 +203,10 @@ CPQFC_QosEntry entryOf(const Node& row)
 {
     constexpr LogText badTag = {TVR_DBG, "SetConfigTable:: malformed tag field "};
     CPQFC_QosEntry entry{};
-    readName(entry.src_wwpn, row, element::source, {TVR_DBG, "SetConfigTable::malformed src_wwpn field "});
-    readName(entry.tgt_wwpn, row, element::target, {TVR_DBG, "SetConfigTable::malformed tgt_wwpn field "});
+    const Node& source = childOf(row, element::source, {TVR_DBG, "SetConfigTable::malformed src_wwpn field "});
+    const Node& target = childOf(row, element::target, {TVR_DBG, "SetConfigTable::malformed tgt_wwpn field "});
+    readName(entry.src_wwpn, source);
+    readName(entry.tgt_wwpn, target);
     const std::optional<long> tag = numberOf(childOf(row, element::tag, badTag));
     if (!tag || *tag < 0 || *tag > UINT8_MAX)
         MethodCall::end(badTag, malformed);

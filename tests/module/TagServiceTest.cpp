@@ -128,7 +128,7 @@ TEST_F(TagService, RefusesWhatItIsNotCalledFor)
     {
         expect(host.callOnPort("SetConfigTable", headEnd, in), 0x1001,
                "[TVR_DBG] TVRHBA_FCTagService_Provider::Null sized URI");
-        expect(host.callOnPort("GetConfigTable", headEnd, in), 0x1001, "[TVR_DBG] Null sized URI..returning");
+        expect(host.callOnPort("GetConfigTable", headEnd, in), 0x80C8, "[TVR_DBG] Null sized URI..returning");
     }
     EXPECT_EQ(libraryCalls(), 0u);
 }

@@ -234,6 +234,12 @@ TEST(TagTable, OtherTextsAreRefusedBeforeTheyCost)
         repeated("<a\">", 100'000) + '"',                     // a quote that is none
         "<a" + repeated(" b=''", 100'000) + "/>",             // the memory
         repeated("<a/>", 500'000),                            //
+        "<a>" +
+            repeated("x<?"
+                     "?>",
+                     2'000'000) +
+            "</a>",                                           //
+        "<a>" + repeated("<![CDATA[]]>", 1'300'000) + "</a>", //
         std::string(maximumTagFile + 1, ' '),
         "<CruxConfig>&#xFFFFFFFFFF;</CruxConfig>",
     };
