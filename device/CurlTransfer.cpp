@@ -9,7 +9,9 @@
 #define CURL_DISABLE_DEPRECATION // CURLOPT_PUT
 #include <curl/curl.h>
 
+#include <csignal>
 #include <cstdio>
+#include <ctime>
 #include <dlfcn.h>
 #include <exception>
 #include <memory>
@@ -17,6 +19,7 @@
 #include <sys/stat.h>
 #include <type_traits>
 #include <unistd.h>
+#include <utility>
 
 namespace cimple
 {
@@ -47,6 +50,34 @@ constexpr auto setProtocols = static_cast<CURLoption>(181);         // CURLOPT_P
 
 /// Older libraries count the users of their global state without a lock.
 constinit std::mutex globalState;
+
+/// While it lives, a connection that its peer has closed is an error and no signal, which would end the server: told to
+/// leave signals alone, libcurl does not see to that itself.
+class NoPipeSignal
+{
+public:
+    NoPipeSignal()
+    {
+        sigemptyset(&_pipe);
+        sigaddset(&_pipe, SIGPIPE);
+        sigset_t pending;
+        _waits = sigpending(&pending) == 0 && sigismember(&pending, SIGPIPE) == 1;
+        pthread_sigmask(SIG_BLOCK, &_pipe, &_before);
+    }
+    ~NoPipeSignal()
+    {
+        constexpr timespec now{};
+        if (!_waits)
+            sigtimedwait(&_pipe, nullptr, &now);
+        pthread_sigmask(SIG_SETMASK, &_before, nullptr);
+    }
+    NoPipeSignal(const NoPipeSignal&) = delete;
+    NoPipeSignal& operator=(const NoPipeSignal&) = delete;
+
+private:
+    sigset_t _pipe, _before;
+    bool _waits; ///< one that is not of this transfer
+};
 
 /// libcurl, open, and its one transfer. At the end of its life both are given back, whatever came between.
 class Curl
@@ -87,6 +118,7 @@ private:
         return reinterpret_cast<Function*>(found);
     }
 
+    const NoPipeSignal _noSignal; // to the end of the connection
     const DynamicLoader& _loader = dynamicLoaderInUse();
     void* const _library;
     bool _globalIsUp = false;
@@ -164,8 +196,8 @@ Curl::~Curl()
         TVR_LOG(TVR_DBG, "UNABLE TO CLOSE DYNAMIC LIB");
 }
 
-/// What both directions set beyond what they transfer: certificates are not checked, and an answer that is a failure is
-/// one.
+/// What both directions set beyond what they transfer: certificates are not checked, and an answer that is a failure,
+/// or names another place, is one.
 bool setCommon(Curl& curl)
 {
     return curl.set(setProtocols, protocols, "Error Sending the CURLOPT_PROTOCOLS to the Curl library %d") &&
@@ -173,6 +205,8 @@ bool setCommon(Curl& curl)
            curl.set(CURLOPT_SSL_VERIFYHOST, 0L, "Error Sending the CURLOPT_SSL_VERIFYHOST to the Curl library %d") &&
            curl.set(CURLOPT_NOSIGNAL, 1L, "Error Sending the CURLOPT_NOSIGNAL to the Curl library %d") &&
            curl.set(CURLOPT_FAILONERROR, 1L, "Error Sending the CURLOPT_FAILONERROR to the Curl library %d") &&
+           curl.set(CURLOPT_FOLLOWLOCATION, 1L, "Error Sending the CURLOPT_FOLLOWLOCATION to the Curl library %d") &&
+           curl.set(CURLOPT_MAXREDIRS, 0L, "Error Sending the CURLOPT_MAXREDIRS to the Curl library %d") &&
            curl.set(CURLOPT_CONNECTTIMEOUT, connectSeconds,
                     "Error Sending the CURLOPT_CONNECTTIMEOUT to the Curl library %d");
 }
@@ -254,7 +288,7 @@ int download(const std::string& uri, std::string& file)
     }
     char errorText[CURL_ERROR_SIZE] = ""; // libcurl's for as long as it is open
     Curl curl(library);
-    const std::optional<std::string> name = lastPartOf(takeLogin(uri).uri);
+    std::optional<std::string> name = lastPartOf(takeLogin(uri).uri);
     if (!name)
     {
         TVR_LOG(TVR_ERR, "ERROR: Could not parse the URI to get the firmware file name");
@@ -277,7 +311,7 @@ int download(const std::string& uri, std::string& file)
     }
     if (!arriving.keep())
         return CURLE_WRITE_ERROR;
-    file = *name;
+    file = std::move(*name);
     return 0;
 }
 
