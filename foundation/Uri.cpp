@@ -47,7 +47,7 @@ std::string uriForLog(View uri)
 {
     const std::size_t at = uri.rfind('@');
     const std::size_t authority = authorityOf(uri);
-    const bool isPath = uri.starts_with('/') && uri.find("://") == View::npos;
+    const bool isPath = uri.starts_with('/') && !uri.starts_with("//") && uri.find("://") == View::npos;
     if (at == View::npos || at < authority || isPath)
         return std::string(uri);
     return std::string(uri.substr(0, authority)) + "***" + std::string(uri.substr(at));
