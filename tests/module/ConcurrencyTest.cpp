@@ -1,11 +1,14 @@
 // Many clients at once, while the cache is rebuilt under them.
+#include "tests/module/Changes.h"
 #include "tests/module/Clock.h"
+#include "tests/module/LibCurl.h"
 #include "tests/module/RefreshLines.h"
 #include "tests/module/Walk.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <atomic>
 #include <functional>
 #include <map>
@@ -144,6 +147,53 @@ TEST(Concurrency, FirstCallsOfAllClassesMakeOneAgent)
             EXPECT_EQ(cold[className], enumeration(className).ask(host.broker())) << className;
         }
     }
+    host.unload();
+}
+
+/// All changes at once on a cache that is rebuilt all the time, among clients that read what is changed.
+TEST(Concurrency, ChangesSucceedWhileTheCacheIsRebuilt)
+{
+    test_support::FileServer server;
+    Host host(changeableHost);
+    host.write("/etc/tavrin_fc_provider.conf", settings);
+    const std::filesystem::path before = std::filesystem::current_path();
+    std::filesystem::create_directory(host.root() / "work");
+    std::filesystem::create_directories(host.root() / "tmp");
+    std::filesystem::current_path(host.root() / "work");
+    addPlatform(host.broker());
+    setRealLibCurl("libcurl.so");
+    host.instancesOf("TVRHBA_LogicalDisk");
+    const std::vector<Change> changes = changesOf(host, server);
+    const std::vector<Request> readers = {enumeration("TVRHBA_FCPort"), enumeration("TVRHBA_Card"),
+                                          enumeration("TVRHBA_ProviderConfigSetting"),
+                                          enumeration("TVRHBA_SoftwareInstallationService")};
+    const std::vector<std::string> lanes = {"TVRHBA_DriverParams", "TVRHBA_DriverServiceElementSettingData",
+                                            "TVRHBA_DriverParameterAffectsFCPort"};
+    std::vector<std::vector<std::string>> expected;
+    for (const Request& reader : readers)
+        expected.push_back(reader.ask(host.broker()));
+
+    setClockStep(1min);
+    runClients(24,
+               [&](unsigned client)
+               {
+                   for (unsigned i = 0; i < 2 * changes.size(); i++)
+                   {
+                       const Change& change = changes[(client * 5 + i) % changes.size()];
+                       const std::string answer = change.ask(host.broker());
+                       if (change.name.find("lane") == std::string::npos) // another client may have made or deleted it
+                       {
+                           EXPECT_EQ(answer, "CIM_ERR_OK 0") << change.name;
+                       }
+                       const std::size_t reader = (client + i) % readers.size();
+                       EXPECT_EQ(readers[reader].ask(host.broker()), expected[reader]) << readers[reader].name;
+                       EXPECT_EQ(enumeration(lanes[i % lanes.size()]).ask(host.broker()).at(0), "CIM_ERR_OK");
+                   }
+               });
+    setClockStep(0us);
+    EXPECT_TRUE(std::filesystem::is_empty("."));
+    std::filesystem::current_path(before);
+    setLibCurl("");
     host.unload();
 }
 

@@ -1,9 +1,13 @@
 // A host on which something goes wrong: what is lost, what is served all the same, and what the log says.
+#include "tests/module/Changes.h"
+#include "tests/module/Clock.h"
 #include "tests/module/Host.h"
+#include "tests/module/LibCurl.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <ostream>
 
 using namespace module_test;
@@ -370,6 +374,55 @@ TEST(Faulty, LibraryThatLiesAboutEverythingIsServedAsFarAsItGoes)
     EXPECT_EQ(host.logged("[TVR_ERR] Failed to fetch information for port: ["), 255u);
     for (const std::string& name : host.broker().servedClasses())
         EXPECT_TRUE(host.enumerate(name).ok()) << name;
+    host.unload();
+}
+
+/// Whatever a library answers to a change, the module ends it, and is as before once the library is.
+TEST(Faults, OfEachFunctionEndTheChangesThatNeedIt)
+{
+    test_support::FileServer server;
+    setRealLibCurl("libcurl.so");
+    Host host(changeableHost);
+    const std::filesystem::path before = std::filesystem::current_path();
+    std::filesystem::create_directory(host.root() / "work");
+    std::filesystem::create_directories(host.root() / "tmp");
+    std::filesystem::current_path(host.root() / "work");
+    host.instancesOf("TVRHBA_LogicalDisk");
+    const std::vector<Change> changes = changesOf(host, server);
+    const auto ask = [&](bool succeeds)
+    {
+        removeLane(host.broker());
+        for (const Change& change : changes)
+        {
+            const std::string answer = change.ask(host.broker());
+            if (succeeds)
+            {
+                EXPECT_EQ(answer, "CIM_ERR_OK 0") << change.name;
+            }
+        }
+        host.awaitRefresh(host.logged("[TVR_DBG] PERF: ---Created DataFetch_Handler"));
+        for (const char* className : {"TVRHBA_FCPort", "TVRHBA_DriverParams", "TVRHBA_SoftwareIdentity"})
+            EXPECT_TRUE(host.enumerate(className).ok()) << className;
+        for (const auto& file : std::filesystem::directory_iterator("."))
+            std::filesystem::remove(file);
+    };
+    for (const char* function :
+         {"CPQFC_QoSGetConfig", "CPQFC_QoSSetConfig", "LRM_ChangeWWN", "LRM_DownloadFirmware", "LRM_GetDriverParams",
+          "LRM_GetHBAAttributes", "LRM_GetHBAFeatureList", "LRM_GetOASLunList", "LRM_GetWWNCapability", "LRM_ReadWWN",
+          "LRM_SetOASLunState", "LRM_SetPortEnabled", "LRM_VPList", "RM_GetLocalHBAInfo", "RM_GetNumberOfLocalAdapters",
+          "RM_ImportHBAFileA", "RM_StatusString"})
+        for (const char* fault : {R"("status": 97)", R"("hostile": "allOnes")", R"("hostile": "hugeCount")"})
+        {
+            SCOPED_TRACE(std::string(function) + " " + fault);
+            if (host.takesFault(R"({"function": ")" + std::string(function) + "\", " + fault + "}"))
+                ask(false);
+            host.clearFaults();
+        }
+    advanceClock(std::chrono::hours(24)); // what the faults left in the cache is outdated
+    host.instancesOf("TVRHBA_FCPort");
+    EXPECT_TRUE(host.awaitRefresh(host.logged("[TVR_DBG] PERF: ---Created DataFetch_Handler")));
+    ask(true);
+    std::filesystem::current_path(before);
     host.unload();
 }
 

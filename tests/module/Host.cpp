@@ -207,6 +207,16 @@ void Host::addFault(const std::string& row)
         throw std::runtime_error(error);
 }
 
+bool Host::takesFault(const std::string& row)
+{
+    return TVR_CONTROL(tvrsim_add_fault)(row.c_str(), nullptr, 0) != 0;
+}
+
+void Host::clearFaults()
+{
+    TVR_CONTROL(tvrsim_clear_faults)();
+}
+
 std::uint64_t Host::calls(const std::string& function) const
 {
     return TVR_CONTROL(tvrsim_call_count)(function.c_str());

@@ -63,6 +63,9 @@ public:
     void rememberState();
     std::string stateDifference() const;
     void addFault(const std::string& row);
+    /// The same for a row that the function may have no use for; false then.
+    bool takesFault(const std::string& row);
+    void clearFaults();
     std::uint64_t calls(const std::string& function) const;
     void setPortState(const char* wwpn, std::uint32_t state);
     /// One attribute of a port, of its statistics or of its adapter: {"name": value}, as in a scenario.

@@ -1,5 +1,7 @@
 // One allocation of the module fails, at any place of its life.
+#include "tests/module/Changes.h"
 #include "tests/module/Host.h"
+#include "tests/module/LibCurl.h"
 #include "tests/module/ModuleMemory.h"
 #include "tests/module/Process.h"
 #include "tests/module/RefreshLines.h"
@@ -70,6 +72,34 @@ std::size_t endWithout(std::size_t number)
     return counted;
 }
 
+/// The same with all that a client can change. What was refused then is done afterwards, with nothing in its way.
+std::size_t changeWithout(std::size_t number)
+{
+    test_support::FileServer server;
+    Host host(changeableHost);
+    const std::filesystem::path folder = host.root() / "work";
+    std::filesystem::create_directories(folder);
+    std::filesystem::create_directories(host.root() / "tmp");
+    std::filesystem::current_path(folder);
+    setRealLibCurl("libcurl.so");
+    host.instancesOf("TVRHBA_LogicalDisk"); // the fabric is known
+    const std::vector<Change> changes = changesOf(host, server);
+    EXPECT_TRUE(host.awaitLog(ended, host.logged(created)));
+    refuseAllocation(number);
+    for (const Change& change : changes)
+        change.ask(host.broker());
+    const std::size_t counted = allocationsOfModule();
+    EXPECT_TRUE(host.awaitLog(ended, host.logged(created)));
+    EXPECT_TRUE(std::filesystem::is_empty(folder));
+    EXPECT_FALSE(std::filesystem::exists(host.root() / "tmp" / "out.xml"));
+    removeLane(host.broker());
+    for (const Change& change : changes)
+        EXPECT_EQ(change.ask(host.broker()), "CIM_ERR_OK 0") << change.name;
+    std::filesystem::current_path("/");
+    host.unload();
+    return counted;
+}
+
 /// Each in a process of its own; one that hangs is ended.
 std::size_t inProcess(std::size_t (*life)(std::size_t number), std::size_t number, const std::string& countFile)
 {
@@ -88,19 +118,27 @@ std::size_t inProcess(std::size_t (*life)(std::size_t number), std::size_t numbe
 
 /// TVR_REFUSED_ALLOCATION=all refuses each in turn, which takes minutes, and a number that one alone; otherwise some of
 /// each part of the life are.
-TEST(Memory, OneRefusedAllocationNeitherHangsNorCorruptsNorLies)
+void refuseInTurn(std::size_t (*life)(std::size_t number))
 {
     const std::string countFile = (std::filesystem::temp_directory_path() / ("tvr-count-" + std::to_string(getpid())));
-    for (auto* life : {askWithout, endWithout})
-    {
-        const std::size_t all = inProcess(life, 0, countFile);
-        const std::string wanted = std::getenv("TVR_REFUSED_ALLOCATION") ? std::getenv("TVR_REFUSED_ALLOCATION") : "";
-        const std::size_t only = std::strtoul(wanted.c_str(), nullptr, 10);
-        const std::size_t step = wanted == "all" ? 1 : all / 40 + 1;
-        for (std::size_t number = only ? only : 1; number <= (only ? only : all); number += step)
-            inProcess(life, number, countFile);
-    }
+    const std::size_t all = inProcess(life, 0, countFile);
+    const std::string wanted = std::getenv("TVR_REFUSED_ALLOCATION") ? std::getenv("TVR_REFUSED_ALLOCATION") : "";
+    const std::size_t only = std::strtoul(wanted.c_str(), nullptr, 10);
+    const std::size_t step = wanted == "all" ? 1 : all / 40 + 1;
+    for (std::size_t number = only ? only : 1; number <= (only ? only : all); number += step)
+        inProcess(life, number, countFile);
     std::filesystem::remove(countFile);
+}
+
+TEST(Memory, OneRefusedAllocationNeitherHangsNorCorruptsNorLies)
+{
+    refuseInTurn(askWithout);
+    refuseInTurn(endWithout);
+}
+
+TEST(Memory, OneRefusedAllocationOfAChangeIsInNobodysWay)
+{
+    refuseInTurn(changeWithout);
 }
 
 } // namespace

@@ -1,0 +1,120 @@
+#include "tests/module/Changes.h"
+
+#include "simulator/FirmwareFile.h"
+#include "tests/module/Describe.h"
+
+namespace module_test
+{
+
+using broker::Value;
+
+const char* const changeableHost = R"({
+  "targets": [{"name": "t", "wwpn": "5063D20000000001", "units": [{"lun": 0}, {"lun": 3}]}],
+  "adapters": [
+    {"name": "A", "serialNumber": "S1", "model": "M", "tagging": {"on": true}, "driverParameters": [{"name": "p", "high": 100}],
+     "ports": [{"wwpn": "1000027A000000A0", "targets": ["t"],
+                "priorityLanes": [{"target": "t", "lun": 3}]}]}]})";
+
+namespace
+{
+
+const std::string lane = "Driver:1000027A000000A0:5063D20000000001:0:PrioLane";
+
+const char* const tagTable =
+    "<?xml version=\"1.0\"?><CruxConfig><theSystem><CruxVersion>1</CruxVersion><CreationDate>now</CreationDate>"
+    "<HostName>h</HostName><Adapter>a<Configuration><numberOfEntries>1</numberOfEntries><Row>"
+    "<src_wwpn>1000027A000000A0</src_wwpn><tgt_wwpn>5063D20000000001</tgt_wwpn><tag>9</tag></Row></Configuration>"
+    "</Adapter></theSystem></CruxConfig>";
+
+broker::Path laneAs(const std::string& name)
+{
+    return {"root/tavrin", "TVRHBA_DriverParams", {{"InstanceID", Value::string(name)}}};
+}
+
+Change method(const broker::Path& service, const std::string& name, const std::vector<broker::Property>& in)
+{
+    return {name, [=](broker::Broker& broker)
+            {
+                const broker::MethodReply reply = broker.invokeMethod(service, name, in);
+                const std::string status = broker::statusName(reply.status);
+                return reply.ok() ? status + " " + std::to_string(reply.returnValue.asUnsigned()) : status;
+            }};
+}
+
+Change change(const std::string& name, std::function<CMPIrc(broker::Broker&)> ask)
+{
+    return {name, [=](broker::Broker& broker) { return std::string(broker::statusName(ask(broker))) + " 0"; }};
+}
+
+Value list(CMPIType type, const Value::List& values)
+{
+    return Value::array(type, values);
+}
+
+} // namespace
+
+void removeLane(broker::Broker& broker)
+{
+    broker.deleteInstance(laneAs(lane));
+}
+
+std::string changeableFirmware()
+{
+    return tvrsim::firmwareText("M", "2.0", "program");
+}
+
+std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
+{
+    server.put("/uri.grp", changeableFirmware());
+    server.put("/table.xml", tagTable);
+    const auto pathOf = [&](const char* className) { return host.instancesOf(className).at(0).path; };
+    const broker::Path names = pathOf("TVRHBA_FCHBAWWNService"), boot = pathOf("TVRHBA_BootBIOSService"),
+                       software = pathOf("TVRHBA_SoftwareInstallationService"),
+                       parameters = pathOf("TVRHBA_FCHBADriverParamService"), tags = pathOf("TVRHBA_FCTagService");
+    const broker::Object setting = host.instancesOf("TVRHBA_ProviderConfigSetting").at(0);
+    const broker::Property target = {"Target", Value::reference(pathOf("TVRHBA_FCPort"))};
+    Value::List image;
+    for (const char byte : changeableFirmware())
+        image.push_back(Value::uint8(static_cast<std::uint8_t>(byte)));
+    return {
+        method(names, "GetWWNCapability", {target}),
+        method(names, "ReadWWN", {target, {"Type", Value::uint16(2)}}),
+        method(names, "ChangeWWN",
+               {target,
+                {"NewWWPN", Value::string("1000027A000000A0")},
+                {"NewWWNN", Value::string("2000027A000000A0")},
+                {"Type", Value::uint16(1)}}),
+        method(names, "RestoreWWN", {target, {"Type", Value::uint16(0)}}),
+        method(boot, "EnableBootBIOS", {target}),
+        method(boot, "DisableBootBIOS", {target}),
+        method(boot, "GetBootBIOSStatus", {target}),
+        method(software, "InstallFromByteStream",
+               {target,
+                {"Image", list(CMPI_uint8, image)},
+                {"InstallOptions", list(CMPI_uint16, {Value::uint16(32768)})},
+                {"InstallOptionsValues", list(CMPI_string, {Value::string("stream.grp")})}}),
+        method(software, "InstallFromURI", {target, {"URI", Value::string(server.uri("/uri.grp"))}}),
+        method(software, "SetPortEnabled", {target, {"PortEnabled", Value::uint32(1)}}),
+        method(software, "GetHBAFeatures", {target}),
+        method(parameters, "SetDriverParameter",
+               {target, {"strParam", Value::string("p")}, {"strValue", Value::string("7")}}),
+        change("create lane",
+               [](auto& broker) {
+                   return broker.createInstance({laneAs(lane), {{"InstanceID", Value::string(lane)}}}).status;
+               }),
+        change("delete lane", [](auto& broker) { return broker.deleteInstance(laneAs(lane)).status; }),
+        method(parameters, "DisableAllPrioLaneLuns",
+               {{"InitiatorWWPN", Value::string("1000027A000000A0")},
+                {"TargetWWPN", Value::string("5063D20000000001")},
+                {"Option", Value::uint16(0)}}),
+        change("modify setting", [setting](auto& broker)
+               { return broker.modifyInstance(changed(setting, "current", setting.get("current"))).status; }),
+        method(tags, "SetGlobalFlag", {target, {"State", Value::uint32(1)}}),
+        method(tags, "GetGlobalFlag", {target}),
+        method(tags, "SetConfigTable", {target, {"URI", Value::string(server.uri("/table.xml"))}}),
+        method(tags, "GetConfigTable", {target, {"URI", Value::string(server.uri("/out.xml", "joe:se%20cret@"))}}),
+        method(software, "ResetHBA", {target}),
+    };
+}
+
+} // namespace module_test
