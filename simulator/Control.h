@@ -51,8 +51,8 @@ extern "C"
 
     /// Remembers the state of the host as it is.
     TVRSIM_EXPORT void tvrsim_remember_host();
-    /// What differs from the state that was remembered, such as "port 10:00:02:7A:51:16:02:10"; empty if nothing does. Cut to
-    /// `size` bytes.
+    /// What differs from the state that was remembered, such as "port 10:00:02:7A:51:16:02:10"; empty if nothing does.
+    /// Cut to `size` bytes.
     TVRSIM_EXPORT void tvrsim_host_difference(char* text, std::size_t size);
 
     // Changes of the host. 0 if there is no such adapter or port.
