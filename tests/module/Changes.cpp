@@ -11,7 +11,7 @@ using broker::Value;
 const char* const changeableHost = R"({
   "targets": [{"name": "t", "wwpn": "5063D20000000001", "units": [{"lun": 0}, {"lun": 3}]}],
   "adapters": [
-    {"name": "A", "serialNumber": "S1", "model": "M", "tagging": {"on": true}, "driverParameters": [{"name": "p", "high": 100}],
+    {"name": "A", "serialNumber": "S1", "model": "M", "tagging": {"on": true}, "attributes": {"bootCodeEnabled": 1}, "driverParameters": [{"name": "p", "high": 100}],
      "ports": [{"wwpn": "1000027A000000A0", "targets": ["t"],
                 "priorityLanes": [{"target": "t", "lun": 3}]}]}]})";
 
