@@ -207,7 +207,8 @@ std::uint32_t installFromURI(const Instance* reference, FromURI& parameters)
     {
         TVR_LOG(TVR_DBG, "FC Firmware download completed for target %s Please reboot system to activate new firmware.",
                 installation.target.c_str());
-        UpdateFirmwareOnFlash(agent, wwpn);
+        // Without memory for it, the refresh that is due shows the new version.
+        unlessOutOfMemory([&] { return UpdateFirmwareOnFlash(agent, wwpn), true; });
         removeInstalled(installation.file);
     };
     return install(call, {*service, target, file, options, done});

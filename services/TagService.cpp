@@ -46,9 +46,10 @@ const TVRHBA_FCPort& targetOf(MethodCall& call, const Instance* reference, const
 /// The name of the adapter that a port is of.
 std::string adapterName(MethodCall& call, const TVRHBA_FCPort& port)
 {
-    for (const Port* known : call.agent().m_pData->ports)
-        if (port.DeviceID.value.view() == known->name)
-            return known->getAdapter()->getName();
+    if (const auto& data = call.agent().m_pData) // none once the process ends
+        for (const Port* known : data->ports)
+            if (port.DeviceID.value.view() == known->name)
+                return known->getAdapter()->getName();
     MethodCall::end(texts.unknownTarget, texts.ofTarget);
 }
 
