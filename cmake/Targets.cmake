@@ -27,5 +27,5 @@ function(tvr_test name)
     add_dependencies(${name} ${arg_DEPENDS})
   endif()
   gtest_discover_tests(${name} TEST_PREFIX "${name}." DISCOVERY_TIMEOUT 60
-    PROPERTIES LABELS "${arg_LABELS}" ENVIRONMENT "${arg_ENVIRONMENT}" TIMEOUT 120 ${arg_PROPERTIES})
+    PROPERTIES LABELS "${arg_LABELS}" ENVIRONMENT "${arg_ENVIRONMENT}" TIMEOUT 300 ${arg_PROPERTIES})
 endfunction()
