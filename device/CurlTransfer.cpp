@@ -129,6 +129,7 @@ private:
 
 void Curl::logVersion() const
 {
+    const std::lock_guard lock(globalState); // the text is one for all threads
     if (auto* const version = find<decltype(curl_version)>("curl_version"))
         if (const char* text = version())
             TVR_LOG(TVR_DBG, "Curl version = %s", text);
