@@ -125,7 +125,6 @@ public:
 private:
     static ProviderAgent& enter(const LogText& entry);
 
-    ProviderAgent::Hold _hold; ///< before all locks; outlives the guard, which unlocks a mutex of the agent
     ProviderAgent& _agent;
     MethodGuard _guard;
 };

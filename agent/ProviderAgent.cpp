@@ -100,25 +100,15 @@ void ProviderAgent::releaseRef()
     releaseRefLocked();
 }
 
-ProviderAgent::Hold::Hold()
-{
-    Auto_Mutex lock(*singletonMutex);
-    references++;
-}
-
-ProviderAgent::Hold::~Hold()
-{
-    Auto_Mutex lock(*singletonMutex);
-    releaseRefLocked();
-}
-
 void ProviderAgent::releaseRefLocked()
 {
     if (--references + failedLoads != 0)
         return;
-    if (singleton.load() && singleton.load()->m_process != getpid())
+    ProviderAgent* agent = singleton.load();
+    // A thread of the agent, here at the end of an up-call into the module, cannot wait for its own end.
+    if (agent && (agent->m_process != getpid() || agent->isOnRefreshThread()))
         return;
-    delete singleton.load();
+    delete agent;
     singleton = nullptr;
     references = 0;
     failedLoads = 0;
@@ -200,6 +190,12 @@ void ProviderAgent::finish()
         TVR_LOG(TVR_ERR, "Error in ProviderAgent unload. Just continue");
     }
     finishLogging();
+}
+
+bool ProviderAgent::isOnRefreshThread()
+{
+    Auto_Mutex lock(m_ThreadMutex);
+    return m_bThreadRunning && Thread::self() == m_dataFetchThread;
 }
 
 /// False on the refresh's own thread, where a library of the hardware or the resolver called exit().

@@ -64,16 +64,6 @@ public:
     static bool join();
     /// Deletes the agent when as many references came back as loads were made; that of a parent process stays.
     static void releaseRef();
-    /// Keeps the agent beyond its last provider. To be made without a lock of the agent.
-    class Hold
-    {
-    public:
-        Hold();
-        ~Hold();
-        Hold(const Hold&) = delete;
-        Hold& operator=(const Hold&) = delete;
-    };
-
     /// The process ends, or has ended, what the agent stands on: data, maps and libraries.
     bool hasEnded() const { return m_bFinished; }
 
@@ -153,6 +143,7 @@ private:
     static ProviderAgent* makeLocked();
     static void addRefLocked();
     static void releaseRefLocked();
+    bool isOnRefreshThread();
 
     void start();
     void readSettings();

@@ -48,12 +48,15 @@ CMPI_Adapter::CMPI_Adapter(const Registration* reg, const CMPIBroker* mb, const 
     const Pushed_Context pushed(thread_context);
     fill_static_data(provider_name);
     // The block knows the adapter already: an exception must not take it away again.
+    load_tried = true;
     shielded(0, [&] { return call(OP_LOAD, provider); });
     shielded(0, [&] { return call(OP_GET_META_CLASS, &meta_class); });
 }
 
 CMPI_Adapter::~CMPI_Adapter()
 {
+    if (load_tried)
+        shielded(0, [&] { return call(OP_UNLOAD, provider); });
     shielded(0, [&] { return call(OP_DESTROY_PROVIDER, provider); });
 }
 
@@ -122,7 +125,7 @@ const Meta_Class* CMPI_Adapter::find_class(const CMPIObjectPath* path) const
 namespace
 {
 
-/// Takes the adapter out of its block; it dies with its last user.
+/// Takes the adapter out of its block; it unloads and dies with its last user, which may be a request in flight.
 void retire(Static_Adapter_Data* data)
 {
     std::unique_ptr<CMPI_Adapter> last;
@@ -232,7 +235,6 @@ Cleanup_Answer count_down(CMPI_Adapter& adapter, bool terminating)
         return {CMPI_RC_DO_NOT_UNLOAD, "cleanup do not unload"};
     if (adapter.load_count == 1)
     {
-        adapter.call(OP_UNLOAD, adapter.provider);
         retire(adapter.static_data);
         return {CMPI_RC_OK, "cleanup unload"};
     }
@@ -256,7 +258,7 @@ static CMPIrc clean_up_behind_gate(Static_Adapter_Data* data, const CMPIContext*
     const Cleanup_Answer answer = shielded(Cleanup_Answer{CMPI_RC_ERR_FAILED, cmpi_status_name(CMPI_RC_ERR_FAILED)},
                                            [&] { return count_down(**adapter, terminating); });
     thread_context.adapter = nullptr;
-    adapter.reset(); // a retired provider is destroyed here, while the thread still has its context
+    adapter.reset(); // without requests in flight the provider unloads here, while the thread still has its context
     RUNTIME_LOG(LOG_DBG, "return: %s(): %s", "cleanup", answer.text);
     return answer.rc;
 }

@@ -89,7 +89,7 @@ public:
     /// Creates and loads the provider, and fills the static block on the way.
     CMPI_Adapter(const Registration* registration, const CMPIBroker* broker, const CMPIContext* context,
                  Static_Adapter_Data* static_data, const char* provider_name, const Module_Info* module = nullptr);
-    /// Destroys the provider.
+    /// Unloads and destroys the provider.
     ~CMPI_Adapter();
     CMPI_Adapter(const CMPI_Adapter&) = delete;
     CMPI_Adapter& operator=(const CMPI_Adapter&) = delete;
@@ -100,6 +100,7 @@ public:
     std::atomic<const CMPIBroker*> broker; ///< the latest: one that closed the library and opened it again has another
     Static_Adapter_Data* static_data;
     int load_count = 1;                   ///< behind the gate
+    bool load_tried = false;
     std::atomic<bool> allow_unload{true}; ///< provider threads may write it
     Array<Indication_Filter> filters;     ///< behind the block's guard
     const Meta_Class* meta_class = nullptr;

@@ -108,7 +108,8 @@ CMPIStatus operate(const MI* mi, const CMPIContext* context, const Traced_Operat
         shielded(CMPI_RC_ERR_FAILED, [&] { return run_in_frame(*adapter, context, operation, checked); }));
 }
 
-/// The cleanup of all four kinds: it counts down, and with the last of them unloads and destroys.
+/// The cleanup of all four kinds: it counts down, and with the last of them the adapter ends, at once or with the last
+/// request in flight.
 CMPIrc clean_up(Static_Adapter_Data* data, const CMPIContext* context, bool terminating);
 
 template <class MI> CMPIStatus cleanup(MI* mi, const CMPIContext* context, CMPIBoolean terminating)

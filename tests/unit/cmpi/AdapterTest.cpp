@@ -98,6 +98,22 @@ TEST_F(Adapter, lives_from_the_first_factory_call_to_the_last_cleanup)
     EXPECT_EQ(provider.count(OP_LOAD), 2);
 }
 
+TEST_F(Adapter, unloads_behind_the_last_request_in_flight)
+{
+    auto* method = provider.make<CMPIMethodMI>(broker, 'M');
+    CMPIArgs* args = broker.args();
+    provider.method = [&](Instance*)
+    {
+        EXPECT_EQ(mi->ft->cleanup(mi, broker.context(), 0).rc, CMPI_RC_OK);
+        EXPECT_EQ(method->ft->cleanup(method, broker.context(), 0).rc, CMPI_RC_OK);
+        EXPECT_EQ(provider.data.magic, 0xDDDDDDDDu);
+        EXPECT_EQ(provider.count(OP_UNLOAD), 0);
+    };
+    method->ft->invokeMethod(method, broker.context(), broker.result(results), path("d0"), "Reset", args, args);
+    for (Operation once : {OP_UNLOAD, OP_DESTROY_PROVIDER})
+        EXPECT_EQ(provider.count(once), 1) << once;
+}
+
 TEST_F(Adapter, stays_while_the_provider_forbids_unloading)
 {
     auto* method = provider.make<CMPIMethodMI>(broker, 'M');
