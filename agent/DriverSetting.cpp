@@ -1,6 +1,7 @@
 #include "agent/DriverSetting.h"
 
 #include "agent/Build.h"
+#include "foundation/Text.h"
 #include "schema/TVRHBA_DriverParamAffectsVirtualFCPort.h"
 #include "schema/TVRHBA_DriverParameterAffectsFCPort.h"
 #include "schema/TVRHBA_DriverParams.h"
@@ -9,9 +10,6 @@
 #include "schema/TVRHBA_FCPort.h"
 #include "schema/TVRHBA_VPortHostedDependency.h"
 #include "schema/TVRHBA_VirtualFCPort.h"
-
-#include <algorithm>
-#include <cctype>
 
 namespace cimple
 {
@@ -46,9 +44,7 @@ Ref<TVRHBA_DriverParams> makeLane(const Lane& lane)
 
 String settingDeviceId(std::string_view wwpn)
 {
-    std::string text(wwpn);
-    std::ranges::transform(text, text.begin(), [](unsigned char c) { return std::tolower(c); });
-    return text;
+    return lowerCase(wwpn);
 }
 
 TVRHBA_DriverParams* insertDriverSetting(ProviderAgent& agent, const Ref<TVRHBA_DriverParams>& made,

@@ -5,27 +5,27 @@
 namespace cimple
 {
 
+namespace
+{
+
+/// `name` is that of the stage's mutex in the log.
+void awaitStage(const RefreshStage& stage, const char* name)
+{
+    Auto_Mutex lock(stage.mutex);
+    if (stage.ready)
+        return;
+    TVR_LOG(TVR_DBG, "PERF: Waiting for %s", name);
+    stage.waitIfNotReady();
+    TVR_LOG(TVR_DBG, "PERF: Woken up from wait for %s", name);
+}
+
+} // namespace
+
 MethodGuard::Ready::Ready(ProviderAgent& agent)
 {
     agent.BuildCimpleInfo();
-    {
-        Auto_Mutex lock(agent.m_AdapterDataReadyMutex);
-        if (!agent.m_bIsAdapterDataReady)
-        {
-            TVR_LOG(TVR_DBG, "PERF: Waiting for m_AdapterDataReadyMutex");
-            agent.adapterData().waitIfNotReady();
-            TVR_LOG(TVR_DBG, "PERF: Woken up from wait for m_AdapterDataReadyMutex");
-        }
-    }
-    {
-        Auto_Mutex lock(agent.m_AdapterMapsReadyMutex);
-        if (!agent.m_bAdapterMapsReady)
-        {
-            TVR_LOG(TVR_DBG, "PERF: Waiting for m_AdapterMapsReadyMutex");
-            agent.adapterMaps().waitIfNotReady();
-            TVR_LOG(TVR_DBG, "PERF: Woken up from wait for m_AdapterMapsReadyMutex");
-        }
-    }
+    awaitStage(agent.adapterData(), "m_AdapterDataReadyMutex");
+    awaitStage(agent.adapterMaps(), "m_AdapterMapsReadyMutex");
 }
 
 MethodGuard::MethodGuard(ProviderAgent& agent) : _ready(agent), _dataLock(agent.m_DataMutex)

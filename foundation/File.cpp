@@ -71,9 +71,15 @@ File_Descriptor openForWriting(const char* path, WriteMode mode)
     return open_regular(place.name.c_str(), flags, newFile, place.folder.get());
 }
 
+bool isPlainFileName(std::string_view name)
+{
+    return !name.empty() && name != "." && name != ".." &&
+           name.find_first_of(std::string_view("/\0", 2)) == std::string_view::npos;
+}
+
 File_Descriptor createNamedFile(const std::string& name)
 {
-    if (name.empty() || name == "." || name == ".." || name.find_first_of(std::string_view("/\0", 2)) != name.npos)
+    if (!isPlainFileName(name))
     {
         errno = EINVAL;
         return File_Descriptor();

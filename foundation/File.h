@@ -22,6 +22,9 @@ enum class WriteMode
 /// a symbolic link is refused.
 File_Descriptor openForWriting(const char* path, WriteMode mode);
 
+/// Whether a name from a client names a file of a folder: not empty, no folder in it, and neither of the dot entries.
+bool isPlainFileName(std::string_view name);
+
 /// Makes a file for what a client sends or asks for, in the current directory and for this user alone. None with errno
 /// where the name has a folder in it or is none, or where anything stands under it, a link included.
 File_Descriptor createNamedFile(const std::string& name);

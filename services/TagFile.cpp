@@ -4,6 +4,7 @@
 #include "device/CurlTransfer.h"
 #include "foundation/File.h"
 #include "foundation/FilePaths.h"
+#include "foundation/Text.h"
 #include "foundation/Uri.h"
 #include "services/TagTable.h"
 
@@ -77,9 +78,8 @@ constexpr std::string_view sendingSchemes[] = {"ftp", "http", "https", "tftp"};
 /// A name that might end a login is none: it would be logged.
 bool isName(const std::string& name)
 {
-    return !name.empty() && name != "." && name != ".." &&
-           std::none_of(name.begin(), name.end(),
-                        [](char c) { return c == '/' || c == '@' || std::iscntrl(static_cast<unsigned char>(c)); });
+    return isPlainFileName(name) &&
+           std::ranges::none_of(name, [](unsigned char c) { return c == '@' || std::iscntrl(c); });
 }
 
 /// The part behind the last slash of the path of a URI; empty where it has no path. All before the last "@" is taken
@@ -107,9 +107,8 @@ std::optional<TagTarget> tagTargetOf(const std::string& uri)
     const std::size_t end = uri.find(schemeEnd);
     if (end == std::string::npos)
         return inFolder(uri, false);
-    std::string scheme = uri.substr(0, end);
-    std::transform(scheme.begin(), scheme.end(), scheme.begin(), [](unsigned char c) { return std::tolower(c); });
-    if (std::find(std::begin(sendingSchemes), std::end(sendingSchemes), scheme) != std::end(sendingSchemes))
+    const std::string scheme = lowerCase(std::string_view(uri).substr(0, end));
+    if (std::ranges::find(sendingSchemes, scheme) != std::end(sendingSchemes))
         return inFolder(lastPart(uri.substr(end + schemeEnd.size())), true);
     const std::string path = localPathOf(uri);
     const bool isFileOfFolder = uri.starts_with("file://") && path.starts_with(folder + '/');

@@ -2,10 +2,11 @@
 
 #include "agent/LogText.h"
 #include "device/Bindings.h"
+#include "device/TVR_MethodWrapper.h"
+#include "foundation/Text.h"
 #include "runtime/log/Shielded.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <cstring>
 #include <memory>
 #include <new>
@@ -258,11 +259,7 @@ void logRead(std::uint32_t type, const RM_WwnNames& names)
 
 std::string lowerCaseText(const HBA_WWN& wwn)
 {
-    const HBA_UINT8* b = wwn.wwn;
-    char text[24];
-    std::snprintf(text, sizeof text, "%02x:%02x:%02x:%02x:%02x:%02x:%02x:%02x", b[0], b[1], b[2], b[3], b[4], b[5],
-                  b[6], b[7]);
-    return text;
+    return lowerCase(TVR_MethodWrapper::hbaNameToString(wwn));
 }
 
 } // namespace

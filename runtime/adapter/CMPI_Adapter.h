@@ -99,7 +99,7 @@ public:
     void* provider = nullptr;
     std::atomic<const CMPIBroker*> broker; ///< the latest: one that closed the library and opened it again has another
     Static_Adapter_Data* static_data;
-    int load_count = 1;                   ///< behind the gate
+    int load_count = 1; ///< behind the gate
     bool load_tried = false;
     std::atomic<bool> allow_unload{true}; ///< provider threads may write it
     Array<Indication_Filter> filters;     ///< behind the block's guard
