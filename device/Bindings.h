@@ -97,6 +97,16 @@ inline constexpr Binding<entryRow("LRM_VpScsiInquiry"), RM_VpScsiInquiry_t> LRM_
 inline constexpr Binding<entryRow("LRM_VpScsiReadCapacity"), RM_VpScsiReadCapacity_t> LRM_VpScsiReadCapacity;
 inline constexpr Binding<entryRow("LRM_VpScsiReportLUNs"), RM_VpScsiReportLUNs_t> LRM_VpScsiReportLUNs;
 
+inline constexpr Binding<entryRow("LRM_DiagCancelDiagnostic"), RM_DiagCancelDiagnostic_t> LRM_DiagCancelDiagnostic;
+inline constexpr Binding<entryRow("LRM_DiagDPortTest"), RM_DiagDPortTest_t> LRM_DiagDPortTest;
+inline constexpr Binding<entryRow("LRM_DiagEchoTestV2"), RM_DiagEchoTestV2_t> LRM_DiagEchoTestV2;
+inline constexpr Binding<entryRow("LRM_DiagGetResults"), RM_DiagGetResults_t> LRM_DiagGetResults;
+inline constexpr Binding<entryRow("LRM_DiagGetResultsDPort"), RM_DiagGetResultsDPort_t> LRM_DiagGetResultsDPort;
+inline constexpr Binding<entryRow("LRM_DiagLoopBackTestV3"), RM_DiagLoopBackTestV3_t> LRM_DiagLoopBackTestV3;
+inline constexpr Binding<entryRow("LRM_DiagPciLoopBackTestV2"), RM_DiagPciLoopBackTestV2_t> LRM_DiagPciLoopBackTestV2;
+inline constexpr Binding<entryRow("LRM_DiagRunPOST"), RM_DiagRunPOST_t> LRM_DiagRunPOST;
+inline constexpr Binding<entryRow("LRM_GetFcpTargetMapping"), RM_GetFcpTargetMapping_t> LRM_GetFcpTargetMapping;
+
 inline constexpr Binding<entryRow("RM_GetAttributeValue"), RM_GetAttributeValue_t> RM_GetAttributeValue;
 inline constexpr Binding<entryRow("RM_GetLocalHBAInfo"), RM_GetLocalHBAInfo_t> RM_GetLocalHBAInfo;
 inline constexpr Binding<entryRow("RM_GetNumberOfLocalAdapters"), RM_GetNumberOfLocalAdapters_t>

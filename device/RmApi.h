@@ -25,7 +25,11 @@ enum RM_StatusCode : std::int32_t
     RM_ERROR_MORE_DATA = 7,
     RM_ERROR_NO_MEMORY = 8,
     RM_ERROR_CHECK_CONDITION = 9, ///< a SCSI command ended with sense data, as in the HBA API
+    RM_ERROR_NO_SFP = 13,
+    RM_ERROR_TEST_RUNNING = 60,   ///< a test has not finished; its record is filled all the same
+    RM_ERROR_TOO_MANY_TESTS = 62, ///< no room for another test beside those that run
     RM_ERROR_DIAGNOSTICS_NOT_AVAILABLE = 63,
+    RM_ERROR_ADAPTER_BUSY = 64, ///< also for a second test of a port
     RM_ERROR_WWN_NOT_SUPPORTED = 89,
     RM_ERROR_DUPLICATE_WWN = 91,
     RM_ERROR_WWN_NOT_AVAILABLE = 92,
@@ -33,9 +37,14 @@ enum RM_StatusCode : std::int32_t
     RM_ERROR_MAILBOX_FAILED = 148,
     RM_ERROR_MAILBOX_TIMEOUT = 149,
     RM_ERROR_MAILBOX_BUSY = 150,
+    RM_ERROR_PORT_NOT_SUPPORTED = 190,
     RM_ERROR_BUFFER_TOO_SMALL = 191, ///< RM_ERROR_MORE_DATA in the words of the driver parameter calls
-    RM_ERROR_NO_RESET = 247,         ///< a download whose firmware no reset would activate
-    RM_ERROR_FIRMWARE_LACKS = 251,   ///< the firmware of the adapter does not have the function
+    RM_ERROR_DPORT_SWITCH = 204,     ///< the switch cannot test the link, or is not set up for it
+    RM_ERROR_NO_CABLE = 212,
+    RM_ERROR_NO_RESET = 247,       ///< a download whose firmware no reset would activate
+    RM_ERROR_HARDWARE_LACKS = 248, ///< the hardware of the adapter does not have the function
+    RM_ERROR_FIRMWARE_LACKS = 251, ///< the firmware of the adapter does not have the function
+    RM_ERROR_PORT_DISABLED = 253,
 };
 
 /// Room that the program offers for each kind of attributes, in bytes.
@@ -43,6 +52,7 @@ enum RM_BufferSize : std::uint32_t
 {
     RM_HBA_ATTRIBUTES_SIZE = 2864,
     RM_PORT_ATTRIBUTES_SIZE = 2048,
+    RM_DIAG_PORT_ATTRIBUTES_SIZE = 4096, ///< of the same before a test
     RM_PORT_STATISTICS_SIZE = 512,
     RM_SERVER_ATTRIBUTES_SIZE = 784,
 };
@@ -88,7 +98,7 @@ enum RM_Attribute : std::uint32_t
 
     // RM_GetPortAttributes
     RM_PA_PORT_TYPE = 0x305,   // number, the HBA API's port type
-    RM_PA_LINK_STATE = 0x306,  // number; 22 is a disabled port
+    RM_PA_LINK_STATE = 0x306,  // number; RM_LINK_DISABLED is a disabled port
     RM_PA_FABRIC_NAME = 0x30f, // 8 bytes, all zero without a fabric
     RM_PA_PORT_STATE = 0x322,  // number, physical port state
     RM_PA_FEC_STATE = 0x360,   // number
@@ -314,7 +324,7 @@ extern "C"
     };
     static_assert(sizeof(RM_WwnNames) == 24);
 
-    /// `type` is an RM_WwnType.
+    /// `type` is an RM_WwnType. Where no names are configured, those in force are read as of RM_WWN_KIND_NONE.
     typedef RM_STATUS RM_ReadWWN_t(HBA_WWN wwpn, std::uint32_t type, RM_WwnNames* names);
 
     // Firmware, boot code and the port as a whole.
@@ -540,6 +550,162 @@ extern "C"
     /// that is to be served with priority, else 0.
     typedef RM_STATUS RM_SetOASLunState_t(HBA_WWN wwpn, HBA_WWN target, HBA_WWN vport, std::int32_t lun,
                                           std::uint32_t state, std::uint32_t option);
+
+    // Diagnostics. A call that starts a test gives it a handle, by which it is asked about and cancelled. Handles are
+    // not 0.
+
+    enum RM_LinkState : std::uint32_t
+    {
+        RM_LINK_DISABLED = 22,
+    };
+
+    enum RM_LoopbackType : std::uint32_t
+    {
+        RM_LOOPBACK_EXTERNAL = 0, ///< through a plug in the place of the cable
+        RM_LOOPBACK_INTERNAL = 1,
+    };
+
+    /// State of a test. Any other is that of a test that has ended in an unknown way.
+    enum RM_DiagState : std::uint32_t
+    {
+        RM_DIAG_STATE_STARTED = 1,
+        RM_DIAG_STATE_RUNNING = 2,
+        RM_DIAG_STATE_CANCELLED = 5,
+        RM_DIAG_STATE_FINISHED = 6,
+    };
+
+    /// What a test came to.
+    enum RM_DiagResult : std::uint32_t
+    {
+        RM_DIAG_RESULT_SUCCESS = 0,
+        RM_DIAG_RESULT_ERROR = 1,
+        RM_DIAG_RESULT_LINK_DOWN = 2,
+        RM_DIAG_RESULT_TARGET_UNREACHABLE = 10,
+    };
+
+    struct RM_DiagResults
+    {
+        std::uint32_t reserved0;
+        std::uint32_t state; ///< an RM_DiagState
+        std::uint32_t reserved2;
+        std::uint32_t cyclesCompleted; ///< those that failed included
+        std::uint32_t executionTime;
+        std::uint32_t result; ///< an RM_DiagResult
+        std::uint32_t reserved6;
+        std::uint32_t cyclesFailed;
+        std::uint32_t reserved8[4];
+    };
+    static_assert(sizeof(RM_DiagResults) == 48);
+    static_assert(offsetof(RM_DiagResults, state) == 4 && offsetof(RM_DiagResults, cyclesCompleted) == 12);
+    static_assert(offsetof(RM_DiagResults, executionTime) == 16 && offsetof(RM_DiagResults, result) == 20);
+    static_assert(offsetof(RM_DiagResults, cyclesFailed) == 28);
+
+    /// `pattern` is a text of hexadecimal digits, `reserved` is 0, `haltOnError` is 0 or 1.
+    typedef RM_STATUS RM_DiagEchoTestV2_t(HBA_WWN wwpn, HBA_WWN target, std::uint32_t cycles, std::uint32_t haltOnError,
+                                          std::uint32_t* handle, std::uint32_t reserved, const char* pattern);
+    /// `type` is an RM_LoopbackType.
+    typedef RM_STATUS RM_DiagLoopBackTestV3_t(HBA_WWN wwpn, std::uint32_t type, std::uint32_t cycles,
+                                              std::uint32_t haltOnError, std::uint32_t* handle, std::uint32_t reserved,
+                                              const char* pattern);
+    typedef RM_STATUS RM_DiagPciLoopBackTestV2_t(HBA_WWN wwpn, std::uint32_t cycles, std::uint32_t haltOnError,
+                                                 std::uint32_t* handle, std::uint32_t reserved, const char* pattern);
+    typedef RM_STATUS RM_DiagRunPOST_t(HBA_WWN wwpn, std::uint32_t* handle);
+    /// RM_ERROR_TEST_RUNNING or RM_OK for a test that runs.
+    typedef RM_STATUS RM_DiagGetResults_t(HBA_WWN wwpn, std::uint32_t handle, RM_DiagResults* results);
+    /// For every test. A test that is cancelled ends some time later.
+    typedef RM_STATUS RM_DiagCancelDiagnostic_t(HBA_WWN wwpn, std::uint32_t handle);
+
+    /// State of a link test. Any other is that of a test that has finished.
+    enum RM_DPortState : std::uint32_t
+    {
+        RM_DPORT_STATE_RUNNING = 4,
+        RM_DPORT_STATE_CANCELLED = 5,
+        RM_DPORT_STATE_FINISHED = 6,
+    };
+
+    enum RM_DPortPhaseId : std::uint8_t
+    {
+        RM_DPORT_ELECTRICAL_LOOPBACK = 210,
+        RM_DPORT_OPTICAL_LOOPBACK = 211,
+        RM_DPORT_REVERSE_OPTICAL_LOOPBACK = 212,
+        RM_DPORT_LINK_TRAFFIC = 213,
+        RM_DPORT_REVERSE_LINK_TRAFFIC = 214,
+    };
+
+    /// Of a phase; of a whole test 0 is the only one that is good.
+    enum RM_DPortResult : std::uint8_t
+    {
+        RM_DPORT_PASSED = 0,
+        RM_DPORT_SKIPPED = 1,
+        RM_DPORT_FAILED = 2,
+        RM_DPORT_STOPPED = 3,
+    };
+
+    enum RM_DPortPhaseFlag : std::uint8_t
+    {
+        RM_DPORT_HAS_ERRORS = 1, ///< the phase holds error masks and no latency
+    };
+
+    struct RM_DPortPhase
+    {
+        std::uint8_t result; ///< an RM_DPortResult
+        std::uint8_t id;     ///< an RM_DPortPhaseId
+        std::uint8_t flags;  ///< RM_DPortPhaseFlag
+        std::uint8_t reserved;
+        std::uint32_t latencyOrLocalErrors; ///< which of them the flags say
+        std::uint32_t remoteErrors;
+    };
+    static_assert(sizeof(RM_DPortPhase) == 12 && offsetof(RM_DPortPhase, latencyOrLocalErrors) == 4);
+
+    enum
+    {
+        RM_MAX_DPORT_PHASES = 37,
+    };
+
+    struct RM_DPortResults
+    {
+        std::uint32_t reserved0;
+        std::uint32_t state; ///< an RM_DPortState
+        std::uint32_t reserved8[3];
+        std::uint32_t diagnosticStatus; ///< 0 if the test itself ran as it should
+        std::uint32_t reserved24[6];
+        std::uint8_t testResult; ///< 0 if the link passed
+        std::uint8_t phaseCount; ///< may be above RM_MAX_DPORT_PHASES
+        std::uint16_t reserved50;
+        std::uint32_t roundTripLatency;
+        std::uint32_t cableLength;
+        std::uint16_t frameSize;
+        std::uint16_t buffersRequired;
+        RM_DPortPhase phases[RM_MAX_DPORT_PHASES];
+        std::uint32_t reserved508;
+    };
+    static_assert(sizeof(RM_DPortResults) == 512);
+    static_assert(offsetof(RM_DPortResults, state) == 4 && offsetof(RM_DPortResults, diagnosticStatus) == 20);
+    static_assert(offsetof(RM_DPortResults, testResult) == 48 && offsetof(RM_DPortResults, phaseCount) == 49);
+    static_assert(offsetof(RM_DPortResults, roundTripLatency) == 52 && offsetof(RM_DPortResults, cableLength) == 56);
+    static_assert(offsetof(RM_DPortResults, frameSize) == 60 && offsetof(RM_DPortResults, buffersRequired) == 62);
+    static_assert(offsetof(RM_DPortResults, phases) == 64);
+
+    /// Tests the link with the help of the switch; `reserved` is 0.
+    typedef RM_STATUS RM_DiagDPortTest_t(HBA_WWN wwpn, std::uint32_t reserved, std::uint32_t* handle);
+    /// As RM_DiagGetResults.
+    typedef RM_STATUS RM_DiagGetResultsDPort_t(HBA_WWN wwpn, std::uint32_t handle, RM_DPortResults* results);
+
+    /// A target that a port sees. The library keeps the rest of the layout to itself.
+    struct RM_FcpMapping
+    {
+        HBA_WWN wwpn;
+        std::uint8_t reserved[304];
+    };
+
+    struct RM_FcpTargetMapping
+    {
+        std::uint32_t count;
+        RM_FcpMapping entry[1];
+    };
+    static_assert(sizeof(RM_FcpTargetMapping) == 316 && offsetof(RM_FcpTargetMapping, entry) == 4);
+
+    typedef RM_STATUS RM_GetFcpTargetMapping_t(HBA_WWN wwpn, RM_FcpTargetMapping* mapping);
 
     // Frame tagging, by adapters that are named as in the HBA API.
 

@@ -15,8 +15,6 @@ namespace tvrsim
 namespace
 {
 
-constexpr std::uint32_t disabledLink = 22;
-
 /// Takes a line off the text; nothing if it does not begin with `name`.
 std::optional<std::string> takeLine(std::string_view& text, std::string_view name)
 {
@@ -66,7 +64,7 @@ void disable(Port& port)
     if (const Attribute* link = find(port.attributes, RM_PA_LINK_STATE))
         before.link = *link;
     port.state = HBA_PORTSTATE_OFFLINE;
-    setAttribute(port.attributes, numberAttribute(RM_PA_LINK_STATE, disabledLink));
+    setAttribute(port.attributes, numberAttribute(RM_PA_LINK_STATE, RM_LINK_DISABLED));
 }
 
 void enable(Port& port)
