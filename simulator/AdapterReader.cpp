@@ -187,6 +187,8 @@ Port readPort(JsonNode& node, const std::vector<Target>& targets)
         port.priorityLanes.emplace();
     node.forEach("priorityLanes",
                  [&](JsonNode& item) { port.priorityLanes->push_back(readPriorityLane(item, targets)); });
+    if (node.has("diagnostics"))
+        port.diagnostics = readDiagnostics(node.at("diagnostics"));
     node.finish();
     return port;
 }

@@ -41,15 +41,15 @@ public:
         return fails() ? *_effects.status : static_cast<std::int32_t>(action());
     }
 
-    /// For a record or a number. `read` fills one and returns the status.
-    template <class Record, class Read> std::int32_t record(Record* out, Read read)
+    /// For a record or a number. `read` fills one and returns the status. With status `also` it is handed out too.
+    template <class Record, class Read> std::int32_t record(Record* out, Read read, std::int32_t also = RM_OK)
     {
         return output(out,
                       [&]
                       {
                           Record record{};
                           const auto status = static_cast<std::int32_t>(read(record));
-                          if (status != RM_OK)
+                          if (status != RM_OK && status != also)
                               return status;
                           if (_effects.hostile)
                               deform(record, *_effects.hostile);

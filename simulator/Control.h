@@ -66,6 +66,11 @@ extern "C"
     /// Sets one attribute of a port, of its statistics or of its adapter: {"name": value}, as in a scenario.
     TVRSIM_EXPORT int tvrsim_set_attribute(const char* wwpn, const char* attribute, char* error, std::size_t errorSize);
 
+    /// Puts what a scenario has under "diagnostics" in the place of that of a port; what is not named has its default.
+    /// With "loopbackPlug" the plug takes the place of the cable, and without it the cable comes back.
+    TVRSIM_EXPORT int tvrsim_set_diagnostics(const char* wwpn, const char* diagnostics, char* error,
+                                             std::size_t errorSize);
+
     /// Sets the current value of a driver parameter of the adapter behind a port, or of that for all adapters where
     /// `wwpn` is null.
     TVRSIM_EXPORT int tvrsim_set_driver_parameter(const char* wwpn, const char* name, std::uint32_t current);

@@ -27,6 +27,7 @@ struct Row
 
 constexpr unsigned statusOnly = 0;
 constexpr unsigned numberOut = bit(Hostile::allOnes);
+constexpr unsigned handleOut = numberOut | bit(Hostile::zeroHandle);
 constexpr unsigned textOut = bit(Hostile::unterminatedText) | truncatable;
 constexpr unsigned recordOut = bit(Hostile::allOnes) | truncatable;
 constexpr unsigned textRecordOut = recordOut | bit(Hostile::unterminatedText);
@@ -43,13 +44,22 @@ constexpr Row rows[] = {
     {"ChangeWWN", dual, numberOut},
     {"DiagBeacon", dual, statusOnly},
     {"DiagBeaconState", dual, numberOut},
+    {"DiagCancelDiagnostic", dual, statusOnly},
+    {"DiagDPortTest", dual, handleOut},
+    {"DiagEchoTestV2", dual, handleOut},
     {"DiagGetLoadListParams", dual, countedRecordOut},
+    {"DiagGetResults", dual, recordOut},
+    {"DiagGetResultsDPort", dual, recordOut | bit(Hostile::hugeCount)},
+    {"DiagLoopBackTestV3", dual, handleOut},
+    {"DiagPciLoopBackTestV2", dual, handleOut},
     {"DiagReadPCIRegistersV2", dual, recordOut},
+    {"DiagRunPOST", dual, handleOut},
     {"DownloadFirmware", dual, statusOnly},
     {"ExitLib", dual, statusOnly},
     {"GetDriverParams", dual, listOut | bit(Hostile::unterminatedText)},
     {"GetDriverParamsGlobal", dual, listOut | bit(Hostile::unterminatedText)},
     {"GetDriverType", dual, numberOut},
+    {"GetFcpTargetMapping", dual, listOut},
     {"GetHBAAttributes", dual, attributesOut},
     {"GetHBAFeature", dual, numberOut},
     {"GetHBAFeatureList", dual, listOut},

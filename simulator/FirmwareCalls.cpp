@@ -155,6 +155,7 @@ RM_STATUS SimulatedHost::resetAdapter(Wwn wwpn)
     return changePort(wwpn,
                       [&](Adapter& adapter, Port&)
                       {
+                          cancelTests(adapter);
                           activateFirmware(adapter);
                           activateNames(adapter, false);
                           return RM_OK;

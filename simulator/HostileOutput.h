@@ -98,6 +98,11 @@ inline void fillCount(HBA_PORTATTRIBUTES& record)
     record.NumberofDiscoveredPorts = 0xFFFF'FFFF;
 }
 
+inline void fillCount(RM_DPortResults& record)
+{
+    record.phaseCount = 0xFF;
+}
+
 inline void fillLength(RM_VpdArea& record)
 {
     record.length = 0xFFFF'FFFF;
@@ -108,6 +113,8 @@ template <class Record> void deform(Record& record, Hostile kind)
 {
     if (kind == Hostile::allOnes)
         std::memset(&record, 0xFF, sizeof record);
+    if (kind == Hostile::zeroHandle)
+        std::memset(&record, 0, sizeof record);
     if constexpr (requires { fillTexts(record); })
         if (kind == Hostile::unterminatedText)
             fillTexts(record);

@@ -255,7 +255,7 @@ RM_STATUS SimulatedHost::readNames(Wwn wwpn, std::uint32_t type, RM_WwnNames& ou
         return fill(out, inForce(*port), kindOf(names.volatileInForce));
     case RM_WWN_TYPE_CONFIGURED:
         if (!isWaiting(*port))
-            return fillWithout(out, RM_WWN_KIND_NONE);
+            return fill(out, inForce(*port), RM_WWN_KIND_NONE);
         out.activation = names.waitsFor;
         return fill(out, configured(*port), kindOf(names.volatileNames.has_value()));
     default:
@@ -276,6 +276,7 @@ RM_STATUS SimulatedHost::setBootCode(Wwn wwpn, bool enabled)
 void SimulatedHost::reboot(bool powerDown)
 {
     std::lock_guard lock(_mutex);
+    _tests.clear();
     for (Adapter& adapter : _scenario.adapters)
     {
         if (powerDown)

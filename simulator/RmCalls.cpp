@@ -23,7 +23,11 @@ constexpr StatusRow statusTexts[] = {
     {RM_ERROR_MORE_DATA, "The buffer is too small for the data"},
     {RM_ERROR_NO_MEMORY, "Out of memory"},
     {RM_ERROR_CHECK_CONDITION, "The SCSI command ended with a check condition"},
+    {RM_ERROR_NO_SFP, "There is no transceiver in the port"},
+    {RM_ERROR_TEST_RUNNING, "The test has not finished"},
+    {RM_ERROR_TOO_MANY_TESTS, "Too many tests are waiting or running"},
     {RM_ERROR_DIAGNOSTICS_NOT_AVAILABLE, "Diagnostics are not available"},
+    {RM_ERROR_ADAPTER_BUSY, "The adapter is busy with something else"},
     {RM_ERROR_WWN_NOT_SUPPORTED, "The WWN operation is not supported"},
     {RM_ERROR_DUPLICATE_WWN, "The WWN is in use"},
     {RM_ERROR_WWN_NOT_AVAILABLE, "WWN management is not available on this adapter"},
@@ -31,11 +35,16 @@ constexpr StatusRow statusTexts[] = {
     {RM_ERROR_MAILBOX_FAILED, "The mailbox command failed"},
     {RM_ERROR_MAILBOX_TIMEOUT, "The mailbox command timed out"},
     {RM_ERROR_MAILBOX_BUSY, "The mailbox is busy"},
+    {RM_ERROR_PORT_NOT_SUPPORTED, "The port does not support the operation"},
+    {RM_ERROR_DPORT_SWITCH, "The switch does not support the test of the link"},
+    {RM_ERROR_NO_CABLE, "No cable connects the port to a switch"},
     {RM_ERROR_NO_RESET, "The firmware is written and waits for a restart of the host"},
     {notFirmware, "The file is no firmware"},
     {firmwareOfAnother, "The firmware is for another family of adapters"},
     {firmwareDamaged, "The firmware does not have its checksum"},
+    {RM_ERROR_HARDWARE_LACKS, "The hardware does not have the function"},
     {RM_ERROR_FIRMWARE_LACKS, "The firmware does not have the function"},
+    {RM_ERROR_PORT_DISABLED, "The port is disabled"},
 };
 
 /// What attributes follow from the members of the scenario, and over them those that it lists.

@@ -141,6 +141,55 @@ struct LinkState
     std::optional<Attribute> link;
 };
 
+/// How a test of a port runs and what it comes to. Time goes by with each poll of its results.
+struct TestBehaviour
+{
+    bool operator==(const TestBehaviour&) const = default;
+
+    RM_STATUS startStatus = RM_OK; ///< of the call that starts it
+    std::uint32_t busy = 0;        ///< starts that are still answered RM_ERROR_ADAPTER_BUSY
+    std::uint32_t polls = 2;       ///< polls that find it running; all ones for ever
+    RM_STATUS runningStatus = RM_ERROR_TEST_RUNNING;
+    std::uint32_t runningState = RM_DIAG_STATE_RUNNING;
+    RM_STATUS endStatus = RM_OK;
+    std::uint32_t endState = RM_DIAG_STATE_FINISHED;
+    RM_STATUS cancelStatus = RM_OK;
+    bool ignoresCancel = false; ///< the call succeeds and the test goes on
+
+    // Not of a link test. What is not given follows from how the test was started.
+    std::optional<std::uint32_t> result{}, cyclesCompleted{}, cyclesFailed{}, executionTime{};
+};
+
+/// A link that passes in all five phases.
+RM_DPortResults goodLink();
+
+struct Diagnostics
+{
+    bool operator==(const Diagnostics&) const = default;
+
+    RM_STATUS whenRunning = RM_ERROR_ADAPTER_BUSY; ///< of a start while a test of the port runs
+    TestBehaviour self{.polls = 3}, hostLoopback, internalLoopback, externalLoopback, echo;
+    TestBehaviour dport{.polls = 4, .runningState = RM_DPORT_STATE_RUNNING, .endState = RM_DPORT_STATE_FINISHED};
+    RM_DPortResults link = goodLink(); ///< of a link test that has finished
+    bool hasLoopbackPlug = false;      ///< in the place of the cable
+};
+
+/// One of the tests.
+using TestOf = TestBehaviour Diagnostics::*;
+
+/// What a port has through its cable; by default, through a loopback plug.
+struct Connection
+{
+    bool operator==(const Connection&) const = default;
+
+    std::uint32_t type = HBA_PORTTYPE_LPORT;
+    std::uint32_t state = HBA_PORTSTATE_ONLINE;
+    std::uint32_t fcId = 0, discoveredPorts = 0;
+    Wwn fabricName = 0;
+    std::vector<std::size_t> targets;
+    std::vector<VirtualPort> virtualPorts;
+};
+
 struct Port
 {
     bool operator==(const Port&) const = default;
@@ -170,6 +219,8 @@ struct Port
     std::vector<VirtualPort> virtualPorts;
     std::optional<std::vector<PriorityLane>> priorityLanes; ///< none: the hardware does not have them
     std::optional<LinkState> beforeDisabling;               ///< of a port that was disabled
+    Diagnostics diagnostics;
+    std::optional<Connection> unplugged; ///< what comes back when the loopback plug is taken out
 };
 
 /// A parameter of the driver, and what it will be once the driver has been loaded anew.

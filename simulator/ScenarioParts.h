@@ -20,6 +20,7 @@ std::vector<DriverParameter> readDriverParameters(JsonNode& owner);
 RM_PciRegisters readPci(JsonNode node);
 RM_VpdArea readVpd(JsonNode node);
 RM_SffData readTransceiver(JsonNode node);
+Diagnostics readDiagnostics(JsonNode node);
 RM_FlashRegion readFlashRegion(JsonNode& node);
 Target readTarget(JsonNode& node);
 /// Ports refer to `targets` by name.

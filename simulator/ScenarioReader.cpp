@@ -179,4 +179,10 @@ Attribute readAttribute(std::string_view text, const std::string& file)
     return list.front();
 }
 
+Diagnostics readDiagnostics(std::string_view text, const std::string& file)
+{
+    const json document = parse(text, file);
+    return readDiagnostics(JsonNode(document, "", file));
+}
+
 } // namespace tvrsim

@@ -24,4 +24,7 @@ Fault readFault(std::string_view text, const std::string& file);
 /// number; null makes it absent. Throws ScenarioError.
 Attribute readAttribute(std::string_view text, const std::string& file);
 
+/// The diagnostics of a port, as the member of that name in a scenario has them. Throws ScenarioError.
+Diagnostics readDiagnostics(std::string_view text, const std::string& file);
+
 } // namespace tvrsim

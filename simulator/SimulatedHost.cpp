@@ -48,6 +48,8 @@ void SimulatedHost::load(Scenario scenario)
     std::lock_guard lock(_mutex);
     _scenario = std::move(scenario);
     _imported.clear();
+    _tests.clear();
+    _lastTest = 0;
     index();
 
     _osDeviceNames.clear();
@@ -61,6 +63,9 @@ void SimulatedHost::load(Scenario scenario)
                     units.push_back(names.next(unit.deviceType));
             }
     completeNames();
+    for (Adapter& adapter : _scenario.adapters)
+        for (Port& port : adapter.ports)
+            usePlug(port);
 }
 
 void SimulatedHost::index()

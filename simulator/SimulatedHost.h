@@ -15,6 +15,15 @@
 namespace tvrsim
 {
 
+/// What a test is started with.
+struct TestOrder
+{
+    std::uint32_t cycles = 1;
+    bool haltOnError = false;
+    const char* pattern = "0"; ///< one to eight hexadecimal digits, or the start is refused
+    Wwn target = 0;            ///< of an echo
+};
+
 class SimulatedHost
 {
 public:
@@ -101,6 +110,15 @@ public:
     RM_STATUS setPortEnabled(Wwn wwpn, std::uint32_t enabled, std::uint32_t& dynamic);
     RM_STATUS setPortAttribute(Wwn wwpn, std::uint32_t id, const void* value, std::uint32_t length);
 
+    // Diagnostics, in DiagCalls.cpp.
+
+    RM_STATUS startTest(Wwn wwpn, TestOf test, const TestOrder& order, std::uint32_t& handle);
+    /// These fill the record also for a test that runs.
+    RM_STATUS testResults(Wwn wwpn, std::uint32_t handle, RM_DiagResults& out);
+    RM_STATUS linkTestResults(Wwn wwpn, std::uint32_t handle, RM_DPortResults& out);
+    RM_STATUS cancelTest(Wwn wwpn, std::uint32_t handle);
+    RM_STATUS fcpTargets(Wwn wwpn, std::vector<RM_FcpMapping>& out) const;
+
     // Frame tagging, in TagCalls.cpp.
 
     bool hasTagging() const;
@@ -131,6 +149,8 @@ public:
     bool setDriverParameter(std::optional<Wwn> wwpn, const std::string& name, std::uint32_t current);
     /// The lists of adapter attributes, port attributes and statistics are told apart by the attribute's number.
     bool setAttributeOf(Wwn wwpn, const Attribute& attribute);
+    /// Takes the place of how the tests of the port behave, of those that run also.
+    bool setDiagnostics(Wwn wwpn, const Diagnostics& diagnostics);
 
 private:
     struct PortPlace
@@ -169,6 +189,24 @@ private:
     template <class Use> RM_STATUS changePort(Wwn wwpn, Use use);
     /// For a reset of an adapter or of the host: what the flash memory holds is what runs. Called with the lock held.
     static void activateFirmware(Adapter& adapter);
+    /// A test that was started. It can be asked about after its end as well.
+    struct StartedTest
+    {
+        Wwn wwpn;
+        TestOf test;
+        std::uint32_t result, cycles;
+        std::uint32_t polls = 0;
+        bool isCancelled = false;
+    };
+
+    // These are called with the lock held.
+    std::uint32_t resultOf(const Port& port, TestOf test, const TestOrder& order) const;
+    bool isRunning(const StartedTest& started) const;
+    StartedTest* findTest(Wwn wwpn, std::uint32_t handle);
+    bool makeRoomForTest();
+    void cancelTests(const Adapter& adapter);
+    template <class Record, class Fill> RM_STATUS poll(Wwn wwpn, std::uint32_t handle, Record& out, Fill fill);
+
     template <class Use> RM_STATUS withImported(Wwn wwpn, const char* path, Use use);
     template <class Self, class Use> static RM_STATUS onTagAdapter(Self& self, std::uint32_t handle, Use use);
 
@@ -181,6 +219,8 @@ private:
     std::map<HBA_HANDLE, std::string> _handles; ///< name of the adapter
     std::uint32_t _lastTagHandle = 0;
     std::map<std::uint32_t, std::string> _tagHandles; ///< name of the adapter
+    std::uint32_t _lastTest = 0;
+    std::map<std::uint32_t, StartedTest> _tests; ///< by handle, the first are the oldest
 
     // Made from the scenario by index().
     std::unordered_map<std::string, std::size_t> _adapterByName;
@@ -199,6 +239,9 @@ template <class Use> RM_STATUS SimulatedHost::changePort(Wwn wwpn, Use use)
     Adapter& adapter = _scenario.adapters[place->second.adapter];
     return use(adapter, adapter.ports[place->second.port]);
 }
+
+/// Puts the loopback plug or the cable into the port, as its diagnostics say.
+void usePlug(Port& port);
 
 /// Copies `text` into a field, cut to leave room for the zero byte.
 template <std::size_t Size> void setText(char (&field)[Size], const std::string& text)

@@ -168,6 +168,17 @@ int tvrsim_set_attribute(const char* wwpn, const char* attribute, char* error, s
                    });
 }
 
+int tvrsim_set_diagnostics(const char* wwpn, const char* diagnostics, char* error, std::size_t errorSize)
+{
+    return attempt(error, errorSize,
+                   [&]
+                   {
+                       const Wwn name = requireWwn(wwpn);
+                       if (!tvrsim_simulation()->host.setDiagnostics(name, readDiagnostics(diagnostics, "diagnostics")))
+                           throw ScenarioError("no port " + wwnText(name));
+                   });
+}
+
 int tvrsim_set_driver_parameter(const char* wwpn, const char* name, std::uint32_t current)
 {
     const std::optional<Wwn> port = wwpn ? parseWwn(wwpn) : std::nullopt;

@@ -25,6 +25,13 @@ inline Call::Subject adapter(HBA_HANDLE handle)
     return [handle] { return tvrsim_simulation()->host.adapterOf(handle); };
 }
 
+/// A call that starts a test.
+inline RM_STATUS startTest(Call& call, const HBA_WWN& wwpn, TestOf test, const TestOrder& order, std::uint32_t* handle)
+{
+    return call.record(handle,
+                       [&](std::uint32_t& out) { return call.host().startTest(fromHba(wwpn), test, order, out); });
+}
+
 /// The functions for frame tagging are looked for in the global scope of the process: an RM library that is initialised
 /// loads them into it, where the host has them.
 void loadTaggingLibrary(SimulatedHost& host);

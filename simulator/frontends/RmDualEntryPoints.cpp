@@ -53,6 +53,15 @@ extern "C"
     TVRSIM_EXPORT RM_ResetHBA_t DUAL(ResetHBA);
     TVRSIM_EXPORT RM_SetPortEnabled_t DUAL(SetPortEnabled);
     TVRSIM_EXPORT RM_SetAdapterAttribute_t DUAL(SetAdapterAttribute);
+    TVRSIM_EXPORT RM_DiagEchoTestV2_t DUAL(DiagEchoTestV2);
+    TVRSIM_EXPORT RM_DiagLoopBackTestV3_t DUAL(DiagLoopBackTestV3);
+    TVRSIM_EXPORT RM_DiagPciLoopBackTestV2_t DUAL(DiagPciLoopBackTestV2);
+    TVRSIM_EXPORT RM_DiagRunPOST_t DUAL(DiagRunPOST);
+    TVRSIM_EXPORT RM_DiagGetResults_t DUAL(DiagGetResults);
+    TVRSIM_EXPORT RM_DiagCancelDiagnostic_t DUAL(DiagCancelDiagnostic);
+    TVRSIM_EXPORT RM_DiagDPortTest_t DUAL(DiagDPortTest);
+    TVRSIM_EXPORT RM_DiagGetResultsDPort_t DUAL(DiagGetResultsDPort);
+    TVRSIM_EXPORT RM_GetFcpTargetMapping_t DUAL(GetFcpTargetMapping);
 
     RM_STATUS DUAL(InitLib)()
     {
@@ -348,6 +357,74 @@ extern "C"
     {
         Call call = callOf(__func__, port(wwpn));
         return call.status([&] { return call.host().setPortAttribute(fromHba(wwpn), id, value, length); });
+    }
+
+    // Diagnostics.
+
+    RM_STATUS DUAL(DiagEchoTestV2)(HBA_WWN wwpn, HBA_WWN target, std::uint32_t cycles, std::uint32_t haltOnError,
+                                   std::uint32_t* handle, std::uint32_t, const char* pattern)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return startTest(call, wwpn, &Diagnostics::echo, {cycles, haltOnError != 0, pattern, fromHba(target)}, handle);
+    }
+
+    RM_STATUS DUAL(DiagLoopBackTestV3)(HBA_WWN wwpn, std::uint32_t type, std::uint32_t cycles,
+                                       std::uint32_t haltOnError, std::uint32_t* handle, std::uint32_t,
+                                       const char* pattern)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        const TestOf test =
+            type == RM_LOOPBACK_EXTERNAL ? &Diagnostics::externalLoopback : &Diagnostics::internalLoopback;
+        return startTest(call, wwpn, type > RM_LOOPBACK_INTERNAL ? nullptr : test, {cycles, haltOnError != 0, pattern},
+                         handle);
+    }
+
+    RM_STATUS DUAL(DiagPciLoopBackTestV2)(HBA_WWN wwpn, std::uint32_t cycles, std::uint32_t haltOnError,
+                                          std::uint32_t* handle, std::uint32_t, const char* pattern)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return startTest(call, wwpn, &Diagnostics::hostLoopback, {cycles, haltOnError != 0, pattern}, handle);
+    }
+
+    RM_STATUS DUAL(DiagRunPOST)(HBA_WWN wwpn, std::uint32_t* handle)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return startTest(call, wwpn, &Diagnostics::self, {}, handle);
+    }
+
+    RM_STATUS DUAL(DiagDPortTest)(HBA_WWN wwpn, std::uint32_t, std::uint32_t* handle)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return startTest(call, wwpn, &Diagnostics::dport, {}, handle);
+    }
+
+    RM_STATUS DUAL(DiagGetResults)(HBA_WWN wwpn, std::uint32_t handle, RM_DiagResults* results)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(
+            results, [&](auto& record) { return call.host().testResults(fromHba(wwpn), handle, record); },
+            RM_ERROR_TEST_RUNNING);
+    }
+
+    RM_STATUS DUAL(DiagGetResultsDPort)(HBA_WWN wwpn, std::uint32_t handle, RM_DPortResults* results)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(
+            results, [&](auto& record) { return call.host().linkTestResults(fromHba(wwpn), handle, record); },
+            RM_ERROR_TEST_RUNNING);
+    }
+
+    RM_STATUS DUAL(DiagCancelDiagnostic)(HBA_WWN wwpn, std::uint32_t handle)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().cancelTest(fromHba(wwpn), handle); });
+    }
+
+    RM_STATUS DUAL(GetFcpTargetMapping)(HBA_WWN wwpn, RM_FcpTargetMapping* mapping)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.list(mapping, &RM_FcpTargetMapping::count,
+                         [&](auto& entries) { return call.host().fcpTargets(fromHba(wwpn), entries); });
     }
 
 } // extern "C"

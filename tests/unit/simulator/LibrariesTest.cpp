@@ -1,4 +1,5 @@
 // The shared objects themselves: what they export, and that they serve one host.
+#include "Opened.h"
 #include "Scenarios.h"
 
 #include "simulator/Control.h"
@@ -10,7 +11,6 @@
 
 #include <vendorhbaapi.h>
 
-#include <dlfcn.h>
 #include <sched.h>
 #include <sys/mount.h>
 #include <sys/wait.h>
@@ -27,11 +27,6 @@ namespace
 {
 
 using testing::ElementsAreArray;
-
-std::string fileOf(const std::string& name)
-{
-    return std::string(TVRSIM_LIBRARY_FOLDER) + '/' + name;
-}
 
 /// Names of the dynamic symbols that a shared object defines, sorted.
 std::vector<std::string> definedSymbols(const std::string& file)
@@ -56,33 +51,6 @@ TEST(Libraries, ExportTheirEntryPointsAndNothingElse)
     EXPECT_THAT(definedSymbols(fileOf("libtvrsim.so")), testing::Each(testing::StartsWith("tvrsim_")));
     EXPECT_THAT(exportedNames(Library::fallback), testing::Not(testing::Contains(testing::StartsWith("LRM_"))));
 }
-
-/// A library of the build tree, opened.
-class Opened
-{
-public:
-    explicit Opened(const std::string& path) : _handle(dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL))
-    {
-        EXPECT_NE(_handle, nullptr) << dlerror();
-    }
-    ~Opened() { dlclose(_handle); }
-    Opened(const Opened&) = delete;
-    Opened& operator=(const Opened&) = delete;
-
-    void* handle() const { return _handle; }
-
-    template <class Function> Function* function(const char* name) const
-    {
-        void* found = dlsym(_handle, name);
-        EXPECT_NE(found, nullptr) << name;
-        return reinterpret_cast<Function*>(found);
-    }
-
-private:
-    void* const _handle;
-};
-
-#define FUNCTION(library, name) library.function<decltype(name)>(#name)
 
 TEST(Libraries, AreFoundBySonameOnceLoaded)
 {

@@ -41,6 +41,14 @@ std::string withUnit(const std::string& members)
     return R"({"targets": [{"name": "T", "wwpn": "5000000000000001", "units": [{"lun": 0}, {)" + members + "}]}]}";
 }
 
+std::string phases(int count)
+{
+    std::string text = R"({"id": 210})";
+    for (int i = 1; i < count; ++i)
+        text += R"(, {"id": 210})";
+    return text;
+}
+
 std::string withFault(const std::string& members)
 {
     return R"({"faults": [{)" + members + "}]}";
@@ -82,6 +90,17 @@ TEST(ScenarioReader, ErrorsNameFilePlaceAndExpectation)
         {withPort(R"("vpd": {"readOnly": {"PNX": "1"}})"), "/adapters/0/ports/0/vpd/readOnly/PNX",
          "a keyword of two characters"},
         {withPort(R"("vpd": {"raw": "82", "product": "P"})"), "/adapters/0/ports/0/vpd", "unknown member \"product\""},
+        {withPort(R"("diagnostics": {"ping": {}})"), "/adapters/0/ports/0/diagnostics", "unknown member \"ping\""},
+        {withPort(R"("diagnostics": {"echo": {"endState": "done"}})"), "/adapters/0/ports/0/diagnostics/echo/endState",
+         R"(or "cancelled" or "finished")"},
+        {withPort(R"("diagnostics": {"dport": {"result": 256}})"), "/adapters/0/ports/0/diagnostics/dport/result",
+         "expected a number from 0 to 255"},
+        {withPort(R"("diagnostics": {"dport": {"phases": [{}]}})"), "/adapters/0/ports/0/diagnostics/dport/phases/0",
+         "expected a member \"id\""},
+        {withPort(R"("diagnostics": {"dport": {"phases": [{"id": 210, "latency": 1, "localErrors": 1}]}})"),
+         "/adapters/0/ports/0/diagnostics/dport/phases/0", "either a latency or errors"},
+        {withPort(R"("diagnostics": {"dport": {"phases": [)" + phases(38) + "]}}"),
+         "/adapters/0/ports/0/diagnostics/dport/phases/37", "expected at most 37 phases"},
         {withUnit(R"("lun": 0)"), "/targets/0/units/1/lun", "expected a number that no other unit of the target has"},
         {withUnit(R"("lun": 16384)"), "/targets/0/units/1/lun", "expected a number from 0 to 16383"},
         {withUnit(R"("lun": 1, "vendor": "NINE CHAR")"), "/targets/0/units/1/vendor", "at most 8 bytes"},
