@@ -4,6 +4,8 @@
 
 #include "agent/EnumerationForms.h"
 #include "agent/ProviderExtension.h"
+#include "diagnostics/DiagnosticsLog.h"
+#include "diagnostics/HelpService.h"
 #include "model/FCPortProvider.h"
 #include "model/LiveRefresh.h"
 #include "model/ProfileProviders.h"

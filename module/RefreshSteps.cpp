@@ -1,6 +1,7 @@
 // The refresh of the module: which steps it has, in which order, and what a failure of each does.
 #include "agent/RefreshSteps.h"
 
+#include "diagnostics/DiagnosticFeature.h"
 #include "model/ComputerSystem.h"
 #include "model/DriverParameters.h"
 #include "model/PhysicalModel.h"
@@ -84,6 +85,11 @@ constexpr PortStep portSteps[] = {
 };
 
 constexpr HostStep closingSteps[] = {
+    {createDiagnostics,
+     GoOn,
+     {TVR_DBG, "FCHBA Diagnositcss either Not Supported/Failed to Create the feature"},
+     {TVR_DBG, "Exception in FCHBA Diagnostics feature class creation"},
+     MapGroup::Diagnostics},
     {updateFruData,
      GoOn,
      {TVR_DBG, "Failed to update FRU VPD data to cim_ Softwareidentity/PhysicalPackage instances"},
