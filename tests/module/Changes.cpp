@@ -71,6 +71,7 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
     const broker::Path names = pathOf("TVRHBA_FCHBAWWNService"), boot = pathOf("TVRHBA_BootBIOSService"),
                        software = pathOf("TVRHBA_SoftwareInstallationService"),
                        parameters = pathOf("TVRHBA_FCHBADriverParamService"), tags = pathOf("TVRHBA_FCTagService");
+    const broker::Object help = host.instancesOf("TVRHBA_HelpService").at(0);
     const broker::Object setting = host.instancesOf("TVRHBA_ProviderConfigSetting").at(0);
     const broker::Property target = {"Target", Value::reference(pathOf("TVRHBA_FCPort"))};
     Value::List image;
@@ -113,6 +114,11 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
         method(tags, "GetGlobalFlag", {target}),
         method(tags, "SetConfigTable", {target, {"URI", Value::string(server.uri("/table.xml"))}}),
         method(tags, "GetConfigTable", {target, {"URI", Value::string(server.uri("/out.xml", "joe:se%20cret@"))}}),
+        method(pathOf("TVRHBA_DiagnosticsLog"), "ClearLog", {}),
+        method(help.path, "GetHelp",
+               {{"RequestedDocument", Value::string(text(help, "Name"))},
+                {"Format", Value::uint16(1)},
+                {"RequestedDelivery", Value::uint16(1)}}),
         method(software, "ResetHBA", {target}),
     };
 }
