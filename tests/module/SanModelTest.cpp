@@ -581,7 +581,8 @@ TEST(SanModel, ChipsHavePriorityLanesWhereTheirPortsTellOfThem)
         ASSERT_THAT(chips, SizeIs(1));
         EXPECT_EQ(chips[0].get("PrioLaneCapability").asUnsigned(), row.capability) << row.portMembers << row.fault;
         EXPECT_THAT(host.log(), Contains(row.line));
-        EXPECT_EQ(host.logged("[TVR_WARN]"), row.line[5] == 'W' ? 1u : 0u) << "one call for both units of the target";
+        EXPECT_EQ(host.logged("[TVR_WARN] GetOASLunList"), row.line[5] == 'W' ? 1u : 0u)
+            << "one call for both units of the target";
         host.unload();
     }
 }
