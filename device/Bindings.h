@@ -107,6 +107,25 @@ inline constexpr Binding<entryRow("LRM_DiagPciLoopBackTestV2"), RM_DiagPciLoopBa
 inline constexpr Binding<entryRow("LRM_DiagRunPOST"), RM_DiagRunPOST_t> LRM_DiagRunPOST;
 inline constexpr Binding<entryRow("LRM_GetFcpTargetMapping"), RM_GetFcpTargetMapping_t> LRM_GetFcpTargetMapping;
 
+// Dumps.
+inline constexpr Binding<entryRow("LRM_DeleteDumpFiles"), RM_DeleteDumpFiles_t> LRM_DeleteDumpFiles;
+inline constexpr Binding<entryRow("LRM_GenerateCoreDump"), RM_GenerateCoreDump_t> LRM_GenerateCoreDump;
+inline constexpr Binding<entryRow("LRM_GenerateDump"), RM_GenerateDump_t> LRM_GenerateDump;
+inline constexpr Binding<entryRow("LRM_GenerateEfdDump"), RM_GenerateEfdDump_t> LRM_GenerateEfdDump;
+inline constexpr Binding<entryRow("LRM_GetDumpDirectoryA"), RM_GetDumpDirectoryA_t> LRM_GetDumpDirectoryA;
+inline constexpr Binding<entryRow("LRM_GetDumpFileNames"), RM_GetDumpFileNames_t> LRM_GetDumpFileNames;
+inline constexpr Binding<entryRow("LRM_GetDumpRetentionCount"), RM_GetDumpRetentionCount_t> LRM_GetDumpRetentionCount;
+inline constexpr Binding<entryRow("LRM_Get_BE_EventLogConfigDataAll"), RM_Get_BE_EventLogConfigDataAll_t>
+    LRM_Get_BE_EventLogConfigDataAll;
+inline constexpr Binding<entryRow("LRM_RetrieveFATDump"), RM_RetrieveFATDump_t> LRM_RetrieveFATDump;
+inline constexpr Binding<entryRow("LRM_RetrieveFATDump2"), RM_RetrieveFATDump2_t> LRM_RetrieveFATDump2;
+inline constexpr Binding<entryRow("LRM_SetDumpDirectory"), RM_SetDumpDirectory_t> LRM_SetDumpDirectory;
+inline constexpr Binding<entryRow("LRM_SetDumpRetentionCount"), RM_SetDumpRetentionCount_t> LRM_SetDumpRetentionCount;
+inline constexpr Binding<entryRow("LRM_Set_BE_EventLogConfigDataModule"), RM_Set_BE_EventLogConfigDataModule_t>
+    LRM_Set_BE_EventLogConfigDataModule;
+inline constexpr Binding<entryRow("LRM_Set_BE_EventLogTraceLevel"), RM_Set_BE_EventLogTraceLevel_t>
+    LRM_Set_BE_EventLogTraceLevel;
+
 inline constexpr Binding<entryRow("RM_GetAttributeValue"), RM_GetAttributeValue_t> RM_GetAttributeValue;
 inline constexpr Binding<entryRow("RM_GetLocalHBAInfo"), RM_GetLocalHBAInfo_t> RM_GetLocalHBAInfo;
 inline constexpr Binding<entryRow("RM_GetNumberOfLocalAdapters"), RM_GetNumberOfLocalAdapters_t>

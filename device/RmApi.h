@@ -26,8 +26,9 @@ enum RM_StatusCode : std::int32_t
     RM_ERROR_NO_MEMORY = 8,
     RM_ERROR_CHECK_CONDITION = 9, ///< a SCSI command ended with sense data, as in the HBA API
     RM_ERROR_NO_SFP = 13,
-    RM_ERROR_TEST_RUNNING = 60,   ///< a test has not finished; its record is filled all the same
-    RM_ERROR_TOO_MANY_TESTS = 62, ///< no room for another test beside those that run
+    RM_ERROR_DIRECTORY_NOT_OPENED = 27, ///< the dump directory
+    RM_ERROR_TEST_RUNNING = 60,         ///< a test has not finished; its record is filled all the same
+    RM_ERROR_TOO_MANY_TESTS = 62,       ///< no room for another test beside those that run
     RM_ERROR_DIAGNOSTICS_NOT_AVAILABLE = 63,
     RM_ERROR_ADAPTER_BUSY = 64, ///< also for a second test of a port
     RM_ERROR_WWN_NOT_SUPPORTED = 89,
@@ -37,11 +38,13 @@ enum RM_StatusCode : std::int32_t
     RM_ERROR_MAILBOX_FAILED = 148,
     RM_ERROR_MAILBOX_TIMEOUT = 149,
     RM_ERROR_MAILBOX_BUSY = 150,
+    RM_ERROR_CONFIGURATION_NOT_READ = 160,
+    RM_ERROR_CONFIGURATION_NOT_OPENED = 178,
     RM_ERROR_PORT_NOT_SUPPORTED = 190,
-    RM_ERROR_BUFFER_TOO_SMALL = 191, ///< RM_ERROR_MORE_DATA in the words of the driver parameter calls
+    RM_ERROR_BUFFER_TOO_SMALL = 191, ///< RM_ERROR_MORE_DATA in the words of the driver parameter and dump calls
     RM_ERROR_DPORT_SWITCH = 204,     ///< the switch cannot test the link, or is not set up for it
     RM_ERROR_NO_CABLE = 212,
-    RM_ERROR_NO_RESET = 247,       ///< a download whose firmware no reset would activate
+    RM_ERROR_NO_RESET = 247,       ///< a download whose firmware no reset would activate; also of a core dump
     RM_ERROR_HARDWARE_LACKS = 248, ///< the hardware of the adapter does not have the function
     RM_ERROR_FIRMWARE_LACKS = 251, ///< the firmware of the adapter does not have the function
     RM_ERROR_PORT_DISABLED = 253,
@@ -418,6 +421,82 @@ extern "C"
 
     /// `text` is "name=value", at most 255 characters.
     typedef RM_STATUS RM_SetDriverParam_t(HBA_WWN wwpn, const char* text, std::uint32_t control);
+
+    // Dumps, of an adapter port.
+
+    enum
+    {
+        RM_DUMP_PATH_SIZE = 256, ///< of a directory, and of a file's name, with the zero byte
+        RM_MAX_RETENTION_COUNT = 20,
+    };
+
+    /// The first two arguments are 0.
+    typedef RM_STATUS RM_GenerateDump_t(std::uint32_t group, std::uint32_t flags, HBA_WWN wwpn);
+    /// `option` selects what is dumped; `flags` is 0.
+    typedef RM_STATUS RM_GenerateEfdDump_t(HBA_WWN wwpn, std::int32_t option, std::uint32_t flags);
+    /// `options` is a text of the firmware's own.
+    typedef RM_STATUS RM_GenerateCoreDump_t(HBA_WWN wwpn, const char* options);
+    typedef RM_STATUS RM_GetDumpDirectoryA_t(HBA_WWN wwpn, char* buffer, std::uint32_t size);
+    typedef RM_STATUS RM_SetDumpDirectory_t(HBA_WWN wwpn, const char* directory);
+    /// How many files the library keeps of a port.
+    typedef RM_STATUS RM_GetDumpRetentionCount_t(HBA_WWN wwpn, std::uint32_t* count);
+    typedef RM_STATUS RM_SetDumpRetentionCount_t(HBA_WWN wwpn, std::uint32_t count);
+    typedef RM_STATUS RM_DeleteDumpFiles_t(HBA_WWN wwpn);
+
+    struct RM_DumpFileName
+    {
+        char name[RM_DUMP_PATH_SIZE]; ///< without its directory
+    };
+
+    struct RM_DumpFileNames
+    {
+        std::uint32_t count;
+        std::uint32_t reserved;
+        RM_DumpFileName entry[1];
+    };
+    static_assert(sizeof(RM_DumpFileName) == 256 && offsetof(RM_DumpFileNames, entry) == 8);
+
+    /// A list that says RM_ERROR_BUFFER_TOO_SMALL in place of RM_ERROR_MORE_DATA.
+    typedef RM_STATUS RM_GetDumpFileNames_t(HBA_WWN wwpn, RM_DumpFileNames* names);
+
+    // The trace that the firmware writes into its flash memory (FAT).
+
+    /// Of all adapters.
+    typedef RM_STATUS RM_RetrieveFATDump_t();
+    typedef RM_STATUS RM_RetrieveFATDump2_t(HBA_WWN wwpn);
+    /// The bytes select what is traced.
+    typedef RM_STATUS RM_Set_BE_EventLogTraceLevel_t(HBA_WWN wwpn, std::uint32_t level, std::uint8_t byte0,
+                                                     std::uint8_t byte1, std::uint8_t byte2, std::uint8_t byte3);
+
+    /// What a module of the firmware traces.
+    struct RM_EventLogModule
+    {
+        char module[48];
+        char level[48];
+        std::uint32_t portMask;
+        std::uint32_t functionMask;
+        std::uint32_t value;
+        std::uint32_t reserved;
+    };
+    static_assert(sizeof(RM_EventLogModule) == 112 && offsetof(RM_EventLogModule, portMask) == 96);
+
+    enum
+    {
+        RM_MAX_EVENT_LOG_MODULES = 64,
+    };
+
+    struct RM_EventLogConfig
+    {
+        std::uint32_t room; ///< in entries
+        std::uint32_t reserved1[2];
+        std::uint32_t count; ///< entries in use
+        std::uint32_t reserved2[9];
+        RM_EventLogModule entry[RM_MAX_EVENT_LOG_MODULES];
+    };
+    static_assert(sizeof(RM_EventLogConfig) == 7220 && offsetof(RM_EventLogConfig, count) == 12);
+
+    typedef RM_STATUS RM_Get_BE_EventLogConfigDataAll_t(HBA_WWN wwpn, RM_EventLogConfig* config);
+    typedef RM_STATUS RM_Set_BE_EventLogConfigDataModule_t(HBA_WWN wwpn, const RM_EventLogModule* module);
 
     // Virtual ports.
 
