@@ -13,6 +13,7 @@
 #include "schema/AllClasses.h"
 #include "services/BootBiosService.h"
 #include "services/DriverParameterService.h"
+#include "services/DumpService.h"
 #include "services/LaneInstances.h"
 #include "services/ProviderSettings.h"
 #include "services/SoftwareInstallation.h"

@@ -14,6 +14,7 @@
 #include "model/Services.h"
 #include "model/SoftwareIdentities.h"
 #include "model/VitalProductData.h"
+#include "services/DumpClasses.h"
 
 namespace cimple
 {
@@ -51,6 +52,10 @@ constexpr HostStep cardSteps[] = {
     {createDriverParameters, GoOn, {}},
     mark({TVR_DBG, "Done with the Driver Parameter fetching"}),
     mark({TVR_DBG, "Calling FC_CreateDumpClasses"}),
+    {createDumpClasses,
+     GoOn,
+     {TVR_DBG, "FC_CreateDumpClasses failed with status %d"},
+     {TVR_ERR, "Exception in FC_CreateDumpClasses"}},
     {createPortVirtualization,
      GoOn,
      {TVR_ERR, "CreatePortVirtualizationClasses failed: %d"},

@@ -179,6 +179,15 @@ Port readPort(JsonNode& node, const std::vector<Target>& targets)
                          item.failWith("expected at most 64 regions");
                      port.flash.push_back(readFlashRegion(item));
                  });
+    if (node.has("dumps"))
+        port.dumps = readDumps(node.at("dumps"));
+    node.forEach("tracedModules",
+                 [&](JsonNode& item)
+                 {
+                     if (port.tracedModules.size() == RM_MAX_EVENT_LOG_MODULES)
+                         item.failWith("expected at most 64 modules");
+                     port.tracedModules.push_back(readTracedModule(item));
+                 });
     if (node.has("qos"))
         port.qos = readQos(node.at("qos"));
     port.targets = readTargetNames(node, targets);

@@ -76,8 +76,10 @@ public:
                       });
     }
 
-    /// For a list: `count` is the room in entries, and then the number available. `read` gives all entries.
-    template <class List, class Read> std::int32_t list(List* out, std::uint32_t List::*count, Read read)
+    /// For a list: `count` is the room in entries, and then the number available. `read` gives all entries. `tooSmall`
+    /// is the status where there are more than there is room for.
+    template <class List, class Read>
+    std::int32_t list(List* out, std::uint32_t List::*count, Read read, std::int32_t tooSmall = RM_ERROR_MORE_DATA)
     {
         using Entry = std::remove_reference_t<decltype(out->entry[0])>;
         return output(out,
@@ -96,7 +98,7 @@ public:
                               std::memcpy(out->entry, entries.data(), kept(fitting * sizeof(Entry)));
                           const bool huge = isHostile(Hostile::hugeCount);
                           out->*count = huge ? 0xFFFF'FFFF : static_cast<std::uint32_t>(entries.size());
-                          return entries.size() > room && !huge ? std::int32_t{RM_ERROR_MORE_DATA} : status;
+                          return entries.size() > room && !huge ? tooSmall : status;
                       });
     }
 

@@ -73,6 +73,25 @@ inline void fillTexts(RM_SffData& record)
     fillText(record.dateCode);
 }
 
+inline void fillTexts(RM_DumpFileName& record)
+{
+    fillText(record.name);
+}
+
+inline void fillTexts(RM_EventLogConfig& record)
+{
+    for (RM_EventLogModule& entry : record.entry)
+    {
+        fillText(entry.module);
+        fillText(entry.level);
+    }
+}
+
+inline void fillCount(RM_EventLogConfig& record)
+{
+    record.count = 0xFFFF'FFFF;
+}
+
 inline void fillTexts(RM_FlashList& record)
 {
     for (RM_FlashRegion& region : record.entry)

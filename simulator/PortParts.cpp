@@ -1,4 +1,4 @@
-// What stands at a port: its transceiver, and the flash memory behind it.
+// What stands at a port: its transceiver, the flash memory behind it, and its dumps.
 #include "simulator/ScenarioParts.h"
 
 namespace tvrsim
@@ -89,6 +89,28 @@ RM_FlashRegion readFlashRegion(JsonNode& node)
     node.read("isWakeup", region.isWakeup);
     node.finish();
     return region;
+}
+
+DumpFiles readDumps(JsonNode node)
+{
+    DumpFiles dumps;
+    node.read("directory", dumps.directory, RM_DUMP_PATH_SIZE - 1);
+    node.read("retentionCount", dumps.retentionCount);
+    node.forEach("files", [&](const JsonNode& item) { dumps.files.push_back(item.asText(RM_DUMP_PATH_SIZE - 1)); });
+    node.finish();
+    return dumps;
+}
+
+RM_EventLogModule readTracedModule(JsonNode& node)
+{
+    RM_EventLogModule module{};
+    readField(node, "module", module.module);
+    readField(node, "level", module.level);
+    node.read("portMask", module.portMask);
+    node.read("functionMask", module.functionMask);
+    node.read("value", module.value);
+    node.finish();
+    return module;
 }
 
 } // namespace tvrsim

@@ -190,6 +190,25 @@ struct Connection
     std::vector<VirtualPort> virtualPorts;
 };
 
+/// What the library keeps of a port's dumps.
+struct DumpFiles
+{
+    bool operator==(const DumpFiles&) const = default;
+
+    std::string directory = "/var/log/tavrin/dump";
+    std::uint32_t retentionCount = 5;
+    std::vector<std::string> files; ///< names, the oldest first
+};
+
+/// What the firmware traces.
+struct TraceLevel
+{
+    bool operator==(const TraceLevel&) const = default;
+
+    std::uint32_t level = 0;
+    std::array<std::uint8_t, 4> bytes{};
+};
+
 struct Port
 {
     bool operator==(const Port&) const = default;
@@ -221,6 +240,9 @@ struct Port
     std::optional<LinkState> beforeDisabling;               ///< of a port that was disabled
     Diagnostics diagnostics;
     std::optional<Connection> unplugged; ///< what comes back when the loopback plug is taken out
+    DumpFiles dumps;
+    TraceLevel traceLevel;
+    std::vector<RM_EventLogModule> tracedModules; ///< at most RM_MAX_EVENT_LOG_MODULES
 };
 
 /// A parameter of the driver, and what it will be once the driver has been loaded anew.

@@ -22,6 +22,8 @@ RM_VpdArea readVpd(JsonNode node);
 RM_SffData readTransceiver(JsonNode node);
 Diagnostics readDiagnostics(JsonNode node);
 RM_FlashRegion readFlashRegion(JsonNode& node);
+DumpFiles readDumps(JsonNode node);
+RM_EventLogModule readTracedModule(JsonNode& node);
 Target readTarget(JsonNode& node);
 /// Ports refer to `targets` by name.
 Adapter readAdapter(JsonNode& node, const std::vector<Target>& targets);

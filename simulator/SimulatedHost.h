@@ -119,6 +119,22 @@ public:
     RM_STATUS cancelTest(Wwn wwpn, std::uint32_t handle);
     RM_STATUS fcpTargets(Wwn wwpn, std::vector<RM_FcpMapping>& out) const;
 
+    // Dumps and the firmware's trace, in DumpCalls.cpp. `ending` is that of the new file's name.
+
+    RM_STATUS generateDump(Wwn wwpn, const char* ending);
+    /// Of each port.
+    RM_STATUS generateDumps(const char* ending);
+    RM_STATUS dumpDirectory(Wwn wwpn, std::string& out);
+    RM_STATUS setDumpDirectory(Wwn wwpn, std::string_view directory);
+    RM_STATUS dumpRetention(Wwn wwpn, std::uint32_t& out);
+    RM_STATUS setDumpRetention(Wwn wwpn, std::uint32_t count);
+    RM_STATUS dumpFiles(Wwn wwpn, std::vector<RM_DumpFileName>& out);
+    RM_STATUS deleteDumps(Wwn wwpn);
+    RM_STATUS setTraceLevel(Wwn wwpn, const TraceLevel& level);
+    RM_STATUS eventLogConfig(Wwn wwpn, RM_EventLogConfig& out);
+    /// Of a module that the firmware has.
+    RM_STATUS setEventLogModule(Wwn wwpn, const RM_EventLogModule& module);
+
     // Frame tagging, in TagCalls.cpp.
 
     bool hasTagging() const;
@@ -187,6 +203,7 @@ private:
     template <class Use> RM_STATUS onVport(Wwn wwpn, Wwn vport, Use use) const;
     /// To change what `use` gets, the adapter and the port.
     template <class Use> RM_STATUS changePort(Wwn wwpn, Use use);
+    template <class Use> RM_STATUS changeDumps(Wwn wwpn, Use use);
     /// For a reset of an adapter or of the host: what the flash memory holds is what runs. Called with the lock held.
     static void activateFirmware(Adapter& adapter);
     /// A test that was started. It can be asked about after its end as well.

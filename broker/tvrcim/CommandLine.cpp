@@ -60,6 +60,17 @@ public:
         _current->add_option("METHOD", _command.method, "name of a method")->required(required);
         return *this;
     }
+    /// Of a port's dumps; without one of these a dump is made.
+    CommandOptions& dumps()
+    {
+        _current->add_option("PORT", _command.target, "WWPN of a port, with or without colons")->required();
+        CLI::Option* list = _current->add_flag("--list", _command.list, "only list the dump files");
+        CLI::Option* deletes = _current->add_flag("--delete", _command.deletes, "delete the dump files");
+        CLI::Option* keep = _current->add_option("--keep", _command.keep, "keep so many dump files");
+        list->excludes(deletes)->excludes(keep);
+        deletes->excludes(keep);
+        return *this;
+    }
     CommandOptions& all(const char* help)
     {
         _current->add_flag("--all", _command.all, help);
@@ -121,6 +132,7 @@ void addCommands(CommandOptions& options)
     options.add("call", "call a method; 'methods CLASS' shows what it takes").path().method(true).assignments(false);
     options.add("host", "show the host, its adapters and what they reach as a tree")
         .all("list each target and unit, however many");
+    options.add("dump", "have a port make a dump, and list its dump files").dumps();
     options.add("topology", "draw cards, ports, targets and units as a graph for graphviz")
         .all("draw each target and unit, however many")
         .output("write FILE.dot, or a picture FILE.svg, .png or .pdf by graphviz");

@@ -12,6 +12,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cctype>
 #include <filesystem>
 #include <fstream>
 
@@ -186,6 +187,13 @@ void showMethods(Session& session, const Command& command)
     printMethods(session.out, session.format, info, methods);
 }
 
+void refuseUnlessZero(const ClassInfo& info, const MethodInfo& method, const MethodReply& reply)
+{
+    const Value& returned = reply.returnValue;
+    if (!returned.isNull() && isInteger(returned.type()) && returned.asUnsigned() != 0)
+        throw MethodRefusal(method.name + " returned " + namedValueText(valueNames(info, method.name), returned));
+}
+
 void call(Session& session, const Command& command)
 {
     const Path named = pathOf(session, command.target);
@@ -197,9 +205,7 @@ void call(Session& session, const Command& command)
     const MethodReply reply =
         changing(session, method.name, [&] { return session.broker.invokeMethod(path, method.name, in); });
     printMethodReply(session.out, session.format, info, method, reply);
-    const Value& returned = reply.returnValue;
-    if (!returned.isNull() && isInteger(returned.type()) && returned.asUnsigned() != 0)
-        throw MethodRefusal(method.name + " returned " + namedValueText(valueNames(info, method.name), returned));
+    refuseUnlessZero(info, method, reply);
 }
 
 void showHost(Session& session, const Command& command)
@@ -210,6 +216,86 @@ void showHost(Session& session, const Command& command)
     else
         report.print(session.out, {.colour = session.colour, .all = command.all});
 }
+
+// --- the dumps of a port
+
+/// 16 capital digits, where a person may have put colons between them.
+std::string plainWwn(std::string text)
+{
+    std::erase(text, ':');
+    std::ranges::transform(text, text.begin(), [](unsigned char c) { return std::toupper(c); });
+    return text;
+}
+
+Path portControllerOf(const Session& session, const std::string& wwpn)
+{
+    const NamesReply known = checked(session.broker.enumerateInstanceNames(session.nameSpace, "TVRHBA_PortController"));
+    std::string ports;
+    for (const Path& path : known.paths)
+    {
+        const std::string id = path.key("DeviceID")->asString();
+        if (id == plainWwn(wwpn))
+            return path;
+        ports += (ports.empty() ? "" : ", ") + id;
+    }
+    throw UsageError("PORT: there is no port '" + wwpn + "'; " +
+                     (ports.empty() ? "the host has none" : "the host has " + ports));
+}
+
+/// Calls a method of the dump service on a port.
+MethodReply callOnDumps(Session& session, const std::string& name, const Path& port)
+{
+    const ClassInfo& info = classOf(session, "TVRHBA_DumpService");
+    const Path service = instancePathOf(session, info.name);
+    MethodReply reply =
+        changing(session, name,
+                 [&] {
+                     return session.broker.invokeMethod(service, name, {{"Target", Value::reference(port)}});
+                 });
+    refuseUnlessZero(info, methodOf(info, name), reply);
+    return reply;
+}
+
+void listDumps(Session& session, const Path& port)
+{
+    const MethodReply reply = callOnDumps(session, "GetDumpFileNames", port);
+    const Property* files = findNamed(reply.out, "DumpFiles");
+    Json names = Json::array();
+    if (files && !files->value.isNull())
+        for (const Value& name : files->value.asList())
+            names.push_back(name.asString());
+    if (session.format == Format::json)
+        return printJson(session.out, names);
+    for (const Json& name : names)
+        session.out << oneLine(name.get<std::string>()) << '\n';
+}
+
+void keepDumps(Session& session, const Path& port, std::uint32_t count)
+{
+    const std::string& id = port.key("DeviceID")->asString();
+    const Path path = instancePathOf(session, "TVRHBA_DumpData.InstanceID=TVRHBA_DumpData::" + id);
+    const Object data{path, {{"ElementName", Value::string(id)}, {"RetentionCount", Value::uint32(count)}}};
+    changing(session, "dump", [&] { return session.broker.modifyInstance(data, {{"ElementName", "RetentionCount"}}); });
+    done(session, {{"port", id}, {"kept", count}}, "keeping " + std::to_string(count) + " dump files of " + id);
+}
+
+void dump(Session& session, const Command& command)
+{
+    const Path port = portControllerOf(session, command.target);
+    if (command.keep)
+        return keepDumps(session, port, *command.keep);
+    if (command.deletes)
+    {
+        callOnDumps(session, "DeleteDump", port);
+        const std::string& id = port.key("DeviceID")->asString();
+        return done(session, {{"port", id}, {"deleted", true}}, "deleted the dump files of " + id);
+    }
+    if (!command.list)
+        callOnDumps(session, "GenerateDump", port);
+    listDumps(session, port);
+}
+
+// --- pictures
 
 /// Graphviz's name of the format that a file name ends in.
 std::string pictureFormat(const std::string& file)
@@ -250,7 +336,7 @@ struct CommandRow
     void (*run)(Session& session, const Command& command);
 };
 
-constexpr std::array<CommandRow, 13> commands{{
+constexpr std::array<CommandRow, 14> commands{{
     {"classes", listClasses},
     {"class", showClass},
     {"methods", showMethods},
@@ -263,6 +349,7 @@ constexpr std::array<CommandRow, 13> commands{{
     {"delete", remove},
     {"call", call},
     {"host", showHost},
+    {"dump", dump},
     {"topology", drawTopology},
 }};
 

@@ -4,6 +4,8 @@
 #include "broker/core/Broker.h"
 #include "broker/tvrcim/Printing.h"
 
+#include <cstdint>
+#include <optional>
 #include <ostream>
 #include <stdexcept>
 #include <string>
@@ -37,7 +39,7 @@ public:
 struct Command
 {
     std::string name = {};
-    std::string target = {}; ///< class name or path
+    std::string target = {}; ///< class name, path or port
     std::string method = {};
     std::vector<std::string> assignments = {}; ///< name=value
     broker::PropertyList properties = {};
@@ -45,6 +47,9 @@ struct Command
     bool names = false;
     bool all = false;
     std::string output = {}; ///< a file
+    bool list = false;
+    bool deletes = false;
+    std::optional<std::uint32_t> keep = {};
 };
 
 /// Where a command works and how it prints.

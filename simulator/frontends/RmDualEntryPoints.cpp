@@ -62,6 +62,20 @@ extern "C"
     TVRSIM_EXPORT RM_DiagDPortTest_t DUAL(DiagDPortTest);
     TVRSIM_EXPORT RM_DiagGetResultsDPort_t DUAL(DiagGetResultsDPort);
     TVRSIM_EXPORT RM_GetFcpTargetMapping_t DUAL(GetFcpTargetMapping);
+    TVRSIM_EXPORT RM_DeleteDumpFiles_t DUAL(DeleteDumpFiles);
+    TVRSIM_EXPORT RM_GenerateCoreDump_t DUAL(GenerateCoreDump);
+    TVRSIM_EXPORT RM_GenerateDump_t DUAL(GenerateDump);
+    TVRSIM_EXPORT RM_GenerateEfdDump_t DUAL(GenerateEfdDump);
+    TVRSIM_EXPORT RM_GetDumpDirectoryA_t DUAL(GetDumpDirectoryA);
+    TVRSIM_EXPORT RM_GetDumpFileNames_t DUAL(GetDumpFileNames);
+    TVRSIM_EXPORT RM_GetDumpRetentionCount_t DUAL(GetDumpRetentionCount);
+    TVRSIM_EXPORT RM_Get_BE_EventLogConfigDataAll_t DUAL(Get_BE_EventLogConfigDataAll);
+    TVRSIM_EXPORT RM_RetrieveFATDump_t DUAL(RetrieveFATDump);
+    TVRSIM_EXPORT RM_RetrieveFATDump2_t DUAL(RetrieveFATDump2);
+    TVRSIM_EXPORT RM_SetDumpDirectory_t DUAL(SetDumpDirectory);
+    TVRSIM_EXPORT RM_SetDumpRetentionCount_t DUAL(SetDumpRetentionCount);
+    TVRSIM_EXPORT RM_Set_BE_EventLogConfigDataModule_t DUAL(Set_BE_EventLogConfigDataModule);
+    TVRSIM_EXPORT RM_Set_BE_EventLogTraceLevel_t DUAL(Set_BE_EventLogTraceLevel);
 
     RM_STATUS DUAL(InitLib)()
     {
@@ -425,6 +439,99 @@ extern "C"
         Call call = callOf(__func__, port(wwpn));
         return call.list(mapping, &RM_FcpTargetMapping::count,
                          [&](auto& entries) { return call.host().fcpTargets(fromHba(wwpn), entries); });
+    }
+
+    // --- dumps, and the trace of the firmware
+
+    RM_STATUS DUAL(GenerateDump)(std::uint32_t, std::uint32_t, HBA_WWN wwpn)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().generateDump(fromHba(wwpn), ".dmp"); });
+    }
+
+    RM_STATUS DUAL(GenerateEfdDump)(HBA_WWN wwpn, std::int32_t, std::uint32_t)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().generateDump(fromHba(wwpn), ".efd"); });
+    }
+
+    RM_STATUS DUAL(GenerateCoreDump)(HBA_WWN wwpn, const char* options)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return options ? call.host().generateDump(fromHba(wwpn), ".core") : RM_ERROR; });
+    }
+
+    RM_STATUS DUAL(RetrieveFATDump)()
+    {
+        Call call = callOf(__func__);
+        return call.status([&] { return call.host().generateDumps(".fat"); });
+    }
+
+    RM_STATUS DUAL(RetrieveFATDump2)(HBA_WWN wwpn)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().generateDump(fromHba(wwpn), ".fat"); });
+    }
+
+    RM_STATUS DUAL(GetDumpDirectoryA)(HBA_WWN wwpn, char* buffer, std::uint32_t size)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.text(buffer, size, [&](auto& text) { return call.host().dumpDirectory(fromHba(wwpn), text); });
+    }
+
+    RM_STATUS DUAL(SetDumpDirectory)(HBA_WWN wwpn, const char* directory)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&]
+                           { return directory ? call.host().setDumpDirectory(fromHba(wwpn), directory) : RM_ERROR; });
+    }
+
+    RM_STATUS DUAL(GetDumpRetentionCount)(HBA_WWN wwpn, std::uint32_t* count)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(count, [&](std::uint32_t& out) { return call.host().dumpRetention(fromHba(wwpn), out); });
+    }
+
+    RM_STATUS DUAL(SetDumpRetentionCount)(HBA_WWN wwpn, std::uint32_t count)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().setDumpRetention(fromHba(wwpn), count); });
+    }
+
+    RM_STATUS DUAL(GetDumpFileNames)(HBA_WWN wwpn, RM_DumpFileNames* names)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.list(
+            names, &RM_DumpFileNames::count,
+            [&](auto& entries) { return call.host().dumpFiles(fromHba(wwpn), entries); }, RM_ERROR_BUFFER_TOO_SMALL);
+    }
+
+    RM_STATUS DUAL(DeleteDumpFiles)(HBA_WWN wwpn)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return call.host().deleteDumps(fromHba(wwpn)); });
+    }
+
+    RM_STATUS DUAL(Set_BE_EventLogTraceLevel)(HBA_WWN wwpn, std::uint32_t level, std::uint8_t byte0, std::uint8_t byte1,
+                                              std::uint8_t byte2, std::uint8_t byte3)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status(
+            [&] {
+                return call.host().setTraceLevel(fromHba(wwpn), {level, {byte0, byte1, byte2, byte3}});
+            });
+    }
+
+    RM_STATUS DUAL(Get_BE_EventLogConfigDataAll)(HBA_WWN wwpn, RM_EventLogConfig* config)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.record(config, [&](auto& record) { return call.host().eventLogConfig(fromHba(wwpn), record); });
+    }
+
+    RM_STATUS DUAL(Set_BE_EventLogConfigDataModule)(HBA_WWN wwpn, const RM_EventLogModule* module)
+    {
+        Call call = callOf(__func__, port(wwpn));
+        return call.status([&] { return module ? call.host().setEventLogModule(fromHba(wwpn), *module) : RM_ERROR; });
     }
 
 } // extern "C"

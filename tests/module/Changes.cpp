@@ -74,6 +74,9 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
     const broker::Object help = host.instancesOf("TVRHBA_HelpService").at(0);
     const broker::Object setting = host.instancesOf("TVRHBA_ProviderConfigSetting").at(0);
     const broker::Property target = {"Target", Value::reference(pathOf("TVRHBA_FCPort"))};
+    const broker::Path dumps = pathOf("TVRHBA_DumpService");
+    const broker::Property controller = {"Target", Value::reference(pathOf("TVRHBA_PortController"))};
+    const broker::Object dumpData = host.instancesOf("TVRHBA_DumpData").at(0);
     Value::List image;
     for (const char byte : changeableFirmware())
         image.push_back(Value::uint8(static_cast<std::uint8_t>(byte)));
@@ -110,6 +113,10 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
                 {"Option", Value::uint16(0)}}),
         change("modify setting", [setting](auto& broker)
                { return broker.modifyInstance(changed(setting, "current", setting.get("current"))).status; }),
+        method(dumps, "GenerateDump", {controller}),
+        method(dumps, "GetDumpFileNames", {controller}),
+        change("modify dump data", [dumpData](auto& broker) { return broker.modifyInstance(dumpData).status; }),
+        method(dumps, "DeleteDump", {controller}),
         method(tags, "SetGlobalFlag", {target, {"State", Value::uint32(1)}}),
         method(tags, "GetGlobalFlag", {target}),
         method(tags, "SetConfigTable", {target, {"URI", Value::string(server.uri("/table.xml"))}}),

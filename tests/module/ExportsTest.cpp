@@ -128,7 +128,8 @@ TEST_F(Exports, ProceduresTellClassAndRepository)
 
 TEST_F(Exports, ProceduresAnswerWhatTheyDoNotImplement)
 {
-    const Names modified = {"TVRHBA_FCPort_Provider", "TVRHBA_ProviderConfigSetting_Provider"};
+    const Names modified = {"TVRHBA_FCPort_Provider", "TVRHBA_ProviderConfigSetting_Provider",
+                            "TVRHBA_DumpData_Provider"};
     const Names made = {"TVRHBA_DriverParams_Provider"};
     for (const Registration* record : records)
     {

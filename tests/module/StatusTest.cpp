@@ -28,7 +28,8 @@ TEST(Status, InstancesAreNotCreatedChangedOrDeleted)
     const std::map<std::string, CMPIrc> created = {{"TVRHBA_DriverParams", CMPI_RC_ERR_INVALID_PARAMETER}};
     const std::map<std::string, CMPIrc> deleted = {{"TVRHBA_DriverParams", CMPI_RC_ERR_NOT_FOUND}};
     const std::map<std::string, CMPIrc> modified = {{"TVRHBA_FCPort", CMPI_RC_ERR_INVALID_PARAMETER},
-                                                    {"TVRHBA_ProviderConfigSetting", CMPI_RC_ERR_FAILED}};
+                                                    {"TVRHBA_ProviderConfigSetting", CMPI_RC_ERR_FAILED},
+                                                    {"TVRHBA_DumpData", CMPI_RC_ERR_FAILED}};
     Host host;
     for (const std::string& className : host.broker().servedClasses())
     {

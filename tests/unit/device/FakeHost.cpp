@@ -392,6 +392,64 @@ HBA_STATUS HBA_SendReadCapacity(HBA_HANDLE, HBA_WWN, HBA_UINT64, void* response,
     return writeScsi("HBA_SendReadCapacity", host->capacity, response, size, sense, senseSize);
 }
 
+// --- dumps, and the trace of the firmware
+
+/// A text as the argument of a template.
+template <std::size_t Size> struct Literal
+{
+    consteval Literal(const char (&from)[Size]) { std::copy_n(from, Size, text); }
+    char text[Size];
+};
+
+/// A function without output.
+template <Literal name, class... Arguments> RM_STATUS statusOnly(Arguments...)
+{
+    return host->enter(name.text);
+}
+
+RM_STATUS LRM_GetDumpDirectoryA(HBA_WWN, char* buffer, std::uint32_t size)
+{
+    std::memset(buffer, 'd', size); // without a terminator
+    return host->enter(__func__);
+}
+
+RM_STATUS LRM_GetDumpRetentionCount(HBA_WWN, std::uint32_t* count)
+{
+    *count = 5;
+    return host->enter(__func__);
+}
+
+RM_STATUS LRM_GetDumpFileNames(HBA_WWN, RM_DumpFileNames* names)
+{
+    const int status = host->enter(__func__);
+    return host->dumpList ? host->dumpList(names) : status;
+}
+
+RM_STATUS LRM_Set_BE_EventLogTraceLevel(HBA_WWN, std::uint32_t level, std::uint8_t a, std::uint8_t b, std::uint8_t c,
+                                        std::uint8_t d)
+{
+    host->dumpArguments += std::to_string(level) + ",";
+    for (const std::uint8_t byte : {a, b, c, d})
+        host->dumpArguments += " " + std::to_string(byte);
+    host->dumpArguments += "; ";
+    return host->enter(__func__);
+}
+
+RM_STATUS LRM_Get_BE_EventLogConfigDataAll(HBA_WWN, RM_EventLogConfig* config)
+{
+    *config = host->eventLog;
+    return host->enter(__func__);
+}
+
+RM_STATUS LRM_Set_BE_EventLogConfigDataModule(HBA_WWN, const RM_EventLogModule* module)
+{
+    host->dumpArguments += std::string(module->module) + " " + module->level;
+    for (const std::uint32_t number : {module->portMask, module->functionMask, module->value})
+        host->dumpArguments += " " + std::to_string(number);
+    host->dumpArguments += "; ";
+    return host->enter(__func__);
+}
+
 template <class Function> void* address(Function* function)
 {
     return reinterpret_cast<void*>(function);
@@ -432,6 +490,20 @@ const std::map<std::string, void*>& symbols()
         {"LRM_VpScsiInquiry", address(LRM_VpScsiInquiry)},
         {"LRM_VpScsiReadCapacity", address(LRM_VpScsiReadCapacity)},
         {"LRM_ScsiInquiry", address(LRM_ScsiInquiry)},
+        {"LRM_GenerateDump", address(statusOnly<"LRM_GenerateDump", std::uint32_t, std::uint32_t, HBA_WWN>)},
+        {"LRM_GenerateEfdDump", address(statusOnly<"LRM_GenerateEfdDump", HBA_WWN, std::int32_t, std::uint32_t>)},
+        {"LRM_GenerateCoreDump", address(statusOnly<"LRM_GenerateCoreDump", HBA_WWN, const char*>)},
+        {"LRM_RetrieveFATDump", address(statusOnly<"LRM_RetrieveFATDump">)},
+        {"LRM_RetrieveFATDump2", address(statusOnly<"LRM_RetrieveFATDump2", HBA_WWN>)},
+        {"LRM_GetDumpDirectoryA", address(LRM_GetDumpDirectoryA)},
+        {"LRM_SetDumpDirectory", address(statusOnly<"LRM_SetDumpDirectory", HBA_WWN, const char*>)},
+        {"LRM_GetDumpRetentionCount", address(LRM_GetDumpRetentionCount)},
+        {"LRM_SetDumpRetentionCount", address(statusOnly<"LRM_SetDumpRetentionCount", HBA_WWN, std::uint32_t>)},
+        {"LRM_DeleteDumpFiles", address(statusOnly<"LRM_DeleteDumpFiles", HBA_WWN>)},
+        {"LRM_GetDumpFileNames", address(LRM_GetDumpFileNames)},
+        {"LRM_Set_BE_EventLogTraceLevel", address(LRM_Set_BE_EventLogTraceLevel)},
+        {"LRM_Get_BE_EventLogConfigDataAll", address(LRM_Get_BE_EventLogConfigDataAll)},
+        {"LRM_Set_BE_EventLogConfigDataModule", address(LRM_Set_BE_EventLogConfigDataModule)},
         {"RM_GetAttributeValue", address(RM_GetAttributeValue)},
         {"RM_StatusString", address(RM_StatusString)},
         {"RM_IsLocalHBA", address(RM_IsLocalHBA)},

@@ -63,6 +63,10 @@ public:
     RM_SffData transceiver{};
     RM_FlashList flash{1, {}}; ///< without a region
     std::string version = "7.1";
+    /// Replaces LRM_GetDumpFileNames.
+    std::function<RM_STATUS(RM_DumpFileNames*)> dumpList;
+    RM_EventLogConfig eventLog{};
+    std::string dumpArguments; ///< of the calls that set what is traced, as "3, 1 2 3 4; "
 
     // SCSI answers by page; page 0 is the standard Inquiry.
     std::map<std::uint32_t, std::string> inquiry;
