@@ -28,15 +28,6 @@ constexpr ServiceTexts texts = {
     .anyServiceWithoutOne = true,
 };
 
-/// The head of all methods.
-HBA_WWN targetOf(MethodCall& call, const Instance* reference, const Instance* target)
-{
-    call.self<Service>(reference, texts);
-    if (target && !cast<TVRHBA_PortController>(target)) // another device may have the same DeviceID
-        MethodCall::end(texts.unknownTarget, texts.ofTarget);
-    return call.wwpn(call.target<TVRHBA_PortController>(target, texts).DeviceID.value, texts);
-}
-
 std::uint32_t refusedByLibrary(RM_STATUS status, const LogText& failure)
 {
     constexpr std::uint32_t ofLibrary = 40000;
@@ -47,7 +38,7 @@ std::uint32_t refusedByLibrary(RM_STATUS status, const LogText& failure)
 std::uint32_t generateDump(const Instance* reference, TVRHBA_DumpService_GenerateDump_method& parameters)
 {
     MethodCall call({TVR_DBG, "Entering GenerateDump"});
-    const HBA_WWN wwpn = targetOf(call, reference, parameters.Target);
+    const HBA_WWN wwpn = call.portOf<Service>(reference, parameters.Target, texts);
     if (const RM_STATUS status = tvrcimDumpDiagnostic(wwpn, wholeDump); status != RM_OK)
         return refusedByLibrary(status, {TVR_ERR, "TVRHBA_DumpService::tvrcimDumpDiagnostic failed"});
     TVR_LOG(TVR_DBG, "TVRHBA_DumpService::tvrcimDumpDiagnostic Succesful");
@@ -58,7 +49,7 @@ std::uint32_t generateDump(const Instance* reference, TVRHBA_DumpService_Generat
 std::uint32_t deleteDump(const Instance* reference, TVRHBA_DumpService_DeleteDump_method& parameters)
 {
     MethodCall call({TVR_DBG, "Entering DeleteDump"});
-    const HBA_WWN wwpn = targetOf(call, reference, parameters.Target);
+    const HBA_WWN wwpn = call.portOf<Service>(reference, parameters.Target, texts);
     if (const RM_STATUS status = tvrcimDeleteDumpFiles(wwpn); status != RM_OK)
         return refusedByLibrary(status, {TVR_ERR, "TVRHBA_DumpService::tvrcimDeleteDumpFiles failed"});
     TVR_LOG(TVR_DBG, "TVRHBA_DumpService::tvrcimDeleteDumpFiles Succesful");
@@ -91,7 +82,7 @@ Array<String> dumpsAmong(const std::vector<std::string>& names)
 std::uint32_t getDumpFileNames(const Instance* reference, TVRHBA_DumpService_GetDumpFileNames_method& parameters)
 {
     MethodCall call({TVR_DBG, "Entering GetDumpFileNames method"});
-    const HBA_WWN wwpn = targetOf(call, reference, parameters.Target);
+    const HBA_WWN wwpn = call.portOf<Service>(reference, parameters.Target, texts);
     const std::optional<DumpFileList> files = readDumpFileNames(wwpn);
     if (!files)
         MethodCall::end({}, {32968});

@@ -275,6 +275,46 @@ TEST(Tvrcim, ErrorsNameTheStatusOrTheArgument)
     std::remove(wrongScenario.c_str());
 }
 
+// --- dumps ---------------------------------------------------------------------------------------------
+
+TEST(Tvrcim, HasPortsMakeDumps)
+{
+    const std::string held = R"(["1000027A51160210_20240229_134501.dmp","1000027A51160210_20240301_080000.core"])";
+    for (const char* port : {"1000027A51160210", "10:00:02:7a:51:16:02:10"})
+        EXPECT_EQ(json(std::string("dump --list ") + port).dump(), held);
+    const nlohmann::json made = json("dump 1000027A51160210");
+    ASSERT_EQ(made.size(), 3u);
+    EXPECT_THAT(made[2].get<std::string>(), testing::MatchesRegex("1000027A51160210_[0-9]{8}_[0-9]{6}\\.dmp"));
+    EXPECT_EQ(tvrcim("dump 1000027A51160211 --list").out, "");
+    EXPECT_EQ(tvrcim("dump 1000027A51160210 --delete").out, "deleted the dump files of 1000027A51160210\n");
+    EXPECT_EQ(tvrcim("dump 1000027A51160210 --keep 9").out, "keeping 9 dump files of 1000027A51160210\n");
+
+    const std::string broken = testing::TempDir() + "broken-" + std::to_string(getpid()) + ".json";
+    std::ofstream(broken) << R"({"adapters": [{"name": "A", "serialNumber": "S", "model": "M",
+        "ports": [{"wwpn": "1000000000000001"}]}], "faults": [{"function": "LRM_GenerateDump", "status": 97}]})";
+    const struct
+    {
+        std::string arguments;
+        int exitCode;
+        std::string expected;
+    } rows[] = {
+        {"dump 1000000000000001 --scenario " + broken, 4, "GenerateDump returned 40097"},
+        {"dump 1000027A51160210 --keep 21", 1, "CIM_ERR_FAILED"},
+        {"dump 1000027A51160210 --keep few", 2, "few"},
+        {"dump 1000027A51160210 --keep 3 --list", 2, "--list"},
+        {"dump 1000000000000002 --scenario " + broken, 2, "the host has 1000000000000001"},
+        {"dump", 2, "PORT"},
+    };
+    for (const auto& row : rows)
+    {
+        const Answer run = tvrcim(row.arguments);
+        EXPECT_EQ(run.exitCode, row.exitCode) << row.arguments << "\n" << run.err;
+        EXPECT_THAT(run.err, HasSubstr(row.expected)) << row.arguments;
+        EXPECT_EQ(run.out, "") << row.arguments;
+    }
+    std::remove(broken.c_str());
+}
+
 // --- the end by a signal -------------------------------------------------------------------------------
 
 /// A folder that the tool takes for that of temporary files; it must be empty in the end.
