@@ -71,12 +71,12 @@ RM_STATUS SimulatedHost::generateDumps(const char* ending)
     return RM_OK;
 }
 
-RM_STATUS SimulatedHost::dumpDirectory(Wwn wwpn, std::string& out)
+RM_STATUS SimulatedHost::dumps(Wwn wwpn, DumpFiles& out)
 {
     return changeDumps(wwpn,
                        [&](const DumpFiles& dumps)
                        {
-                           out = dumps.directory;
+                           out = dumps;
                            return RM_OK;
                        });
 }
@@ -93,16 +93,6 @@ RM_STATUS SimulatedHost::setDumpDirectory(Wwn wwpn, std::string_view directory)
                        });
 }
 
-RM_STATUS SimulatedHost::dumpRetention(Wwn wwpn, std::uint32_t& out)
-{
-    return changeDumps(wwpn,
-                       [&](const DumpFiles& dumps)
-                       {
-                           out = dumps.retentionCount;
-                           return RM_OK;
-                       });
-}
-
 RM_STATUS SimulatedHost::setDumpRetention(Wwn wwpn, std::uint32_t count)
 {
     return changeDumps(wwpn,
@@ -111,17 +101,6 @@ RM_STATUS SimulatedHost::setDumpRetention(Wwn wwpn, std::uint32_t count)
                            if (count == 0)
                                return RM_ERROR;
                            dumps.retentionCount = count;
-                           return RM_OK;
-                       });
-}
-
-RM_STATUS SimulatedHost::dumpFiles(Wwn wwpn, std::vector<RM_DumpFileName>& out)
-{
-    return changeDumps(wwpn,
-                       [&](const DumpFiles& dumps)
-                       {
-                           for (const std::string& file : dumps.files)
-                               setText(out.emplace_back().name, file);
                            return RM_OK;
                        });
 }

@@ -124,11 +124,9 @@ public:
     RM_STATUS generateDump(Wwn wwpn, const char* ending);
     /// Of each port.
     RM_STATUS generateDumps(const char* ending);
-    RM_STATUS dumpDirectory(Wwn wwpn, std::string& out);
+    RM_STATUS dumps(Wwn wwpn, DumpFiles& out);
     RM_STATUS setDumpDirectory(Wwn wwpn, std::string_view directory);
-    RM_STATUS dumpRetention(Wwn wwpn, std::uint32_t& out);
     RM_STATUS setDumpRetention(Wwn wwpn, std::uint32_t count);
-    RM_STATUS dumpFiles(Wwn wwpn, std::vector<RM_DumpFileName>& out);
     RM_STATUS deleteDumps(Wwn wwpn);
     RM_STATUS setTraceLevel(Wwn wwpn, const TraceLevel& level);
     RM_STATUS eventLogConfig(Wwn wwpn, RM_EventLogConfig& out);

@@ -9,6 +9,20 @@ using namespace tvrsim;
 /// The exported name of a function.
 #define DUAL(name) TVRSIM_JOIN(TVRSIM_DUAL_PREFIX, name)
 
+namespace
+{
+
+/// Gives `use` what the library keeps of a port's dumps.
+template <class Use> RM_STATUS readDumps(Call& call, const HBA_WWN& wwpn, Use use)
+{
+    DumpFiles dumps;
+    const RM_STATUS status = call.host().dumps(fromHba(wwpn), dumps);
+    use(dumps);
+    return status;
+}
+
+} // namespace
+
 extern "C"
 {
 
@@ -476,7 +490,9 @@ extern "C"
     RM_STATUS DUAL(GetDumpDirectoryA)(HBA_WWN wwpn, char* buffer, std::uint32_t size)
     {
         Call call = callOf(__func__, port(wwpn));
-        return call.text(buffer, size, [&](auto& text) { return call.host().dumpDirectory(fromHba(wwpn), text); });
+        return call.text(buffer, size,
+                         [&](auto& text)
+                         { return readDumps(call, wwpn, [&](DumpFiles& dumps) { text = dumps.directory; }); });
     }
 
     RM_STATUS DUAL(SetDumpDirectory)(HBA_WWN wwpn, const char* directory)
@@ -489,7 +505,8 @@ extern "C"
     RM_STATUS DUAL(GetDumpRetentionCount)(HBA_WWN wwpn, std::uint32_t* count)
     {
         Call call = callOf(__func__, port(wwpn));
-        return call.record(count, [&](std::uint32_t& out) { return call.host().dumpRetention(fromHba(wwpn), out); });
+        return call.record(count, [&](std::uint32_t& out)
+                           { return readDumps(call, wwpn, [&](DumpFiles& dumps) { out = dumps.retentionCount; }); });
     }
 
     RM_STATUS DUAL(SetDumpRetentionCount)(HBA_WWN wwpn, std::uint32_t count)
@@ -503,7 +520,16 @@ extern "C"
         Call call = callOf(__func__, port(wwpn));
         return call.list(
             names, &RM_DumpFileNames::count,
-            [&](auto& entries) { return call.host().dumpFiles(fromHba(wwpn), entries); }, RM_ERROR_BUFFER_TOO_SMALL);
+            [&](auto& entries)
+            {
+                return readDumps(call, wwpn,
+                                 [&](DumpFiles& dumps)
+                                 {
+                                     for (const std::string& file : dumps.files)
+                                         setText(entries.emplace_back().name, file);
+                                 });
+            },
+            RM_ERROR_BUFFER_TOO_SMALL);
     }
 
     RM_STATUS DUAL(DeleteDumpFiles)(HBA_WWN wwpn)

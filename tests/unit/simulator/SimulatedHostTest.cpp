@@ -180,6 +180,52 @@ TEST_F(Host, RmQueriesAnswerForThePortTheyName)
     EXPECT_EQ(host.pciRegisters(disks, pci), RM_ERROR_INVALID_WWN);
 }
 
+TEST_F(Host, DumpsOfEachFunctionAreKeptForTheirPort)
+{
+    const auto endings = [&](Wwn port)
+    {
+        DumpFiles dumps;
+        EXPECT_EQ(host.dumps(port, dumps), RM_OK);
+        std::vector<std::string> texts;
+        for (const std::string& file : dumps.files)
+            texts.push_back(file.substr(file.find('.')));
+        return texts;
+    };
+    EXPECT_EQ(host.generateDump(portA, ".dmp"), RM_OK);
+    EXPECT_EQ(host.generateDumps(".fat"), RM_OK);
+    EXPECT_EQ(host.setDumpDirectory(portA, "relative"), RM_ERROR_DIRECTORY_NOT_OPENED);
+    EXPECT_EQ(host.setDumpDirectory(portA, "/d"), RM_OK);
+    EXPECT_EQ(host.setDumpRetention(portA, 0), RM_ERROR);
+    EXPECT_EQ(host.setDumpRetention(portA, 2), RM_OK);
+    EXPECT_EQ(host.generateDump(portA, ".core"), RM_OK);
+    EXPECT_THAT(endings(portA), ElementsAre(".fat", ".core"));
+    EXPECT_THAT(endings(portB), ElementsAre(".fat"));
+    DumpFiles dumps;
+    EXPECT_EQ(host.dumps(portA, dumps), RM_OK);
+    EXPECT_EQ(dumps.directory, "/d");
+}
+
+TEST(TracedModules, AreChangedByTheirName)
+{
+    SimulatedHost host;
+    host.load(readScenario(R"({"adapters": [{"name": "A", "ports": [{"wwpn": "1000027A000000A0", "tracedModules": [
+        {"module": "link", "level": "info", "portMask": 1}, {"module": "dma", "value": 2}]}]}]})",
+                           "test"));
+    RM_EventLogModule changed{};
+    setText(changed.module, "dma");
+    changed.value = 9;
+    EXPECT_EQ(host.setEventLogModule(portA, changed), RM_OK);
+    setText(changed.module, "none");
+    EXPECT_EQ(host.setEventLogModule(portA, changed), RM_ERROR);
+    RM_EventLogConfig config{};
+    EXPECT_EQ(host.eventLogConfig(portA, config), RM_OK);
+    EXPECT_EQ(config.room, 64u);
+    ASSERT_EQ(config.count, 2u);
+    EXPECT_STREQ(config.entry[0].level, "info");
+    EXPECT_EQ(config.entry[0].portMask, 1u);
+    EXPECT_EQ(config.entry[1].value, 9u);
+}
+
 TEST_F(Host, VirtualPortsBelongToTheirPort)
 {
     std::vector<RM_VPortEntry> entries;
