@@ -241,9 +241,8 @@ TEST_F(DumpCalls, TracedModulesAreHandedOutWithinTheirRoom)
 
 // --- classes that cannot be made
 
-class DumpClasses : public DumpCalls
+struct DumpClasses : DumpCalls
 {
-protected:
     DumpClasses()
     {
         auto system = fresh<CIM_ComputerSystem>();
