@@ -60,12 +60,12 @@ bool anybodyMayWrite(const File_Descriptor& folder)
 
 // --- opening and reading -------------------------------------------------------------------------------
 
-File_Descriptor openForWriting(const char* path, WriteMode mode)
+File_Descriptor openForAppending(const char* path, int flags)
 {
     const Place place = placeOf(path);
     if (!place.folder)
         return File_Descriptor();
-    int flags = mode == WriteMode::Append ? O_RDWR | O_APPEND | O_CREAT : O_WRONLY | O_TRUNC | O_CREAT;
+    flags |= O_RDWR | O_APPEND | O_CREAT;
     if (anybodyMayWrite(place.folder))
         flags |= O_NOFOLLOW;
     return open_regular(place.name.c_str(), flags, newFile, place.folder.get());

@@ -12,15 +12,9 @@
 namespace cimple
 {
 
-enum class WriteMode
-{
-    Truncate, ///< as "w"
-    Append,   ///< as "a+"
-};
-
-/// Opens for writing, creating the file with 0644; none with errno on failure. In a folder that anybody may write to,
-/// a symbolic link is refused.
-File_Descriptor openForWriting(const char* path, WriteMode mode);
+/// Opens for reading and appending, creating the file with 0644; none with errno on failure. In a folder that anybody
+/// may write to, a symbolic link is refused. `flags` are further ones of open(), such as O_NOFOLLOW.
+File_Descriptor openForAppending(const char* path, int flags = 0);
 
 /// Whether a name from a client names a file of a folder: not empty, no folder in it, and neither of the dot entries.
 bool isPlainFileName(std::string_view name);

@@ -90,6 +90,11 @@ LogData parseLogData(std::string_view text)
     return data;
 }
 
+bool fitsLogData(std::string_view path)
+{
+    return parseLogData(std::string("2,0,0\n").append(path)).path == path;
+}
+
 // --- file ----------------------------------------------------------------------------------------------
 
 void TVR_Logger::resolveDataPath()

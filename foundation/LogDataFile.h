@@ -38,4 +38,7 @@ struct LogData
 
 LogData parseLogData(std::string_view text);
 
+/// Whether the path of a log file is read back as it is.
+bool fitsLogData(std::string_view path);
+
 } // namespace cimple

@@ -1,13 +1,16 @@
 #include "foundation/TVR_FileLogger.h"
 
+#include "foundation/LogDataFile.h"
 #include "runtime/log/LogLine.h"
 #include "runtime/values/Datetime.h"
 
 #include <pthread.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
+#include <string_view>
 
 namespace cimple
 {
@@ -30,6 +33,17 @@ bool isWritableOrAbsent(const char* path)
     return (status.st_mode & S_IWUSR) != 0;
 }
 
+/// Whether the text is the head of a line as logMessage() writes it.
+bool beginsLikeALine(std::string_view text)
+{
+    constexpr std::string_view begin = "[threadid =";
+    if (!text.starts_with(begin))
+        return false;
+    text.remove_prefix(begin.size());
+    const std::size_t digits = std::min(text.find_first_not_of("0123456789"), text.size());
+    return digits != 0 && text.substr(digits).starts_with("l] [");
+}
+
 } // namespace
 
 TVR_FileLogger::TVR_FileLogger()
@@ -49,18 +63,46 @@ int TVR_FileLogger::validateAndSetPath(const char* path, bool errorsOnly)
     return status;
 }
 
-int TVR_FileLogger::setPath(const char* path, bool errorsOnly)
+int TVR_FileLogger::validateAndSetClientPath(const String& path)
+{
+    if (!path.view().starts_with('/') || !fitsLogData(path.view()))
+        return -1;
+    const int status = setPath(path.c_str(), false, NamedBy::Client);
+    TVR_Logger::instance().sinkChanged();
+    return status;
+}
+
+int TVR_FileLogger::setPath(const char* path, bool errorsOnly, NamedBy namedBy)
 {
     if (!path || !isWritableOrAbsent(path))
         return -1;
-    File_Descriptor file = openForWriting(path, WriteMode::Append);
-    if (!file)
-        return -1;
+    const bool byClient = namedBy == NamedBy::Client;
+    File_Descriptor file = openForAppending(path, byClient ? O_NOFOLLOW : 0);
     Auto_Mutex lock(_mutex);
+    // Also a path that was accepted before: a client may have named it, and others may since have put another file
+    // under it.
+    const bool mustBeLog = byClient || _path == path;
+    if (!file || (mustBeLog && !isLog(file)))
+        return -1;
     _file = std::move(file);
     _path = path;
     _errorsOnly = errorsOnly;
     return 0;
+}
+
+/// The file that is open already, one of this user that nobody has written to, or one that begins as a log does.
+bool TVR_FileLogger::isLog(const File_Descriptor& file) const
+{
+    struct stat status;
+    struct stat known;
+    if (fstat(file.get(), &status) != 0)
+        return false;
+    if (_file && fstat(_file.get(), &known) == 0 && status.st_dev == known.st_dev && status.st_ino == known.st_ino)
+        return true;
+    char head[64];
+    const ssize_t size = pread(file.get(), head, sizeof head, 0);
+    return status.st_uid == geteuid() && size >= 0 &&
+           (size == 0 || beginsLikeALine({head, static_cast<std::size_t>(size)}));
 }
 
 String TVR_FileLogger::getPath() const
@@ -118,17 +160,17 @@ void TVR_FileLogger::stop()
 void TVR_FileLogger::clearLog()
 {
     Auto_Mutex lock(_mutex);
-    _file = File_Descriptor();
-    if (!_path.empty())
-        openForWriting(_path.c_str(), WriteMode::Truncate);
     reopen();
+    if (_file && ftruncate(_file.get(), 0) != 0)
+        _file = File_Descriptor(); // as when it cannot be opened
 }
 
 void TVR_FileLogger::reopen()
 {
-    _file = File_Descriptor();
+    File_Descriptor file;
     if (!_path.empty())
-        _file = openForWriting(_path.c_str(), WriteMode::Append);
+        file = openForAppending(_path.c_str());
+    _file = file && isLog(file) ? std::move(file) : File_Descriptor();
 }
 
 } // namespace cimple

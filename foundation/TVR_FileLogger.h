@@ -18,6 +18,10 @@ public:
     /// Moves the log to another file, which is created if need be; `errorsOnly` drops all but critical messages and
     /// errors. Returns 0, or -1 with the old file still in use.
     int validateAndSetPath(const char* path, bool errorsOnly);
+    /// The same for a path that a client names, who must not get at other files of the host: an absolute path of a new
+    /// file, an empty one of this user, or a log that this module wrote; without a link at its end, and such that the
+    /// data file can keep it.
+    int validateAndSetClientPath(const String& path);
     /// Empty when no path is set.
     String getPath() const;
 
@@ -30,10 +34,16 @@ public:
 private:
     friend class TVR_Logger;
 
+    enum class NamedBy
+    {
+        Administrator,
+        Client,
+    };
     /// validateAndSetPath() under the logger's mutex.
-    int setPath(const char* path, bool errorsOnly);
+    int setPath(const char* path, bool errorsOnly, NamedBy namedBy = NamedBy::Administrator);
     // The mutex is held.
     void reopen();
+    bool isLog(const File_Descriptor& file) const;
     unsigned levels() const;
 
     mutable Mutex _mutex; ///< taken after the logger's
