@@ -38,4 +38,13 @@ template <class Record> struct SecondMapPlace;
     };
 #include "agent/ClassCatalog.def"
 
+/// Null where the class has one map alone.
+template <class Record> constexpr Instance_Map InstanceCache::*secondMap()
+{
+    if constexpr (requires { SecondMapPlace<Record>::map; })
+        return SecondMapPlace<Record>::map;
+    else
+        return nullptr;
+}
+
 } // namespace cimple

@@ -93,14 +93,14 @@ void copyAfterLiveRefresh(ProviderAgent& agent, Mutex& classMutex, LiveRefresh r
 
 } // namespace
 
-int enumeratePlain(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client,
-                   const Selection& selection)
+int enumeratePlain(Instance_Map InstanceCache::*map, Instance_Map InstanceCache::*second, const char* providerName,
+                   Instance_Handler handler, void* client, const Selection& selection)
 {
     try
     {
         ProviderAgent& agent = *ProviderAgent::instance();
         agent.BuildCimpleInfo();
-        Reading reading(agent.*map, selection);
+        Reading reading(agent.*map, selection, second ? &(agent.*second) : nullptr);
         copyWhenReady(agent, agent.adapterMaps(), reading);
         reading.deliver(providerName, handler, client);
     }

@@ -14,9 +14,10 @@ int unloadProvider(const char* providerName);
 
 /// Copies what is selected of the map under the locks, then gives the copies to the handler. Every failure leaves a log
 /// line and ends the enumeration with what was sent; the status is always 0. A handler that must know whether it was
-/// given everything is told by a null instance with ENUM_INSTANCES_FAILED.
-int enumeratePlain(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client,
-                   const Selection& selection);
+/// given everything is told by a null instance with ENUM_INSTANCES_FAILED. A second map, if there is one, comes behind
+/// the first.
+int enumeratePlain(Instance_Map InstanceCache::*map, Instance_Map InstanceCache::*second, const char* providerName,
+                   Instance_Handler handler, void* client, const Selection& selection);
 
 /// The same for SAN classes, whose maps are built when one of them is asked for.
 int enumerateSan(Instance_Map InstanceCache::*map, const char* providerName, Instance_Handler handler, void* client,

@@ -5,6 +5,7 @@
 #include "agent/LaneName.h"
 #include "device/Data.h"
 #include "device/TVR_MethodWrapper.h"
+#include "foundation/DeviceEventBuffer.h"
 #include "foundation/TVR_CIMLogger.h"
 #include "foundation/TVR_FileLogger.h"
 #include "foundation/TVR_SysLogger.h"
@@ -94,6 +95,7 @@ public:
     TVR_CIMLogger m_cimLogger;
     TVR_SysLogger m_sysLogger;
     TvrConfigFile m_config;
+    DeviceEventBuffer m_deviceEvents; ///< what the driver log shows; under m_DataMutex
 
     // --- stages of the refresh
     Mutex m_DataMutex; ///< device data and the contents of the maps

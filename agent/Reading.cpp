@@ -9,7 +9,9 @@ namespace cimple
 
 void Reading::copy(const RefreshStage& stage)
 {
-    const std::optional<std::size_t> refused = _cached.copy_to(_local, _selection);
+    std::optional<std::size_t> refused = _cached.copy_to(_local, _selection);
+    if (!refused && _second)
+        refused = _second->copy_to(_local, _selection);
     if (refused)
         TVR_LOG(TVR_CRIT, "Insert failed for %zu", *refused);
     _copied = refused ? Copied::refused : stage.incomplete ? Copied::incomplete : Copied::all;

@@ -13,9 +13,9 @@ namespace cimple
 class Reading
 {
 public:
-    /// `cached` and `selection` stay the caller's.
-    Reading(const Instance_Map& cached, const Selection& selection)
-        : _cached(cached), _selection(selection), _local(cached.meta_class)
+    /// The maps and `selection` stay the caller's. What is in `second` comes behind what is in `cached`.
+    Reading(const Instance_Map& cached, const Selection& selection, const Instance_Map* second = nullptr)
+        : _cached(cached), _second(second), _selection(selection), _local(cached.meta_class)
     {}
 
     /// The caller holds m_DataMutex.
@@ -36,6 +36,7 @@ private:
     };
 
     const Instance_Map& _cached;
+    const Instance_Map* _second;
     const Selection& _selection;
     Instance_Map _local;
     Copied _copied = Copied::all;

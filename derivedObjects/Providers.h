@@ -6,6 +6,9 @@
 #include "agent/ProviderExtension.h"
 #include "diagnostics/DiagnosticsLog.h"
 #include "diagnostics/HelpService.h"
+#include "logs/DriverLog.h"
+#include "logs/LogEntries.h"
+#include "logs/RecordLog.h"
 #include "model/FCPortProvider.h"
 #include "model/LiveRefresh.h"
 #include "model/ProfileProviders.h"
@@ -37,7 +40,8 @@ template <class Class> struct PlainForm : ProviderBase<Class>
 {
     int enum_instances(const Instance*, Instance_Handler handler, void* client, const Selection& selection)
     {
-        return enumeratePlain(MapPlace<Class>::map, CatalogRow<Class>::providerName, handler, client, selection);
+        return enumeratePlain(MapPlace<Class>::map, secondMap<Class>(), CatalogRow<Class>::providerName, handler,
+                              client, selection);
     }
 };
 
@@ -61,21 +65,6 @@ template <class Class> struct ActiveForm : ProviderBase<Class>
 
 /// A class of this form has its enumeration in its Extended.
 template <class Class> struct OwnForm : ProviderBase<Class>
-{};
-
-// Nothing builds instances of these but the steps of the refresh: they serve what is in their map.
-template <> struct Extended<TVRHBA_LogEntry, OwnForm<TVRHBA_LogEntry>> : PlainForm<TVRHBA_LogEntry>
-{};
-template <>
-struct Extended<TVRHBA_RecordLogManagesRecord, OwnForm<TVRHBA_RecordLogManagesRecord>>
-    : PlainForm<TVRHBA_RecordLogManagesRecord>
-{};
-template <>
-struct Extended<TVRHBA_FCDriverLogEntry, OwnForm<TVRHBA_FCDriverLogEntry>> : PlainForm<TVRHBA_FCDriverLogEntry>
-{};
-template <>
-struct Extended<TVRHBA_DriverRecordLogManagesRecord, OwnForm<TVRHBA_DriverRecordLogManagesRecord>>
-    : PlainForm<TVRHBA_DriverRecordLogManagesRecord>
 {};
 
 /// The code of a provider does what its row says, no more and no less: a misspelt function, or the header of an

@@ -1,5 +1,5 @@
 // The record log that publishes the module's own log, as an instance.
-#include "agent/Build.h"
+#include "agent/RecordLogs.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
 #include "schema/TVRHBA_EnabledRecordLogCapabilities.h"
@@ -18,7 +18,7 @@ namespace
 Ref<TVRHBA_RecordLog> makeProviderLog(const HostContext& host)
 {
     const TVR_Logger& logger = TVR_Logger::instance();
-    const String id = formatText("TVRHBA:ProviderLog:%s", host.system->Name.value.c_str());
+    const String id = providerLogId(host.system->Name.value);
     const bool enabled = logger.isEnabled();
     Ref<TVRHBA_RecordLog> log = fresh<TVRHBA_RecordLog>();
     log->InstanceID.set(id);
@@ -86,11 +86,7 @@ std::uint32_t associateProvider(HostContext& host, const TVRHBA_RecordLog* log)
     const TVRHBA_SoftwareIdentity* identity = host.providerIdentity;
     if (!identity)
         return failed({TVR_DBG, "Missing Provider Software Identity"});
-    using Use = TVRHBA_ProviderUseOfLog;
-    join<Use>(
-        host.agent, &Use::Antecedent, log, &Use::Dependent, identity, "Insert Failed : m_TVRHBA_ProviderUseOfLog_map",
-        [&](Use&)
-        { TVR_LOG(TVR_DBG, "%s uses log : %s", identity->InstanceID.value.c_str(), log->InstanceID.value.c_str()); });
+    associateUseOfLog(mapOf<TVRHBA_ProviderUseOfLog>(host.agent), log, identity);
     return BUILD_DONE;
 }
 

@@ -1,5 +1,6 @@
 #include "model/SoftwareIdentities.h"
 
+#include "agent/DriverIdentity.h"
 #include "agent/SoftwareVersion.h"
 #include "device/Data.h"
 #include "model/Affects.h"
@@ -42,11 +43,6 @@ constexpr std::uint16_t installed = 6;
 
 // --- driver
 
-String driverIdentityId(const Attributes& attributes)
-{
-    return formatText("TVR FC HBA: Driver %s v%s", attributes.driverName.c_str(), attributes.driverVersion.c_str());
-}
-
 Ref<Identity> makeDriverIdentity(const Attributes& attributes)
 {
     const String name(attributes.driverName);
@@ -63,13 +59,6 @@ Ref<Identity> makeDriverIdentity(const Attributes& attributes)
     identity->IdentityInfoValue.set({name});
     identity->IsEntity.set(true);
     return identity;
-}
-
-/// The identity of an adapter's driver; null where the adapter does not tell its driver.
-Identity* driverOf(ProviderAgent& agent, const Attributes& attributes)
-{
-    const String id = driverIdentityId(attributes);
-    return mapOf<Identity>(agent).findFirst([&](const Identity& known) { return known.InstanceID.value == id; });
 }
 
 void installOnSystem(const HostContext& host, const Identity* identity)
@@ -223,7 +212,7 @@ std::uint32_t createDriverSoftwareIdentities(HostContext& host)
         const auto* fcAdapter = dynamic_cast<const FCAdapter*>(adapter);
         const Attributes* attributes = fcAdapter ? fcAdapter->getAttributes() : nullptr;
         const bool isTold = attributes && !(attributes->driverName.empty() && attributes->driverVersion.empty());
-        if (!isTold || driverOf(agent, *attributes))
+        if (!isTold || findDriverIdentity(agent, *attributes))
             continue;
         Identity* identity = mapOf<Identity>(agent).insert(makeDriverIdentity(*attributes),
                                                            "Insert Failed : m_TVRHBA_SoftwareIdentity_map");
@@ -241,7 +230,7 @@ std::uint32_t createDriverSoftwareIdentities(HostContext& host)
 std::uint32_t createPortSoftwareIdentities(PortContext& port)
 {
     const HostContext& host = port.host;
-    tieAsSoftware(port, driverOf(host.agent, port.on.attributes), current);
+    tieAsSoftware(port, findDriverIdentity(host.agent, port.on.attributes), current);
     for (const SoftwareRow& row : softwareRows)
     {
         if (!isReported(row, port))

@@ -2,6 +2,7 @@
 #include "agent/RefreshSteps.h"
 
 #include "diagnostics/DiagnosticFeature.h"
+#include "logs/DriverLog.h"
 #include "model/ComputerSystem.h"
 #include "model/DriverParameters.h"
 #include "model/PhysicalModel.h"
@@ -56,6 +57,7 @@ constexpr HostStep cardSteps[] = {
      GoOn,
      {TVR_DBG, "FC_CreateDumpClasses failed with status %d"},
      {TVR_ERR, "Exception in FC_CreateDumpClasses"}},
+    {createFCDriverLogClasses, GoOn, {TVR_INFO, "Issue with FC Driver Log classes"}},
     {createPortVirtualization,
      GoOn,
      {TVR_ERR, "CreatePortVirtualizationClasses failed: %d"},
