@@ -171,6 +171,80 @@ TEST_F(FileSink, FollowsNoLinkWhereAnybodyMayWrite)
     EXPECT_EQ(file.validateAndSetPath(link.c_str(), false), -1);
 }
 
+constexpr const char* ownLine = "[threadid =12l] [2026/11/22 18:00:00.000000+000] [A.cpp:1][TVR_ERR] a\n";
+
+TEST_F(FileSink, TakesFromAClientNewFilesAndLogsAlone)
+{
+    const std::string folder = root / "logs";
+    std::filesystem::create_directory(folder);
+    std::filesystem::create_directory(folder + "/folder");
+    mkfifo((folder + "/pipe").c_str(), 0600);
+    writeFile(folder + "/log", ownLine);
+    writeFile(folder + "/empty", "");
+    writeFile(folder + "/other", "root:x:0:0\n");
+    writeFile(folder + "/almost", "[threadid =l] [");
+    writeFile(folder + "/read-only", ownLine);
+    chmod((folder + "/read-only").c_str(), 0444);
+    std::filesystem::create_symlink(folder + "/log", folder + "/link");
+    std::filesystem::create_symlink(folder + "/nowhere", folder + "/broken");
+    const std::string longest = folder + "/" + std::string(254 - folder.size(), 'n');
+    const std::pair<std::string, int> rows[] = {
+        {folder + "/new", 0},
+        {folder + "/log", 0},
+        {folder + "/empty", 0},
+        {longest, 0},
+        {longest + "n", -1},
+        {folder + "/other", -1},
+        {folder + "/almost", -1},
+        {folder + "/link", -1},
+        {folder + "/broken", -1},
+        {folder + "/folder", -1},
+        {folder + "/pipe", -1},
+        {folder + "/read-only", -1},
+        {folder + "/new/below", -1},
+        {folder + "/none/x", -1},
+        {"/dev/null", -1},
+        {folder + "/a\nb", -1},
+        {folder + "/a\rb", -1},
+        {"relative", -1},
+        {folder + std::string("/a\0b", 4), -1},
+    };
+    for (const auto& [named, status] : rows)
+    {
+        EXPECT_EQ(file.validateAndSetClientPath(named), status) << named;
+        if (status == 0)
+        {
+            EXPECT_EQ(file.getPath().view(), named);
+        }
+    }
+    EXPECT_EQ(fileText(folder + "/other"), "root:x:0:0\n");
+    EXPECT_FALSE(std::filesystem::exists(folder + "/nowhere"));
+}
+
+/// Whoever may write to the folder of a log puts another file, or a link to one, under its name.
+TEST_F(FileSink, LeavesAFileAloneThatTookTheLogsPlace)
+{
+    const std::string other = root / "other";
+    for (const bool link : {true, false})
+    {
+        std::filesystem::remove(path);
+        ASSERT_EQ(file.validateAndSetClientPath(path), 0);
+        TVR_LOG(TVR_ERR, "one");
+        std::filesystem::remove(path);
+        writeFile(other, "precious\n");
+        if (link)
+            std::filesystem::create_symlink(other, path);
+        else
+            std::filesystem::rename(other, path);
+        logger.setMode(4); // opens it again
+        logger.clearAll();
+        logger.writeDataFile();
+        logger.readDataFile();
+        TVR_LOG(TVR_ERR, "two");
+        EXPECT_EQ(fileText(link ? other : path), "precious\n");
+    }
+}
+
 TEST_F(FileSink, AppendsAndGoesOnAfterAClear)
 {
     writeFile(path, "from before\n");
