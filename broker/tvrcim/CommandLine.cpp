@@ -81,6 +81,18 @@ public:
         _current->add_option("--output", _command.output, help);
         return *this;
     }
+    CommandOptions& log()
+    {
+        CLI::Option* driver =
+            _current->add_flag("--driver", _command.driver,
+                               "what the kernel driver wrote to the system log; enables this log, and "
+                               "with it the logging of the provider");
+        _current->add_flag("--follow", _command.follow, "go on with what comes later");
+        _current->add_option("--level", _command.level, "1 for critical messages, 2 for warnings too, 3 for all")
+            ->check(CLI::Range(1, 3))
+            ->excludes(driver);
+        return *this;
+    }
     CommandOptions& associationClass(const char* option)
     {
         _current->add_option(option, _command.filter.assocClass, "association class");
@@ -136,6 +148,10 @@ void addCommands(CommandOptions& options)
     options.add("topology", "draw cards, ports, targets and units as a graph for graphviz")
         .all("draw each target and unit, however many")
         .output("write FILE.dot, or a picture FILE.svg, .png or .pdf by graphviz");
+    options
+        .add("log", "show errors and warnings of the provider, the newest last; where its log in memory is off, this "
+                    "switches it on, starts the provider anew, and leaves the log on")
+        .log();
 }
 
 std::vector<std::string> serverNames()

@@ -3,6 +3,7 @@
 #include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/Graphviz.h"
 #include "broker/tvrcim/HostReport.h"
+#include "broker/tvrcim/LogCommand.h"
 #include "broker/tvrcim/Progress.h"
 #include "broker/tvrcim/Topology.h"
 #include "broker/values/PathText.h"
@@ -351,6 +352,7 @@ constexpr std::array<CommandRow, 14> commands{{
     {"host", showHost},
     {"dump", dump},
     {"topology", drawTopology},
+    {"log", showLog},
 }};
 
 } // namespace

@@ -73,6 +73,7 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
                        parameters = pathOf("TVRHBA_FCHBADriverParamService"), tags = pathOf("TVRHBA_FCTagService");
     const broker::Object help = host.instancesOf("TVRHBA_HelpService").at(0);
     const broker::Object setting = host.instancesOf("TVRHBA_ProviderConfigSetting").at(0);
+    const broker::Path driverLog = pathOf("TVRHBA_RecordLog"), log = host.instancesOf("TVRHBA_RecordLog").back().path;
     const broker::Property target = {"Target", Value::reference(pathOf("TVRHBA_FCPort"))};
     const broker::Path dumps = pathOf("TVRHBA_DumpService");
     const broker::Property controller = {"Target", Value::reference(pathOf("TVRHBA_PortController"))};
@@ -126,6 +127,13 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
                {{"RequestedDocument", Value::string(text(help, "Name"))},
                 {"Format", Value::uint16(1)},
                 {"RequestedDelivery", Value::uint16(1)}}),
+        method(log, "SetLogParams",
+               {{"LogLevel", Value::uint16(5)},
+                {"LogMode", Value::uint16(4)},
+                {"TracePath", Value::string((host.root() / "provider.log").string())}}),
+        method(log, "RequestStateChange", {{"RequestedState", Value::uint16(2)}}),
+        method(driverLog, "RequestStateChange", {{"RequestedState", Value::uint16(2)}}),
+        method(driverLog, "ClearLog", {}),
         method(software, "ResetHBA", {target}),
     };
 }

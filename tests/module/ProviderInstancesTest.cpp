@@ -240,7 +240,7 @@ RequestedState = 2
 TracePath = ")" + path + R"("
 TransitioningToState = 12
 )"));
-    EXPECT_THAT(described(host, "TVRHBA_EnabledRecordLogCapabilities"), ElementsAre(R"(
+    EXPECT_THAT(described(host, "TVRHBA_EnabledRecordLogCapabilities"), testing::Contains(R"(
 ElementName = "TVRHBA provider log capabilities"
 ElementNameEditSupported = false
 InstanceID = "TVRHBA provider log capabilities"
@@ -252,7 +252,7 @@ RequestedStatesSupported = {2, 3}
                             "\"TVRHBA provider log capabilities\"\nManagedElement = " +
                             recordLog + "\n"));
     EXPECT_THAT(described(host, "TVRHBA_ProviderUseOfLog"),
-                ElementsAre("\nAntecedent = " + recordLog + "\nDependent = " + identity + "\n"));
+                testing::Contains("\nAntecedent = " + recordLog + "\nDependent = " + identity + "\n"));
     EXPECT_THAT(described(host, "TVRHBA_RecordLogConformsToProfile"),
                 testing::Contains("\nConformantStandard = root/pg_interop:TVRHBA_RegisteredProfile.InstanceID="
                                   "\"TVR:Record Log\"\nManagedElement = " +
@@ -269,7 +269,7 @@ TEST(ProviderInstances, RecordLogOfADisabledLoggerIsDisabled)
 {
     Host host;
     host.write("/etc/tavrin_fc_provider.dmp", "1,3,0\n" + (host.root() / "provider.log").string());
-    const broker::Object log = host.instancesOf("TVRHBA_RecordLog").at(0);
+    const broker::Object log = host.instancesOf("TVRHBA_RecordLog").back(); // behind the driver's
     EXPECT_EQ(log.get("RequestedState").asUnsigned(), 5u);
     EXPECT_EQ(log.get("EnabledState").asUnsigned(), 3u);
     EXPECT_EQ(log.get("LogLevel").asUnsigned(), 3u);

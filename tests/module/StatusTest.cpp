@@ -78,7 +78,7 @@ TEST(Status, MethodsWithoutABodyAreRefused)
     } rows[] = {
         {"TVRHBA_Card", "IsCompatible", CMPI_RC_ERR_NOT_SUPPORTED},
         {"TVRHBA_SoftwareInstallationService", "StartService", CMPI_RC_ERR_NOT_SUPPORTED},
-        {"TVRHBA_RecordLog", "CLEARLOG", CMPI_RC_ERR_NOT_SUPPORTED},
+        {"TVRHBA_Card", "ISCOMPATIBLE", CMPI_RC_ERR_NOT_SUPPORTED},
         {"TVRHBA_Card", "NoSuchMethod", CMPI_RC_ERR_METHOD_NOT_FOUND},
         {"TVRHBA_CardContainsChip", "IsCompatible", CMPI_RC_ERR_METHOD_NOT_FOUND},
         {"TVRHBA_Card", "TVRHBA_Card", CMPI_RC_ERR_METHOD_NOT_FOUND},
