@@ -2,6 +2,7 @@
 #include "bench/HostAndFloor.h"
 #include "bench/Workloads.h"
 #include "device/Target.h"
+#include "logs/NewestLines.h"
 #include "schema/TVRHBA_Card.h"
 #include "schema/TVRHBA_LocalHostedAccessPoint.h"
 #include "schema/TVRHBA_SCSIInitiatorTargetStorageVolumePath.h"
@@ -13,10 +14,14 @@
 
 #include <algorithm>
 #include <chrono>
+#include <cstdio>
+#include <cstdlib>
 #include <ctime>
+#include <fstream>
 #include <limits>
 #include <set>
 #include <string>
+#include <unistd.h>
 #include <utility>
 
 using namespace cimple;
@@ -264,6 +269,61 @@ TEST(Ratio, OperationsOnAVolumeDoNotGrowWithTheSan)
         << many.associatorNames << " ns against " << few.associatorNames << " ns";
     EXPECT_LE(many.associators, 2 * some.associators)
         << many.associators << " ns a volume against " << some.associators << " ns";
+}
+
+// --- the driver's log -------------------------------------------------------------------------------------
+
+/// Milliseconds, best of a few.
+template <class Work> double milliseconds(Work work)
+{
+    double best = std::numeric_limits<double>::max();
+    for (int round = 0; round < 5; round++)
+    {
+        const auto start = std::chrono::steady_clock::now();
+        work();
+        best =
+            std::min(best, std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() - start).count());
+    }
+    return best;
+}
+
+/// A system log of 256 MiB in which one line in 500 is the driver's.
+std::size_t writeSystemLog(const std::string& file)
+{
+    std::string part;
+    for (int i = 0; i < 10000; i++)
+        part += i % 500 == 0 ? "Nov 22 18:00:00 host kernel: tvfc 0000:08:00.0: link up, 8 Gbit/s\n"
+                             : "Nov 22 18:00:00 host kernel: usb 1-1: new high-speed device number " +
+                                   std::to_string(i) + " using xhci_hcd, verified after transfer of fc service\n";
+    std::ofstream out(file);
+    std::size_t lines = 0;
+    for (std::size_t size = 0; size < 256u << 20; size += part.size(), lines += 20)
+        out << part;
+    return lines;
+}
+
+TEST(Ratio, TheWholeSystemLogTakesAtMostTwiceGrepsTime)
+{
+    const std::string file = testing::TempDir() + "messages-" + std::to_string(getpid());
+    const std::size_t written = writeSystemLog(file);
+    const std::string grep =
+        "LC_ALL=C grep -c tvfc " + file + " | cat > /dev/null"; // into /dev/null it ends at the first
+    const double greps = milliseconds([&] { EXPECT_EQ(std::system(grep.c_str()), 0); });
+    const double ours = milliseconds(
+        [&]
+        {
+            std::size_t lines = 0;
+            newestLinesWith(file.c_str(), "tvfc",
+                            [&](std::string_view)
+                            {
+                                lines++;
+                                return true;
+                            });
+            EXPECT_EQ(lines, written);
+        });
+    std::remove(file.c_str());
+    RecordProperty("ms", std::to_string(ours) + " beside " + std::to_string(greps) + " of grep");
+    EXPECT_LE(ours, 2 * greps) << ours << " ms against " << greps << " ms";
 }
 
 /// Bytes of the texts of an object, each counted once.

@@ -7,9 +7,10 @@
 
 #include <algorithm>
 #include <array>
-#include <chrono>
 #include <csignal>
-#include <thread>
+
+#include <poll.h>
+#include <unistd.h>
 
 namespace tvrcim
 {
@@ -19,7 +20,7 @@ using namespace broker;
 namespace
 {
 
-constexpr std::chrono::seconds followInterval{1};
+constexpr int followInterval = 1000; // milliseconds
 
 /// One of the two logs.
 struct LogRow
@@ -164,6 +165,13 @@ std::size_t knownOf(const std::vector<std::string>& before, const std::vector<st
     return known;
 }
 
+/// False when nobody reads the output any more.
+bool waitForMore()
+{
+    pollfd output{STDOUT_FILENO, 0, 0}; // its end is told unasked
+    return poll(&output, 1, followInterval) <= 0;
+}
+
 void print(Session& session, const LogRow& row, const std::vector<Object>& entries, bool follow)
 {
     if (session.format != Format::table && !(session.format == Format::json && follow))
@@ -187,14 +195,10 @@ void showLog(Session& session, const Command& command)
         row.switchOn(session, log);
     }
     std::vector<std::string> shown;
-    for (bool first = true; first || (command.follow && session.out); first = false)
+    for (bool first = true; first || (command.follow && session.out && waitForMore()); first = false)
     {
-        if (!first)
-        {
-            std::this_thread::sleep_for(followInterval);
-            if (row.readWhenEnabled)
-                enable(session, log.path);
-        }
+        if (!first && row.readWhenEnabled)
+            enable(session, log.path);
         std::vector<Object> entries = entriesOf(session, row, command.level);
         std::vector<std::string> keys;
         std::ranges::transform(entries, std::back_inserter(keys), keyOf);

@@ -52,6 +52,12 @@ public:
     Object provider() { return log(providerLogPrefix); }
     Object driver() { return log(driverLogPrefix); }
 
+    /// Waits for the refresh that the first request began, which logs as well.
+    void settle()
+    {
+        instancesOf("TVRHBA_RecordLog");
+        EXPECT_TRUE(awaitRefresh());
+    }
     Answer call(const Path& path, const std::string& method, const std::vector<Property>& in = {})
     {
         const std::size_t before = Host::log().size();
@@ -118,6 +124,7 @@ const std::vector<std::string> parameterNames = {"LogLevel", "LogMode", "TracePa
 TEST(RecordLog, WrongCallsChangeNothing)
 {
     LogHost host;
+    host.settle();
     const Path provider = host.provider().path, driver = host.driver().path;
     Path unknown = provider;
     unknown.setKey("InstanceID", Value::string("another"));
@@ -229,6 +236,7 @@ TEST(RecordLog, EitherLogSwitchesTheLoggingOfTheModule)
     {
         SCOPED_TRACE(prefix);
         LogHost host;
+        host.settle();
         const bool isDriver = prefix == driverLogPrefix;
         const Path log = host.log(prefix).path;
         EXPECT_THAT(host.request(log, disable).lines, ElementsAre("[TVR_WARN] Logs disabled"));
@@ -280,6 +288,7 @@ TEST(RecordLog, FirstFailuresAreLoggedUntilAPathIsSet)
 TEST(RecordLog, EntriesAreTheNewestErrorsOfTheRing)
 {
     LogHost host;
+    host.settle();
     const Object log = host.provider();
     EXPECT_THAT(host.instancesOf("TVRHBA_LogEntry"), IsEmpty()) << "the ring is not in use";
     host.setParameters(log.path, 5, 4, host.at("provider.log"));
@@ -390,6 +399,7 @@ TEST(DriverLog, StandsBesideTheModulesOwn)
 TEST(DriverLog, ShowsTheNewestLinesOnceItIsEnabled)
 {
     LogHost host;
+    host.settle();
     std::string messages;
     for (int i = 1; i <= 500; i++)
         messages += "Nov 22 18:00:00 host kernel: xtvfcx 0000:08:00.0: line " + std::to_string(i) +

@@ -231,6 +231,60 @@ TEST(Tvrcim, PlaysTheServersThatItKnows)
     }
 }
 
+/// A folder that the module takes for the root, with a system log.
+class FilesOfHost
+{
+public:
+    FilesOfHost()
+    {
+        EXPECT_TRUE(mkdtemp(_path.data()));
+        std::filesystem::create_directories(_path + "/var/log");
+        std::filesystem::create_directories(_path + "/etc");
+        setenv("TVR_FILE_ROOT", _path.c_str(), 1);
+    }
+    ~FilesOfHost()
+    {
+        unsetenv("TVR_FILE_ROOT");
+        std::filesystem::remove_all(_path);
+    }
+    void driverLogs(const std::string& line) const
+    {
+        std::ofstream(_path + "/var/log/messages", std::ios::app) << line;
+    }
+    std::string dataFile() const { return textOf(_path + "/etc/tavrin_fc_provider.dmp"); }
+
+private:
+    std::string _path = testing::TempDir() + "tvrcim-root-XXXXXX";
+};
+
+TEST(Tvrcim, ShowsTheLogs)
+{
+    const std::string start = "critical   Continuing logs in Tavrin log provider. \n";
+    const std::string warning = "warning   GetOASLunList failed. Unsupported Hardware\n";
+    const Answer all = tvrcim("log");
+    EXPECT_EQ(all.exitCode, 0) << all.err;
+    EXPECT_THAT(all.out, testing::MatchesRegex("20[0-9-]+ [0-9:]+\\.[0-9]+  critical   Continuing(.|\n)*"));
+    EXPECT_THAT(all.out, HasSubstr(warning));
+    EXPECT_LT(all.out.find(start), all.out.find(warning)) << "the newest last";
+    EXPECT_THAT(tvrcim("log --level 1").out, testing::AllOf(HasSubstr(start), testing::Not(HasSubstr(warning))));
+    EXPECT_EQ(json("log --level 1")[0]["properties"]["RecordData"], "[ Continuing logs in Tavrin log provider. ]");
+    EXPECT_EQ(tvrcim("log --level 4").exitCode, 2);
+    EXPECT_EQ(tvrcim("log --driver --level 1").exitCode, 2);
+
+    const FilesOfHost files;
+    files.driverLogs("first tvfc\nof others\nsecond tvfc \x1b[2J\n");
+    EXPECT_EQ(tvrcim("log --driver").out, "first tvfc\nsecond tvfc ?[2J\n");
+    EXPECT_EQ(files.dataFile(), "") << "nothing to be kept";
+    EXPECT_EQ(tvrcim("log").exitCode, 0);
+    EXPECT_THAT(files.dataFile(), testing::StartsWith("1,5,1\n"));
+    const std::string none = testing::TempDir() + "none-" + std::to_string(getpid()) + ".json";
+    std::ofstream(none) << R"({"adapters": []})";
+    const Answer without = tvrcim("log --driver --scenario " + none);
+    EXPECT_EQ(without.exitCode, 1);
+    EXPECT_THAT(without.err, HasSubstr("there is no driver log"));
+    std::remove(none.c_str());
+}
+
 TEST(Tvrcim, KnowsAllClasses)
 {
     EXPECT_EQ(json("classes").size(), 159u);
@@ -395,6 +449,20 @@ public:
         return exitCode();
     }
 
+    std::string readLine() const
+    {
+        std::string line;
+        for (char c = 0; awaitOutput() && read(_output, &c, 1) == 1 && c != '\n';)
+            line += c;
+        return line;
+    }
+    /// Its exit code when nobody reads any more.
+    int closeOutput()
+    {
+        close(std::exchange(_output, -1));
+        return exitCode();
+    }
+
     /// Its exit code after all of its output.
     int readAll()
     {
@@ -446,6 +514,26 @@ TEST(Tvrcim, EndsCleanlyInAnOperationThatHangs)
     EXPECT_EQ(semaphoresOf(process), 0u);
     EXPECT_TRUE(temporary.empty());
     std::remove(scenario.c_str());
+}
+
+/// What the driver logs is shown when it comes, until somebody ends the tool or stops reading.
+TEST(Tvrcim, FollowsTheDriversLog)
+{
+    const FilesOfHost files;
+    files.driverLogs("tvfc 1\n");
+    {
+        Running tool({"log", "--driver", "--follow"});
+        EXPECT_EQ(tool.readLine(), "tvfc 1");
+        files.driverLogs("other\ntvfc 2\ntvfc 3\n");
+        EXPECT_EQ(tool.readLine(), "tvfc 2");
+        EXPECT_EQ(tool.readLine(), "tvfc 3");
+        EXPECT_EQ(tool.endBy(SIGINT), 128 + SIGINT);
+    }
+    Running tool({"log", "--follow"});
+    EXPECT_THAT(tool.readLine(), HasSubstr("Continuing logs"));
+    const pid_t process = tool.process();
+    EXPECT_EQ(tool.closeOutput(), 0);
+    EXPECT_EQ(semaphoresOf(process), 0u);
 }
 
 /// A signal that whoever started the tool ignores, as nohup does, does not end it.
