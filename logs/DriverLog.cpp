@@ -192,7 +192,7 @@ int enumerateDriverLogEntries(Instance_Handler handler, void* client, const Sele
     ProviderAgent& agent = *ProviderAgent::instance();
     if (!isInitialised(agent, provider))
         return 0;
-    TVR_LOG(TVR_DBG, "%s::enum_instances()", provider);
+    TVR_LOG(TVR_DBG, "TVRHBA_FCDriverLogEntry_Provider::enum_instances()");
     Reading reading(agent.m_TVRHBA_FCDriverLogEntry_map, selection);
     const bool isCopied = unlessOutOfMemory(
         [&]
