@@ -72,7 +72,7 @@ TEST_P(GeneratedComputerSystem, IsNamedAsTheHostIs)
     setHostNames(GetParam().answers);
     Host host("empty");
     const std::string systemName = GetParam().systemName;
-    EXPECT_EQ(text(host.instancesOf("TVRHBA_RecordLog").at(0), "InstanceID"), "TVRHBA:ProviderLog:" + systemName);
+    EXPECT_EQ(text(host.instancesOf("TVRHBA_RecordLog").back(), "InstanceID"), "TVRHBA:ProviderLog:" + systemName);
     EXPECT_THAT(ends(host, "TVRHBA_ComputerSystemConformsToProfile", "ManagedElement"),
                 AllOf(SizeIs(13), Each("root/tavrin:CIM_ComputerSystem.Name=\"" + systemName +
                                        "\",CreationClassName=\"CIM_ComputerSystem\"")));
@@ -151,7 +151,7 @@ TEST(ComputerSystem, ThatOfThePlatformStandsForTheHost)
         EXPECT_EQ(text(device, "SystemCreationClassName"), "IBMSD_ComputerSystem");
         EXPECT_EQ(text(device, "SystemName"), "first");
     }
-    EXPECT_EQ(text(host.instancesOf("TVRHBA_RecordLog").at(0), "InstanceID"), "TVRHBA:ProviderLog:first");
+    EXPECT_EQ(text(host.instancesOf("TVRHBA_RecordLog").back(), "InstanceID"), "TVRHBA:ProviderLog:first");
 
     // The platform answers for the profiles of its own system; the profiles themselves are there.
     EXPECT_THAT(host.instancesOf("TVRHBA_ComputerSystemConformsToProfile"), IsEmpty());

@@ -374,7 +374,7 @@ TEST(PhysicalModel, CleanRefreshEndsWithTheseLines)
     EXPECT_THAT(logAbout(host, {"updateAdapterMaps: ", "Driver Parameter fetching", "Calling FC_CreateDumpClasses",
                                 "uses log", "Create the Diagnostic classes"}),
                 ElementsAre("[TVR_DBG]  updateAdapterMaps: Entry", "[TVR_DBG] Done with the Driver Parameter fetching",
-                            "[TVR_DBG] Calling FC_CreateDumpClasses", testing::_,
+                            "[TVR_DBG] Calling FC_CreateDumpClasses", testing::_, testing::_,
                             "[TVR_DBG] Create the Diagnostic classes", "[TVR_DBG] PERF: updateAdapterMaps: cleanExit"));
     host.unload();
 }
