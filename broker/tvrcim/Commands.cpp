@@ -337,7 +337,7 @@ struct CommandRow
     void (*run)(Session& session, const Command& command);
 };
 
-constexpr std::array<CommandRow, 14> commands{{
+constexpr std::array<CommandRow, 15> commands{{
     {"classes", listClasses},
     {"class", showClass},
     {"methods", showMethods},
