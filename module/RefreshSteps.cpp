@@ -56,7 +56,7 @@ constexpr HostStep cardSteps[] = {
     {createFCDriverLogClasses, GoOn, {TVR_INFO, "Issue with FC Driver Log classes"}},
     {createDumpClasses,
      GoOn,
-     {TVR_DBG, "FC_CreateDumpClasses failed with status %d"},
+     {TVR_ERR, "FC_CreateDumpClasses failed with status %d"},
      {TVR_ERR, "Exception in FC_CreateDumpClasses"}},
     {createPortVirtualization,
      GoOn,
