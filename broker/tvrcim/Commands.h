@@ -50,7 +50,7 @@ struct Command
     bool list = false;
     bool deletes = false;
     std::optional<std::uint32_t> keep = {};
-    bool driver = false;     ///< its log, not the provider's
+    bool driver = false; ///< its log, not the provider's
     bool follow = false;
     unsigned level = 0; ///< the last that is shown; 0 for all
 };
