@@ -86,7 +86,7 @@ RM_STATUS tvrcimGetRetentionCount(const HBA_WWN& wwpn, std::uint32_t* count)
 RM_STATUS tvrcimSetRetentionCount(const HBA_WWN& wwpn, std::uint32_t count)
 {
     constexpr std::uint32_t least = 1;
-    constexpr std::uint32_t most = 20;
+    constexpr std::uint32_t most = RM_MAX_RETENTION_COUNT;
     if (count < least || count > most)
     {
         TVR_LOG(TVR_DBG, "ERROR: RetentionCount value must be in-between %d and %d", static_cast<int>(least),

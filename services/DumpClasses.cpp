@@ -3,6 +3,7 @@
 #include "agent/Build.h"
 #include "agent/ClassCatalog.h"
 #include "device/TVR_MethodWrapper.h"
+#include "foundation/ClientText.h"
 #include "schema/TVRHBA_DumpData.h"
 #include "schema/TVRHBA_DumpService.h"
 #include "schema/TVRHBA_DumpServiceAffectsElement.h"
@@ -129,7 +130,7 @@ void addData(InstanceCache& cache, const TVRHBA_PortController* controller)
             made.InstanceID.set(joinTexts({"TVRHBA_DumpData::", id.view()}));
             made.ElementName.set(id);
             made.RetentionCount.set(count);
-            made.DumpDirectory.set(directory.c_str());
+            made.DumpDirectory.set(clientText(directory));
         },
         "Failed to create TVRHBA_DumpData for fc port", "Insert Failed : m_TVRHBA_DumpData_map");
     constexpr std::uint16_t isDefault = 1; // CIM_ElementSettingData.IsDefault

@@ -9,7 +9,7 @@ namespace cimple
 {
 
 /// Makes them of the port controllers in the cache, whose data lock the caller holds. 0, 32769 if a port's name or a
-/// map refuses, or 40008 without memory; the first failure ends it, and what was made stays.
+/// map refuses, or 40008 without memory or a computer system; the first failure ends it, and what was made stays.
 std::uint32_t FC_CreateDumpClasses(InstanceCache& cache);
 std::uint32_t FC_ClearDumpClasses(InstanceCache& cache);
 

@@ -2,6 +2,7 @@
 
 #include "agent/Build.h"
 #include "agent/MethodCall.h"
+#include "foundation/ClientText.h"
 #include "runtime/adapter/Provider.h"
 #include "schema/TVRHBA_PortController.h"
 #include "services/DumpCalls.h"
@@ -74,7 +75,7 @@ Array<String> dumpsAmong(const std::vector<std::string>& names)
         if (!isDump(names[i]))
             continue;
         TVR_LOG(TVR_DBG, "Filename[%d] = %s", static_cast<int>(i), name);
-        dumps.append(name);
+        dumps.append(clientText(names[i]));
     }
     return dumps;
 }
@@ -106,6 +107,17 @@ constexpr ServiceTexts dataTexts = {
     .ofName = notDone,
 };
 
+/// The port that the instance names, which is that of the data: a client may leave the name out, but not give another.
+HBA_WWN portOf(MethodCall& call, const TVRHBA_DumpData& known, const TVRHBA_DumpData& instance)
+{
+    if (instance.ElementName.null)
+        return call.wwpn(known.ElementName.value, dataTexts);
+    const HBA_WWN wwpn = call.wwpn(instance.ElementName.value, dataTexts);
+    if (instance.ElementName.value != known.ElementName.value)
+        MethodCall::end(dataTexts.noWwn, dataTexts.ofName);
+    return wwpn;
+}
+
 void refuseOtherDirectory(const TVRHBA_DumpData& known, const TVRHBA_DumpData& instance, const TVRHBA_DumpData& model)
 {
     if (model.DumpDirectory.null || model.DumpDirectory.value.empty())
@@ -115,9 +127,11 @@ void refuseOtherDirectory(const TVRHBA_DumpData& known, const TVRHBA_DumpData& i
     TVR_LOG(TVR_DBG, " For Non VMWARE");
 }
 
-void changeRetention(const TVRHBA_DumpData& known, const HBA_WWN& wwpn, const Property<std::uint32_t>& wanted)
+/// Where the client names no properties, the model has a 0 for a count that it did not send.
+void changeRetention(const TVRHBA_DumpData& known, const HBA_WWN& wwpn, const TVRHBA_DumpData& instance,
+                     const Property<std::uint32_t>& wanted)
 {
-    if (wanted.null || wanted.value == known.RetentionCount.value)
+    if (instance.RetentionCount.null || wanted.null || wanted.value == known.RetentionCount.value)
         return;
     if (tvrcimSetRetentionCount(wwpn, wanted.value) != RM_OK)
         MethodCall::end({TVR_ERR, "TVR_MethodWrapper::tvrcimSetRetentionCount failed"}, notDone);
@@ -144,10 +158,10 @@ int modifyDumpData(const TVRHBA_DumpData* instance, const TVRHBA_DumpData* model
     const TVRHBA_DumpData* known = mapOf<TVRHBA_DumpData>(call.agent()).withKeysOf(instance);
     if (!known)
         MethodCall::end({TVR_ERR, "Invalid instance of TVRHBA_DumpData_Provider Data"}, notDone);
-    const HBA_WWN wwpn = call.wwpn(instance->ElementName.value, dataTexts);
+    const HBA_WWN wwpn = portOf(call, *known, *instance);
     TVR_LOG(TVR_DBG, "found the key match for instance.");
     refuseOtherDirectory(*known, *instance, *model);
-    changeRetention(*known, wwpn, model->RetentionCount);
+    changeRetention(*known, wwpn, *instance, model->RetentionCount);
     const SharedEnds ends;
     rebuild(call.agent(), FC_ClearDumpClasses, {TVR_DBG, "FC_ClearDumpClasses failed"});
     rebuild(call.agent(), FC_CreateDumpClasses, {TVR_DBG, "FC_CreateDumpClasses failed"});

@@ -116,7 +116,8 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
                { return broker.modifyInstance(changed(setting, "current", setting.get("current"))).status; }),
         method(dumps, "GenerateDump", {controller}),
         method(dumps, "GetDumpFileNames", {controller}),
-        change("modify dump data", [dumpData](auto& broker) { return broker.modifyInstance(dumpData).status; }),
+        change("modify dump data", [dumpData](auto& broker)
+               { return broker.modifyInstance(changed(dumpData, "RetentionCount", Value::uint32(6))).status; }),
         method(dumps, "DeleteDump", {controller}),
         method(tags, "SetGlobalFlag", {target, {"State", Value::uint32(1)}}),
         method(tags, "GetGlobalFlag", {target}),

@@ -353,6 +353,7 @@ TEST(Dumps, ChangesAreRefusedOneByOne)
     };
     const auto null = [](const char* name) { return broker::Property{name, Value::null(CMPI_string)}; };
     const char* const directory = "/var/log/tavrin/dump";
+    const broker::Property noCount = {"RetentionCount", Value::null(CMPI_uint32)};
     const struct
     {
         std::vector<broker::Property> changes;
@@ -374,6 +375,9 @@ TEST(Dumps, ChangesAreRefusedOneByOne)
         {{count(7), null("DumpDirectory")}, {}, CMPI_RC_OK, 7, 1, {found, done}},
         {{count(7), text("DumpDirectory", "/tmp")}, {{"RetentionCount"}}, CMPI_RC_OK, 7, 1, {found, done}},
         {{count(7)}, {{"ElementName"}}, CMPI_RC_OK, 5, 0, {found}},
+        {{noCount}, {}, CMPI_RC_OK, 5, 0, {found, sameDirectory}},
+        {{count(7), null("ElementName")}, {{"RetentionCount"}}, CMPI_RC_OK, 7, 1, {found, done}},
+        {{count(7), text("ElementName", "1000000000000002")}, {}, CMPI_RC_ERR_FAILED, 5, 0, {str2}},
         {{count(7), text("ElementName", "x")}, {}, CMPI_RC_ERR_FAILED, 5, 0, {noName, str2}},
         {{count(7), text("ElementName", "")}, {}, CMPI_RC_ERR_FAILED, 5, 0, {noName, str2}},
         {{count(7), text("ElementName", "10000000000000\xC3\xA9")}, {}, CMPI_RC_ERR_FAILED, 5, 0, {noName, str2}},
