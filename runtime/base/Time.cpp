@@ -11,8 +11,6 @@ namespace cimple
 namespace
 {
 
-constexpr std::uint64_t usec_per_second = 1'000'000;
-
 /// gettimeofday no longer knows the time zone, so the local offset comes from the broken-down time.
 std::int32_t local_offset(std::time_t seconds)
 {
@@ -26,7 +24,7 @@ bool system_now(std::uint64_t& usec, std::int32_t& utc_offset)
     timeval now{};
     if (gettimeofday(&now, nullptr) != 0)
         return false;
-    usec = static_cast<std::uint64_t>(now.tv_sec) * usec_per_second + static_cast<std::uint64_t>(now.tv_usec);
+    usec = static_cast<std::uint64_t>(now.tv_sec) * Time::second + static_cast<std::uint64_t>(now.tv_usec);
     utc_offset = local_offset(now.tv_sec);
     return true;
 }
@@ -34,8 +32,8 @@ bool system_now(std::uint64_t& usec, std::int32_t& utc_offset)
 void system_sleep(std::uint64_t usec)
 {
     timeval rest{};
-    rest.tv_sec = static_cast<std::time_t>(usec / usec_per_second);
-    rest.tv_usec = static_cast<suseconds_t>(usec % usec_per_second);
+    rest.tv_sec = static_cast<std::time_t>(usec / Time::second);
+    rest.tv_usec = static_cast<suseconds_t>(usec % Time::second);
     // After a signal select leaves the time not slept in `rest`.
     while (select(0, nullptr, nullptr, nullptr, &rest) != 0 && errno == EINTR)
     {}

@@ -21,6 +21,8 @@ const Time_Source& time_source();
 
 struct Time
 {
+    static constexpr std::uint64_t second = 1'000'000;
+
     static void sleep(std::uint64_t usec);
     /// Microseconds since the epoch; 0 if the clock cannot be read.
     static std::uint64_t now();

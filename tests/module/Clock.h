@@ -1,4 +1,5 @@
-// The time of day as the module sees it: that of the machine and what a test adds.
+// The time of day as the module sees it: that of the machine, what a test adds, and what the module sleeps, since no
+// sleep of the module takes its time.
 #pragma once
 
 #include <chrono>
@@ -13,5 +14,8 @@ void setClockStep(std::chrono::microseconds step);
 
 /// From now on the time of day moves only as a test moves it.
 void stopClock();
+
+/// How long the module has slept so far.
+std::chrono::microseconds slept();
 
 } // namespace module_test

@@ -235,6 +235,13 @@ void Host::setAttribute(const char* wwpn, const char* attribute)
         throw std::runtime_error(error);
 }
 
+void Host::setDiagnostics(const char* wwpn, const char* diagnostics)
+{
+    char error[1024] = "";
+    if (!TVR_CONTROL(tvrsim_set_diagnostics)(wwpn, diagnostics, error, sizeof(error)))
+        throw std::runtime_error(error);
+}
+
 void Host::setDriverParameter(const char* wwpn, const char* name, std::uint32_t current)
 {
     if (!TVR_CONTROL(tvrsim_set_driver_parameter)(wwpn, name, current))

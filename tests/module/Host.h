@@ -70,6 +70,8 @@ public:
     void setPortState(const char* wwpn, std::uint32_t state);
     /// One attribute of a port, of its statistics or of its adapter: {"name": value}, as in a scenario.
     void setAttribute(const char* wwpn, const char* attribute);
+    /// How the tests of a port go: what a scenario has under "diagnostics".
+    void setDiagnostics(const char* wwpn, const char* diagnostics);
     /// Of the adapter behind a port, or of the driver where `wwpn` is null.
     void setDriverParameter(const char* wwpn, const char* name, std::uint32_t current);
     /// Names of ports come into force that wait for a restart of the host; without power the volatile ones are lost.

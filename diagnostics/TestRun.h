@@ -1,0 +1,31 @@
+// One run of a test: what its executor is given, and what it gives back.
+#pragma once
+
+#include "agent/ProviderAgent.h"
+#include "device/RmApi.h"
+#include "diagnostics/TestCatalog.h"
+#include "schema/TVRHBA_ConcreteJob.h"
+
+namespace cimple
+{
+
+class TVRHBA_FCHBADiagnosticSettingData;
+class TVRHBA_JobSettingData;
+class TVRHBA_PortController;
+
+/// What it refers to is of the cache: the run holds the data lock from its beginning to its end.
+struct TestRun
+{
+    ProviderAgent& agent;
+    const DiagnosticTest& test;
+    HBA_WWN wwpn; ///< zero where the port's DeviceID is no name
+    const TVRHBA_FCHBADiagnosticSettingData& settings;
+    const TVRHBA_JobSettingData& jobSettings;
+    const TVRHBA_PortController& portController;
+    Ref<TVRHBA_ConcreteJob> job = {}; ///< out: a copy of the job, if there is one for the client
+};
+
+/// Drives a test through the library. RM status, or another number that the client gets in the same way.
+using Executor = RM_STATUS(TestRun& run);
+
+} // namespace cimple
