@@ -89,15 +89,9 @@ public:
     /// it.
     template <class Work> auto withoutLock(Work work)
     {
-        struct Released
-        {
-            explicit Released(Mutex& mutex) : mutex(mutex) { mutex.unlock(); }
-            ~Released() { mutex.lock(); }
-            Mutex& mutex;
-        };
         auto result = [&]
         {
-            const Released released(_agent.m_DataMutex);
+            const Auto_Unlock released(_agent.m_DataMutex);
             return work();
         }();
         if (_agent.hasEnded())

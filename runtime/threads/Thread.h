@@ -44,6 +44,19 @@ private:
     Mutex* _mutex;
 };
 
+/// Lets go of a mutex that is held, for a scope.
+class Auto_Unlock
+{
+public:
+    explicit Auto_Unlock(Mutex& mutex) : _mutex(mutex) { mutex.unlock(); }
+    ~Auto_Unlock() { _mutex.lock(); }
+    Auto_Unlock(const Auto_Unlock&) = delete;
+    Auto_Unlock& operator=(const Auto_Unlock&) = delete;
+
+private:
+    Mutex& _mutex;
+};
+
 class Condition
 {
 public:
