@@ -11,10 +11,12 @@
 #include "runtime/log/Shielded.h"
 #include "runtime/threads/Thread_Context.h"
 
+#include <cerrno>
 #include <csignal>
 #include <exception>
 #include <string>
 #include <unistd.h>
+#include <utility>
 
 namespace cimple
 {
@@ -176,7 +178,7 @@ void ProviderAgent::finish()
         const bool joined = joinThreads();
         m_config.save(); // while a failure can still be logged
         if (!joined)
-            return m_pMethodWrapper.reset(); // the locks of the refresh that ends the process are its own
+            return m_pMethodWrapper.reset(); // the locks of the thread that ends the process are its own
         deleteData();
         HBA_FreeLibrary();
         ClearMaps();
@@ -198,16 +200,10 @@ bool ProviderAgent::isOnRefreshThread()
     return m_bThreadRunning && Thread::self() == m_dataFetchThread;
 }
 
-/// False on the refresh's own thread, where a library of the hardware or the resolver called exit().
+/// False on one of the threads themselves, where a library of the hardware or the resolver called exit().
 bool ProviderAgent::joinThreads()
 {
-    void* value = nullptr;
-    if (m_bDportThreadRunning)
-    {
-        m_bDportThreadEnd = true;
-        Thread::join(m_dportThread, value);
-        m_bDportThreadRunning = false;
-    }
+    const bool dportEnded = endDportThread();
 
     m_ThreadMutex.lock();
     m_bLoaded = false;
@@ -217,7 +213,66 @@ bool ProviderAgent::joinThreads()
     m_ThreadMutex.unlock();
     if (running)
         TVR_LOG(TVR_DBG, "PERF: Clearing the previous thread...with join");
-    return !joinable || Thread::join(m_dataFetchThread, value) == 0;
+    void* value = nullptr;
+    const bool refreshEnded = !joinable || Thread::join(m_dataFetchThread, value) == 0;
+    return dportEnded && refreshEnded;
+}
+
+// --- the thread of the D-Port test
+
+namespace
+{
+
+thread_local bool onDportThread = false;
+
+struct DportStart
+{
+    Thread::Proc proc;
+    void* arg;
+};
+
+void* runDport(void* arg)
+{
+    const std::unique_ptr<DportStart> start(static_cast<DportStart*>(arg));
+    onDportThread = true;
+    return start->proc(start->arg);
+}
+
+} // namespace
+
+int ProviderAgent::startDportThread(Thread::Proc proc, void* arg)
+{
+    auto start = std::make_unique<DportStart>(proc, arg);
+    Auto_Mutex lock(m_DportThreadMutex);
+    if (m_bDportThreadRunning)
+        TVR_LOG(TVR_DBG, "DPortTest:Joining the thread created for DPORTStatus");
+    joinDportThread();
+    if (m_bDportThreadEnd)
+        return ECANCELED;
+    const int error = Thread::create_joinable(m_dportThread, &runDport, start.get());
+    if (error == 0)
+        static_cast<void>(start.release()); // the thread's from now on
+    m_bDportThreadRunning = error == 0;
+    return error;
+}
+
+/// The caller holds m_DportThreadMutex.
+void ProviderAgent::joinDportThread()
+{
+    void* value = nullptr;
+    if (std::exchange(m_bDportThreadRunning, false))
+        Thread::join(m_dportThread, value);
+}
+
+/// False on the thread itself.
+bool ProviderAgent::endDportThread()
+{
+    m_bDportThreadEnd = true;
+    if (onDportThread)
+        return false;
+    Auto_Mutex lock(m_DportThreadMutex); // a method may be waiting for the same end
+    joinDportThread();
+    return true;
 }
 
 void ProviderAgent::deleteData()

@@ -132,9 +132,11 @@ public:
     std::set<LanePath> m_lanePaths;
 
     // --- status thread of the D-Port test
-    Thread m_dportThread;
-    std::atomic<bool> m_bDportThreadRunning{false};
-    std::atomic<bool> m_bDportThreadEnd{false};
+    /// Runs `proc(arg)` on the thread once it has ended what it was started with before. That may take as long as a
+    /// test of a link, and needs m_DataMutex, which the caller does not hold. 0, or what Thread::create_joinable
+    /// answers, or ECANCELED when the agent ends.
+    int startDportThread(Thread::Proc proc, void* arg);
+    std::atomic<bool> m_bDportThreadEnd{false}; ///< asks the thread to end soon
 
 private:
     friend class AgentEnd;
@@ -153,6 +155,8 @@ private:
     /// process than the agent's, such as a child of a fork, nothing is ended: it is all the parent's.
     void finish();
     bool joinThreads();
+    bool endDportThread();
+    void joinDportThread();
     void deleteData();
 
     void takeDownIncomplete();
@@ -164,7 +168,10 @@ private:
     void adapterStage();
     void sanStage();
 
-    Datetime m_lastLoadTime; ///< end of the last run; the zero interval before any
+    Mutex m_DportThreadMutex; ///< the two below; held while the thread is waited for
+    Thread m_dportThread;
+    bool m_bDportThreadRunning = false; ///< started and not joined
+    Datetime m_lastLoadTime;            ///< end of the last run; the zero interval before any
     Thread m_dataFetchThread;
     Mutex m_ThreadMutex;            ///< m_bThreadRunning, m_lastLoadTime and the decision to start
     bool m_bThreadRunning = false;  ///< started and not finished
