@@ -6,6 +6,8 @@
 #include "diagnostics/TestCatalog.h"
 #include "schema/TVRHBA_ConcreteJob.h"
 
+#include <array>
+
 namespace cimple
 {
 
@@ -23,6 +25,8 @@ struct TestRun
     const TVRHBA_JobSettingData& jobSettings;
     const TVRHBA_PortController& portController;
     Ref<TVRHBA_ConcreteJob> job = {}; ///< out: a copy of the job, if there is one for the client
+    /// What of the above an executor keeps alive to the end of the run, while it lets go of the data lock.
+    std::array<Ref<const Instance>, 3> kept = {};
 };
 
 /// Drives a test through the library. RM status, or another number that the client gets in the same way.
