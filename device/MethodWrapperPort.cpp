@@ -1,4 +1,4 @@
-// What stands at a port: beacon, transceiver, flash memory.
+// What stands at a port: beacon, transceiver, flash memory, and its reset.
 #include "device/TVR_MethodWrapper.h"
 
 #include "device/Bindings.h"
@@ -91,6 +91,17 @@ std::uint32_t TVR_MethodWrapper::SetBeaconState(const HBA_WWN& wwpn, std::uint16
     else
         TVR_LOG(TVR_DBG, "Failed to set the beacon state to %d ", state);
     return 0;
+}
+
+RM_STATUS TVR_MethodWrapper::tvrcimReset(const HBA_WWN& wwpn)
+{
+    TVR_LOG(TVR_DBG, "TVR_MethodWrapper::tvrcimReset");
+    const RM_STATUS status = LRM_ResetHBA(wwpn, 1);
+    if (status == RM_OK)
+        TVR_LOG(TVR_WARN, "WWN %s is reset", hbaNameToString(wwpn).c_str());
+    else
+        logStatus(status);
+    return status;
 }
 
 RM_STATUS TVR_MethodWrapper::tvrcimGetDigitalDiagnosticsData(const char* deviceId, std::unique_ptr<RM_SffData>& data)

@@ -89,6 +89,8 @@ public:
     static std::uint32_t GetBeaconState(const char* deviceId, std::uint16_t* value);
     /// `value` is 2 for on or 3 for off. 32968 for any other, else 0, whatever the library says.
     static std::uint32_t SetBeaconState(const HBA_WWN& wwpn, std::uint16_t value);
+    /// Restarts the firmware behind a port.
+    static RM_STATUS tvrcimReset(const HBA_WWN& wwpn);
     /// Units of a target that a port, or the virtual port `vportId` of it, may serve with priority. Null stands for the
     /// port itself. `option` is an RM_LaneOption.
     static RM_STATUS GetOASLunList(const char* deviceId, const char* targetId, const char* vportId,

@@ -104,7 +104,7 @@ RM_STATUS resetWhereAsked(const HBA_WWN& wwpn, const Options& options)
     if (std::ranges::find(options, resetAfterwards) == options.end())
         return RM_OK;
     TVR_LOG(TVR_DBG, "HBA RESET OPTION SELECTED");
-    const RM_STATUS status = tvrcimReset(wwpn);
+    const RM_STATUS status = TVR_MethodWrapper::tvrcimReset(wwpn);
     TVR_LOG(TVR_DBG, status == RM_OK ? "Fiwmware download functionality complete with Reset on the HBA"
                                      : "TVRHBA_SoftwareInstallationService_Provider::tvrcimResetHBA failed");
     return status;
@@ -224,7 +224,7 @@ std::uint32_t resetHBA(const Instance* reference, ResetHBA& parameters)
         MethodCall::end({TVR_ERR, "Reset HBA on CNA is not supported"}, invalid);
     call.self<Service>(reference, texts);
     const String target = targetOf(call, parameters.Target);
-    const RM_STATUS status = tvrcimReset(call.wwpn(target, texts));
+    const RM_STATUS status = TVR_MethodWrapper::tvrcimReset(call.wwpn(target, texts));
     if (status == RM_OK)
     {
         TVR_LOG(TVR_WARN,

@@ -101,17 +101,6 @@ RM_STATUS tvrcimDownloadFW(const HBA_WWN& wwpn, const char* file)
     return status;
 }
 
-RM_STATUS tvrcimReset(const HBA_WWN& wwpn)
-{
-    TVR_LOG(TVR_DBG, "TVR_MethodWrapper::tvrcimReset");
-    const RM_STATUS status = LRM_ResetHBA(wwpn, 1);
-    if (status == RM_OK)
-        TVR_LOG(TVR_WARN, "WWN %s is reset", TVR_MethodWrapper::hbaNameToString(wwpn).c_str());
-    else
-        TVR_MethodWrapper::logStatus(status);
-    return status;
-}
-
 void UpdateFirmwareOnFlash(ProviderAgent& agent, const HBA_WWN& wwpn)
 {
     TVR_LOG(TVR_DBG, "Entering TVR_MethodWrapper::UpdateFirmwareOnFlash");

@@ -16,9 +16,6 @@ bool isFileThere(const char* file, const LogText& notFound, const LogText& notRe
 /// Writes the firmware of a file to the flash memory behind a port: RM status, 1 where the port or the file is none.
 RM_STATUS tvrcimDownloadFW(const HBA_WWN& wwpn, const char* file);
 
-/// Restarts the firmware behind a port: RM status, 1 for a port that is not of this host.
-RM_STATUS tvrcimReset(const HBA_WWN& wwpn);
-
 /// Reads the version of the firmware in the flash memory anew into the identity in the cache, whose key stays what it
 /// is until the next refresh. The caller holds the data lock.
 void UpdateFirmwareOnFlash(ProviderAgent& agent, const HBA_WWN& wwpn);
