@@ -4,6 +4,8 @@
 
 #include "agent/EnumerationForms.h"
 #include "agent/ProviderExtension.h"
+#include "diagnostics/ConcreteJobs.h"
+#include "diagnostics/DiagnosticRun.h"
 #include "diagnostics/DiagnosticsLog.h"
 #include "diagnostics/HelpService.h"
 #include "logs/DriverLog.h"

@@ -11,6 +11,7 @@
 namespace cimple
 {
 
+class ProviderAgent;
 class TVRHBA_PortController;
 
 /// What is asked for as the state of a new job. It begins as Exception for whatever is not named here.
@@ -49,8 +50,9 @@ TVRHBA_ConcreteJob* CreateConcreteJobInstantiateNonBlocking(InstanceCache& cache
 /// word. The job itself may be gone afterwards.
 std::uint32_t DeleteConcreteJob(InstanceCache& cache, const TVRHBA_ConcreteJob* job);
 
-/// Asks for the end of a test of the port until it has ended, once a second, for minutes if need be: RM status.
-RM_STATUS CancelTest(const HBA_WWN& wwpn, std::uint32_t diagHandle, const char* testName);
+/// Asks for the end of a test of the port until it has ended, or the agent has, once a second, for minutes if need be:
+/// the library's last status, 0 if the test has ended.
+RM_STATUS CancelTest(const ProviderAgent& agent, const HBA_WWN& wwpn, std::uint32_t diagHandle, const char* testName);
 
 /// Asks once, for the end of a test of the link: RM status. The test ends some time later.
 RM_STATUS CancelDportTest(const HBA_WWN& wwpn, std::uint32_t diagHandle, const char* testName);

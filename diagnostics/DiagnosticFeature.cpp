@@ -3,6 +3,7 @@
 #include "agent/Build.h"
 #include "device/AttributeBlock.h"
 #include "device/Bindings.h"
+#include "diagnostics/PortName.h"
 #include "diagnostics/TestCatalog.h"
 #include "schema/TVRHBA_AvailableDiagnosticService.h"
 #include "schema/TVRHBA_DiagElementCapabilities.h"
@@ -419,17 +420,6 @@ std::optional<std::uint32_t> diagnosticVersion(InstanceCache& cache)
     const auto* asked = mapOf<TVRHBA_PortController>(cache).findFirst(
         [&](const auto& known) { return GetDiagnosticVersion(known.DeviceID.value.c_str(), &version) == 0; });
     return asked ? std::optional(version) : std::nullopt;
-}
-
-/// The name behind a DeviceID. False, with its line in the log, if it is none.
-bool toWwn(HBA_WWN& wwpn, const char* deviceId, const LogText& noPlainName, const LogText& noWwn)
-{
-    char name[TVR_MethodWrapper::hbaNameLength + 1];
-    if (TVR_MethodWrapper::Id2HBAName(name, deviceId) != 0)
-        return noPlainName.log(), false;
-    if (TVR_MethodWrapper::str2HBAName(&wwpn, name) != 0)
-        return noWwn.log(), false;
-    return true;
 }
 
 } // namespace

@@ -1,6 +1,8 @@
 // The diagnostic tests that every host with ports offers.
 #pragma once
 
+#include "device/RmApi.h"
+
 #include <cstdint>
 #include <initializer_list>
 #include <span>
@@ -8,6 +10,8 @@
 
 namespace cimple
 {
+
+struct TestRun;
 
 enum class DiagnosticTestId : std::uint32_t
 {
@@ -39,7 +43,17 @@ struct LoopDefault
     const char* parameter;
 };
 
-/// What is published about a test. The values are those of the CIM properties of these names.
+/// Drives a test through the library. RM status, or another number that the client gets in the same way.
+using Executor = RM_STATUS(TestRun& run);
+
+/// How a test is run.
+struct TestExecution
+{
+    Executor* executor;
+    std::uint32_t secondsAfter = 0; ///< that the port is left alone before the next test
+};
+
+/// What is published about a test, and how it is run. The values are those of the CIM properties of these names.
 struct DiagnosticTest
 {
     DiagnosticTestId id;
@@ -53,6 +67,7 @@ struct DiagnosticTest
     TestSettings settings;
     std::initializer_list<const char*> overrides;
     const char* description;
+    TestExecution execution;
 
     bool hasBuffer() const { return settings >= TestSettings::Buffer; }
 };

@@ -29,7 +29,10 @@ struct TestRun
     std::array<Ref<const Instance>, 3> kept = {};
 };
 
-/// Drives a test through the library. RM status, or another number that the client gets in the same way.
-using Executor = RM_STATUS(TestRun& run);
+/// What a client gets for a status of the library.
+constexpr std::uint32_t ofLibrary(RM_STATUS status)
+{
+    return static_cast<std::uint32_t>(status) + 40000;
+}
 
 } // namespace cimple

@@ -1,0 +1,54 @@
+#include "diagnostics/TestResult.h"
+
+#include "diagnostics/DiagnosticRecords.h"
+#include "diagnostics/DiagnosticTexts.h"
+#include "schema/TVRHBA_FCHBADiagnosticSettingData.h"
+#include "schema/TVRHBA_JobSettingData.h"
+
+#include <utility>
+
+namespace cimple
+{
+
+RM_STATUS endWithoutJob(RM_STATUS status)
+{
+    TVR_LOG(TVR_DBG, "%s , Exited with error code : %d", MapDiagStatus(status), status);
+    return status;
+}
+
+Ref<TVRHBA_ConcreteJob> publish(TestRun& run, const TestResult& result)
+{
+    const bool isDeleted = run.jobSettings.DeleteOnCompletion.value;
+    const TVRHBA_ConcreteJob* job =
+        CreateConcreteJobInstantiateNonBlocking(run.agent, {.testName = run.test.name,
+                                                            .deleteOnCompletion = isDeleted,
+                                                            .requestedState = result.requestedState,
+                                                            .diagHandle = result.diagHandle,
+                                                            .portController = &run.portController});
+    if (!job)
+        return {};
+    Ref<TVRHBA_ConcreteJob> copy(clone_of(job));
+    const TestOutcome outcome = {
+        .test = run.test,
+        .message = result.message,
+        .jobId = job->InstanceID.value,
+        .passed = result.passed,
+        .portController = &run.portController,
+        .overridden = run.settings.OverridedSettingData.value == 1,
+        .results = result.results,
+    };
+    CreateDiagnosticServiceRecord(run.agent, outcome);
+    CreateDiagnosticCompletionRecord(run.agent, outcome);
+    if (isDeleted)
+        DeleteConcreteJob(run.agent, job);
+    return copy;
+}
+
+void endWithJob(TestRun& run, const TestResult& result)
+{
+    Ref<TVRHBA_ConcreteJob> job = publish(run, result);
+    if (!run.jobSettings.DeleteOnCompletion.value)
+        run.job = std::move(job);
+}
+
+} // namespace cimple
