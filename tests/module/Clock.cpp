@@ -13,6 +13,7 @@ std::atomic<std::int64_t> added{0};
 std::atomic<std::int64_t> step{0};
 std::atomic<std::int64_t> stopped{0};
 std::atomic<std::int64_t> sleeps{0};
+std::atomic<void (*)()> sleepHook{nullptr};
 
 std::int64_t machineTime()
 {
@@ -41,6 +42,11 @@ void stopClock()
     stopped = machineTime();
 }
 
+void atSleep(void (*hook)())
+{
+    sleepHook = hook;
+}
+
 std::chrono::microseconds slept()
 {
     return std::chrono::microseconds(sleeps);
@@ -67,6 +73,8 @@ extern "C" __attribute__((visibility("default"))) int select(int count, fd_set* 
     static auto* const real = reinterpret_cast<Select*>(dlsym(RTLD_NEXT, "select"));
     if (reads || writes || errors || !timeout)
         return real(count, reads, writes, errors, timeout);
+    if (void (*hook)() = sleepHook)
+        hook();
     constexpr std::int64_t faster = 20'000;
     const std::int64_t time = std::int64_t{timeout->tv_sec} * 1'000'000 + timeout->tv_usec;
     sleeps += time;

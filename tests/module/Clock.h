@@ -18,4 +18,7 @@ void stopClock();
 /// How long the module has slept so far.
 std::chrono::microseconds slept();
 
+/// From now on called by each thread of the module that sleeps; null ends it.
+void atSleep(void (*hook)());
+
 } // namespace module_test

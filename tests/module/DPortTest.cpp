@@ -25,13 +25,13 @@ namespace
 
 constexpr char test[] = "TVR:FCHBA D-Port Test";
 constexpr char firstPort[] = "1000027A51160210";
-constexpr char otherPort[] = "1000027A51160211";
+constexpr char otherPort[] = "1000027A51320240";
 constexpr char forEver[] = R"({"dport": {"polls": 4294967295}})";
 constexpr char ended[] = "[TVR_DBG] TVR_Diagnostics::DportStatusThread Ends";
 constexpr char noRecords[] = "[TVR_DBG] DPORTStatusThreadCall: RM_DiagGetResultsDPort Failed and Not creating Service "
                              "and Completion Records";
 
-struct Run
+struct Started
 {
     std::uint64_t value = 0;
     std::string job = {}; ///< its InstanceID; empty for a null
@@ -48,7 +48,7 @@ public:
         service = theOne(*this, "TVRHBA_FCHBADiagnosticTest", "Name", test).path;
     }
 
-    Run run(const std::string& wwpn, std::vector<broker::Property> settings = {})
+    Started run(const std::string& wwpn, std::vector<broker::Property> settings = {})
     {
         const broker::Path port = theOne(*this, "TVRHBA_PortController", "DeviceID", wwpn).path;
         settings.push_back({"ManagedElement", Value::reference(port)});
@@ -60,9 +60,9 @@ public:
                 hasJob ? job->value.asPath().key("InstanceID")->asString() : std::string()};
     }
 
-    broker::Object job(const Run& run) { return theOne(*this, "TVRHBA_ConcreteJob", "InstanceID", run.job); }
+    broker::Object job(const Started& run) { return theOne(*this, "TVRHBA_ConcreteJob", "InstanceID", run.job); }
     /// State, percentage and error of the job.
-    std::string stateOf(const Run& run)
+    std::string stateOf(const Started& run)
     {
         const broker::Object found = job(run);
         std::string state = std::to_string(found.get("JobState").asUnsigned()) + " " +
@@ -75,7 +75,7 @@ public:
     {
         return count("TVRHBA_DiagnosticServiceRecord") + count("TVRHBA_DiagnosticCompletionRecord");
     }
-    std::uint64_t cancel(const Run& run)
+    std::uint64_t cancel(const Started& run)
     {
         return broker()
             .invokeMethod(job(run).path, "RequestStateChange", {{"RequestedState", Value::uint16(4)}})
@@ -175,6 +175,7 @@ std::vector<std::string> linesOfThread(const Host& host)
 
 TEST(DPortTest, TheThreadEndsTheJobAsTheLibraryEndsTheTest)
 {
+    unsigned number = 0; // of all jobs of the process
     for (const Ending& row : endings)
     {
         SCOPED_TRACE(row.link);
@@ -182,9 +183,9 @@ TEST(DPortTest, TheThreadEndsTheJobAsTheLibraryEndsTheTest)
         host.setDiagnostics(firstPort, (std::string(R"({"dport": )") + row.link + "}").c_str());
         host.holdThread(row.looks + 1);
         const auto before = slept();
-        const Run run = host.run(firstPort);
+        const Started run = host.run(firstPort);
         EXPECT_EQ(run.value, 0u);
-        EXPECT_EQ(run.job, std::string(test) + ":1:1");
+        EXPECT_EQ(run.job, std::string(test) + ":" + std::to_string(++number) + ":1");
         EXPECT_EQ(slept() - before, 5s + 2s * (row.looks == 2 ? 2 : 0)) << "the thread does not sleep yet";
         EXPECT_EQ(host.stateOf(run), row.begins);
         EXPECT_EQ(host.job(run).get("wwpn").asString(), firstPort);
@@ -227,8 +228,9 @@ TEST(DPortTest, RecordsShowThePhases)
 {
     LinkHost host;
     host.setDiagnostics(firstPort, phases);
-    const Run run = host.run(firstPort, {{"DiagnosticSettings", instanceOf("TVRHBA_FCHBADiagnosticSettingData", test,
-                                                                           "HaltOnError", Value::boolean(true))}});
+    const Started run =
+        host.run(firstPort, {{"DiagnosticSettings", instanceOf("TVRHBA_FCHBADiagnosticSettingData", test, "HaltOnError",
+                                                               Value::boolean(true))}});
     ASSERT_TRUE(host.awaitLog(ended));
     const std::string figures = R"(FrameSize = 2112
 InstanceID = "<id>"
@@ -318,8 +320,11 @@ TEST(DPortTest, RunsThatCannotBeginLeaveNothing)
         std::vector<std::string> lines;
     } rows[] = {
         {R"("state": "online")", 0, 40248, {"[TVR_ERR] D_Port Test is not supported on this adapter."}},
-        {R"("names": {"activation": 5}, "attributes": {"linkState": 22})", 1, 40089, {pending, reboot}},
-        {R"("names": {"activation": 6})", 1, 40089, {pending, reboot}},
+        {R"("names": {"activation": 5, "volatile": {"wwpn": "1000027A51160299"}}, "attributes": {"linkState": 22})",
+         1,
+         40089,
+         {pending, reboot}},
+        {R"("names": {"activation": 6, "nonVolatile": {"wwpn": "1000027A51160299"}})", 1, 40089, {pending, reboot}},
         {R"("attributes": {"linkState": 22})",
          1,
          40253,
@@ -341,10 +346,10 @@ TEST(DPortTest, RunsThatCannotBeginLeaveNothing)
                       std::to_string(row.feature) + R"(}, "attributes": {"diagVersion": 4},
             "ports": [{"wwpn": "1000027A51160210", )" +
                       row.port + "}]}]}");
-        const Run run = host.run(firstPort);
+        const Started run = host.run(firstPort);
         EXPECT_EQ(run.value, row.value);
         EXPECT_EQ(run.job, "");
-        EXPECT_EQ(logAbout(host, {"D_Port", "D Port", "WWN Management", "disabled", "Unable to start", "Exited with"}),
+        EXPECT_EQ(logAbout(host, {"D_Port", "D Port", "WWN Management", "disabled", "Unable to start", "error code"}),
                   row.lines);
         EXPECT_EQ(host.calls("LRM_DiagDPortTest"), row.value >= 40200 && row.value < 40240 ? 1u : 0u);
         EXPECT_EQ(host.count("TVRHBA_ConcreteJob") + host.records(), 0u);
@@ -358,7 +363,7 @@ TEST(DPortTest, ACancelledTestLeavesNoRecords)
 {
     LinkHost host;
     host.setDiagnostics(firstPort, forEver);
-    const Run run = host.run(firstPort);
+    const Started run = host.run(firstPort);
     EXPECT_EQ(host.stateOf(run), "4 0");
     EXPECT_EQ(host.cancel(run), 0u);
     ASSERT_TRUE(host.awaitLog(ended));
@@ -395,14 +400,14 @@ TEST(DPortTest, ASecondTestWaitsForTheFirst)
 {
     LinkHost host;
     host.setDiagnostics(firstPort, forEver);
-    const Run first = host.run(firstPort);
+    const Started first = host.run(firstPort);
     advanceClock(10min);
     auto second = std::async(std::launch::async, [&] { return host.run(otherPort); });
     ASSERT_TRUE(host.awaitLog("[TVR_DBG] DPortTest:Joining the thread created for DPORTStatus"));
     EXPECT_EQ(host.count("TVRHBA_ConcreteJob"), 2u);
     EXPECT_EQ(second.wait_for(0s), std::future_status::timeout);
     EXPECT_EQ(host.cancel(first), 0u);
-    const Run run = second.get();
+    const Started run = second.get();
     EXPECT_EQ(run.value, 0u);
     EXPECT_EQ(host.stateOf(first), "8 0");
     ASSERT_TRUE(host.awaitLog(ended, 2));
@@ -415,7 +420,7 @@ TEST(DPortTest, RefreshesRunBesideIt)
 {
     LinkHost host;
     host.setDiagnostics(firstPort, forEver);
-    const Run run = host.run(firstPort);
+    const Started run = host.run(firstPort);
     for (std::size_t refreshes = 2; refreshes < 5; ++refreshes)
     {
         advanceClock(10min);
@@ -435,13 +440,12 @@ TEST(DPortTest, WithoutAThreadTheJobIsNotRunning)
     LinkHost host;
     host.setDiagnostics(firstPort, forEver);
     refuseThreads(true);
-    const Run run = host.run(firstPort);
+    const Started run = host.run(firstPort);
     refuseThreads(false);
     EXPECT_EQ(run.value, 0u);
     EXPECT_EQ(host.logged("[TVR_DBG] DPortTest: Creation of DPORT Status Thread Failed"), 1u);
     EXPECT_EQ(host.stateOf(run), "10 0");
-    host.setDiagnostics(firstPort, R"({})");
-    host.run(firstPort);
+    host.run(otherPort);
     ASSERT_TRUE(host.awaitLog(ended)) << "the next one has its thread";
     host.broker().unload();
     const std::vector<broker::Violation> violations = host.broker().violations();
@@ -459,19 +463,32 @@ TEST(DPortTest, TheModuleEndsWhileATestRuns)
     host.unload();
     EXPECT_EQ(host.logged("[TVR_DBG] DPORTStatusThreadCall: m_bDportThreadEnd is set"), 1u);
     EXPECT_EQ(host.logged(ended), 1u);
-    EXPECT_EQ(host.logged("[TVR_INFO] Tavrin Provider Unloaded"), 1u);
+}
+
+/// A library of the hardware that gives up the process does so on the thread that asked it.
+TEST(DPortTest, TheThreadMayExit)
+{
+    EXPECT_EQ(inChild(
+                  []
+                  {
+                      alarm(60); // a child that hangs is ended by it
+                      LinkHost host;
+                      host.setDiagnostics(firstPort, forEver);
+                      host.run(firstPort);
+                      atSleep([] { std::exit(0); });
+                      std::this_thread::sleep_for(1min);
+                  }),
+              0);
 }
 
 TEST(DPortTest, TheProcessExitsWhileATestRunsAndASecondWaits)
 {
     for (const bool waits : {false, true})
     {
-        Host files; // of the child as well
         EXPECT_EQ(inChild(
                       [&]
                       {
                           alarm(60); // a child that hangs is ended by it
-                          passOverLeaks();
                           LinkHost host;
                           host.setDiagnostics(firstPort, forEver);
                           host.run(firstPort);
