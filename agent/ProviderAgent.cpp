@@ -14,6 +14,7 @@
 #include <cerrno>
 #include <csignal>
 #include <exception>
+#include <new>
 #include <string>
 #include <unistd.h>
 #include <utility>
@@ -242,7 +243,9 @@ void* runDport(void* arg)
 
 int ProviderAgent::startDportThread(Thread::Proc proc, void* arg)
 {
-    auto start = std::make_unique<DportStart>(proc, arg);
+    std::unique_ptr<DportStart> start(new (std::nothrow) DportStart{proc, arg});
+    if (!start)
+        return ENOMEM;
     Auto_Mutex lock(m_DportThreadMutex);
     if (m_bDportThreadRunning)
         TVR_LOG(TVR_DBG, "DPortTest:Joining the thread created for DPORTStatus");

@@ -134,7 +134,7 @@ public:
     // --- status thread of the D-Port test
     /// Runs `proc(arg)` on the thread once it has ended what it was started with before. That may take as long as a
     /// test of a link, and needs m_DataMutex, which the caller does not hold. 0, or what Thread::create_joinable
-    /// answers, or ECANCELED when the agent ends.
+    /// answers, or ECANCELED when the agent ends; it never throws.
     int startDportThread(Thread::Proc proc, void* arg);
     std::atomic<bool> m_bDportThreadEnd{false}; ///< asks the thread to end soon
 

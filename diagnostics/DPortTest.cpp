@@ -8,6 +8,7 @@
 #include "diagnostics/DiagnosticRecords.h"
 #include "diagnostics/DiagnosticTexts.h"
 #include "runtime/base/Time.h"
+#include "runtime/log/Shielded.h"
 #include "schema/TVRHBA_FCHBADiagnosticSettingData.h"
 #include "schema/TVRHBA_JobSettingData.h"
 #include "schema/TVRHBA_PortController.h"
@@ -172,7 +173,9 @@ void* DportStatusThread(void* arg)
 {
     const std::unique_ptr<const LinkTest> link(static_cast<const LinkTest*>(arg));
     TVR_LOG(TVR_DBG, "TVR_Diagnostics::DportStatusThread Start");
-    DPORTStatusThreadCall(*link);
+    shielded(
+        false, [&] { return DPORTStatusThreadCall(*link), true; },
+        [](const char* what) { TVR_LOG(TVR_ERR, "Exception in the thread of a link test: %s", what); });
     TVR_LOG(TVR_DBG, "TVR_Diagnostics::DportStatusThread Ends");
     return nullptr;
 }
