@@ -123,7 +123,7 @@ std::uint32_t SimulatedHost::resultOf(const Port& port, TestOf test, const TestO
 bool SimulatedHost::isRunning(const StartedTest& started) const
 {
     const Port* port = findPort(started.wwpn);
-    return port && !started.isCancelled && started.polls < (port->diagnostics.*started.test).polls;
+    return port && !started.isCancelled && !started.hasEnded && started.polls < (port->diagnostics.*started.test).polls;
 }
 
 SimulatedHost::StartedTest* SimulatedHost::findTest(Wwn wwpn, std::uint32_t handle)
@@ -191,6 +191,7 @@ RM_STATUS SimulatedHost::poll(Wwn wwpn, std::uint32_t handle, Record& out, Fill 
                               out.state = RM_DIAG_STATE_CANCELLED;
                               return RM_OK;
                           }
+                          started->hasEnded = true;
                           fill(port, *started);
                           out.state = behaviour.endState;
                           return behaviour.endStatus;

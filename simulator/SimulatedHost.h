@@ -212,6 +212,7 @@ private:
         std::uint32_t result, cycles;
         std::uint32_t polls = 0;
         bool isCancelled = false;
+        bool hasEnded = false; ///< a poll has seen the end, which longer tests of the port do not undo
     };
 
     // These are called with the lock held.
