@@ -46,6 +46,14 @@ Change change(const std::string& name, std::function<CMPIrc(broker::Broker&)> as
     return {name, [=](broker::Broker& broker) { return std::string(broker::statusName(ask(broker))) + " 0"; }};
 }
 
+Value instance(const char* className, const std::vector<broker::Property>& properties)
+{
+    broker::Object object;
+    object.path.className = className;
+    object.properties = properties;
+    return Value::instance(object);
+}
+
 Value list(CMPIType type, const Value::List& values)
 {
     return Value::array(type, values);
@@ -72,6 +80,7 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
                        software = pathOf("TVRHBA_SoftwareInstallationService"),
                        parameters = pathOf("TVRHBA_FCHBADriverParamService"), tags = pathOf("TVRHBA_FCTagService");
     const broker::Object help = host.instancesOf("TVRHBA_HelpService").at(0);
+    const broker::Path test = theOne(host, "TVRHBA_FCHBADiagnosticTest", "Name", "TVR:FCHBA Host Loopback Test").path;
     const broker::Object setting = host.instancesOf("TVRHBA_ProviderConfigSetting").at(0);
     const broker::Path driverLog = pathOf("TVRHBA_RecordLog"), log = host.instancesOf("TVRHBA_RecordLog").back().path;
     const broker::Property target = {"Target", Value::reference(pathOf("TVRHBA_FCPort"))};
@@ -123,6 +132,14 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
         method(tags, "GetGlobalFlag", {target}),
         method(tags, "SetConfigTable", {target, {"URI", Value::string(server.uri("/table.xml"))}}),
         method(tags, "GetConfigTable", {target, {"URI", Value::string(server.uri("/out.xml", "joe:se%20cret@"))}}),
+        method(test, "RunDiagnosticService",
+               {{"ManagedElement", Value::reference(pathOf("TVRHBA_PortController"))},
+                {"DiagnosticSettings", instance("TVRHBA_FCHBADiagnosticSettingData",
+                                                {{"InstanceID", Value::string("TVR:FCHBA Host Loopback Test")},
+                                                 {"BufferPattern", list(CMPI_uint8, {Value::uint8('f')})}})},
+                {"JobSettings",
+                 instance("TVRHBA_JobSettingData", {{"InstanceID", Value::string("TVR:FCHBA JobSettingData")},
+                                                    {"DeleteOnCompletion", Value::boolean(true)}})}}),
         method(pathOf("TVRHBA_DiagnosticsLog"), "ClearLog", {}),
         method(help.path, "GetHelp",
                {{"RequestedDocument", Value::string(text(help, "Name"))},
