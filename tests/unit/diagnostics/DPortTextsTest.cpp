@@ -50,14 +50,4 @@ TEST(DPortTexts, ErrorsAreNamedFromTheLowestBit)
         EXPECT_STREQ(DPortErrorsToString(row.mask).c_str(), row.names);
 }
 
-TEST(DPortTexts, AResultHasNoMorePhasesThanRoom)
-{
-    RM_DPortResults results{};
-    for (const auto& [claimed, phases] : std::map<unsigned, unsigned>{{0, 0}, {5, 5}, {37, 37}, {38, 37}, {255, 37}})
-    {
-        results.phaseCount = static_cast<std::uint8_t>(claimed);
-        EXPECT_EQ(phasesOf(results).size(), phases);
-    }
-}
-
 } // namespace

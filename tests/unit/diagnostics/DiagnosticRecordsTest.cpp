@@ -11,13 +11,11 @@
 #include "schema/TVRHBA_RecordAppliesToElement.h"
 #include "tests/support/LogCollector.h"
 
-#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
 
 using namespace cimple;
-using testing::ElementsAre;
 
 namespace
 {
@@ -126,29 +124,6 @@ TEST_F(RecordsOfATest, FiguresAndAdviceDifferByTest)
             EXPECT_TRUE(isLogged("Message buffer: the message : Suggested Actions " + row.advice));
         }
     }
-}
-
-TEST_F(RecordsOfATest, OverriddenSettingsHaveARecordThatTheOthersReferTo)
-{
-    TestOutcome outcome = outcomeOf(*findDiagnosticTest("TVR:FCHBA Beacon Test"));
-    outcome.overridden = true;
-    create(outcome);
-    const auto* settings = mapOf<TVRHBA_DiagnosticSettingDataRecord>(cache).first();
-    ASSERT_NE(settings, nullptr);
-    EXPECT_STREQ(settings->InstanceID.value.c_str(), "the test:7:42:SettingData Record");
-    EXPECT_STREQ(settings->Caption.value.c_str(), job);
-    EXPECT_STREQ(settings->Description.value.c_str(), "This class holds the overrided setting data of the test");
-    EXPECT_STREQ(settings->ElementName.value.c_str(), "TVR:FCHBA Beacon Test SettingData Record");
-    EXPECT_STREQ(settings->ServiceName.value.c_str(), "TVR:FCHBA Beacon Test");
-    EXPECT_STREQ(settings->ManagedElementName.value.c_str(), "the port");
-    EXPECT_TRUE(settings->RecordType.null);
-    EXPECT_EQ(settings->Settings, nullptr);
-    EXPECT_EQ(count<TVRHBA_LogManagesRecord>(), 3u);
-    EXPECT_EQ(count<TVRHBA_RecordAppliesToElement>(), 3u);
-    std::vector<std::string> ofSettings;
-    for (std::size_t i = 0; const auto* known = mapOf<TVRHBA_CorrespondingSettingDataRecord>(cache).at(i); i++)
-        ofSettings.push_back(static_cast<const CIM_DiagnosticRecord*>(known->DataRecord)->InstanceID.value.c_str());
-    EXPECT_THAT(ofSettings, ElementsAre("the test:7:42:Service Record", job));
 }
 
 TEST_F(RecordsOfATest, WithoutPortAndLogTheyStandAlone)
