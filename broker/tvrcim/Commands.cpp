@@ -275,8 +275,8 @@ void keepDumps(Session& session, const Path& port, std::uint32_t count)
 {
     const std::string& id = port.key("DeviceID")->asString();
     const Path path = instancePathOf(session, "TVRHBA_DumpData.InstanceID=TVRHBA_DumpData::" + id);
-    const Object data{path, {{"ElementName", Value::string(id)}, {"RetentionCount", Value::uint32(count)}}};
-    changing(session, "dump", [&] { return session.broker.modifyInstance(data, {{"ElementName", "RetentionCount"}}); });
+    const Object data{path, {{"RetentionCount", Value::uint32(count)}}};
+    changing(session, "dump", [&] { return session.broker.modifyInstance(data, {{"RetentionCount"}}); });
     done(session, {{"port", id}, {"kept", count}}, "keeping " + std::to_string(count) + " dump files of " + id);
 }
 
