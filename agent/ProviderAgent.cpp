@@ -267,11 +267,11 @@ void ProviderAgent::joinDportThread()
         Thread::join(m_dportThread, value);
 }
 
-/// False on the thread itself.
+/// False on the thread itself, and on that of the refresh, which has what the other may wait for.
 bool ProviderAgent::endDportThread()
 {
     m_bDportThreadEnd = true;
-    if (onDportThread)
+    if (onDportThread || isOnRefreshThread())
         return false;
     Auto_Mutex lock(m_DportThreadMutex); // a method may be waiting for the same end
     joinDportThread();

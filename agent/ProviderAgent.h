@@ -70,6 +70,8 @@ public:
 
     /// Starts a refresh if one is due; returns 0 at once.
     int BuildCimpleInfo();
+    /// Whether a reader waits for SAN maps that nobody builds yet.
+    bool isFabricAwaited() const;
     /// True when the cache is older than m_cacheTimeout.
     bool isTimeOut();
     std::uint32_t updateAdapterMaps();
@@ -116,7 +118,7 @@ public:
     RefreshStage adapterData();
     RefreshStage adapterMaps();
     RefreshStage sanMaps();
-    std::atomic<bool> m_bDiagnosticsRunning{false};
+    std::atomic<unsigned> m_diagnosticsRunning{0}; ///< runs of tests; while there is one, no refresh starts
 
     // --- the host
     String m_osName;
@@ -163,7 +165,6 @@ private:
     void giveUpRefresh(int error);
     static void* DataFetch_Handler(void* agent);
     void refresh();
-    bool isFabricAwaited() const;
     void askPlatform();
     void adapterStage();
     void sanStage();

@@ -50,7 +50,7 @@ int ProviderAgent::BuildCimpleInfo()
         TVR_LOG(TVR_DBG, "PERF: ---No timeout BuildCimpleInfo END---");
         return 0;
     }
-    if (m_bDiagnosticsRunning)
+    if (m_diagnosticsRunning > 0)
     {
         TVR_LOG(TVR_DBG, "Diagnostics is running.. Skip the internal refresh till it ends");
         return 0;

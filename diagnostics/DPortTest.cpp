@@ -30,6 +30,7 @@ struct LinkTest
     ProviderAgent& agent;
     const DiagnosticTest& test;
     HBA_WWN wwpn;
+    std::string wwpnText;
     Ref<const TVRHBA_PortController> portController;
     bool overridden;
     bool deleteOnCompletion;
@@ -146,6 +147,12 @@ void leaveRecords(const LinkTest& link, const RM_DPortResults& results, bool pas
     TVR_LOG(TVR_DBG, "Created completion Records");
 }
 
+void logException(const char* what)
+{
+    TVR_LOG(TVR_ERR, "Exception in the thread of a link test: %s", what);
+}
+
+/// Whatever is thrown on the way, the job ends.
 void DPORTStatusThreadCall(const LinkTest& link)
 {
     TVR_LOG(TVR_DBG, "TVR_Diagnostics::DPORTStatusThreadCall Start");
@@ -155,7 +162,8 @@ void DPORTStatusThreadCall(const LinkTest& link)
         return;
     }
     RM_DPortResults results{};
-    const Ending ending = awaitEnd(link, results);
+    const Ending ending = shielded(
+        Ending{jobException}, [&] { return awaitEnd(link, results); }, logException);
     Auto_Mutex dataLock(link.agent.m_DataMutex); // whoever waits for this thread does not hold it
     endJob(link, ending);
     if (!ending.passed)
@@ -164,7 +172,8 @@ void DPORTStatusThreadCall(const LinkTest& link)
                          "Records");
         return;
     }
-    leaveRecords(link, results, *ending.passed);
+    shielded(
+        false, [&] { return leaveRecords(link, results, *ending.passed), true; }, logException);
     if (link.deleteOnCompletion)
         DeleteConcreteJob(link.agent, link.job.get());
 }
@@ -174,8 +183,7 @@ void* DportStatusThread(void* arg)
     const std::unique_ptr<const LinkTest> link(static_cast<const LinkTest*>(arg));
     TVR_LOG(TVR_DBG, "TVR_Diagnostics::DportStatusThread Start");
     shielded(
-        false, [&] { return DPORTStatusThreadCall(*link), true; },
-        [](const char* what) { TVR_LOG(TVR_ERR, "Exception in the thread of a link test: %s", what); });
+        false, [&] { return DPORTStatusThreadCall(*link), true; }, logException);
     TVR_LOG(TVR_DBG, "TVR_Diagnostics::DportStatusThread Ends");
     return nullptr;
 }
@@ -271,9 +279,8 @@ std::uint32_t lookAtTest(const LinkTest& link)
 
 TVRHBA_ConcreteJob* makeJob(const LinkTest& link, std::uint32_t state)
 {
-    const std::string wwpn = wwnText(link.wwpn);
     return CreateConcreteJobInstantiateNonBlocking(link.agent, {.testName = link.test.name,
-                                                                .wwpnText = wwpn.c_str(),
+                                                                .wwpnText = link.wwpnText.c_str(),
                                                                 .deleteOnCompletion = link.deleteOnCompletion,
                                                                 .requestedState = state,
                                                                 .diagHandle = link.handle,
@@ -309,6 +316,7 @@ RM_STATUS DPortTest(TestRun& run)
         .agent = run.agent,
         .test = run.test,
         .wwpn = run.wwpn,
+        .wwpnText = wwnText(run.wwpn), // before the test begins, which a thread must follow then
         .portController = hold(&run.portController),
         .overridden = run.settings.OverridedSettingData.value == 1,
         .deleteOnCompletion = run.jobSettings.DeleteOnCompletion.value,

@@ -6,6 +6,7 @@
 #include "diagnostics/PortName.h"
 #include "diagnostics/TestRun.h"
 #include "runtime/base/Time.h"
+#include "runtime/log/Shielded.h"
 #include "schema/TVRHBA_DiagnosticSettingDataRecord.h"
 #include "schema/TVRHBA_FCHBADiagnosticSettingData.h"
 #include "schema/TVRHBA_JobSettingData.h"
@@ -36,13 +37,28 @@ constexpr ServiceTexts texts = {
 class DiagnosticsRunning
 {
 public:
-    explicit DiagnosticsRunning(ProviderAgent& agent) : _agent(agent) { agent.m_bDiagnosticsRunning = true; }
-    ~DiagnosticsRunning() { _agent.m_bDiagnosticsRunning = false; }
+    explicit DiagnosticsRunning(ProviderAgent& agent) : _agent(agent) { ++agent.m_diagnosticsRunning; }
+    ~DiagnosticsRunning() { --_agent.m_diagnosticsRunning; }
     DiagnosticsRunning(const DiagnosticsRunning&) = delete;
     DiagnosticsRunning& operator=(const DiagnosticsRunning&) = delete;
 
 private:
     ProviderAgent& _agent;
+};
+
+/// Begins the refresh that a reader asked for during a run, and waits for. To be made before the data lock is taken.
+class WakesReaders
+{
+public:
+    WakesReaders() = default;
+    ~WakesReaders()
+    {
+        ProviderAgent& agent = *ProviderAgent::instance();
+        if (agent.isFabricAwaited())
+            shielded(0, [&] { return agent.BuildCimpleInfo(); });
+    }
+    WakesReaders(const WakesReaders&) = delete;
+    WakesReaders& operator=(const WakesReaders&) = delete;
 };
 
 const TVRHBA_PortController& controllerOf(InstanceCache& cache, const CIM_ManagedElement* element)
@@ -117,21 +133,23 @@ std::uint32_t answerOf(const DiagnosticTest& test, RM_STATUS status)
 }
 
 /// Where the records of the run have one of its settings, it gets these as the run had them: they may change in the
-/// cache.
+/// cache. Those of a link test come after its run, and have none even if they came fast.
 void recordSettings(const TestRun& run)
 {
-    if (!run.job || run.settings.OverridedSettingData.value != 1)
+    if (!run.job || run.settings.OverridedSettingData.value != 1 || run.test.id == DiagnosticTestId::DPort)
         return;
     auto* record = mapOf<TVRHBA_DiagnosticSettingDataRecord>(run.agent).findFirst(
         [&](const auto& known) { return known.Caption.value == run.job->InstanceID.value; });
     if (!record)
         return;
     TVR_LOG(TVR_DBG, "Adding the embedded instance for Settingdatarecord : %s", record->InstanceID.value.c_str());
-    const Ref<CIM_DiagnosticSettingData> former(std::exchange(record->Settings, clone_of(&run.settings)));
+    if (Ref<Settings> copy = unlessOutOfMemory([&] { return Ref<Settings>(clone_of(&run.settings)); }))
+        const Ref<CIM_DiagnosticSettingData> former(std::exchange(record->Settings, copy.release()));
 }
 
 std::uint32_t runDiagnosticService(const Instance* reference, Parameters& parameters)
 {
+    const WakesReaders wakes;
     MethodCall call({TVR_DBG, "TVRHBA_FCHBADiagnosticTest_Provider::RunDiagnosticService"});
     ProviderAgent& agent = call.agent();
     const DiagnosticsRunning running(agent);

@@ -54,28 +54,23 @@ template <class Attempt> RM_STATUS runAtOnce(TestRun& run, const char* success, 
 
 // --- the beacon
 
-bool setBeacon(const TestRun& run, RM_BeaconState state, TestResult& result)
-{
-    const RM_STATUS status = LRM_DiagBeacon(run.wwpn, state);
-    result.message =
-        status == RM_OK ? formatText(hasSucceeded, run.test.name) : formatText(hasFailed, run.test.name, status);
-    return status == RM_OK;
-}
-
-/// Has a result from the first whole round on, which also a light has that stays on.
-void flash(const TestRun& run, TestResult& result)
+/// The status of the last step. Has a result from the first whole round on, which also a light has that stays on.
+RM_STATUS flash(const TestRun& run, TestResult& result)
 {
     constexpr int rounds = 20;
+    RM_STATUS status = RM_OK;
     for (int round = 0; round < rounds && !run.agent.hasEnded(); round++)
     {
-        if (!setBeacon(run, RM_BEACON_ON, result))
-            return;
+        status = LRM_DiagBeacon(run.wwpn, RM_BEACON_ON);
+        if (status != RM_OK)
+            return status;
         Time::sleep(Time::second);
-        setBeacon(run, RM_BEACON_OFF, result);
+        status = LRM_DiagBeacon(run.wwpn, RM_BEACON_OFF);
         Time::sleep(Time::second);
         result.requestedState = JOB_COMPLETED;
         result.passed = true;
     }
+    return status;
 }
 
 } // namespace
@@ -113,10 +108,12 @@ RM_STATUS BeaconTest(TestRun& run)
         return endWithoutJob(status);
     if (status == RM_OK)
     {
-        flash(run, result);
+        const RM_STATUS flashed = flash(run, result);
         status = LRM_DiagBeacon(run.wwpn, before);
         if (status != RM_OK)
             TVR_LOG(TVR_DBG, "Unable to set the previous beacon state");
+        result.message =
+            flashed == RM_OK ? formatText(hasSucceeded, run.test.name) : formatText(hasFailed, run.test.name, flashed);
     }
     run.job = publish(run, result);
     TVR_LOG(TVR_DBG, "%s Succesful", run.test.name);

@@ -1,5 +1,6 @@
 #include "diagnostics/TestResult.h"
 
+#include "agent/Build.h"
 #include "diagnostics/DiagnosticRecords.h"
 #include "diagnostics/DiagnosticTexts.h"
 #include "schema/TVRHBA_FCHBADiagnosticSettingData.h"
@@ -19,15 +20,16 @@ RM_STATUS endWithoutJob(RM_STATUS status)
 Ref<TVRHBA_ConcreteJob> publish(TestRun& run, const TestResult& result)
 {
     const bool isDeleted = run.jobSettings.DeleteOnCompletion.value;
-    const TVRHBA_ConcreteJob* job =
+    TVRHBA_ConcreteJob* made =
         CreateConcreteJobInstantiateNonBlocking(run.agent, {.testName = run.test.name,
                                                             .deleteOnCompletion = isDeleted,
                                                             .requestedState = result.requestedState,
                                                             .diagHandle = result.diagHandle,
                                                             .portController = &run.portController});
-    if (!job)
+    if (!made)
         return {};
-    Ref<TVRHBA_ConcreteJob> copy(clone_of(job));
+    ref(made);
+    const Ref<TVRHBA_ConcreteJob> job(made); // beyond its place in the cache
     const TestOutcome outcome = {
         .test = run.test,
         .message = result.message,
@@ -40,8 +42,8 @@ Ref<TVRHBA_ConcreteJob> publish(TestRun& run, const TestResult& result)
     CreateDiagnosticServiceRecord(run.agent, outcome);
     CreateDiagnosticCompletionRecord(run.agent, outcome);
     if (isDeleted)
-        DeleteConcreteJob(run.agent, job);
-    return copy;
+        DeleteConcreteJob(run.agent, job.get());
+    return unlessOutOfMemory([&] { return Ref<TVRHBA_ConcreteJob>(clone_of(job.get())); });
 }
 
 void endWithJob(TestRun& run, const TestResult& result)
