@@ -50,26 +50,9 @@ std::optional<struct stat> statusAt(const Place& place)
     return status;
 }
 
-bool anybodyMayWrite(const File_Descriptor& folder)
-{
-    struct stat status;
-    return fstat(folder.get(), &status) == 0 && (status.st_mode & S_IWOTH) != 0;
-}
-
 } // namespace
 
 // --- opening and reading -------------------------------------------------------------------------------
-
-File_Descriptor openForAppending(const char* path, int flags)
-{
-    const Place place = placeOf(path);
-    if (!place.folder)
-        return File_Descriptor();
-    flags |= O_RDWR | O_APPEND | O_CREAT;
-    if (anybodyMayWrite(place.folder))
-        flags |= O_NOFOLLOW;
-    return open_regular(place.name.c_str(), flags, newFile, place.folder.get());
-}
 
 bool isPlainFileName(std::string_view name)
 {
@@ -165,6 +148,50 @@ bool followLink(Place& place)
 }
 
 } // namespace
+
+// --- appending -----------------------------------------------------------------------------------------
+
+namespace
+{
+
+bool isSame(const struct stat& one, const struct stat& other)
+{
+    return one.st_dev == other.st_dev && one.st_ino == other.st_ino;
+}
+
+} // namespace
+
+bool isSame(const File_Descriptor& one, const File_Descriptor& other)
+{
+    struct stat status;
+    struct stat otherStatus;
+    return fstat(one.get(), &status) == 0 && fstat(other.get(), &otherStatus) == 0 && isSame(status, otherStatus);
+}
+
+bool isSameFile(const char* one, const char* other)
+{
+    struct stat status;
+    struct stat otherStatus;
+    if (stat(one, &status) == 0 && stat(other, &otherStatus) == 0 && isSame(status, otherStatus))
+        return true;
+    const Place place = placeOf(one);
+    const Place otherPlace = placeOf(other);
+    return place.name == otherPlace.name && isSame(place.folder, otherPlace.folder);
+}
+
+Appendable openForAppending(const char* path, int flags)
+{
+    Place place = placeOf(path);
+    if (!place.folder)
+        return {};
+    // The same folder, so that nobody puts another in its place meanwhile.
+    const bool isRootsWay = isSame(walkAsRoot(openFolder("."), path), place.folder);
+    const auto status = statusAt(place);
+    if (status && S_ISLNK(status->st_mode) && (flags & O_NOFOLLOW) == 0 && !followLink(place))
+        return {};
+    flags |= O_RDWR | O_APPEND | O_CREAT | O_NOFOLLOW;
+    return {open_regular(place.name.c_str(), flags, newFile, place.folder.get()), isRootsWay};
+}
 
 // --- replacing -----------------------------------------------------------------------------------------
 

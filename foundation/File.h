@@ -12,9 +12,21 @@
 namespace cimple
 {
 
-/// Opens for reading and appending, creating the file with 0644; none with errno on failure. In a folder that anybody
-/// may write to, a symbolic link is refused. `flags` are further ones of open(), such as O_NOFOLLOW.
-File_Descriptor openForAppending(const char* path, int flags = 0);
+/// A file that is open for reading and appending.
+struct Appendable
+{
+    File_Descriptor file = File_Descriptor();
+    bool isRootsWay = false; ///< nobody but root could have led the path to it
+};
+
+/// Opens for reading and appending, creating the file with 0644; none with errno on failure. A symbolic link at the end
+/// is followed where nobody but root could have made it, and never with O_NOFOLLOW in the `flags`.
+Appendable openForAppending(const char* path, int flags = 0);
+
+/// Whether both are the same file.
+bool isSame(const File_Descriptor& one, const File_Descriptor& other);
+/// Whether two paths name the same file, or the same place for one that is not there yet.
+bool isSameFile(const char* one, const char* other);
 
 /// Whether a name from a client names a file of a folder: not empty, no folder in it, and neither of the dot entries.
 bool isPlainFileName(std::string_view name);

@@ -116,8 +116,8 @@ public:
     bool dataFileAccessible();
     /// Applies what the file says. On any fault mode and level stay as they are.
     void readDataFile();
-    /// On a fault the file stays as it is.
-    void writeDataFile();
+    /// False on a fault: the file stays as it is.
+    bool writeDataFile();
 
 private:
     friend class Immortal<TVR_Logger>;

@@ -154,19 +154,15 @@ std::string TVR_Logger::dataText()
     return text;
 }
 
-void TVR_Logger::writeDataFile()
+bool TVR_Logger::writeDataFile()
 {
     const std::string path = dataPath();
-    switch (replaceFile(path.c_str(), dataText()))
-    {
-    case Replacement::NotOpened:
-        return TVR_LOG(TVR_ERR, "Unable to open dump file\n");
-    case Replacement::NotWritten:
-        return TVR_LOG(TVR_ERR, "Unable to write dump file - %s: %s", path.c_str(), std::strerror(errno));
-    case Replacement::Unchanged:
-    case Replacement::Done:
-        return;
-    }
+    const Replacement replacement = replaceFile(path.c_str(), dataText());
+    if (replacement == Replacement::NotOpened)
+        TVR_LOG(TVR_ERR, "Unable to open dump file\n");
+    else if (replacement == Replacement::NotWritten)
+        TVR_LOG(TVR_ERR, "Unable to write dump file - %s: %s", path.c_str(), std::strerror(errno));
+    return !failed(replacement);
 }
 
 } // namespace cimple

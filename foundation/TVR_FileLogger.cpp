@@ -1,5 +1,6 @@
 #include "foundation/TVR_FileLogger.h"
 
+#include "foundation/FilePaths.h"
 #include "foundation/LogDataFile.h"
 #include "runtime/log/LogLine.h"
 #include "runtime/values/Datetime.h"
@@ -44,6 +45,19 @@ bool beginsLikeALine(std::string_view text)
     return digits != 0 && text.substr(digits).starts_with("l] [");
 }
 
+/// Files that the module reads or keeps other things in, some of which may not be there yet.
+constexpr FilePath otherFiles[] = {FilePath::ProviderConfig,  FilePath::WebLaunchConfig, FilePath::LogData,
+                                   FilePath::LogDataFallback, FilePath::KernelVersion,   FilePath::OsDistribution,
+                                   FilePath::SystemLog};
+
+bool mayBeNamedByClient(const String& path)
+{
+    const auto isControl = [](char c) { return static_cast<unsigned char>(c) < 0x20 || c == 0x7f; };
+    const auto isPath = [&](FilePath file) { return isSameFile(path.c_str(), filePath(file).c_str()); };
+    return path.view().starts_with('/') && std::ranges::none_of(path.view(), isControl) &&
+           std::ranges::none_of(otherFiles, isPath);
+}
+
 } // namespace
 
 TVR_FileLogger::TVR_FileLogger()
@@ -65,11 +79,21 @@ int TVR_FileLogger::validateAndSetPath(const char* path, bool errorsOnly)
 
 int TVR_FileLogger::validateAndSetClientPath(const String& path)
 {
-    if (!path.view().starts_with('/') || !fitsLogData(path.view()))
+    if (!fitsLogData(path.view()))
         return -1;
-    const int status = setPath(path.c_str(), false, NamedBy::Client);
+    const bool accepted =
+        keepPath(path) || (mayBeNamedByClient(path) && setPath(path.c_str(), false, NamedBy::Client) == 0);
     TVR_Logger::instance().sinkChanged();
-    return status;
+    return accepted ? 0 : -1;
+}
+
+bool TVR_FileLogger::keepPath(const String& path)
+{
+    Auto_Mutex lock(_mutex);
+    if (!_file || path != _path)
+        return false;
+    _errorsOnly = false;
+    return true;
 }
 
 int TVR_FileLogger::setPath(const char* path, bool errorsOnly, NamedBy namedBy)
@@ -77,28 +101,31 @@ int TVR_FileLogger::setPath(const char* path, bool errorsOnly, NamedBy namedBy)
     if (!path || !isWritableOrAbsent(path))
         return -1;
     const bool byClient = namedBy == NamedBy::Client;
-    File_Descriptor file = openForAppending(path, byClient ? O_NOFOLLOW : 0);
+    Appendable opened = openForAppending(path, byClient ? O_NOFOLLOW : 0);
     Auto_Mutex lock(_mutex);
-    // Also a path that was accepted before: a client may have named it, and others may since have put another file
-    // under it.
-    const bool mustBeLog = byClient || _path == path;
-    if (!file || (mustBeLog && !isLog(file)))
+    if (!opened.file)
         return -1;
-    _file = std::move(file);
+    // Not under a path that was accepted before: a client may have named it, and others may since have put another
+    // file under it. They may have done so before a start as well, but not where root alone leads the way.
+    const bool mayBeForeign = !byClient && _path != path && opened.isRootsWay;
+    const bool ours = isOurs(opened.file);
+    if (!ours && !mayBeForeign && !isSame(opened.file, _file))
+        return -1;
+    _file = std::move(opened.file);
+    _isOurs = ours;
     _path = path;
     _errorsOnly = errorsOnly;
     return 0;
 }
 
-/// The file that is open already, one of this user that nobody has written to, or one that begins as a log does.
-bool TVR_FileLogger::isLog(const File_Descriptor& file) const
+/// The log that is open already, a file of this user that nobody has written to, or one that begins as a log does.
+bool TVR_FileLogger::isOurs(const File_Descriptor& file) const
 {
     struct stat status;
-    struct stat known;
     if (fstat(file.get(), &status) != 0)
         return false;
-    if (_file && fstat(_file.get(), &known) == 0 && status.st_dev == known.st_dev && status.st_ino == known.st_ino)
-        return true;
+    if (isSame(file, _file))
+        return _isOurs;
     char head[64];
     const ssize_t size = pread(file.get(), head, sizeof head, 0);
     return status.st_uid == geteuid() && size >= 0 &&
@@ -161,16 +188,19 @@ void TVR_FileLogger::clearLog()
 {
     Auto_Mutex lock(_mutex);
     reopen();
-    if (_file && ftruncate(_file.get(), 0) != 0)
-        _file = File_Descriptor(); // as when it cannot be opened
+    // One that may only be appended to is written on.
+    if (_file && _isOurs) [[maybe_unused]]
+        const int status = ftruncate(_file.get(), 0);
 }
 
 void TVR_FileLogger::reopen()
 {
     File_Descriptor file;
     if (!_path.empty())
-        file = openForAppending(_path.c_str());
-    _file = file && isLog(file) ? std::move(file) : File_Descriptor();
+        file = openForAppending(_path.c_str()).file;
+    const bool ours = file && isOurs(file);
+    _file = ours || isSame(file, _file) ? std::move(file) : File_Descriptor();
+    _isOurs = ours;
 }
 
 } // namespace cimple

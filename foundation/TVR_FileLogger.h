@@ -16,11 +16,13 @@ public:
     ~TVR_FileLogger() override;
 
     /// Moves the log to another file, which is created if need be; `errorsOnly` drops all but critical messages and
-    /// errors. Returns 0, or -1 with the old file still in use.
+    /// errors. A file with other text is appended to where root alone could have led the path to it, and never emptied.
+    /// Returns 0, or -1 with the old file still in use.
     int validateAndSetPath(const char* path, bool errorsOnly);
     /// The same for a path that a client names, who must not get at other files of the host: an absolute path of a new
-    /// file, an empty one of this user, or a log that this module wrote; without a link at its end, and such that the
-    /// data file can keep it.
+    /// file, an empty one of this user, or a log that this module wrote; without a link at its end or control
+    /// characters, none of the module's other files, and such that the data file can keep it. The path in use stays,
+    /// whoever named it.
     int validateAndSetClientPath(const String& path);
     /// Empty when no path is set.
     String getPath() const;
@@ -41,14 +43,17 @@ private:
     };
     /// validateAndSetPath() under the logger's mutex.
     int setPath(const char* path, bool errorsOnly, NamedBy namedBy = NamedBy::Administrator);
+    /// Has all messages written to the open file if this is its path.
+    bool keepPath(const String& path);
     // The mutex is held.
     void reopen();
-    bool isLog(const File_Descriptor& file) const;
+    bool isOurs(const File_Descriptor& file) const;
     unsigned levels() const;
 
     mutable Mutex _mutex; ///< taken after the logger's
     String _path;
     File_Descriptor _file;
+    bool _isOurs = false; ///< the file may be emptied
     bool _errorsOnly = false;
 };
 

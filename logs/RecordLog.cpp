@@ -2,6 +2,7 @@
 
 #include "agent/MethodCall.h"
 #include "agent/RecordLogs.h"
+#include "foundation/ClientText.h"
 #include "foundation/FilePaths.h"
 #include "logs/DriverLog.h"
 #include "runtime/adapter/Provider.h"
@@ -44,11 +45,12 @@ int valueUpTo(int most, const Property<std::uint16_t>& value, const LogText& out
     return value.value;
 }
 
-/// What the data file gets holds once it is read back, as after a restart.
+/// What the data file gets holds once it is read back, as after a restart. A file that cannot be written holds the old
+/// parameters, which are not to undo the change.
 void keepParameters()
 {
-    TVR_Logger::instance().writeDataFile();
-    TVR_Logger::instance().readDataFile();
+    if (TVR_Logger::instance().writeDataFile())
+        TVR_Logger::instance().readDataFile();
 }
 
 void setState(TVRHBA_RecordLog& log, std::uint16_t state, std::uint16_t status)
@@ -79,7 +81,7 @@ std::uint32_t setLogParams(const Instance* reference, TVRHBA_RecordLog_SetLogPar
     logger.setMode(mode);
     const String used = agent.m_fileLogger.getPath();
     TVR_LOG(TVR_DBG, "Setting path as %s", used.c_str());
-    log.TracePath.set(used);
+    log.TracePath.set(clientText(used.view()));
     log.LogLevel.set(static_cast<std::uint16_t>(level));
     log.LogMode.set(static_cast<std::uint16_t>(mode));
     keepParameters();

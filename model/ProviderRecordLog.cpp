@@ -1,5 +1,6 @@
 // The record log that publishes the module's own log, as an instance.
 #include "agent/RecordLogs.h"
+#include "foundation/ClientText.h"
 #include "model/Profiles.h"
 #include "model/ProviderInstances.h"
 #include "schema/TVRHBA_EnabledRecordLogCapabilities.h"
@@ -34,7 +35,7 @@ Ref<TVRHBA_RecordLog> makeProviderLog(const HostContext& host)
     log->EnabledState.set(enabled ? 2 : 3);
     log->LogLevel.set(static_cast<std::uint16_t>(logger.getLevel()));
     log->LogMode.set(static_cast<std::uint16_t>(logger.getMode()));
-    log->TracePath.set(host.agent.m_fileLogger.getPath());
+    log->TracePath.set(clientText(host.agent.m_fileLogger.getPath().view()));
     return log;
 }
 

@@ -72,7 +72,7 @@ TEST_P(NoFile, IsNeitherReadNorWrittenNorReplacedAndNothingWaits)
     const File_Descriptor held = GetParam().make(path);
     const auto before = std::filesystem::symlink_status(path).type();
     EXPECT_EQ(readTextFile(path.c_str(), 10), std::nullopt);
-    EXPECT_FALSE(openForAppending(path.c_str()));
+    EXPECT_FALSE(openForAppending(path.c_str()).file);
     EXPECT_EQ(replaceFile(path.c_str(), "text"), Replacement::NotOpened);
     EXPECT_FALSE(createTextFile(path.c_str(), "text"));
     EXPECT_EQ(std::filesystem::symlink_status(path).type(), before);

@@ -6,8 +6,11 @@
 #include "foundation/TVR_SysLogger.h"
 
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <syslog.h>
+#include <unistd.h>
 
+#include <cerrno>
 #include <cstdarg>
 #include <cstdio>
 #include <fstream>
@@ -23,9 +26,19 @@ struct SysLogCall
 std::vector<SysLogCall> sysLogCalls;
 std::vector<std::string> connectionCalls;
 
+bool canTruncate = true; ///< false as where files may only be appended to
+
 } // namespace
 
 // These take the place of the C library's in this program.
+
+extern "C" int ftruncate(int file, off_t size) noexcept
+{
+    if (canTruncate)
+        return static_cast<int>(syscall(SYS_ftruncate, file, size));
+    errno = EPERM;
+    return -1;
+}
 
 extern "C" void openlog(const char* identity, int options, int facility)
 {
@@ -160,18 +173,55 @@ TEST_F(FileSink, CreatesAFileThatOnlyTheOwnerWrites)
     EXPECT_EQ(status.st_mode & 07777, 0644u);
 }
 
-TEST_F(FileSink, FollowsNoLinkWhereAnybodyMayWrite)
-{
-    const std::string target = root / "target";
-    const std::string link = root / "etc/link";
-    writeFile(target, "");
-    std::filesystem::create_symlink(target, link);
-    EXPECT_EQ(file.validateAndSetPath(link.c_str(), false), 0) << "an administrator's link";
-    chmod((root / "etc").c_str(), 01777);
-    EXPECT_EQ(file.validateAndSetPath(link.c_str(), false), -1);
-}
-
 constexpr const char* ownLine = "[threadid =12l] [2026/11/22 18:00:00.000000+000] [A.cpp:1][TVR_ERR] a\n";
+
+/// What the data file names: who may have put a file or a link there, and what becomes of it.
+TEST_F(FileSink, TakesWhatRootAloneCanHavePutUnderAPath)
+{
+    if (geteuid() != 0)
+        GTEST_SKIP() << "root's links";
+    const std::string target = root / "target";
+    const std::string named = root / "etc/named";
+    const struct
+    {
+        mode_t folder;
+        bool link;
+        const char* text; ///< none for no file
+        bool appended;
+        bool cleared;
+    } rows[] = {
+        {0755, true, "precious\n", true, false},  {0755, false, "precious\n", true, false},
+        {0755, true, ownLine, true, true},        {0755, true, nullptr, true, true},
+        {0775, true, "precious\n", false, false}, {0775, false, "precious\n", false, false},
+        {0775, true, "", false, false},           {0775, true, nullptr, false, false},
+        {01777, true, ownLine, false, false},     {0775, false, ownLine, true, true},
+        {01777, false, nullptr, true, true},
+    };
+    for (const auto& row : rows)
+    {
+        SCOPED_TRACE(testing::Message() << std::oct << row.folder << (row.link ? " link " : " file ")
+                                        << (row.text ? row.text : "none"));
+        logger.setMode(0); // as at a start, when no path is known
+        logger.setMode(2);
+        std::filesystem::remove(named);
+        std::filesystem::remove(target);
+        const std::string& there = row.link ? target : named;
+        if (row.text)
+            writeFile(there, row.text);
+        if (row.link)
+            std::filesystem::create_symlink(target, named);
+        chmod((root / "etc").c_str(), row.folder);
+        EXPECT_EQ(file.validateAndSetPath(named.c_str(), false), row.appended ? 0 : -1);
+        TVR_LOG(TVR_ERR, "one");
+        logger.setMode(4);
+        EXPECT_EQ(fileText(there).find("one") != std::string::npos, row.appended);
+        EXPECT_EQ(std::filesystem::exists(there), row.text || row.appended);
+        logger.clearAll();
+        EXPECT_EQ(fileText(there) == "", row.cleared || std::string_view(row.text ? row.text : "").empty());
+        TVR_LOG(TVR_ERR, "two");
+        EXPECT_EQ(fileText(there).find("two") != std::string::npos, row.appended) << "it goes on";
+    }
+}
 
 TEST_F(FileSink, TakesFromAClientNewFilesAndLogsAlone)
 {
@@ -247,10 +297,15 @@ TEST_F(FileSink, LeavesAFileAloneThatTookTheLogsPlace)
 
 TEST_F(FileSink, AppendsAndGoesOnAfterAClear)
 {
-    writeFile(path, "from before\n");
+    writeFile(path, ownLine);
     ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
     TVR_LOG(TVR_ERR, "one");
-    EXPECT_THAT(fileText(path), testing::AllOf(testing::StartsWith("from before\n"), HasSubstr("one")));
+    EXPECT_THAT(fileText(path), testing::AllOf(testing::StartsWith(ownLine), HasSubstr("one")));
+    canTruncate = false;
+    logger.clearAll();
+    canTruncate = true;
+    TVR_LOG(TVR_ERR, "kept on");
+    EXPECT_THAT(fileText(path), testing::AllOf(HasSubstr("one"), HasSubstr("kept on")));
     logger.clearAll();
     EXPECT_EQ(fileText(path), "");
     TVR_LOG(TVR_ERR, "two");
