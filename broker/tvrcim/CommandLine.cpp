@@ -150,7 +150,7 @@ void addCommands(CommandOptions& options)
         .output("write FILE.dot, or a picture FILE.svg, .png or .pdf by graphviz");
     options
         .add("log", "show errors and warnings of the provider, the newest last; where its log in memory is off, this "
-                    "switches it on, starts the provider anew, and leaves the log on")
+                    "switches it on beside its file, starts the provider anew, and leaves the log on")
         .log();
 }
 

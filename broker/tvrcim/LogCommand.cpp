@@ -87,7 +87,7 @@ void switchProviderLogOn(Session& session, const Object& log)
     const std::string path = textOf(log, "TracePath");
     const bool isInMemory = mode == 1 || mode == 4;
     const bool isEnabled = numberOf(log, "EnabledState") == 2;
-    const bool writesFile = mode == 2 && level != 0 && !path.empty();
+    const bool writesFile = mode == 2 && !path.empty();
     if (!isInMemory)
         call(session, log.path, "SetLogParams",
              {{"LogLevel", Value::uint16(level ? static_cast<std::uint16_t>(level) : 5)},

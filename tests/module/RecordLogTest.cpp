@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <chrono>
 #include <sys/stat.h>
 #include <thread>
 
@@ -132,6 +133,9 @@ TEST(RecordLog, WrongCallsChangeNothing)
     std::filesystem::create_directory(host.at("folder"));
     ASSERT_EQ(mkfifo(host.at("pipe").c_str(), 0600), 0);
     std::filesystem::create_symlink(host.at("provider.log"), host.at("link"));
+    std::filesystem::create_directory_symlink(host.at("etc"), host.at("settings"));
+    std::filesystem::create_directories(host.at("var/log"));
+    std::filesystem::remove(host.at("var/log/messages"));
 
     const auto params = [](const Value& level, const Value& mode, const Value& path) {
         return std::vector<Property>{{"LogLevel", level}, {"LogMode", mode}, {"TracePath", path}};
@@ -172,6 +176,12 @@ TEST(RecordLog, WrongCallsChangeNothing)
         {provider, "SetLogParams", traced(host.at("link")), "CIM_ERR_OK 32968", noPath},
         {provider, "SetLogParams", traced("/dev/null"), "CIM_ERR_OK 32968", noPath},
         {provider, "SetLogParams", traced(host.at("two\nlines")), "CIM_ERR_OK 32968", noPath},
+        {provider, "SetLogParams", traced(host.at("a\x1b[2J")), "CIM_ERR_OK 32968", noPath},
+        {provider, "SetLogParams", traced(host.at("etc/tvr_smis.conf")), "CIM_ERR_OK 32968", noPath},
+        {provider, "SetLogParams", traced(host.at("var/../etc//tavrin_fc_provider.conf")), "CIM_ERR_OK 32968", noPath},
+        {provider, "SetLogParams", traced(host.at("settings/tavrin_fc_provider.dmp")), "CIM_ERR_OK 32968", noPath},
+        {provider, "SetLogParams", traced(host.at("var/log/tavrin_fc_provider.dmp")), "CIM_ERR_OK 32968", noPath},
+        {provider, "SetLogParams", traced(host.at("var/log/messages")), "CIM_ERR_OK 32968", noPath},
         {provider, "SetLogParams", traced(host.at(std::string(255, 'n'))), "CIM_ERR_OK 32968", noPath},
         {unknown, "ClearLog", {}, "CIM_ERR_OK 33068", noLog},
         {unknown, "RequestStateChange", {{"RequestedState", number(enable)}}, "CIM_ERR_OK 33068", noLog},
@@ -227,6 +237,57 @@ TEST(RecordLog, ParametersHoldAndOutliveTheModule)
     }
     EXPECT_THAT(host.Host::log(), Contains("[TVR_CRIT] Changing the record log parameters 5-4-" + old));
     EXPECT_THAT(host.Host::log(), Contains("[TVR_DBG] Setting path as " + old));
+    host.unload();
+}
+
+/// Whoever may write to the folder of a log puts a link to another file under its name while no provider runs.
+TEST(RecordLog, AFileThatTookTheLogsPlaceIsLeftAlone)
+{
+    LogHost host;
+    std::filesystem::create_directory(host.at("logs"));
+    std::filesystem::permissions(host.at("logs"), std::filesystem::perms(0775));
+    const std::string path = host.at("logs/x.log");
+    EXPECT_EQ(host.setParameters(host.provider().path, 5, 2, path).result, "CIM_ERR_OK 0");
+    host.unload();
+    std::filesystem::remove(path);
+    host.write("/secret", "precious\n");
+    std::filesystem::create_symlink(host.at("secret"), path);
+    host.logError("once more");
+    EXPECT_EQ(host.call(host.provider().path, "ClearLog").result, "CIM_ERR_OK 0");
+    EXPECT_EQ(host.read("/secret"), "precious\n");
+    host.unload();
+}
+
+TEST(RecordLog, ADataFileThatCannotBeWrittenUndoesNoChange)
+{
+    LogHost host;
+    const std::string other = host.at("other.log"), dataFile = host.at("etc/tavrin_fc_provider.dmp");
+    host.settle();
+    std::filesystem::rename(dataFile, host.at("data"));
+    std::filesystem::permissions(host.at("etc"), std::filesystem::perms(0777)); // no place for links
+    std::filesystem::create_symlink(host.at("data"), dataFile);
+    EXPECT_EQ(host.setParameters(host.provider().path, 3, 4, other).result, "CIM_ERR_OK 0");
+    EXPECT_EQ(shown(host.provider(), parameterNames), "3, 4, " + other);
+    host.logError("one");
+    EXPECT_THAT(host.read("/other.log"), HasSubstr("one"));
+    EXPECT_EQ(host.request(host.provider().path, disable).result, "CIM_ERR_OK 0");
+    host.logError("while disabled");
+    EXPECT_EQ(shown(host.provider(), stateNames), "3, 3, 10, 0");
+    EXPECT_THAT(host.read("/other.log"), Not(HasSubstr("while disabled")));
+    EXPECT_EQ(host.read("/data"), "2,5,1\n" + host.at("provider.log"));
+    host.unload();
+}
+
+TEST(RecordLog, ThePathInUseIsKeptWhoeverNamedIt)
+{
+    LogHost host;
+    host.write("/named", "a file of the administrator's\n");
+    const std::string path = host.at("named");
+    host.write("/etc/tavrin_fc_provider.dmp", "2,5,1\n" + path);
+    EXPECT_EQ(host.setParameters(host.provider().path, 3, 4, path).result, "CIM_ERR_OK 0");
+    EXPECT_EQ(shown(host.provider(), parameterNames), "3, 4, " + path);
+    EXPECT_EQ(host.call(host.provider().path, "ClearLog").result, "CIM_ERR_OK 0");
+    EXPECT_THAT(host.read("/named"), testing::AllOf(testing::StartsWith("a file of the"), HasSubstr("Cleared all")));
     host.unload();
 }
 
@@ -339,13 +400,20 @@ TEST(RecordLog, EntriesAreReadWhileOthersLog)
                 for (unsigned n = 0; !done; n++)
                     host.logError("writer " + std::to_string(i) + " " + std::to_string(n));
             });
-    std::size_t most = 0;
-    while (most < 300)
+    std::string first;
+    bool wrapped = false; // the ring, while it is read
+    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(60);
+    while (!wrapped && std::chrono::steady_clock::now() < end)
         for (const Object& entry : host.instancesOf("TVRHBA_LogEntry"))
         {
-            most = std::max<std::size_t>(most, std::stoul(text(entry, "RecordID")) + 1);
-            EXPECT_THAT(text(entry, "RecordData"), testing::AllOf(testing::StartsWith("["), EndsWith("]")));
+            const std::string data = text(entry, "RecordData");
+            EXPECT_THAT(data, testing::AllOf(testing::StartsWith("["), EndsWith("]")));
+            if (text(entry, "RecordID") != "0")
+                continue;
+            wrapped = !first.empty() && data != first;
+            first = data;
         }
+    EXPECT_TRUE(wrapped);
     done = true;
     for (std::thread& writer : writers)
         writer.join();
@@ -370,6 +438,9 @@ TEST(DriverLog, StandsBesideTheModulesOwn)
     const Object log = host.driver();
     const std::string id = text(log, "InstanceID");
     EXPECT_THAT(id, testing::StartsWith(driverLogPrefix));
+    const std::vector<Object> logs = host.instancesOf("TVRHBA_RecordLog");
+    ASSERT_EQ(logs.size(), 2u);
+    EXPECT_EQ(text(logs[0], "InstanceID"), id) << "the driver's first";
     EXPECT_EQ(shown(log, {"ElementName", "Name", "MaxNumberOfRecords", "CurrentNumberOfRecords", "LogState",
                           "OverwritePolicy", "OperationalStatus", "RequestedState", "EnabledState", "HealthState"}),
               id + ", Driver logs for Tavrin FC Provider, 200, 0, 4, 2, 2, 2, 3, 5");

@@ -252,6 +252,18 @@ public:
         std::ofstream(_path + "/var/log/messages", std::ios::app) << line;
     }
     std::string dataFile() const { return textOf(_path + "/etc/tavrin_fc_provider.dmp"); }
+    /// Has the log written to a file, under these parameters.
+    std::string nameFile(const std::string& parameters) const
+    {
+        std::ofstream(_path + "/etc/tavrin_fc_provider.dmp") << parameters << _path << "/x.log";
+        return _path + "/x.log";
+    }
+    /// Makes the folder of the first failures' log.
+    std::string firstFailures() const
+    {
+        std::filesystem::create_directories(_path + "/opt/ibm/platform/log");
+        return _path + "/opt/ibm/platform/log/tavrin_fc_provider_ffdc.log";
+    }
 
 private:
     std::string _path = testing::TempDir() + "tvrcim-root-XXXXXX";
@@ -277,6 +289,15 @@ TEST(Tvrcim, ShowsTheLogs)
     EXPECT_EQ(files.dataFile(), "") << "nothing to be kept";
     EXPECT_EQ(tvrcim("log").exitCode, 0);
     EXPECT_THAT(files.dataFile(), testing::StartsWith("1,5,1\n"));
+    for (const bool firstFailures : {false, true})
+    {
+        const FilesOfHost host;
+        const std::string file = firstFailures ? host.firstFailures() : host.nameFile("2,0,1\n");
+        const Answer answer = tvrcim("log");
+        EXPECT_EQ(answer.exitCode, 0) << answer.err;
+        EXPECT_EQ(host.dataFile(), "4,5,1\n" + file) << "a file in use stays in use";
+        EXPECT_THAT(textOf(file), HasSubstr("[TVR_DBG]"));
+    }
     const std::string none = testing::TempDir() + "none-" + std::to_string(getpid()) + ".json";
     std::ofstream(none) << R"({"adapters": []})";
     const Answer without = tvrcim("log --driver --scenario " + none);
