@@ -12,6 +12,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <string_view>
+#include <tuple>
 
 namespace cimple
 {
@@ -189,8 +190,8 @@ void TVR_FileLogger::clearLog()
     Auto_Mutex lock(_mutex);
     reopen();
     // One that may only be appended to is written on.
-    if (_file && _isOurs) [[maybe_unused]]
-        const int status = ftruncate(_file.get(), 0);
+    if (_file && _isOurs)
+        std::ignore = ftruncate(_file.get(), 0);
 }
 
 void TVR_FileLogger::reopen()
