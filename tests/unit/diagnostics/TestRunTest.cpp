@@ -1,25 +1,22 @@
-// What the library says of tests, in words; jobs where no host leads the executors: states, ends that are missing, keys
-// that are there already, a test that nobody knows.
-#include "agent/Build.h"
+// What the library says of tests, in words, and jobs that no run of a client leads to: states, ends that are missing,
+// jobs that are gone.
+#include "agent/Maps.h"
+#include "agent/ProviderAgent.h"
 #include "diagnostics/ConcreteJobs.h"
 #include "diagnostics/DiagnosticTexts.h"
-#include "diagnostics/Executors.h"
 #include "schema/TVRHBA_AffectedJobElement.h"
-#include "schema/TVRHBA_FCHBADiagnosticSettingData.h"
-#include "schema/TVRHBA_JobSettingData.h"
 #include "schema/TVRHBA_OwningJobElement.h"
-#include "schema/TVRHBA_PortController.h"
 #include "tests/support/LogCollector.h"
 #include "tests/unit/device/FakeHost.h"
 
-#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <map>
 #include <string>
+#include <vector>
 
 using namespace cimple;
-using testing::Contains;
 
 namespace
 {
@@ -49,36 +46,18 @@ TEST(DiagnosticTexts, AStatusHasItsText)
 
 TEST(DiagnosticTexts, AResultHasItsText)
 {
+    // clang-format off
     const char* const texts[] = {
-        "Success",
-        "General Error",
-        "Link Down",
-        "I/O Error",
-        "Timeout",
-        "Transmit Error",
-        "Receive Error",
-        "Mailbox Error",
-        "Error: Echo test not supported",
-        "Error: Echo Failed",
-        "Error: Target Unreachable",
+        "Success", "General Error", "Link Down", "I/O Error", "Timeout", "Transmit Error", "Receive Error",
+        "Mailbox Error", "Error: Echo test not supported", "Error: Echo Failed", "Error: Target Unreachable",
         "Error: HBA temperature exceeded operational range. Adapter stopped.\n\nPlease see the product documentation",
-        "Error: Failed to allocate resource",
-        "Error: Another diagnostic test is running. Please try again",
-        "Error: Sequence Timeout",
-        "Error: Bus reset received during test",
-        "Error: Read-Write test is running",
-        "Error: Driver busy. Please try again",
-        "Error: Mailbox not ready",
-        "Error: Port not ready",
-        "Unknown",
-        "Unknown",
-        "Unknown",
-        "Unknown",
-        "Unknown",
-        "Error: Connection Failed",
-        "Error: Socket Connection Failed",
+        "Error: Failed to allocate resource", "Error: Another diagnostic test is running. Please try again",
+        "Error: Sequence Timeout", "Error: Bus reset received during test", "Error: Read-Write test is running",
+        "Error: Driver busy. Please try again", "Error: Mailbox not ready", "Error: Port not ready", "Unknown",
+        "Unknown", "Unknown", "Unknown", "Unknown", "Error: Connection Failed", "Error: Socket Connection Failed",
         "Unknown",
     };
+    // clang-format on
     for (std::uint32_t result = 0; result < std::size(texts); result++)
         EXPECT_STREQ(MapDiagResultStatus(result), texts[result]) << result;
     EXPECT_STREQ(MapDiagResultStatus(0xFFFFFFFF), "Unknown");
