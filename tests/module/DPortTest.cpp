@@ -251,6 +251,7 @@ ElementName = "TVR:FCHBA D-Port Test Completion Record"
                      "cable(s) if faultyd) Verify and replace transceiver(s) if faulty e) Replace Card f) Replace "
                      "Switch"));
     std::string settings = withoutTime(host.instancesOf("TVRHBA_DiagnosticSettingDataRecord").at(0));
+    EXPECT_EQ(settings.find("\nSettings = "), settings.npos);
     settings.resize(settings.find("ManagedElementName"));
     EXPECT_EQ(settings, "\nCaption = \"" + run.job + R"("
 Description = "This class holds the overrided setting data of the test"
@@ -454,6 +455,27 @@ TEST(DPortTest, TheThreadMayExit)
                       host.setDiagnostics(firstPort, forEver);
                       host.run(firstPort);
                       atSleep([] { std::exit(0); });
+                      std::this_thread::sleep_for(1min);
+                  }),
+              0);
+}
+
+/// On the thread of a refresh, which has the data that the other thread waits for.
+TEST(DPortTest, TheRefreshBesideItMayExit)
+{
+    EXPECT_EQ(inChild(
+                  []
+                  {
+                      alarm(60); // a child that hangs is ended by it
+                      LinkHost host;
+                      host.setDiagnostics(firstPort, forEver);
+                      host.run(firstPort);
+                      host.addFault(R"({"function": "HBA_GetNumberOfAdapters", "gate": "refresh"})");
+                      advanceClock(10min);
+                      std::thread([&] { host.count("TVRHBA_Card"); }).detach();
+                      EXPECT_TRUE(host.awaitGate("refresh"));
+                      setHostNames({.resolving = [] { std::exit(0); }});
+                      host.openGate("refresh");
                       std::this_thread::sleep_for(1min);
                   }),
               0);

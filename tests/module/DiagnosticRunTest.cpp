@@ -534,6 +534,28 @@ TEST(DiagnosticRun, ReadersWaitForItAndNoRefreshStarts)
     host.unload();
 }
 
+/// Nobody else comes who would begin the refresh that the reader waits for.
+TEST(DiagnosticRun, AReaderOfTheFabricIsWokenBehindIt)
+{
+    TestHost host;
+    const broker::Object setting =
+        theOne(host, "TVRHBA_ProviderConfigSetting", "InstanceID", "Tavrin HBA Provider:sanrefresh");
+    EXPECT_TRUE(host.broker().modifyInstance(changed(setting, "current", Value::uint32(0))).ok());
+    advanceClock(10min);
+    host.count("TVRHBA_Card");
+    ASSERT_TRUE(host.awaitRefresh(2));
+    host.addFault(fault("LRM_DiagGetResults", R"("gate": "poll", "to": 1)"));
+    auto run = std::async(std::launch::async, [&] { return host.run("Self"); });
+    ASSERT_TRUE(host.awaitGate("poll"));
+    auto disks = std::async(std::launch::async, [&] { return host.count("TVRHBA_LogicalDisk"); });
+    ASSERT_TRUE(host.awaitLog("[TVR_DBG] Diagnostics is running.. Skip the internal refresh till it ends"));
+    host.openGate("poll");
+    EXPECT_EQ(run.get().value, 0u);
+    ASSERT_EQ(disks.wait_for(20s), std::future_status::ready);
+    EXPECT_GT(disks.get(), 0u);
+    host.unload();
+}
+
 /// It would go on for a quarter of an hour.
 TEST(DiagnosticRun, ATestEndsWhenTheProcessExits)
 {
