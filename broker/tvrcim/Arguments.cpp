@@ -4,6 +4,7 @@
 #include "broker/values/PathText.h"
 
 #include <algorithm>
+#include <cctype>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -147,6 +148,28 @@ std::vector<Property> parseAssignments(const Session& session, const Assignable&
         result.push_back({feature.name, valueOf(session, assignable, feature, text.substr(mark + 1))});
     }
     return result;
+}
+
+std::string plainWwn(std::string text)
+{
+    std::erase(text, ':');
+    std::ranges::transform(text, text.begin(), [](unsigned char c) { return std::toupper(c); });
+    return text;
+}
+
+Path portControllerOf(const Session& session, const std::string& wwpn)
+{
+    const NamesReply known = namesOfClass(session, {session.nameSpace, "TVRHBA_PortController", {}});
+    std::string ports;
+    for (const Path& path : known.paths)
+    {
+        const std::string id = path.key("DeviceID")->asString();
+        if (id == plainWwn(wwpn))
+            return path;
+        ports += (ports.empty() ? "" : ", ") + id;
+    }
+    throw UsageError("PORT: there is no port '" + wwpn + "'; " +
+                     (ports.empty() ? "the host has none" : "the host has " + ports));
 }
 
 } // namespace tvrcim

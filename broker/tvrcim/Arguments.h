@@ -17,6 +17,11 @@ broker::Path pathOf(const Session& session, const std::string& text, const std::
 /// throws CimError when there is none.
 broker::Path instancePathOf(const Session& session, const std::string& text, const std::string& argument = "PATH");
 
+/// 16 capital digits, where a person may have put colons between them.
+std::string plainWwn(std::string text);
+/// The controller of a port that a person named by its WWPN.
+broker::Path portControllerOf(const Session& session, const std::string& wwpn);
+
 /// What name=value texts may name.
 struct Assignable
 {

@@ -93,6 +93,17 @@ public:
             ->excludes(driver);
         return *this;
     }
+    /// A test of a port; without them all are listed.
+    CommandOptions& test()
+    {
+        CLI::Option* port = _current->add_option("PORT", _command.target, "WWPN of a port, with or without colons");
+        CLI::Option* test = _current->add_option(
+            "TEST", _command.test, "name of a test, such as echo or dport, or how it begins; none lists the tests");
+        port->needs(test);
+        _current->add_option("SETTINGS", _command.assignments,
+                             "name=value of TVRHBA_FCHBADiagnosticSettingData, such as TargetDevice=WWPN");
+        return *this;
+    }
     CommandOptions& associationClass(const char* option)
     {
         _current->add_option(option, _command.filter.assocClass, "association class");
@@ -152,6 +163,10 @@ void addCommands(CommandOptions& options)
         .add("log", "show errors and warnings of the provider, the newest last; where its log in memory is off, this "
                     "switches it on beside its file, starts the provider anew, and leaves the log on")
         .log();
+    options
+        .add("diag", "run a diagnostic test of a port and tell how it ended; exits with 5 when it did not pass. SIGINT "
+                     "cancels a D-Port test and waits for its end")
+        .test();
 }
 
 std::vector<std::string> serverNames()

@@ -1,6 +1,7 @@
 #include "broker/tvrcim/Commands.h"
 
 #include "broker/tvrcim/Arguments.h"
+#include "broker/tvrcim/DiagCommand.h"
 #include "broker/tvrcim/Graphviz.h"
 #include "broker/tvrcim/HostReport.h"
 #include "broker/tvrcim/LogCommand.h"
@@ -13,7 +14,6 @@
 
 #include <algorithm>
 #include <array>
-#include <cctype>
 #include <filesystem>
 #include <fstream>
 
@@ -220,29 +220,6 @@ void showHost(Session& session, const Command& command)
 
 // --- the dumps of a port
 
-/// 16 capital digits, where a person may have put colons between them.
-std::string plainWwn(std::string text)
-{
-    std::erase(text, ':');
-    std::ranges::transform(text, text.begin(), [](unsigned char c) { return std::toupper(c); });
-    return text;
-}
-
-Path portControllerOf(const Session& session, const std::string& wwpn)
-{
-    const NamesReply known = checked(session.broker.enumerateInstanceNames(session.nameSpace, "TVRHBA_PortController"));
-    std::string ports;
-    for (const Path& path : known.paths)
-    {
-        const std::string id = path.key("DeviceID")->asString();
-        if (id == plainWwn(wwpn))
-            return path;
-        ports += (ports.empty() ? "" : ", ") + id;
-    }
-    throw UsageError("PORT: there is no port '" + wwpn + "'; " +
-                     (ports.empty() ? "the host has none" : "the host has " + ports));
-}
-
 /// Calls a method of the dump service on a port.
 MethodReply callOnDumps(Session& session, const std::string& name, const Path& port)
 {
@@ -337,7 +314,7 @@ struct CommandRow
     void (*run)(Session& session, const Command& command);
 };
 
-constexpr std::array<CommandRow, 15> commands{{
+constexpr std::array<CommandRow, 16> commands{{
     {"classes", listClasses},
     {"class", showClass},
     {"methods", showMethods},
@@ -353,6 +330,7 @@ constexpr std::array<CommandRow, 15> commands{{
     {"dump", dump},
     {"topology", drawTopology},
     {"log", showLog},
+    {"diag", diagnose},
 }};
 
 } // namespace

@@ -35,12 +35,27 @@ public:
     using std::runtime_error::runtime_error;
 };
 
+/// A diagnostic test that did not pass.
+class TestFailure : public std::runtime_error
+{
+public:
+    using std::runtime_error::runtime_error;
+};
+
+/// Work that ended early, since a person asked for it by SIGINT.
+class Interruption : public std::runtime_error
+{
+public:
+    using std::runtime_error::runtime_error;
+};
+
 /// One command with its arguments; what a command does not use stays empty.
 struct Command
 {
     std::string name = {};
     std::string target = {}; ///< class name, path or port
     std::string method = {};
+    std::string test = {};
     std::vector<std::string> assignments = {}; ///< name=value
     broker::PropertyList properties = {};
     broker::AssociationFilter filter = {};
@@ -55,6 +70,8 @@ struct Command
     unsigned level = 0; ///< the last that is shown; 0 for all
 };
 
+class SignalEnd;
+
 /// Where a command works and how it prints.
 struct Session
 {
@@ -64,9 +81,12 @@ struct Session
     std::ostream& out;
     bool colour = false;              ///< what is wrong may be in colour
     std::ostream* progress = nullptr; ///< a terminal that shows what is at work
+    std::ostream* steps = nullptr;    ///< where there is no terminal: gets long work line by line
+    SignalEnd* signals = nullptr;     ///< of the process
 };
 
-/// Runs a command and prints its result. Throws UsageError or CimError, and MethodRefusal once that is printed.
+/// Runs a command and prints its result. Throws UsageError or CimError, and MethodRefusal, TestFailure or
+/// Interruption once that is printed.
 void runCommand(Session& session, const Command& command);
 
 } // namespace tvrcim

@@ -1,6 +1,7 @@
 #include "broker/tvrcim/SignalEnd.h"
 
 #include <chrono>
+#include <condition_variable>
 #include <csignal>
 #include <future>
 #include <initializer_list>
@@ -19,7 +20,10 @@ namespace tvrcim
 struct SignalEnd::State
 {
     std::mutex mutex; ///< guards what follows
+    std::condition_variable interrupt;
     bool ending = false;
+    bool notes = false;
+    bool noted = false;
     broker::Broker* broker = nullptr;
     std::filesystem::path folder;
 };
@@ -76,8 +80,17 @@ SignalEnd::SignalEnd() : _state(std::make_shared<State>())
         [signals, state = _state]
         {
             int signal = 0;
-            sigwait(&signals, &signal);
-            std::unique_lock lock(state->mutex);
+            std::unique_lock lock(state->mutex, std::defer_lock);
+            for (bool noted = true; noted;)
+            {
+                if (lock)
+                    lock.unlock();
+                sigwait(&signals, &signal);
+                lock.lock();
+                noted = signal == SIGINT && state->notes && !state->noted;
+                state->noted |= noted;
+                state->interrupt.notify_all();
+            }
             state->ending = true;
             lock.unlock(); // from here on the broker and the folder stay as they are
             if (state->broker)
@@ -123,6 +136,19 @@ void SignalEnd::unloads(broker::Broker* broker)
 void SignalEnd::passIfNone()
 {
     lockIfNone();
+}
+
+void SignalEnd::notesInterrupt(bool notes)
+{
+    const auto lock = lockIfNone();
+    _state->notes = notes;
+    _state->noted = false;
+}
+
+bool SignalEnd::awaitInterrupt(std::chrono::milliseconds limit)
+{
+    auto lock = lockIfNone();
+    return _state->interrupt.wait_for(lock, limit, [this] { return _state->noted; });
 }
 
 } // namespace tvrcim

@@ -3,6 +3,7 @@
 
 #include "broker/core/Broker.h"
 
+#include <chrono>
 #include <filesystem>
 #include <memory>
 #include <mutex>
@@ -26,12 +27,35 @@ public:
     void unloads(broker::Broker* broker);
     /// Does not return when a signal has come.
     void passIfNone();
+    /// Whether SIGINT is noted from now on, once, rather than end the process; the next one does that.
+    void notesInterrupt(bool notes);
+    /// Whether one was noted, after at most so long.
+    bool awaitInterrupt(std::chrono::milliseconds limit);
 
 private:
     std::unique_lock<std::mutex> lockIfNone();
 
     struct State;
     std::shared_ptr<State> _state;
+};
+
+/// Work that SIGINT does not end but asks to end, as long as the object lives. `signals` may be null.
+class Interruptible
+{
+public:
+    explicit Interruptible(SignalEnd* signals) : _signals(signals) { note(true); }
+    ~Interruptible() { note(false); }
+    Interruptible(const Interruptible&) = delete;
+    Interruptible& operator=(const Interruptible&) = delete;
+
+private:
+    void note(bool notes)
+    {
+        if (_signals)
+            _signals->notesInterrupt(notes);
+    }
+
+    SignalEnd* _signals;
 };
 
 /// Entrusts a broker to the signals as long as it lives itself.

@@ -2,6 +2,7 @@
 #include "broker/tvrcim/CommandLine.h"
 #include "broker/tvrcim/Environment.h"
 
+#include <csignal>
 #include <cstdlib>
 #include <exception>
 #include <iostream>
@@ -46,6 +47,15 @@ int runAndReport(Session& session, const Command& command, SignalEnd& signals)
     {
         return report("", error, exitRefusal);
     }
+    catch (const TestFailure& error)
+    {
+        return report("", error, exitTestFailed);
+    }
+    catch (const Interruption& error)
+    {
+        constexpr int endedBySignal = 128;
+        return report("", error, endedBySignal + SIGINT);
+    }
     catch (const UsageError& error)
     {
         return report("", error, exitUsage);
@@ -53,9 +63,11 @@ int runAndReport(Session& session, const Command& command, SignalEnd& signals)
 }
 
 /// Where the tool shows that it is at work: people see it, and who reads the output does not.
-std::ostream* progressTerminal(const Settings& settings)
+void showWork(Session& session)
 {
-    return settings.format != Format::json && isatty(STDERR_FILENO) ? &std::cerr : nullptr;
+    if (session.format == Format::json)
+        return;
+    (isatty(STDERR_FILENO) ? session.progress : session.steps) = &std::cerr;
 }
 
 /// Sets up the host, runs the command, then unloads the module and tells what it did wrong on the way.
@@ -74,7 +86,9 @@ int run(const Settings& settings)
     const UnloadedBySignal entrusted(signals, broker);
     if (!settings.platform.empty())
         broker::loadPlatformFile(broker.store(), broker.classes(), settings.platform);
-    Session session{broker, settings.nameSpace, settings.format, std::cout, wantsColour(), progressTerminal(settings)};
+    Session session{broker, settings.nameSpace, settings.format, std::cout, wantsColour()};
+    session.signals = &signals;
+    showWork(session);
     int exitCode = runAndReport(session, settings.command, signals);
     std::cout.flush();
     broker.unload();
