@@ -537,6 +537,102 @@ TEST(Tvrcim, EndsCleanlyInAnOperationThatHangs)
     std::remove(scenario.c_str());
 }
 
+// --- diagnostic tests -----------------------------------------------------------------------------------
+
+const std::string testedPorts = std::string("--scenario ") + TVR_SCENARIOS + "/diagnostics.json ";
+
+TEST(TvrcimDiag, ListsTheTestsAndWhatPortsRun)
+{
+    const Answer run = tvrcim(testedPorts + "diag");
+    ASSERT_EQ(run.exitCode, 0) << run.err;
+    for (const char* expected :
+         {"\nbeacon             LoopControlParameter=5 ",
+          "\necho               LoopControlParameter=100 HaltOnError=false BufferSizes=8 BufferPattern=1a2b3c4d LUN=0 "
+          "TargetDevice=  Test verifies the data path from host to target\n",
+          "\nd-port  ", "\n1000027A51320601  all\n", "\n1000027A51320605  all but d-port\n"})
+        EXPECT_THAT(run.out, HasSubstr(expected));
+    const nlohmann::json list = json(testedPorts + "diag");
+    EXPECT_EQ(list["tests"].size(), 10u);
+    EXPECT_EQ(list["ports"][4]["tests"].size(), 9u);
+}
+
+TEST(TvrcimDiag, TellsHowATestEnded)
+{
+    const struct
+    {
+        const char* arguments;
+        int exitCode;
+        std::vector<std::string> out;
+        std::string err;
+    } rows[] = {
+        {"1000027A51320601 status",
+         0,
+         {"TVR:FCHBA Status Test of 1000027A51320601  passed\n", "TVR:FCHBA Status Test:1:65535, completed\n",
+          "  state             OK\n", "Resulted with Success"},
+         "status test of 1000027A51320601 ... 0 s\n"},
+        {"10:00:02:7a:51:32:06:01 Echo targetdevice=50:06:3d:20:01:10:00:0a LoopControlParameter=7 BufferSizes=9",
+         0,
+         {"  loops             7 passed, 0 failed\n"},
+         "tvrcim: BufferSizes: the test does not take '9' but has '8'\n"},
+        {"1000027A51320602 ec TargetDevice=50063D200110000A",
+         5,
+         {"TVR:FCHBA Echo Test of 1000027A51320602  FAILED\n", ", exception\n", "  state             failed\n",
+          "1 failed\n", "  suggested         a) Verify end devices b) Verify switch configuration"},
+         "the test did not pass"},
+        {"1000027A51320601 echo", 4, {}, "RunDiagnosticService returned 5 (Invalid Parameter)"},
+        {"1000027A51320604 dport", 4, {}, "RunDiagnosticService returned "},
+        {"1000027A51320605 self", 4, {}, "RunDiagnosticService made no job"},
+        {"1000027A51320601 e", 2, {}, "TEST: 'e' may be echo, external-loopback"},
+        {"1000027A51320601 colour", 2, {}, "there is no test 'colour'; the host has beacon, "},
+        {"1000027A51320601 echo LUNS=1", 2, {}, "'LUNS': TVRHBA_FCHBADiagnosticSettingData has none of that name"},
+        {"1000027A51320609 echo", 2, {}, "there is no port '1000027A51320609'"},
+        {"1000027A51320601", 2, {}, "TEST"},
+    };
+    for (const auto& row : rows)
+    {
+        const Answer run = tvrcim(testedPorts + "diag " + row.arguments);
+        EXPECT_EQ(run.exitCode, row.exitCode) << row.arguments << "\n" << run.err;
+        EXPECT_THAT(run.err, HasSubstr(row.err)) << row.arguments;
+        EXPECT_EQ(run.out.empty(), row.out.empty()) << row.arguments;
+        for (const std::string& expected : row.out)
+            EXPECT_THAT(run.out, HasSubstr(expected)) << row.arguments;
+    }
+    const nlohmann::json passed = json(testedPorts + "diag 1000027A51320601 status");
+    EXPECT_EQ(passed["result"], "passed");
+    EXPECT_EQ(passed["completion"]["CompletionState"], 2);
+}
+
+TEST(TvrcimDiag, ShowsThePhasesOfALink)
+{
+    const Answer run = tvrcim(testedPorts + "diag 1000027A51320602 dport");
+    EXPECT_EQ(run.exitCode, 5) << run.err;
+    for (const char* expected : {"TVR:FCHBA D-Port Test of 1000027A51320602  FAILED\n", "\nphase ", "  result ",
+                                 "  latency  local errors", "  remote errors\n"})
+        EXPECT_THAT(run.out, HasSubstr(expected));
+    EXPECT_THAT(run.out, testing::ContainsRegex("Electrical[^\n]* 38 +- +-"));
+    EXPECT_THAT(run.err, HasSubstr("d-port test of 1000027A51320602 ... 0 s\n"));
+}
+
+/// Also while the provider still begins it, and the job is not known.
+TEST(TvrcimDiag, CancelsTheTestOfALink)
+{
+    const std::string scenario = std::string(TVR_SCENARIOS) + "/diagnostics.json";
+    Running tool({"--scenario", scenario.c_str(), "diag", "1000027A51320603", "dport", "--format", "json"});
+    const pid_t process = tool.process();
+    ASSERT_TRUE(test_support::eventually([&] { return semaphoresOf(process) > 0; }));
+    sleep(3);
+    kill(process, SIGINT);
+    std::string out;
+    for (std::string line = tool.readLine(); !line.empty(); line = tool.readLine())
+        out += line;
+    EXPECT_EQ(tool.readAll(), 128 + SIGINT);
+    const nlohmann::json end = nlohmann::json::parse(out);
+    EXPECT_EQ(end["result"], "cancelled");
+    EXPECT_EQ(end["job"]["JobState"], 8);
+    EXPECT_TRUE(end["completion"].is_null());
+    EXPECT_EQ(semaphoresOf(process), 0u);
+}
+
 /// What the driver logs is shown when it comes, until somebody ends the tool or stops reading.
 TEST(Tvrcim, FollowsTheDriversLog)
 {
