@@ -149,6 +149,8 @@ std::string plainSetting(const ClassInfo& info, const std::string& text)
         return name + "=" + plainWwn(value);
     if (!(feature->type & CMPI_ARRAY))
         return text;
+    if (feature->type == CMPI_stringA)
+        return name + "=" + Json(std::vector<std::string>{value}).dump(-1, ' ', false, Json::error_handler_t::replace);
     if (feature->type != CMPI_uint8A)
         return name + "=[" + value + "]";
     std::string bytes;
@@ -383,7 +385,9 @@ std::string elementText(const Object& record, const char* property, std::size_t 
     const Value& value = record.get(property);
     if (value.isNull() || index >= value.asList().size())
         return "-";
-    const std::string text = withoutQuotes(valueText(value.asList()[index]));
+    std::string text = withoutQuotes(valueText(value.asList()[index]));
+    if (text.ends_with(','))
+        text.pop_back();
     return text.empty() || text == "0" ? "-" : oneLine(text);
 }
 
