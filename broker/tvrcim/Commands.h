@@ -55,7 +55,6 @@ struct Command
     std::string name = {};
     std::string target = {}; ///< class name, path or port
     std::string method = {};
-    std::string test = {};
     std::vector<std::string> assignments = {}; ///< name=value
     broker::PropertyList properties = {};
     broker::AssociationFilter filter = {};
@@ -68,6 +67,7 @@ struct Command
     bool driver = false; ///< its log, not the provider's
     bool follow = false;
     unsigned level = 0; ///< the last that is shown; 0 for all
+    std::string test = {};
 };
 
 class SignalEnd;

@@ -570,7 +570,7 @@ TEST(TvrcimDiag, TellsHowATestEnded)
          {"TVR:FCHBA Status Test of 1000027A51320601  passed\n", "TVR:FCHBA Status Test:1:65535, completed\n",
           "  state             OK\n", "Resulted with Success"},
          "status test of 1000027A51320601 ... 0 s\n"},
-        {"10:00:02:7a:51:32:06:01 Echo targetdevice=50:06:3d:20:01:10:00:0a LoopControlParameter=7 BufferSizes=9",
+        {"10:00:02:7a:51:32:06:03 Echo targetdevice=50:06:3d:20:01:10:00:0a LoopControlParameter=7 BufferSizes=9",
          0,
          {"  loops             7 passed, 0 failed\n"},
          "tvrcim: BufferSizes: the test does not take '9' but has '8'\n"},
