@@ -103,6 +103,7 @@ int TVR_FileLogger::setPath(const char* path, bool errorsOnly, NamedBy namedBy)
         return -1;
     const bool byClient = namedBy == NamedBy::Client;
     Appendable opened = openForAppending(path, byClient ? O_NOFOLLOW : 0);
+    String accepted = path; // no memory for it: nothing has changed
     Auto_Mutex lock(_mutex);
     if (!opened.file)
         return -1;
@@ -114,7 +115,7 @@ int TVR_FileLogger::setPath(const char* path, bool errorsOnly, NamedBy namedBy)
         return -1;
     _file = std::move(opened.file);
     _isOurs = ours;
-    _path = path;
+    _path = std::move(accepted);
     _errorsOnly = errorsOnly;
     return 0;
 }

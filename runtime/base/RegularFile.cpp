@@ -39,7 +39,8 @@ File_Descriptor open_regular(const char* path, int flags, mode_t mode, int folde
     if (fstatat(folder, path, &status, flags & O_NOFOLLOW ? AT_SYMLINK_NOFOLLOW : 0) == 0 && !is_regular(status))
         return File_Descriptor();
     File_Descriptor file(openat(folder, path, flags | O_NONBLOCK | O_NOCTTY | O_CLOEXEC, mode));
-    if (file && (fstat(file.get(), &status) != 0 || !is_regular(status)))
+    // What the call itself has made is regular; given up, it would stay behind.
+    if (file && !(flags & O_EXCL) && (fstat(file.get(), &status) != 0 || !is_regular(status)))
         return File_Descriptor();
     return file;
 }

@@ -12,6 +12,25 @@
 #include <functional>
 #include <random>
 
+namespace
+{
+
+/// The call of fstat() from now on that fails; none for 0.
+int unreadableStatus = 0;
+
+} // namespace
+
+/// Stands before the C library's function.
+extern "C" __attribute__((visibility("default"))) int fstat(int file, struct stat* status) noexcept
+{
+    if (unreadableStatus != 0 && --unreadableStatus == 0)
+    {
+        errno = EIO;
+        return -1;
+    }
+    return fstatat(file, "", status, AT_EMPTY_PATH);
+}
+
 namespace cimple
 {
 namespace
@@ -195,6 +214,19 @@ TEST_F(ReplaceFile, KeepsTheOldFileWhenTheDiskIsFull)
     EXPECT_EQ(status, EFBIG);
     EXPECT_EQ(fileText(path), old);
     EXPECT_THAT(namesIn(root / "etc"), ElementsAre("file"));
+}
+
+TEST_F(ReplaceFile, LeavesNothingBesideAFileWhoseStatusCannotBeRead)
+{
+    writeFile(path, old);
+    for (int call = 1; call <= 6; call++)
+    {
+        unreadableStatus = call;
+        const Replacement replacement = replaceFile(path.c_str(), std::to_string(call));
+        unreadableStatus = 0;
+        EXPECT_THAT(namesIn(root / "etc"), ElementsAre("file")) << call;
+        EXPECT_EQ(fileText(path) == std::to_string(call), !failed(replacement)) << call;
+    }
 }
 
 TEST_F(ReplaceFile, KeepsAWholeFileAmongManyWritersWhenTheyAreKilled)

@@ -36,6 +36,24 @@ TEST_F(LogMemory, FileSinkWritesLinesWithoutAny)
     EXPECT_THAT(text, EndsWith("[TVR_DBG] " + longer.substr(0, 1'023) + "\n")) << "cut";
 }
 
+TEST_F(LogMemory, APathThatFindsNoneLeavesTheOldOneInUse)
+{
+    TVR_FileLogger file;
+    logger.setMode(2);
+    ASSERT_EQ(file.validateAndSetPath(path.c_str(), false), 0);
+    const std::string other = path + ".of a name that has no room in the object itself";
+    const std::size_t refusals =
+        test_support::withEachAllocationFailing([&] { file.validateAndSetPath(other.c_str(), false); },
+                                                [&](bool failed)
+                                                {
+                                                    TVR_LOG(TVR_ERR, "marker");
+                                                    const std::string used = failed ? path : other;
+                                                    EXPECT_EQ(file.getPath().view(), used);
+                                                    EXPECT_EQ(fileText(other).empty(), failed);
+                                                });
+    EXPECT_GT(refusals, 0u);
+}
+
 TEST_F(LogMemory, RingDropsWhatFindsNoneAndGoesOn)
 {
     TVR_CIMLogger ring;
