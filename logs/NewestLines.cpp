@@ -3,6 +3,7 @@
 #include "runtime/base/RegularFile.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <cstring>
 #include <memory>
 #include <string>
@@ -106,6 +107,16 @@ bool LineSearch::searchLines(std::string_view lines)
                        [&](const Match& match) { return _take(lines.substr(match.begin, match.size)); });
 }
 
+/// Whether nothing was ever written there, as ahead of what is written on after a log was emptied under its writer.
+bool isHole(const File_Descriptor& file, std::size_t begin, std::size_t end)
+{
+    const off_t data = lseek(file.get(), static_cast<off_t>(begin), SEEK_DATA);
+    if (data >= 0)
+        return static_cast<std::size_t>(data) >= end;
+    struct stat status; // behind the last data, or behind the end of a file that was cut off
+    return errno == ENXIO && fstat(file.get(), &status) == 0 && static_cast<std::size_t>(status.st_size) >= end;
+}
+
 } // namespace
 
 void newestLinesWith(const char* path, std::string_view keyword, const std::function<bool(std::string_view)>& take)
@@ -119,6 +130,15 @@ void newestLinesWith(const char* path, std::string_view keyword, const std::func
     for (auto end = static_cast<std::size_t>(status.st_size); end > 0;)
     {
         const std::size_t begin = (end - 1) / blockSize * blockSize;
+        if (isHole(file, begin, end))
+        {
+            // Zero bytes, of which a line shows no more than this.
+            static constexpr char zeros[longestLine] = {};
+            if (!search.searchBlock({zeros, std::min(end - begin, longestLine)}))
+                return;
+            end = begin;
+            continue;
+        }
         // The kernel reads ahead of those alone that go forward.
         if (begin > 0)
             posix_fadvise(file.get(), static_cast<off_t>(begin - blockSize), blockSize, POSIX_FADV_WILLNEED);
