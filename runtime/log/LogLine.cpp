@@ -55,7 +55,11 @@ struct Escape
             std::strcpy(text, "\\t");
             break;
         default:
-            std::snprintf(text, sizeof text, "\\x%02x", static_cast<unsigned char>(c));
+            // Not by printf: a client's text may be megabytes of them, for which all who log wait.
+            constexpr const char* digits = "0123456789abcdef";
+            const auto byte = static_cast<unsigned char>(c);
+            const char escaped[] = {'\\', 'x', digits[byte >> 4], digits[byte & 15], '\0'};
+            std::memcpy(text, escaped, sizeof text);
         }
     }
     char text[5];
