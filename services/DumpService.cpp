@@ -138,12 +138,15 @@ void changeRetention(const TVRHBA_DumpData& known, const HBA_WWN& wwpn, const TV
     TVR_LOG(TVR_DBG, "TVR_MethodWrapper::tvrcimSetRetentionCount succeded");
 }
 
-/// What is thrown stays here as well: the change that came before is made.
-void rebuild(ProviderAgent& agent, std::uint32_t (*step)(InstanceCache&), const LogText& failure)
+/// What is thrown stays here as well: the change that came before is made. What is missing then comes back with the
+/// refresh that is due from now on.
+void rebuild(MethodCall& call, std::uint32_t (*step)(InstanceCache&), const LogText& failure)
 {
-    const auto status = unlessThrown<std::uint32_t>(BUILD_FAILED, [&] { return step(agent); });
+    const auto status = unlessThrown<std::uint32_t>(BUILD_FAILED, [&] { return step(call.agent()); });
     if (status == BUILD_DONE)
         return;
+    call.agent().m_bAdapterMapsIncomplete = true;
+    call.refreshAfterwards();
     failure.log();
     TVR_LOG(TVR_ERR, "tvrstatus = %d", static_cast<int>(status));
 }
@@ -163,8 +166,8 @@ int modifyDumpData(const TVRHBA_DumpData* instance, const TVRHBA_DumpData* model
     refuseOtherDirectory(*known, *instance, *model);
     changeRetention(*known, wwpn, *instance, model->RetentionCount);
     const SharedEnds ends;
-    rebuild(call.agent(), FC_ClearDumpClasses, {TVR_DBG, "FC_ClearDumpClasses failed"});
-    rebuild(call.agent(), FC_CreateDumpClasses, {TVR_DBG, "FC_CreateDumpClasses failed"});
+    rebuild(call, FC_ClearDumpClasses, {TVR_DBG, "FC_ClearDumpClasses failed"});
+    rebuild(call, FC_CreateDumpClasses, {TVR_DBG, "FC_CreateDumpClasses failed"});
     return 0;
 }
 

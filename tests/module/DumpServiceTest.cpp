@@ -3,6 +3,7 @@
 #include "tests/module/Clock.h"
 #include "tests/module/Describe.h"
 #include "tests/module/HostNames.h"
+#include "tests/module/ModuleMemory.h"
 #include "tests/module/ServiceHost.h"
 
 #include <gmock/gmock.h>
@@ -415,6 +416,23 @@ TEST(Dumps, ChangesOfWhatIsNotThereOrCannotBeStoredAreRefused)
                             "[TVR_DBG] Status: <178>:The configuration file cannot be opened",
                             "[TVR_ERR] TVR_MethodWrapper::tvrcimSetRetentionCount failed"));
     EXPECT_EQ(host.retention(), 5u);
+    host.unload();
+}
+
+TEST(Dumps, AreThereAgainAfterAChangeThatFoundNoMemory)
+{
+    DumpHost host;
+    const broker::Object data = host.data();
+    for (std::size_t number = 1;; number++)
+    {
+        refuseAllocation(number);
+        host.broker().modifyInstance(data);
+        const CMPIrc got = host.broker().getInstance(data.path).status;
+        if (allocationsOfModule() < number)
+            break;
+        EXPECT_NE(got, CMPI_RC_ERR_NOT_FOUND) << number;
+        EXPECT_EQ(host.instancesOf("TVRHBA_ElementDumpData").size(), 2u) << number;
+    }
     host.unload();
 }
 
