@@ -4,6 +4,7 @@
 #include "tests/module/Describe.h"
 #include "tests/module/HostNames.h"
 #include "tests/module/ModuleMemory.h"
+#include "tests/module/RefreshLines.h"
 #include "tests/module/ServiceHost.h"
 
 #include <gmock/gmock.h>
@@ -431,6 +432,7 @@ TEST(Dumps, AreThereAgainAfterAChangeThatFoundNoMemory)
         if (allocationsOfModule() < number)
             break;
         EXPECT_NE(got, CMPI_RC_ERR_NOT_FOUND) << number;
+        ASSERT_TRUE(host.awaitLog(ended, host.logged(created))); // one may be under way that has not begun its work
         EXPECT_EQ(host.instancesOf("TVRHBA_ElementDumpData").size(), 2u) << number;
     }
     host.unload();
