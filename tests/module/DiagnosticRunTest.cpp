@@ -8,7 +8,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <future>
+#include <map>
 #include <thread>
 #include <unistd.h>
 
@@ -553,6 +555,57 @@ TEST(DiagnosticRun, AReaderOfTheFabricIsWokenBehindIt)
     EXPECT_EQ(run.get().value, 0u);
     ASSERT_EQ(disks.wait_for(20s), std::future_status::ready);
     EXPECT_GT(disks.get(), 0u);
+    host.unload();
+}
+
+/// Ten thousand seconds of the module's clock. The beacon's log is cleared all the time, so that its records come and
+/// go; those of the other tests are all there at the end. Link tests go on while the next tests begin.
+TEST(DiagnosticRun, TestsOnAllPortsAndReadersOfTheirRecordsGoTogether)
+{
+    TestHost host;
+    const std::vector<broker::Object> ports = host.instancesOf("TVRHBA_PortController");
+    broker::Path beaconLog = theOne(host, "TVRHBA_DiagnosticsLog", "InstanceID", nameOf("Beacon")).path;
+    std::map<std::string, std::size_t> jobs; ///< by the test
+    std::atomic<bool> over = false;
+    const auto runsTests = [&]
+    {
+        for (const auto start = slept(); slept() - start < 10'000s;)
+            for (const broker::Object& port : ports)
+                for (const char* test : {"Beacon", "Status", "D-Port", "Internal Loopback", "Self"})
+                {
+                    broker::Path of = host.service;
+                    of.setKey("Name", Value::string(nameOf(test)));
+                    const auto reply = host.broker().invokeMethod(of, "RunDiagnosticService",
+                                                                  {{"ManagedElement", Value::reference(port.path)}});
+                    const broker::Property* job = broker::findNamed(reply.out, "Job");
+                    if (job && !job->value.isNull())
+                        jobs[nameOf(test)]++;
+                }
+        over = true;
+    };
+    auto running = std::async(std::launch::async, runsTests);
+    while (!over)
+    {
+        for (const char* className : {"TVRHBA_ConcreteJob", "TVRHBA_DiagnosticServiceRecord",
+                                      "TVRHBA_DiagnosticCompletionRecord", "TVRHBA_RecordAppliesToElement"})
+            EXPECT_EQ(host.enumerate(className).status, CMPI_RC_OK) << className;
+        EXPECT_EQ(host.broker().invokeMethod(beaconLog, "ClearLog", {}).returnValue.asUnsigned(), 0u);
+    }
+    running.get();
+    EXPECT_TRUE(host.awaitLog("[TVR_DBG] TVR_Diagnostics::DportStatusThread Ends", jobs[nameOf("D-Port")]));
+    host.broker().invokeMethod(beaconLog, "ClearLog", {});
+    const auto countsOf = [&](const char* className, const char* nameProperty)
+    {
+        std::map<std::string, std::size_t> counts;
+        for (const broker::Object& one : host.instancesOf(className))
+            counts[text(one, nameProperty)]++;
+        return counts;
+    };
+    EXPECT_GT(jobs[nameOf("Beacon")], 100u);
+    EXPECT_EQ(countsOf("TVRHBA_ConcreteJob", "Name"), jobs);
+    jobs.erase(nameOf("Beacon"));
+    EXPECT_EQ(countsOf("TVRHBA_DiagnosticServiceRecord", "ServiceName"), jobs);
+    EXPECT_EQ(countsOf("TVRHBA_DiagnosticCompletionRecord", "ServiceName"), jobs);
     host.unload();
 }
 
