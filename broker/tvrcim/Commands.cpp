@@ -6,6 +6,7 @@
 #include "broker/tvrcim/HostReport.h"
 #include "broker/tvrcim/LogCommand.h"
 #include "broker/tvrcim/Progress.h"
+#include "broker/tvrcim/Replies.h"
 #include "broker/tvrcim/Topology.h"
 #include "broker/values/PathText.h"
 #include "broker/values/ValueMap.h"
@@ -24,13 +25,6 @@ using namespace broker;
 
 namespace
 {
-
-template <class Answer> Answer checked(Answer answer)
-{
-    if (!answer.ok())
-        throw CimError(answer);
-    return answer;
-}
 
 const ClassInfo& classOf(const Session& session, const std::string& name)
 {

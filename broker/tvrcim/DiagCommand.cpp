@@ -3,6 +3,7 @@
 #include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/Progress.h"
 #include "broker/tvrcim/ReadableText.h"
+#include "broker/tvrcim/Replies.h"
 #include "broker/tvrcim/SignalEnd.h"
 #include "broker/values/Json.h"
 #include "broker/values/ValueMap.h"
@@ -30,28 +31,9 @@ namespace
 
 constexpr const char* settingsClass = "TVRHBA_FCHBADiagnosticSettingData";
 
-template <class Answer> Answer checked(Answer answer)
-{
-    if (!answer.ok())
-        throw CimError(answer);
-    return answer;
-}
-
 std::vector<Object> instancesOf(Session& session, const char* className)
 {
     return checked(session.broker.enumerateInstances(session.nameSpace, className)).objects;
-}
-
-std::string textOf(const Object& object, const char* property)
-{
-    const Json value = toJson(object.get(property));
-    return value.is_string() ? value.get<std::string>() : std::string();
-}
-
-std::uint64_t numberOf(const Object& object, const char* property)
-{
-    const Value& value = object.get(property);
-    return value.isNull() ? 0 : value.asUnsigned();
 }
 
 bool isSet(const Object& object, const char* property)

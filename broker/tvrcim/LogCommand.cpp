@@ -1,6 +1,7 @@
 #include "broker/tvrcim/LogCommand.h"
 
 #include "broker/tvrcim/Progress.h"
+#include "broker/tvrcim/Replies.h"
 #include "broker/values/Json.h"
 
 #include <nlohmann/json.hpp>
@@ -34,25 +35,6 @@ struct LogRow
     bool newestFirst;     ///< in the order of its instances
     bool readWhenEnabled; ///< what comes later is seen when it is enabled again
 };
-
-std::string textOf(const Object& object, const char* property)
-{
-    const Json value = toJson(object.get(property));
-    return value.is_string() ? value.get<std::string>() : std::string();
-}
-
-std::uint64_t numberOf(const Object& object, const char* property)
-{
-    const Value& value = object.get(property);
-    return value.isNull() ? 0 : value.asUnsigned();
-}
-
-template <class Answer> Answer checked(Answer answer)
-{
-    if (!answer.ok())
-        throw CimError(answer);
-    return answer;
-}
 
 void call(Session& session, const Path& log, const std::string& method, const std::vector<Property>& in)
 {
