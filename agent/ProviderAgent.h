@@ -52,7 +52,7 @@ struct RefreshStage
 /// Exists while at least one class provider is loaded. Broker threads never build anything: they ask for a refresh,
 /// wait for the stage they need and copy out of the cache; one DataFetch_Handler thread at a time rebuilds it.
 ///
-/// Locks are taken in this order: singleton mutex, m_ThreadMutex, m_AdapterDataReadyMutex,
+/// Locks are taken in this order: singleton mutex, m_DportThreadMutex, m_ThreadMutex, m_AdapterDataReadyMutex,
 /// m_AdapterMapsReadyMutex, m_SANMapsReadyMutex, m_DataMutex.
 class ProviderAgent : public InstanceCache
 {
