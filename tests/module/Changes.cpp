@@ -11,8 +11,9 @@ using broker::Value;
 const char* const changeableHost = R"({
   "targets": [{"name": "t", "wwpn": "5063D20000000001", "units": [{"lun": 0}, {"lun": 3}]}],
   "adapters": [
-    {"name": "A", "serialNumber": "S1", "model": "M", "tagging": {"on": true}, "attributes": {"bootCodeEnabled": 1}, "driverParameters": [{"name": "p", "high": 100}],
-     "ports": [{"wwpn": "1000027A000000A0", "targets": ["t"],
+    {"name": "A", "serialNumber": "S1", "model": "M", "tagging": {"on": true}, "features": {"200": 1},
+     "attributes": {"bootCodeEnabled": 1, "diagVersion": 4}, "driverParameters": [{"name": "p", "high": 100}],
+     "ports": [{"wwpn": "1000027A000000A0", "targets": ["t"], "beacon": "off",
                 "priorityLanes": [{"target": "t", "lun": 3}]}]}]})";
 
 namespace
@@ -59,6 +60,16 @@ Value list(CMPIType type, const Value::List& values)
     return Value::array(type, values);
 }
 
+Change diagnose(const broker::Path& port, broker::Path service, const std::string& test,
+                std::vector<broker::Property> settings = {})
+{
+    service.setKey("Name", Value::string("TVR:FCHBA " + test + " Test"));
+    settings.push_back({"ManagedElement", Value::reference(port)});
+    Change run = method(service, "RunDiagnosticService", settings);
+    run.name += " " + test;
+    return run;
+}
+
 } // namespace
 
 void removeLane(broker::Broker& broker)
@@ -80,12 +91,12 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
                        software = pathOf("TVRHBA_SoftwareInstallationService"),
                        parameters = pathOf("TVRHBA_FCHBADriverParamService"), tags = pathOf("TVRHBA_FCTagService");
     const broker::Object help = host.instancesOf("TVRHBA_HelpService").at(0);
-    const broker::Path test = theOne(host, "TVRHBA_FCHBADiagnosticTest", "Name", "TVR:FCHBA Host Loopback Test").path;
+    const broker::Path test = pathOf("TVRHBA_FCHBADiagnosticTest"), port = pathOf("TVRHBA_PortController");
     const broker::Object setting = host.instancesOf("TVRHBA_ProviderConfigSetting").at(0);
     const broker::Path driverLog = pathOf("TVRHBA_RecordLog"), log = host.instancesOf("TVRHBA_RecordLog").back().path;
     const broker::Property target = {"Target", Value::reference(pathOf("TVRHBA_FCPort"))};
     const broker::Path dumps = pathOf("TVRHBA_DumpService");
-    const broker::Property controller = {"Target", Value::reference(pathOf("TVRHBA_PortController"))};
+    const broker::Property controller = {"Target", Value::reference(port)};
     const broker::Object dumpData = host.instancesOf("TVRHBA_DumpData").at(0);
     Value::List image;
     for (const char byte : changeableFirmware())
@@ -132,14 +143,16 @@ std::vector<Change> changesOf(Host& host, test_support::FileServer& server)
         method(tags, "GetGlobalFlag", {target}),
         method(tags, "SetConfigTable", {target, {"URI", Value::string(server.uri("/table.xml"))}}),
         method(tags, "GetConfigTable", {target, {"URI", Value::string(server.uri("/out.xml", "joe:se%20cret@"))}}),
-        method(test, "RunDiagnosticService",
-               {{"ManagedElement", Value::reference(pathOf("TVRHBA_PortController"))},
-                {"DiagnosticSettings", instance("TVRHBA_FCHBADiagnosticSettingData",
-                                                {{"InstanceID", Value::string("TVR:FCHBA Host Loopback Test")},
-                                                 {"BufferPattern", list(CMPI_uint8, {Value::uint8('f')})}})},
-                {"JobSettings",
-                 instance("TVRHBA_JobSettingData", {{"InstanceID", Value::string("TVR:FCHBA JobSettingData")},
-                                                    {"DeleteOnCompletion", Value::boolean(true)}})}}),
+        diagnose(port, test, "Host Loopback",
+                 {{"DiagnosticSettings", instance("TVRHBA_FCHBADiagnosticSettingData",
+                                                  {{"InstanceID", Value::string("TVR:FCHBA Host Loopback Test")},
+                                                   {"BufferPattern", list(CMPI_uint8, {Value::uint8('f')})}})},
+                  {"JobSettings",
+                   instance("TVRHBA_JobSettingData", {{"InstanceID", Value::string("TVR:FCHBA JobSettingData")},
+                                                      {"DeleteOnCompletion", Value::boolean(true)}})}}),
+        diagnose(port, test, "Status"),
+        diagnose(port, test, "Beacon"),
+        diagnose(port, test, "D-Port"),
         method(pathOf("TVRHBA_DiagnosticsLog"), "ClearLog", {}),
         method(help.path, "GetHelp",
                {{"RequestedDocument", Value::string(text(help, "Name"))},

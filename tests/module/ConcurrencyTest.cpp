@@ -181,7 +181,10 @@ TEST(Concurrency, ChangesSucceedWhileTheCacheIsRebuilt)
                    {
                        const Change& change = changes[(client * 5 + i) % changes.size()];
                        const std::string answer = change.ask(host.broker());
-                       if (change.name.find("lane") == std::string::npos) // another client may have made or deleted it
+                       const bool ofLane = change.name.find("lane") != std::string::npos;
+                       const bool ofTest = change.name.find("RunDiagnosticService") != std::string::npos;
+                       // Another client may have made or deleted the lane, or its link test may be under way.
+                       if (!ofLane && !(ofTest && answer == "CIM_ERR_OK 40064"))
                        {
                            EXPECT_EQ(answer, "CIM_ERR_OK 0") << change.name;
                        }

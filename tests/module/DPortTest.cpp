@@ -345,6 +345,7 @@ TEST(DPortTest, ACancelledTestLeavesNoRecords)
     const Started run = host.run(firstPort);
     EXPECT_EQ(host.stateOf(run), "4 0");
     EXPECT_EQ(host.cancel(run), 0u);
+    EXPECT_EQ(host.logged("[TVR_DBG] TVRHBA_ConcreteJob_Provider: CancelTest Successful: DiagHandle :1"), 1u);
     ASSERT_TRUE(host.awaitLog(ended));
     EXPECT_EQ(host.stateOf(run), "8 0");
     EXPECT_EQ(host.records(), 0u);

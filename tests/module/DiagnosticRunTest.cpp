@@ -340,6 +340,21 @@ TEST(DiagnosticRun, EachTestEndsInItsWay)
     host.unload();
 }
 
+TEST(DiagnosticRun, ABusyAdapterIsAskedFourHundredAndFiftyTimes)
+{
+    TestHost host;
+    for (const auto& [test, function] : std::initializer_list<std::pair<const char*, const char*>>{
+             {"Status", "LRM_GetPortAttributes"}, {"Reset", "LRM_ResetHBA"}})
+    {
+        host.addFault(fault(function, R"("status": 64)"));
+        const std::size_t before = host.calls(function);
+        EXPECT_EQ(host.run(test).value, 40064u) << test;
+        EXPECT_EQ(host.calls(function) - before, 450u) << test;
+        host.clearFaults();
+    }
+    host.unload();
+}
+
 TEST(DiagnosticRun, ADisabledPortIsNoFailureAndNoJob)
 {
     TestHost host;
@@ -407,6 +422,25 @@ TEST(DiagnosticRun, ADeletedJobLeavesItsRecords)
     host.portsAfterRefresh();
     EXPECT_NE(jobOf(host.run("Status")), "");
     EXPECT_THAT(host.leftBehind(), ElementsAre("2", "2", "2", "11", "11")) << "which a refresh leaves alone";
+    host.unload();
+}
+
+TEST(DiagnosticRun, OverridesHoldUntilTheAdaptersAreReadAgain)
+{
+    TestHost host;
+    const auto cyclesOf = [&](const Settings& settings)
+    {
+        const std::string id = jobOf(host.run("Host Loopback", settings));
+        return numberOf(theOne(host, "TVRHBA_DiagnosticServiceRecord", "InstanceID", id + ":Service Record"),
+                        "CompletedCycles");
+    };
+    EXPECT_EQ(cyclesOf({overrides("Host Loopback",
+                                  {{"LoopControlParameter", Value::array(CMPI_string, {Value::string("7")})}})}),
+              "7");
+    EXPECT_EQ(cyclesOf({}), "7");
+    advanceClock(10min);
+    host.portsAfterRefresh();
+    EXPECT_EQ(cyclesOf({}), "100");
     host.unload();
 }
 

@@ -3,8 +3,11 @@
 #include "diagnostics/DiagnosticSettings.h"
 #include "agent/Build.h"
 #include "agent/MethodCall.h"
+#include "diagnostics/ConcreteJobs.h"
 #include "diagnostics/DiagnosticFeature.h"
+#include "diagnostics/DiagnosticRun.h"
 #include "diagnostics/DiagnosticsLog.h"
+#include "diagnostics/Executors.h"
 #include "schema/TVRHBA_ConcreteJob.h"
 #include "schema/TVRHBA_DiagElementSettingData.h"
 #include "schema/TVRHBA_DiagnosticCompletionRecord.h"
@@ -355,6 +358,58 @@ TEST_F(DiagnosticMaps, WithoutAPortThatCanBeAskedThereAreNoDiagnostics)
                 ElementsAre("5 Invalid Argument"));
     EXPECT_THAT(linesOf([&] { EXPECT_EQ(IsFeatureTagSupported("no name", 200), 32768u); }),
                 ElementsAre("3 INVALID HBA Name", "5 str2HBAName failed"));
+}
+
+// --- methods on what no host has
+
+TEST_F(DiagnosticMaps, ATestOutsideOfTheCatalogIsNotRun)
+{
+    constexpr char unknown[] = "TVR:FCHBA Unknown Test";
+    ASSERT_EQ(CreateFCHBADiagnosticClassFeature(agent), 0u);
+    Ref<TVRHBA_FCHBADiagnosticTest> test = fresh<TVRHBA_FCHBADiagnosticTest>();
+    test->Name.set(unknown);
+    mapOf<TVRHBA_FCHBADiagnosticTest>(agent).insert(test, "refused");
+    Ref<Settings> settings = fresh<Settings>();
+    settings->InstanceID.set(unknown);
+    mapOf<Settings>(agent).insert(settings, "refused");
+    Ref<TVRHBA_PortController> nameless = fresh<TVRHBA_PortController>();
+    nameless->DeviceID.set("no name"); // it goes on with none
+    mapOf<TVRHBA_PortController>(agent).insert(nameless, "refused");
+    Ref<CIM_DiagnosticService_RunDiagnosticService_method> parameters(
+        create<CIM_DiagnosticService_RunDiagnosticService_method>());
+    parameters->ManagedElement = clone_of(nameless.get());
+    EXPECT_THAT(linesOf([&] { EXPECT_EQ(diagnosticTestMethods()[0].call(test.get(), parameters.get()), 0); }),
+                testing::IsSupersetOf({"5 TVRHBA_FCHBADiagnosticTest_Provider::str2HBAName failed",
+                                       "5 Started Diagnostic : TVR:FCHBA Unknown Test", "5 Invalid Test Name"}));
+    EXPECT_EQ(parameters->return_value.value, 1u);
+    EXPECT_EQ(parameters->Job, nullptr);
+}
+
+TEST_F(DiagnosticMaps, AJobOfAPortWithoutANameIsNotCancelled)
+{
+    Ref<TVRHBA_ConcreteJob> job = fresh<TVRHBA_ConcreteJob>();
+    job->InstanceID.set("job");
+    job->Name.set("TVR:FCHBA D-Port Test");
+    job->diagHandle.set(1);
+    job->wwpn.set("no name");
+    mapOf<TVRHBA_ConcreteJob>(agent).insert(job, "refused");
+    Ref<TVRHBA_ConcreteJob_RequestStateChange_method> parameters(
+        create<TVRHBA_ConcreteJob_RequestStateChange_method>());
+    parameters->RequestedState.set(4);
+    EXPECT_THAT(linesOf([&] { EXPECT_EQ(concreteJobMethods()[0].call(job.get(), parameters.get()), 0); }),
+                testing::Contains("5 TVRHBA_ConcreteJob_Provider: RequestStateChange:str2HBAName failed"));
+    EXPECT_EQ(parameters->return_value.value, 4097u);
+    ClearDiagnosticClassMaps(agent, 2);
+}
+
+TEST_F(DiagnosticMaps, ALoopbackOfAnotherModeIsRefused)
+{
+    const Ref<Settings> settings = empty<Settings>();
+    const Ref<TVRHBA_JobSettingData> jobSettings = empty<TVRHBA_JobSettingData>();
+    TestRun run{agent, *findDiagnosticTest(external), {}, *settings, *jobSettings, *controller};
+    EXPECT_THAT(linesOf([&] { EXPECT_EQ(LoopBackTest(run, 7), 4); }),
+                ElementsAre("5 TVR_Diagnostics::LoopBackTest", "5 Error: Wrong Test type passed: 7"));
+    EXPECT_FALSE(run.job);
 }
 
 // --- records of runs

@@ -1,5 +1,6 @@
 // What the library says of tests, in words, and jobs that no run of a client leads to: states, ends that are missing,
 // jobs that are gone.
+#include "agent/Build.h"
 #include "agent/Maps.h"
 #include "agent/ProviderAgent.h"
 #include "diagnostics/ConcreteJobs.h"
@@ -108,6 +109,41 @@ TEST(ConcreteJobs, OfUnknownTestsHaveNoOwner)
     EXPECT_EQ(DeleteConcreteJob(cache, other), 0u);
     EXPECT_EQ(DeleteConcreteJob(cache, gone.get()), 0u) << "without a word";
     EXPECT_EQ(mapOf<TVRHBA_ConcreteJob>(cache).size(), 0u);
+}
+
+/// A job that is there already is not made; without one of its associations it stands.
+TEST(ConcreteJobs, WhatAMapRefusesIsLeftOut)
+{
+    InstanceCache cache;
+    test_support::LogCollector lines{TVR_DBG};
+    const auto idAfter = [](const TVRHBA_ConcreteJob& job)
+    {
+        const std::string id = job.InstanceID.value.c_str();
+        return "t:" + std::to_string(std::stoul(id.substr(2)) + 1) + id.substr(id.find(':', 2));
+    };
+    const auto make = [&] { return CreateConcreteJobInstantiateNonBlocking(cache, {.testName = "t"}); };
+    const TVRHBA_ConcreteJob* first = make();
+    ASSERT_NE(first, nullptr);
+    Ref<TVRHBA_ConcreteJob> next(clone_of(first));
+    next->InstanceID.set(idAfter(*first));
+    mapOf<TVRHBA_ConcreteJob>(cache).insert(next, "refused");
+    EXPECT_EQ(make(), nullptr);
+    EXPECT_EQ(mapOf<TVRHBA_OwningJobElement>(cache).size(), 1u);
+
+    Ref<TVRHBA_ConcreteJob> third(clone_of(next.get()));
+    third->InstanceID.set(idAfter(*next));
+    Ref<TVRHBA_OwningJobElement> owning = empty<TVRHBA_OwningJobElement>();
+    owning->OwnedElement = clone_of(third.get());
+    mapOf<TVRHBA_OwningJobElement>(cache).insert(owning, "refused");
+    Ref<TVRHBA_AffectedJobElement> affected = empty<TVRHBA_AffectedJobElement>();
+    affected->AffectingElement = clone_of(third.get());
+    mapOf<TVRHBA_AffectedJobElement>(cache).insert(affected, "refused");
+    EXPECT_NE(make(), nullptr);
+    lines.stopCollecting();
+    const std::vector<std::string> messages = lines.messages();
+    for (const char* line : {"Insert Failed: TVRHBA_ConcreteJob", "Insert Failed: TVRHBA_OwningJobElement",
+                             "Insert Failed: TVRHBA_AffectedJobElement"})
+        EXPECT_EQ(std::count(messages.begin(), messages.end(), line), 1) << line;
 }
 
 TEST(ConcreteJobs, NothingIsCancelledWithoutAHandleOrAName)
