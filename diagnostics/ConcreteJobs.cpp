@@ -76,18 +76,18 @@ template <class Association, class Element, class Holder1, class Holder2>
 bool joinJob(InstanceCache& cache, CIM_Job* Holder1::*jobRole, const TVRHBA_ConcreteJob* job,
              Element* Holder2::*elementRole, const Element* element, const LogText& notMade, const LogText& refused)
 {
-    Ref<Association> made = unlessOutOfMemory(
+    const bool hadMemory = unlessOutOfMemory(
         [&]
         {
             Ref<Association> association = fresh<Association>();
             (*association).*jobRole = shared_end(job).release();
             (*association).*elementRole = shared_end(element).release();
-            return association;
+            mapOf<Association>(cache).insert(std::move(association), refused);
+            return true;
         });
-    if (!made)
-        return notMade.log(), false;
-    mapOf<Association>(cache).insert(std::move(made), refused);
-    return true;
+    if (!hadMemory)
+        notMade.log();
+    return hadMemory;
 }
 
 /// Takes the job's association out of its map.
@@ -152,14 +152,15 @@ TVRHBA_ConcreteJob* CreateConcreteJobInstantiateNonBlocking(InstanceCache& cache
     using Owning = TVRHBA_OwningJobElement;
     using Affected = TVRHBA_AffectedJobElement;
     TVR_LOG(TVR_DBG, "CreateConcreteJobInstantiateNonBlocking");
-    Ref<TVRHBA_ConcreteJob> made = unlessOutOfMemory([&] { return makeJob(order); });
-    if (!made)
-    {
+    TVRHBA_ConcreteJob* job = nullptr;
+    const bool hadMemory = unlessOutOfMemory(
+        [&]
+        {
+            job = mapOf<TVRHBA_ConcreteJob>(cache).insert(makeJob(order), "Insert Failed: TVRHBA_ConcreteJob");
+            return true;
+        });
+    if (!hadMemory)
         TVR_LOG(TVR_ERR, "Unable to create TVRHBA_ConcreteJob");
-        return nullptr;
-    }
-    TVRHBA_ConcreteJob* job =
-        mapOf<TVRHBA_ConcreteJob>(cache).insert(std::move(made), "Insert Failed: TVRHBA_ConcreteJob");
     if (!job)
         return nullptr;
     const CIM_ManagedElement* test = mapOf<TVRHBA_FCHBADiagnosticTest>(cache).findFirst(

@@ -149,7 +149,7 @@ void leaveRecords(const LinkTest& link, const RM_DPortResults& results, bool pas
 
 void logException(const char* what)
 {
-    TVR_LOG(TVR_ERR, "Exception in the thread of a link test: %s", what);
+    TVR_LOG(TVR_ERR, "Exception in a link test: %s", what);
 }
 
 /// Whatever is thrown on the way, the job ends.
@@ -323,11 +323,13 @@ RM_STATUS DPortTest(TestRun& run)
     });
     if (const RM_STATUS status = startTest(*link); status != RM_OK)
         return status;
-    const std::uint32_t state = lookAtTest(*link);
+    // Whatever is thrown from here on, a thread follows the test that has begun.
+    const std::uint32_t state = shielded(
+        std::uint32_t{JOB_FAILED}, [&] { return lookAtTest(*link); }, logException);
     link->job = hold(makeJob(*link, state));
     const Ref<TVRHBA_ConcreteJob> job = link->job;
     startThread(run, std::move(link));
-    run.job.reset(clone_of(job.get()));
+    run.job = unlessOutOfMemory([&] { return Ref<TVRHBA_ConcreteJob>(clone_of(job.get())); });
     return RM_OK;
 }
 

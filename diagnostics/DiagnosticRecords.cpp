@@ -281,14 +281,15 @@ private:
     template <class Record, class Make>
     bool insert(Make make, const LogText& notMade, const LogText& refused, const Record*& record)
     {
-        Ref<Record> made = unlessOutOfMemory(make);
-        if (!made)
-        {
+        const bool hadMemory = unlessOutOfMemory(
+            [&]
+            {
+                record = mapOf<Record>(_cache).insert(make(), refused);
+                return true;
+            });
+        if (!hadMemory)
             notMade.log();
-            return false;
-        }
-        record = mapOf<Record>(_cache).insert(std::move(made), refused);
-        return true;
+        return hadMemory;
     }
 
     /// Either end may be null.

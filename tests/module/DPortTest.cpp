@@ -4,6 +4,7 @@
 #include "tests/module/Describe.h"
 #include "tests/module/Host.h"
 #include "tests/module/HostNames.h"
+#include "tests/module/ModuleMemory.h"
 #include "tests/module/Process.h"
 #include "tests/module/Threads.h"
 
@@ -431,6 +432,26 @@ TEST(DPortTest, WithoutAThreadTheJobIsNotRunning)
     const std::vector<broker::Violation> violations = host.broker().violations();
     ASSERT_EQ(violations.size(), 1u);
     EXPECT_EQ(violations[0].text, "outside of a call: 1 prepared thread contexts were never detached");
+}
+
+/// A refusal at each place of a host's first run, in which the maps of jobs and associations have no room yet: what
+/// says that it runs has a thread that will end it.
+TEST(DPortTest, NoJobRunsForEverWhateverMemoryLacks)
+{
+    for (std::size_t number = 1, places = number; number <= places; number++)
+    {
+        SCOPED_TRACE(number);
+        LinkHost host;
+        host.setDiagnostics(firstPort, forEver);
+        const broker::Path port = theOne(host, "TVRHBA_PortController", "DeviceID", firstPort).path;
+        refuseAllocation(number);
+        host.broker().invokeMethod(host.service, "RunDiagnosticService", {{"ManagedElement", Value::reference(port)}});
+        places = allocationsOfModule();
+        for (const broker::Object& job : host.instancesOf("TVRHBA_ConcreteJob"))
+            if (job.get("JobState").asUnsigned() == 4)
+                ASSERT_TRUE(host.awaitLog("[TVR_DBG] TVR_Diagnostics::DPORTStatusThreadCall Start"));
+        host.broker().unload(); // a context that the run left unused is the broker's to complain of
+    }
 }
 
 // --- ends that come first
