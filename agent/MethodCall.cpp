@@ -19,6 +19,8 @@ void awaitStage(const RefreshStage& stage, const char* name)
     TVR_LOG(TVR_DBG, "PERF: Woken up from wait for %s", name);
 }
 
+thread_local unsigned guardsOnThread = 0;
+
 } // namespace
 
 MethodGuard::Ready::Ready(ProviderAgent& agent)
@@ -30,13 +32,36 @@ MethodGuard::Ready::Ready(ProviderAgent& agent)
 
 MethodGuard::MethodGuard(ProviderAgent& agent) : _ready(agent), _dataLock(agent.m_DataMutex)
 {
-    resolveAbsentEntries(); // a library may have come since the start
+    if (!agent.hasEnded())
+        resolveAbsentEntries(); // a library may have come since the start
+    ++guardsOnThread;
+}
+
+MethodGuard::~MethodGuard()
+{
+    --guardsOnThread;
+}
+
+bool MethodGuard::isOnThisThread()
+{
+    return guardsOnThread != 0;
+}
+
+MethodCall::MethodCall(const LogText& entry) : _agent(enter(entry)), _guard(_agent)
+{
+    endIfAgentHas();
 }
 
 ProviderAgent& MethodCall::enter(const LogText& entry)
 {
     entry.log();
     return *ProviderAgent::instance();
+}
+
+void MethodCall::endIfAgentHas() const
+{
+    if (_agent.hasEnded())
+        end({}, {methodFailed});
 }
 
 void MethodCall::end(const LogText& why, const MethodEnd& with)

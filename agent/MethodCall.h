@@ -18,6 +18,12 @@ class MethodGuard
 {
 public:
     explicit MethodGuard(ProviderAgent& agent);
+    ~MethodGuard();
+    MethodGuard(const MethodGuard&) = delete;
+    MethodGuard& operator=(const MethodGuard&) = delete;
+
+    /// Whether the calling thread has one, and so what others wait for.
+    static bool isOnThisThread();
 
 private:
     struct Ready
@@ -44,11 +50,12 @@ struct ServiceTexts
 };
 
 /// Logs the entry, asks for a refresh if one is due, waits for the adapter data and maps, and holds the data lock as
-/// long as it lives. What it then looks up is there, or it ends the method with the service's text and value.
+/// long as it lives. What it then looks up is there, or it ends the method with the service's text and value. It ends a
+/// method that comes when the agent has ended, whose maps and libraries go then.
 class MethodCall
 {
 public:
-    explicit MethodCall(const LogText& entry) : _agent(enter(entry)), _guard(_agent) {}
+    explicit MethodCall(const LogText& entry);
 
     ProviderAgent& agent() { return _agent; }
 
@@ -94,8 +101,7 @@ public:
             const Auto_Unlock released(_agent.m_DataMutex);
             return work();
         }();
-        if (_agent.hasEnded())
-            end({}, {methodFailed});
+        endIfAgentHas();
         return result;
     }
 
@@ -118,6 +124,7 @@ public:
 
 private:
     static ProviderAgent& enter(const LogText& entry);
+    void endIfAgentHas() const;
 
     ProviderAgent& _agent;
     MethodGuard _guard;

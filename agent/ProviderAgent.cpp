@@ -1,5 +1,6 @@
 #include "agent/ProviderAgent.h"
 
+#include "agent/MethodCall.h"
 #include "agent/RefreshSteps.h"
 #include "agent/SignalTrace.h"
 #include "device/Bindings.h"
@@ -176,7 +177,7 @@ void ProviderAgent::finish()
     try
     {
         TVR_LOG(TVR_DBG, "Entering dtor ~ProviderAgent()");
-        const bool joined = joinThreads();
+        const bool joined = !MethodGuard::isOnThisThread() && joinThreads();
         m_config.save(); // while a failure can still be logged
         if (!joined)
             return m_pMethodWrapper.reset(); // the locks of the thread that ends the process are its own

@@ -643,6 +643,56 @@ TEST(DiagnosticRun, TestsOnAllPortsAndReadersOfTheirRecordsGoTogether)
     host.unload();
 }
 
+/// A library of the hardware that gives up the process does so on the thread that asked it, which has the data of the
+/// agent.
+TEST(DiagnosticRun, TheProcessMayExitOnTheThreadOfARun)
+{
+    for (const char* test : {"Self", "Beacon", "D-Port"})
+        EXPECT_EQ(inChild(
+                      [&]
+                      {
+                          alarm(60); // a child that hangs is ended by it
+                          TestHost host;
+                          host.setDiagnostics(firstPort, forEver);
+                          atSleep([] { std::exit(0); });
+                          host.run(test);
+                          std::_Exit(1);
+                      }),
+                  0)
+            << test;
+}
+
+/// Between the end of the data and that of the maps, which nobody holds any more then.
+TEST(DiagnosticRun, ARunThatComesWhileTheProcessExitsIsRefused)
+{
+    static std::atomic<bool> refused = false;
+    EXPECT_EQ(inChild(
+                  []
+                  {
+                      alarm(60); // a child that hangs is ended by it
+                      passOverLeaks();
+                      std::atexit(
+                          []
+                          {
+                              if (!refused)
+                                  std::_Exit(1);
+                          });
+                      TestHost host;
+                      host.addFault(R"({"function": "HBA_FreeLibrary", "gate": "end"})");
+                      std::thread(
+                          [&]
+                          {
+                              host.awaitGate("end");
+                              const Answer answer = host.run("Status");
+                              refused = answer.value == 4 && jobOf(answer).empty();
+                              host.openGate("end");
+                          })
+                          .detach();
+                      std::exit(testing::Test::HasFailure());
+                  }),
+              0);
+}
+
 /// It would go on for a quarter of an hour.
 TEST(DiagnosticRun, ATestEndsWhenTheProcessExits)
 {
