@@ -49,7 +49,7 @@ template <class Record> Ref<Record> hold(Record* instance)
 struct Ending
 {
     std::uint32_t jobState;
-    std::optional<RM_STATUS> error = {}; ///< of the library, where it does not know the test any more
+    std::optional<RM_STATUS> error = {}; ///< of the library, where it does not know the test any more, or of the thread
     std::optional<bool> passed = {};     ///< where there is a result, which its records tell
 };
 
@@ -163,7 +163,7 @@ void DPORTStatusThreadCall(const LinkTest& link)
     }
     RM_DPortResults results{};
     const Ending ending = shielded(
-        Ending{jobException}, [&] { return awaitEnd(link, results); }, logException);
+        Ending{.jobState = jobException, .error = RM_ERROR}, [&] { return awaitEnd(link, results); }, logException);
     Auto_Mutex dataLock(link.agent.m_DataMutex); // whoever waits for this thread does not hold it
     endJob(link, ending);
     if (!ending.passed)
@@ -301,7 +301,10 @@ void startThread(TestRun& run, std::unique_ptr<LinkTest> link)
     if (error == 0)
         return static_cast<void>(link.release()); // the thread's from now on
     TVR_LOG(TVR_DBG, "DPortTest: Creation of DPORT Status Thread Failed");
-    if (job && job->JobState.value == JOB_RUNNING) // and nobody would ever see it end
+    if (!job)
+        return;
+    job->ErrorCode.set(RM_ERROR); // its records will never come
+    if (job->JobState.value == JOB_RUNNING)
         job->JobState.set(jobException);
 }
 

@@ -309,7 +309,7 @@ bool hasEnded(const TestEnd& end)
     if (end.completion || !end.job)
         return true;
     const std::uint64_t state = numberOf(*end.job, "JobState");
-    return state == jobTerminated || state == jobFailed || (state == jobException && isSet(*end.job, "ErrorCode"));
+    return state == jobTerminated || state == jobFailed || isSet(*end.job, "ErrorCode");
 }
 
 /// What the person is told of it.
@@ -555,7 +555,7 @@ void runTest(Session& session, const Command& command)
 
 void diagnose(Session& session, const Command& command)
 {
-    if (command.test.empty())
+    if (command.target.empty() && command.test.empty())
         listTests(session);
     else
         runTest(session, command);

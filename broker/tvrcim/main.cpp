@@ -90,7 +90,6 @@ int run(const Settings& settings)
     session.signals = &signals;
     showWork(session);
     int exitCode = runAndReport(session, settings.command, signals);
-    std::cout.flush();
     broker.unload();
     for (const broker::Violation& violation : broker.violations())
     {
@@ -100,9 +99,7 @@ int run(const Settings& settings)
     return exitCode;
 }
 
-} // namespace
-
-int main(int argc, char** argv)
+int parseAndRun(int argc, char** argv)
 {
     const CommandLine line = parseCommandLine(argc, argv);
     if (!line.proceed)
@@ -115,4 +112,15 @@ int main(int argc, char** argv)
     {
         return report("", error, exitUsage);
     }
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    const int exitCode = parseAndRun(argc, argv);
+    if (std::cout.flush())
+        return exitCode;
+    std::cerr << "tvrcim: not all of the output could be written\n";
+    return exitCode == 0 ? exitOutputLost : exitCode;
 }

@@ -339,6 +339,10 @@ TEST(Tvrcim, ErrorsNameTheStatusOrTheArgument)
         {"host --module /nonexistent.so", 2, "/nonexistent.so"},
         {"host --scenario " + wrongScenario, 2, "/adapters/0/name"},
         {"host --scenario " + wrongScenario, 2, wrongScenario},
+        {"classes > /dev/full", 6, "not all of the output could be written"},
+        {"--help > /dev/full", 6, "not all of the output could be written"},
+        {"enum NoSuchClass > /dev/full", 1, "CIM_ERR_INVALID_CLASS"},
+        {"diag 1000027A51160210 ''", 2, "there is no test ''"},
     };
     for (const auto& row : rows)
     {
