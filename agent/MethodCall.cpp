@@ -19,8 +19,6 @@ void awaitStage(const RefreshStage& stage, const char* name)
     TVR_LOG(TVR_DBG, "PERF: Woken up from wait for %s", name);
 }
 
-thread_local unsigned guardsOnThread = 0;
-
 } // namespace
 
 MethodGuard::Ready::Ready(ProviderAgent& agent)
@@ -34,17 +32,6 @@ MethodGuard::MethodGuard(ProviderAgent& agent) : _ready(agent), _dataLock(agent.
 {
     if (!agent.hasEnded())
         resolveAbsentEntries(); // a library may have come since the start
-    ++guardsOnThread;
-}
-
-MethodGuard::~MethodGuard()
-{
-    --guardsOnThread;
-}
-
-bool MethodGuard::isOnThisThread()
-{
-    return guardsOnThread != 0;
 }
 
 MethodCall::MethodCall(const LogText& entry) : _agent(enter(entry)), _guard(_agent)

@@ -18,12 +18,6 @@ class MethodGuard
 {
 public:
     explicit MethodGuard(ProviderAgent& agent);
-    ~MethodGuard();
-    MethodGuard(const MethodGuard&) = delete;
-    MethodGuard& operator=(const MethodGuard&) = delete;
-
-    /// Whether the calling thread has one, and so what others wait for.
-    static bool isOnThisThread();
 
 private:
     struct Ready

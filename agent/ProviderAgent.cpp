@@ -1,6 +1,5 @@
 #include "agent/ProviderAgent.h"
 
-#include "agent/MethodCall.h"
 #include "agent/RefreshSteps.h"
 #include "agent/SignalTrace.h"
 #include "device/Bindings.h"
@@ -177,11 +176,15 @@ void ProviderAgent::finish()
     try
     {
         TVR_LOG(TVR_DBG, "Entering dtor ~ProviderAgent()");
-        const bool joined = !MethodGuard::isOnThisThread() && joinThreads();
+        const bool joined = !m_DataMutex.isMine() && joinThreads();
         m_config.save(); // while a failure can still be logged
         if (!joined)
             return m_pMethodWrapper.reset(); // the locks of the thread that ends the process are its own
         deleteData();
+        // Who comes now gets nothing, rather than a part of it.
+        Auto_Mutex adapterMapsLock(m_AdapterMapsReadyMutex);
+        Auto_Mutex sanMapsLock(m_SANMapsReadyMutex);
+        Auto_Mutex dataLock(m_DataMutex);
         HBA_FreeLibrary();
         ClearMaps();
         if (!TVR_Logger::instance().isFfdcMode())
@@ -303,14 +306,8 @@ void ProviderAgent::deleteData()
 void ProviderAgent::ClearMaps()
 {
     TVR_LOG(TVR_DBG, "Entered ClearMaps()");
-    {
-        Auto_Mutex lock(m_AdapterMapsReadyMutex);
-        clearAdapterMaps();
-    }
-    {
-        Auto_Mutex lock(m_SANMapsReadyMutex);
-        clearSANMaps();
-    }
+    clearAdapterMaps();
+    clearSANMaps();
     TVR_LOG(TVR_DBG, "Exiting ClearMaps()");
 }
 

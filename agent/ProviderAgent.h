@@ -76,7 +76,7 @@ public:
     bool isTimeOut();
     std::uint32_t updateAdapterMaps();
     std::uint32_t updateSANMaps();
-    /// Clears all maps, each group under its mutex.
+    /// Clears all maps. The caller holds the mutexes of both groups and m_DataMutex.
     void ClearMaps();
     /// The caller holds the mutex of the group.
     void clearAdapterMaps();

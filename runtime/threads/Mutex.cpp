@@ -25,17 +25,38 @@ void Mutex::lock()
     if (pthread_mutex_lock(&_mutex) != 0)
         assert_failed("Mutex.cpp", __LINE__, "void cimple::Mutex::lock()",
                       "pthread_mutex_lock(&((MutexRep*)_rep)->mutex) == 0");
+    taken();
 }
 
 int Mutex::try_lock()
 {
     const int error = pthread_mutex_trylock(&_mutex);
+    if (error == 0)
+        taken();
     return error == 0 || error == EBUSY ? error : -1;
 }
 
 void Mutex::unlock()
 {
+    given();
     pthread_mutex_unlock(&_mutex);
+}
+
+bool Mutex::isMine() const
+{
+    return _holds.load(std::memory_order_acquire) != 0 &&
+           pthread_equal(_holder.load(std::memory_order_relaxed), pthread_self());
+}
+
+void Mutex::taken()
+{
+    _holder.store(pthread_self(), std::memory_order_relaxed);
+    _holds.store(_holds.load(std::memory_order_relaxed) + 1, std::memory_order_release);
+}
+
+void Mutex::given()
+{
+    _holds.store(_holds.load(std::memory_order_relaxed) - 1, std::memory_order_release);
 }
 
 Condition::Condition()
@@ -50,7 +71,9 @@ Condition::~Condition()
 
 void Condition::wait(Mutex& mutex)
 {
+    mutex.given();
     pthread_cond_wait(&_cond, &mutex._mutex);
+    mutex.taken();
 }
 
 void Condition::signal()

@@ -1,6 +1,7 @@
 // POSIX threads, mutexes and conditions. A thread started here inherits the caller's broker attachment.
 #pragma once
 
+#include <atomic>
 #include <pthread.h>
 
 namespace cimple
@@ -19,10 +20,17 @@ public:
     /// 0, 16 (EBUSY) when another thread holds it, -1 for other errors.
     int try_lock();
     void unlock();
+    /// Whether the calling thread holds it.
+    bool isMine() const;
 
 private:
     friend class Condition;
+    void taken();
+    void given();
+
     pthread_mutex_t _mutex;
+    std::atomic<pthread_t> _holder{}; ///< the last one
+    std::atomic<unsigned> _holds = 0; ///< by the holder, who alone writes both
 };
 
 /// Holds a mutex for a scope; may be released early.

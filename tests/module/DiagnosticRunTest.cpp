@@ -662,19 +662,19 @@ TEST(DiagnosticRun, TheProcessMayExitOnTheThreadOfARun)
             << test;
 }
 
-/// Between the end of the data and that of the maps, which nobody holds any more then.
+/// Between the end of the data and that of the maps: it gets the data lock behind both.
 TEST(DiagnosticRun, ARunThatComesWhileTheProcessExitsIsRefused)
 {
-    static std::atomic<bool> refused = false;
+    static std::promise<bool> refused;
     EXPECT_EQ(inChild(
                   []
                   {
                       alarm(60); // a child that hangs is ended by it
                       passOverLeaks();
-                      std::atexit(
+                      std::atexit( // called behind the module's end, which is registered later
                           []
                           {
-                              if (!refused)
+                              if (!refused.get_future().get())
                                   std::_Exit(1);
                           });
                       TestHost host;
@@ -683,9 +683,11 @@ TEST(DiagnosticRun, ARunThatComesWhileTheProcessExitsIsRefused)
                           [&]
                           {
                               host.awaitGate("end");
-                              const Answer answer = host.run("Status");
-                              refused = answer.value == 4 && jobOf(answer).empty();
-                              host.openGate("end");
+                              std::thread([&] { host.openGate("end"); }).detach();
+                              const broker::MethodReply reply = // the log has ended by then
+                                  host.broker().invokeMethod(host.service, "RunDiagnosticService",
+                                                             {{"ManagedElement", Value::reference(host.controller)}});
+                              refused.set_value(reply.ok() && reply.returnValue.asUnsigned() == 4);
                           })
                           .detach();
                       std::exit(testing::Test::HasFailure());
