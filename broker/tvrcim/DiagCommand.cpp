@@ -247,7 +247,6 @@ void listTests(Session& session)
 // --- the end of a test
 
 constexpr std::uint16_t jobTerminated = 8;
-constexpr std::uint16_t jobException = 10;
 constexpr std::uint16_t jobFailed = 32768;
 
 struct NumberName
