@@ -9,8 +9,10 @@ namespace
 {
 
 constexpr std::size_t line_width = 110;
+constexpr std::size_t longest_on_line = 60; ///< of the text of a qualifier
 
-/// Items with commas between them, in lines of bounded width that begin at `indent`.
+/// Items with commas between them, in lines of bounded width that begin at `indent`. An item of several lines has
+/// them to itself.
 std::string listed(const std::vector<std::string>& items, const std::string& indent)
 {
     std::string text;
@@ -19,14 +21,29 @@ std::string listed(const std::vector<std::string>& items, const std::string& ind
     {
         if (i > 0)
         {
-            const bool fits = used + items[i].size() + 2 <= line_width;
+            const bool fits = used + items[i].size() + 2 <= line_width && items[i].find('\n') == std::string::npos;
             text += fits ? ", " : ",\n" + indent;
             used = fits ? used + 2 : indent.size();
         }
         text += items[i];
-        used += items[i].size();
+        used = items[i].find('\n') == std::string::npos ? used + items[i].size() : line_width;
     }
     return text;
+}
+
+/// A text as literals of bounded width, which compilers join, each on a line of its own.
+std::string string_lines(std::string_view text, const std::string& indent)
+{
+    const std::size_t room = line_width - indent.size() - 2;
+    std::string lines;
+    while (!text.empty())
+    {
+        const std::size_t blank = text.size() > room ? text.rfind(' ', room - 1) : std::string_view::npos;
+        const std::size_t length = blank == std::string_view::npos ? text.size() : blank + 1;
+        lines += "\n" + indent + as_string_literal(text.substr(0, length));
+        text.remove_prefix(length);
+    }
+    return lines;
 }
 
 std::string mof_of(const Literal& literal)
@@ -55,10 +72,18 @@ std::string mof_of(const Value& value, const std::string& indent)
     return value.is_array ? braced(value, indent) : mof_of(value.items.front());
 }
 
+bool is_long(const Value& value)
+{
+    return !value.is_array && value.items.front().kind == Literal::Kind::String &&
+           value.items.front().text.size() > longest_on_line;
+}
+
 std::string mof_of(const Qualifier& qualifier, const std::string& indent)
 {
     if (!qualifier.value)
         return qualifier.name;
+    if (is_long(*qualifier.value))
+        return qualifier.name + " (" + string_lines(qualifier.value->items.front().text, indent + "   ") + " )";
     const std::string value = mof_of(*qualifier.value, indent + "   ");
     return qualifier.name + (qualifier.value->is_array ? " " + value : " ( " + value + " )");
 }

@@ -24,8 +24,8 @@ OutputFiles write_records(const Schema& schema);
 /// The meta tables in `chunks` source files, and the repository.
 OutputFiles write_tables(const Schema& schema, std::size_t chunks);
 
-/// The value maps of methods and their parameters, for what shows them to people.
-OutputFiles write_value_maps(const Schema& schema);
+/// What people are shown of classes and their features: descriptions, units and the names of values.
+OutputFiles write_texts(const Schema& schema);
 
 /// What CIM servers read: qualifiers.mof, cim_classes.mof and tavrin_classes.mof, to be compiled in this order into
 /// each namespace, with a class after those it names; the registration of the providers as stanzas (.reg, the

@@ -14,9 +14,10 @@
 namespace
 {
 
-constexpr const char* usage = "usage: schemac --cpp FOLDER CHUNKS FILE.mof...   record types, meta tables, value maps\n"
-                              "       schemac --mof FOLDER VERSION FILE.mof...  files for CIM servers\n"
-                              "       schemac --check FILE.mof...               refusals only\n";
+constexpr const char* usage =
+    "usage: schemac --cpp FOLDER CHUNKS FILE.mof...   record types, meta tables, texts for people\n"
+    "       schemac --mof FOLDER VERSION FILE.mof...  files for CIM servers\n"
+    "       schemac --check FILE.mof...               refusals only\n";
 
 void read_source(const std::string& path, schemac::Schema& schema)
 {
@@ -44,7 +45,7 @@ void write(const schemac::Schema& schema, const std::string& mode, const std::st
     {
         schemac::save(schemac::write_records(schema), folder);
         schemac::save(schemac::write_tables(schema, std::stoul(option)), folder);
-        schemac::save(schemac::write_value_maps(schema), folder);
+        schemac::save(schemac::write_texts(schema), folder);
     }
     else
     {

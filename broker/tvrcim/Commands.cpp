@@ -88,7 +88,7 @@ void enumerate(Session& session, const Command& command)
     }
     const Reply reply =
         checked(session.broker.enumerateInstances(session.nameSpace, command.target, command.properties));
-    printObjects(session.out, session.format, reply.objects, command.properties);
+    printObjects(session.out, session.format, session.broker.classes(), reply.objects, command.properties);
 }
 
 void get(Session& session, const Command& command)
@@ -100,7 +100,7 @@ void get(Session& session, const Command& command)
         printJson(session.out, toJson(reply.objects.front()));
         return;
     }
-    printObjects(session.out, session.format, reply.objects, std::nullopt);
+    printObjects(session.out, session.format, session.broker.classes(), reply.objects, std::nullopt);
 }
 
 /// The two forms of an association operation.
@@ -119,7 +119,7 @@ void follow(Session& session, const Command& command, const Traversal& traversal
         return;
     }
     const Reply reply = checked((session.broker.*traversal.objects)(path, command.filter, command.properties));
-    printObjects(session.out, session.format, reply.objects, command.properties);
+    printObjects(session.out, session.format, session.broker.classes(), reply.objects, command.properties);
 }
 
 void followAssociations(Session& session, const Command& command)

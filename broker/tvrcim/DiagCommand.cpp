@@ -474,7 +474,7 @@ void print(const Session& session, const Run& run)
     for (const auto part : parts)
         if (run.end.*part)
             objects.push_back(*(run.end.*part));
-    printObjects(session.out, session.format, objects, std::nullopt);
+    printObjects(session.out, session.format, session.broker.classes(), objects, std::nullopt);
 }
 
 // --- a run

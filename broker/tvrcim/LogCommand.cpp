@@ -157,7 +157,7 @@ bool waitForMore()
 void print(Session& session, const LogRow& row, const std::vector<Object>& entries, bool follow)
 {
     if (session.format != Format::table && !(session.format == Format::json && follow))
-        printObjects(session.out, session.format, entries, std::nullopt);
+        printObjects(session.out, session.format, session.broker.classes(), entries, std::nullopt);
     else
         for (const Object& entry : entries)
             session.out << (session.format == Format::json ? jsonText(toJson(entry)) : row.line(entry)) << '\n';

@@ -1,5 +1,6 @@
 #include "broker/tvrcim/Printing.h"
 
+#include "broker/tvrcim/ReadableText.h"
 #include "broker/values/PathText.h"
 #include "broker/values/QualifierText.h"
 #include "broker/values/Utf8.h"
@@ -28,24 +29,46 @@ std::string joined(const std::vector<std::string>& names)
     return text;
 }
 
-void printBlock(std::ostream& out, const Object& object)
+bool isNumber(CMPIType type)
+{
+    const auto element = static_cast<CMPIType>(type & ~CMPI_ARRAY);
+    return isInteger(element) || element == CMPI_real32 || element == CMPI_real64;
+}
+
+/// A value on one line, with its name or in its unit where the schema has one.
+std::string shownText(const ClassInfo* info, const Value& value, std::string_view feature,
+                      std::string_view parameter = {})
+{
+    if (info && isNumber(value.type()))
+    {
+        const ValueNames names = valueNames(*info, feature, parameter);
+        const std::string_view unit = names.empty() ? unitOf(*info, feature, parameter) : std::string_view();
+        return unit.empty() ? namedValueText(names, value) : measureText(unit, value);
+    }
+    return oneLine(valueText(value));
+}
+
+void printBlock(std::ostream& out, const ClassTable& classes, const Object& object)
 {
     std::size_t width = 0;
     for (const Property& property : object.properties)
         width = std::max(width, property.name.size());
     out << pathText(object.path) << '\n';
+    const ClassInfo* info = classes.find(object.path.className);
     for (const Property& property : object.properties)
-        out << "    " << padded(property.name, width) << "  " << oneLine(valueText(property.value)) << '\n';
+        out << "    " << padded(property.name, width) << "  " << shownText(info, property.value, property.name) << '\n';
 }
 
-void printColumns(std::ostream& out, const std::vector<Object>& objects, const std::vector<std::string>& columns)
+void printColumns(std::ostream& out, const ClassTable& classes, const std::vector<Object>& objects,
+                  const std::vector<std::string>& columns)
 {
     Table table(columns);
     for (const Object& object : objects)
     {
+        const ClassInfo* info = classes.find(object.path.className);
         std::vector<std::string> row;
         for (const std::string& column : columns)
-            row.push_back(object.has(column) ? oneLine(valueText(object.get(column))) : "-");
+            row.push_back(object.has(column) ? shownText(info, object.get(column), column) : "-");
         table.add(std::move(row));
     }
     table.print(out);
@@ -85,16 +108,44 @@ std::string parameterList(const MethodInfo& method)
 
 constexpr const char* returned = "(returned)";
 
-void printNames(std::ostream& out, const std::string& of, ValueNames names)
+constexpr std::size_t textWidth = 100; ///< of descriptions
+constexpr const char* textIndent = "    ";
+
+void printText(std::ostream& out, std::string_view text, const std::string& indent)
 {
-    if (names.empty())
+    for (const std::string& line : lines(std::string(text), textWidth - indent.size()))
+        out << indent << line << '\n';
+}
+
+/// What the schema says of a parameter or of what a method returns, with a line for each value that has a name.
+void printMeaning(std::ostream& out, const std::string& of, std::string_view description, std::string_view unit,
+                  ValueNames names)
+{
+    if (description.empty() && unit.empty() && names.empty())
         return;
+    out << '\n' << of << (unit.empty() ? "" : ", in " + std::string(unit)) << '\n';
+    printText(out, description, textIndent);
     std::size_t width = 0;
     for (const cimple::Value_Name& row : names)
         width = std::max(width, std::string_view(row.values).size());
-    out << '\n' << of << '\n';
     for (const cimple::Value_Name& row : names)
-        out << "    " << padded(row.values, width) << "  " << row.name << '\n';
+        out << textIndent << padded(row.values, width) << "  " << row.name << '\n';
+}
+
+/// What the schema says of a property or method of a class, in few lines.
+void printShortly(std::ostream& out, const ClassInfo& info, const std::string& feature)
+{
+    const std::string_view description = descriptionOf(info, feature);
+    const std::string_view unit = unitOf(info, feature);
+    const ValueNames names = valueNames(info, feature);
+    if (description.empty() && unit.empty() && names.empty())
+        return;
+    out << '\n' << feature << (unit.empty() ? "" : ", in " + std::string(unit)) << '\n';
+    printText(out, description, textIndent);
+    std::vector<std::string> meanings;
+    for (const cimple::Value_Name& row : names)
+        meanings.push_back(std::string(row.values) + " " + row.name);
+    printText(out, joined(meanings), textIndent);
 }
 
 /// The type with the qualifiers that are not the direction.
@@ -110,15 +161,18 @@ void printMethod(std::ostream& out, const ClassInfo& info, const MethodInfo& met
     out << info.name << '.' << method.name;
     if (method.origin != &info)
         out << ", declared in " << method.origin->name;
-    out << "\n\n";
+    out << '\n';
+    printText(out, descriptionOf(info, method.name), "");
+    out << '\n';
     Table table({"PARAMETER", "DIRECTION", "TYPE"});
     for (const FeatureInfo& parameter : method.parameters)
         table.add({parameter.name, directionOf(parameter), qualifiedType(parameter)});
     table.add({returned, "", typeText(method.returnType)});
     table.print(out);
     for (const FeatureInfo& parameter : method.parameters)
-        printNames(out, parameter.name, valueNames(info, method.name, parameter.name));
-    printNames(out, returned, valueNames(info, method.name));
+        printMeaning(out, parameter.name, descriptionOf(info, method.name, parameter.name),
+                     unitOf(info, method.name, parameter.name), valueNames(info, method.name, parameter.name));
+    printMeaning(out, returned, {}, unitOf(info, method.name), valueNames(info, method.name));
 }
 
 void printClassTable(std::ostream& out, const ClassInfo& info)
@@ -127,7 +181,9 @@ void printClassTable(std::ostream& out, const ClassInfo& info)
     for (const ClassInfo* ancestor = info.superclass; ancestor; ancestor = ancestor->superclass)
         out << " : " << ancestor->name;
     const std::vector<std::string> qualifiers = qualifierNames(info.flags);
-    out << (qualifiers.empty() ? "\n\n" : "\n[" + joined(qualifiers) + "]\n\n");
+    out << (qualifiers.empty() ? "\n" : "\n[" + joined(qualifiers) + "]\n");
+    printText(out, descriptionOf(info), "");
+    out << '\n';
     Table properties({"PROPERTY", "TYPE", "QUALIFIERS", "DEFAULT", "DECLARED IN"});
     for (const FeatureInfo& property : info.properties)
     {
@@ -136,13 +192,17 @@ void printClassTable(std::ostream& out, const ClassInfo& info)
                         initial ? valueText(property.defaultValue) : "", property.origin->name});
     }
     properties.print(out);
-    if (info.methods.empty())
-        return;
-    out << '\n';
+    if (!info.methods.empty())
+        out << '\n';
     Table methods({"METHOD", "RETURNS", "PARAMETERS", "DECLARED IN"});
     for (const MethodInfo& method : info.methods)
         methods.add({method.name, typeText(method.returnType), parameterList(method), method.origin->name});
-    methods.print(out);
+    if (!info.methods.empty())
+        methods.print(out);
+    for (const FeatureInfo& property : info.properties)
+        printShortly(out, info, property.name);
+    for (const MethodInfo& method : info.methods)
+        printShortly(out, info, method.name);
 }
 
 } // namespace
@@ -201,7 +261,8 @@ void printJson(std::ostream& out, const Json& json)
     out << jsonText(json, true) << '\n';
 }
 
-void printObjects(std::ostream& out, Format format, const std::vector<Object>& objects, const PropertyList& columns)
+void printObjects(std::ostream& out, Format format, const ClassTable& classes, const std::vector<Object>& objects,
+                  const PropertyList& columns)
 {
     if (format == Format::json)
     {
@@ -213,7 +274,7 @@ void printObjects(std::ostream& out, Format format, const std::vector<Object>& o
     }
     if (format == Format::table && columns)
     {
-        printColumns(out, objects, *columns);
+        printColumns(out, classes, objects, *columns);
         return;
     }
     for (const Object& object : objects)
@@ -222,7 +283,7 @@ void printObjects(std::ostream& out, Format format, const std::vector<Object>& o
         if (format == Format::mof)
             out << mofText(object);
         else
-            printBlock(out, object);
+            printBlock(out, classes, object);
     }
 }
 
@@ -263,6 +324,7 @@ void printClasses(std::ostream& out, Format format, const std::vector<const Clas
         for (const ClassInfo* info : classes)
         {
             list.push_back({{"name", info->name},
+                            {"description", descriptionOf(*info)},
                             {"superclass", info->superclass ? Json(info->superclass->name) : Json(nullptr)},
                             {"association", info->isAssociation()},
                             {"keys", info->keys}});
@@ -299,7 +361,7 @@ void printMethods(std::ostream& out, Format format, const ClassInfo& info,
     for (const MethodInfo* method : methods)
     {
         if (format == Format::mof)
-            out << mofText(*method);
+            out << mofText(info, *method);
         else
             printMethod(out << (method == methods.front() ? "" : "\n"), info, *method);
     }
@@ -308,20 +370,18 @@ void printMethods(std::ostream& out, Format format, const ClassInfo& info,
 void printMethodReply(std::ostream& out, Format format, const ClassInfo& info, const MethodInfo& method,
                       const MethodReply& reply)
 {
-    const ValueNames names = valueNames(info, method.name);
     if (format == Format::json)
     {
-        const std::string_view meaning = valueName(names, reply.returnValue);
+        const std::string_view meaning = valueName(valueNames(info, method.name), reply.returnValue);
         printJson(out, {{"returnValue", toJson(reply.returnValue)},
                         {"meaning", meaning.empty() ? Json(nullptr) : Json(meaning)},
                         {"out", propertiesToJson(reply.out)}});
         return;
     }
     Table table({"PARAMETER", "VALUE"});
-    table.add({returned, oneLine(namedValueText(names, reply.returnValue))});
+    table.add({returned, shownText(&info, reply.returnValue, method.name)});
     for (const Property& parameter : reply.out)
-        table.add(
-            {parameter.name, oneLine(namedValueText(valueNames(info, method.name, parameter.name), parameter.value))});
+        table.add({parameter.name, shownText(&info, parameter.value, method.name, parameter.name)});
     table.print(out);
 }
 

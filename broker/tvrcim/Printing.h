@@ -38,9 +38,10 @@ std::string padded(const std::string& text, std::size_t width);
 /// terminal; bytes that are no UTF-8 too.
 std::string oneLine(const std::string& text);
 
-/// Instances: with `columns` a table of these properties, otherwise a block for each.
-void printObjects(std::ostream& out, Format format, const std::vector<broker::Object>& objects,
-                  const broker::PropertyList& columns);
+/// Instances: with `columns` a table of these properties, otherwise a block for each. People read the names of values
+/// and numbers in their units.
+void printObjects(std::ostream& out, Format format, const broker::ClassTable& classes,
+                  const std::vector<broker::Object>& objects, const broker::PropertyList& columns);
 /// One path a line, or a JSON list of them.
 void printPaths(std::ostream& out, Format format, const std::vector<broker::Path>& paths);
 void printClass(std::ostream& out, Format format, const broker::ClassInfo& info);

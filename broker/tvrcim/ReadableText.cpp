@@ -1,7 +1,9 @@
 #include "broker/tvrcim/ReadableText.h"
 
 #include "broker/tvrcim/Printing.h"
+#include "broker/values/ValueText.h"
 
+#include <algorithm>
 #include <array>
 #include <cstdio>
 #include <span>
@@ -31,16 +33,46 @@ constexpr std::array<ScaleRow, 7> sizes{{
 
 constexpr std::array<ScaleRow, 3> speeds{{{1'000'000'000, "Gbit/s"}, {1'000'000, "Mbit/s"}, {1, "bit/s"}}};
 
+struct UnitRow
+{
+    std::string_view unit; ///< as the schema has it
+    const char* text;
+    std::span<const ScaleRow> larger; ///< for numbers that are better read in larger units
+};
+
+constexpr UnitRow units[] = {
+    {"bit / second", "bit/s", speeds},
+    {"byte", "bytes", sizes},
+    {"percent", "%", {}},
+    {"degree celsius", "°C", {}},
+    {"volt", "V", {}},
+    {"ampere * 10^-3", "mA", {}},
+    {"watt * 10^-3", "mW", {}},
+    {"meter * 10^-9", "nm", {}},
+    {"meter", "m", {}},
+    {"second", "s", {}},
+    {"second * 10^-3", "ms", {}},
+};
+
+/// The largest unit that is not above the number.
+const ScaleRow& scaleOf(std::uint64_t number, std::span<const ScaleRow> rows)
+{
+    const auto row = std::find_if(rows.begin(), rows.end(), [&](const ScaleRow& r) { return number >= r.factor; });
+    return row == rows.end() ? rows.back() : *row;
+}
+
+/// True if the number has no more than one decimal in its largest unit.
+bool isRound(std::uint64_t number, std::span<const ScaleRow> rows)
+{
+    constexpr std::uint64_t tenths = 10;
+    const std::uint64_t factor = scaleOf(number, rows).factor;
+    return number % factor * tenths % factor == 0;
+}
+
 /// In the largest unit that is not above the number, with one decimal where that is not 0.
 std::string scaled(std::uint64_t number, std::span<const ScaleRow> rows)
 {
-    const ScaleRow* row = &rows.back();
-    for (const ScaleRow& larger : rows)
-        if (number >= larger.factor)
-        {
-            row = &larger;
-            break;
-        }
+    const ScaleRow* row = &scaleOf(number, rows);
     std::array<char, 32> text{};
     std::snprintf(text.data(), text.size(), "%.1f", static_cast<double>(number) / static_cast<double>(row->factor));
     std::string result = text.data();
@@ -59,6 +91,25 @@ std::string sizeText(std::uint64_t bytes)
 std::string speedText(std::uint64_t bitsPerSecond)
 {
     return bitsPerSecond == 0 ? std::string() : scaled(bitsPerSecond, speeds);
+}
+
+std::string measureText(std::string_view unit, const broker::Value& value)
+{
+    if (value.isNull())
+        return broker::valueText(value);
+    if (value.isArray())
+    {
+        std::string text;
+        for (const broker::Value& element : value.asList())
+            text += (text.empty() ? "" : ", ") + measureText(unit, element);
+        return "[" + text + "]";
+    }
+    const auto* row =
+        std::find_if(std::begin(units), std::end(units), [&](const UnitRow& r) { return r.unit == unit; });
+    const bool known = row != std::end(units);
+    if (known && !row->larger.empty() && broker::isInteger(value.type()) && isRound(value.asUnsigned(), row->larger))
+        return scaled(value.asUnsigned(), row->larger);
+    return broker::valueText(value) + " " + (known ? row->text : std::string(unit));
 }
 
 std::string countText(std::uint64_t count, const char* singular, const char* plural)

@@ -1,8 +1,11 @@
 // Numbers of instances as a person reads them.
 #pragma once
 
+#include "broker/values/Value.h"
+
 #include <cstdint>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace tvrcim
@@ -12,6 +15,9 @@ namespace tvrcim
 std::string sizeText(std::uint64_t bytes);
 /// "8 Gbit/s", "2.5 Gbit/s"; empty for 0, which is no speed.
 std::string speedText(std::uint64_t bitsPerSecond);
+/// A number in a unit of the schema ("bit / second"), or those of an array: "16 Gbit/s", "100 GiB", "38.5 °C". A larger
+/// unit is used where it says the number to the last digit.
+std::string measureText(std::string_view unit, const broker::Value& value);
 /// "1 card", "2 cards".
 std::string countText(std::uint64_t count, const char* singular, const char* plural);
 /// The name of a kind inside a sentence: "card" and "FC port".

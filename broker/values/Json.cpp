@@ -2,7 +2,7 @@
 
 #include "broker/values/PathText.h"
 #include "broker/values/QualifierText.h"
-#include "broker/values/ValueMap.h"
+#include "broker/values/SchemaText.h"
 
 #include <nlohmann/json.hpp>
 
@@ -29,10 +29,15 @@ Json featureToJson(const FeatureInfo& feature)
     return json;
 }
 
-/// The names of values, by the values; nothing where there are none.
-void addNames(Json& json, ValueNames names)
+/// What the schema says of a feature or a parameter: its description, its unit and the names of values, by the values.
+/// Nothing where it says nothing.
+void addTexts(Json& json, const ClassInfo& info, std::string_view feature, std::string_view parameter = {})
 {
-    for (const cimple::Value_Name& row : names)
+    if (const std::string_view description = descriptionOf(info, feature, parameter); !description.empty())
+        json["description"] = description;
+    if (const std::string_view unit = unitOf(info, feature, parameter); !unit.empty())
+        json["unit"] = unit;
+    for (const cimple::Value_Name& row : valueNames(info, feature, parameter))
         json["values"][row.values] = row.name;
 }
 
@@ -118,13 +123,13 @@ Json toJson(const ClassInfo& info, const MethodInfo& method)
 {
     Json parameters = Json::array();
     for (const FeatureInfo& parameter : method.parameters)
-        addNames(parameters.emplace_back(featureToJson(parameter)), valueNames(info, method.name, parameter.name));
+        addTexts(parameters.emplace_back(featureToJson(parameter)), info, method.name, parameter.name);
     Json json{{"name", method.name},
               {"returns", typeText(method.returnType)},
               {"parameters", std::move(parameters)},
               {"qualifiers", qualifierNames(method.flags)},
               {"origin", method.origin ? method.origin->name : ""}};
-    addNames(json, valueNames(info, method.name));
+    addTexts(json, info, method.name);
     return json;
 }
 
@@ -132,11 +137,12 @@ Json toJson(const ClassInfo& info)
 {
     Json properties = Json::array();
     for (const FeatureInfo& property : info.properties)
-        properties.push_back(featureToJson(property));
+        addTexts(properties.emplace_back(featureToJson(property)), info, property.name);
     Json methods = Json::array();
     for (const MethodInfo& method : info.methods)
         methods.push_back(toJson(info, method));
     return {{"name", info.name},
+            {"description", descriptionOf(info)},
             {"superclass", info.superclass ? Json(info.superclass->name) : Json(nullptr)},
             {"qualifiers", qualifierNames(info.flags)},
             {"keys", info.keys},

@@ -1,5 +1,6 @@
 #include "broker/values/QualifierText.h"
 
+#include "broker/values/SchemaText.h"
 #include "broker/values/ValueText.h"
 #include "runtime/meta/Meta.h"
 
@@ -14,12 +15,46 @@ namespace
 /// The flags below this bit say what kind a feature is.
 constexpr unsigned firstQualifier = 4;
 
-std::string qualifierList(std::uint32_t flags, const char* indent)
+/// A qualifier with a list of what the rows have.
+std::string listQualifier(const char* name, ValueNames rows, const char* cimple::Value_Name::*member)
 {
     std::string text;
+    for (const cimple::Value_Name& row : rows)
+        text += (text.empty() ? "" : ", ") + quoteText(row.*member);
+    return name + (" { " + text + " }");
+}
+
+std::string textQualifier(const char* name, std::string_view text)
+{
+    return name + (" ( " + quoteText(text) + " )");
+}
+
+/// The qualifiers that tell people what a feature or parameter is.
+std::vector<std::string> textQualifiers(const ClassInfo& info, std::string_view feature,
+                                        std::string_view parameter = {})
+{
+    std::vector<std::string> items;
+    if (const std::string_view description = descriptionOf(info, feature, parameter); !description.empty())
+        items.push_back(textQualifier("Description", description));
+    if (const std::string_view unit = unitOf(info, feature, parameter); !unit.empty())
+        items.push_back(textQualifier("PUnit", unit));
+    if (const ValueNames names = valueNames(info, feature, parameter); !names.empty())
+    {
+        items.push_back(listQualifier("ValueMap", names, &cimple::Value_Name::values));
+        items.push_back(listQualifier("Values", names, &cimple::Value_Name::name));
+    }
+    return items;
+}
+
+/// The flags in a line, and each text in a line of its own.
+std::string qualifierList(std::uint32_t flags, const std::vector<std::string>& texts, const std::string& indent)
+{
+    std::string list;
     for (const std::string& name : qualifierNames(flags))
-        text += (text.empty() ? "[" : ", ") + name;
-    return text.empty() ? std::string() : indent + text + "]\n";
+        list += (list.empty() ? "" : ", ") + name;
+    for (const std::string& text : texts)
+        list += (list.empty() ? "" : ",\n" + indent + " ") + text;
+    return list.empty() ? std::string() : indent + "[" + list + "]\n";
 }
 
 std::string declaration(const FeatureInfo& feature)
@@ -32,11 +67,12 @@ std::string declaration(const FeatureInfo& feature)
     return type + " " + feature.name + (array ? "[]" : "");
 }
 
-std::string propertyText(const FeatureInfo& property)
+std::string propertyText(const ClassInfo& info, const FeatureInfo& property)
 {
     const std::string initial =
         property.defaultValue.isNull() ? std::string() : " = " + mofValue(property.defaultValue);
-    return qualifierList(property.flags, "    ") + "    " + declaration(property) + initial + ";\n";
+    return qualifierList(property.flags, textQualifiers(info, property.name), "    ") + "    " + declaration(property) +
+           initial + ";\n";
 }
 
 } // namespace
@@ -58,29 +94,35 @@ std::vector<std::string> qualifierNames(std::uint32_t flags)
     return names;
 }
 
-std::string mofText(const MethodInfo& method)
+std::string mofText(const ClassInfo& info, const MethodInfo& method)
 {
-    std::string text =
-        qualifierList(method.flags, "    ") + "    " + typeText(method.returnType) + " " + method.name + "(";
+    std::string text = qualifierList(method.flags, textQualifiers(info, method.name), "    ") + "    " +
+                       typeText(method.returnType) + " " + method.name + "(";
     for (const FeatureInfo& parameter : method.parameters)
     {
-        std::string qualifiers = qualifierList(parameter.flags, "");
-        if (!qualifiers.empty())
+        std::string qualifiers =
+            qualifierList(parameter.flags, textQualifiers(info, method.name, parameter.name), "        ");
+        if (qualifiers.empty())
+            qualifiers = "        ";
+        else
             qualifiers.back() = ' ';
-        text += (&parameter == &method.parameters.front() ? "\n        " : ",\n        ") + qualifiers +
-                declaration(parameter);
+        text += (&parameter == &method.parameters.front() ? "\n" : ",\n") + qualifiers + declaration(parameter);
     }
     return text + ");\n";
 }
 
 std::string mofText(const ClassInfo& info)
 {
-    std::string text = qualifierList(info.flags, "") + "class " + info.name;
+    const std::string_view description = descriptionOf(info);
+    std::vector<std::string> texts;
+    if (!description.empty())
+        texts.push_back(textQualifier("Description", description));
+    std::string text = qualifierList(info.flags, texts, "") + "class " + info.name;
     text += (info.superclass ? " : " + info.superclass->name : "") + "\n{\n";
     for (const FeatureInfo& property : info.properties)
-        text += property.origin == &info ? propertyText(property) : "";
+        text += property.origin == &info ? propertyText(info, property) : "";
     for (const MethodInfo& method : info.methods)
-        text += method.origin == &info ? mofText(method) : "";
+        text += method.origin == &info ? mofText(info, method) : "";
     return text + "};\n";
 }
 

@@ -18,7 +18,7 @@ std::vector<std::string> qualifierNames(std::uint32_t flags);
 
 /// The class with its own features, as source text.
 std::string mofText(const ClassInfo& info);
-std::string mofText(const MethodInfo& method);
+std::string mofText(const ClassInfo& info, const MethodInfo& method);
 std::string mofText(const Object& object);
 
 } // namespace broker

@@ -38,16 +38,6 @@ bool covers(std::string_view values, std::uint64_t number)
 
 } // namespace
 
-ValueNames valueNames(const ClassInfo& info, std::string_view method, std::string_view parameter)
-{
-    const std::span maps(cimple::value_maps, cimple::num_value_maps);
-    for (const ClassInfo* owner = &info; owner; owner = owner->superclass)
-        for (const cimple::Value_Map& map : maps)
-            if (map.class_name == owner->name && sameName(map.method, method) && sameName(map.parameter, parameter))
-                return {map.names, map.num_names};
-    return {};
-}
-
 std::string_view valueName(ValueNames names, const Value& value)
 {
     if (value.isNull() || !isInteger(value.type()))
@@ -77,7 +67,7 @@ std::string namedValueText(ValueNames names, const Value& value)
         return "[" + text + "]";
     }
     const std::string_view name = valueName(names, value);
-    return valueText(value) + (name.empty() ? "" : " (" + std::string(name) + ")");
+    return name.empty() ? valueText(value) : std::string(name) + " (" + valueText(value) + ")";
 }
 
 } // namespace broker

@@ -1,0 +1,114 @@
+// What the schema tells people of classes, properties, methods and parameters, for programs that show it; the meta
+// tables have no qualifiers.
+#include "schemac/CppNames.h"
+#include "schemac/Output.h"
+#include "schemac/Types.h"
+
+namespace schemac
+{
+
+namespace
+{
+
+constexpr const char* header_text = R"(#pragma once
+
+#include <cstddef>
+
+namespace cimple
+{
+
+/// The name of a value, of a range such as "5..7" or "0x8000..", or of all others ("..").
+struct Value_Name
+{
+    const char* values;
+    const char* name;
+};
+
+/// What the declaration of a class, or of a feature in it, says beyond its type. Texts that it lacks are empty.
+struct Schema_Text
+{
+    const char* class_name;
+    const char* feature;   ///< a property, reference or method; empty for the class itself
+    const char* parameter; ///< empty for the feature itself; a method's names and unit are of what it returns
+    const char* description;
+    const char* unit; ///< in the notation of the qualifier PUnit
+    const Value_Name* names;
+    std::size_t num_names;
+};
+
+/// Those of a class stand together.
+extern const Schema_Text schema_texts[];
+extern const std::size_t num_schema_texts;
+
+} // namespace cimple
+)";
+
+/// The rows that a value map gives, a line each; empty without one.
+std::string rows_of(const Qualifiers& qualifiers)
+{
+    const Qualifier* map = find(qualifiers, "ValueMap");
+    const Qualifier* names = find(qualifiers, "Values");
+    if (!map || !names || !map->value || !names->value || map->value->items.size() != names->value->items.size())
+        return {};
+    std::string text;
+    for (std::size_t i = 0; i < map->value->items.size(); i++)
+        text += "    {" + as_string_literal(map->value->items[i].text) + ", " +
+                as_string_literal(names->value->items[i].text) + "},\n";
+    return text;
+}
+
+std::string literal_of(const Qualifiers& qualifiers, std::string_view name)
+{
+    const std::string* text = text_of(qualifiers, name);
+    return as_string_literal(text ? *text : std::string());
+}
+
+struct Tables
+{
+    std::string names;
+    std::string texts;
+
+    void add(const Class& c, const std::string& feature, const std::string& parameter, const Qualifiers& qualifiers)
+    {
+        const std::string rows = rows_of(qualifiers);
+        if (rows.empty() && !text_of(qualifiers, "Description") && !text_of(qualifiers, "PUnit"))
+            return;
+        const std::string name = c.name + "_" + feature + (parameter.empty() ? "" : "_" + parameter) + "_names";
+        if (!rows.empty())
+            names += "constexpr Value_Name " + name + "[] = {\n" + rows + "};\n";
+        texts += "    {" + as_string_literal(c.name) + ", " + as_string_literal(feature) + ", " +
+                 as_string_literal(parameter) + ", " + literal_of(qualifiers, "Description") + ", " +
+                 literal_of(qualifiers, "PUnit") + ", " +
+                 (rows.empty() ? "nullptr, 0" : name + ", std::size(" + name + ")") + "},\n";
+    }
+
+    void add(const Class& c)
+    {
+        add(c, "", "", c.qualifiers);
+        for (const Feature& feature : c.features)
+        {
+            add(c, feature.name, "", feature.qualifiers);
+            for (const Feature& parameter : feature.parameters)
+                add(c, feature.name, parameter.name, parameter.qualifiers);
+        }
+    }
+};
+
+} // namespace
+
+OutputFiles write_texts(const Schema& schema)
+{
+    Tables tables;
+    for (const Class& c : schema.classes)
+        tables.add(c);
+    return {{"schema/SchemaTexts.h", banner("the schema") + header_text},
+            {"schema/SchemaTexts.cpp",
+             banner("the schema") +
+                 "#include \"schema/SchemaTexts.h\"\n\n#include <iterator>\n\nnamespace cimple\n{\n\n"
+                 "namespace\n{\n\n" +
+                 tables.names + "\n} // namespace\n\nconst Schema_Text schema_texts[] = {\n" + tables.texts +
+                 "};\nconst std::size_t num_schema_texts = std::size(schema_texts);\n\n"
+                 "} // namespace cimple\n"}};
+}
+
+} // namespace schemac
