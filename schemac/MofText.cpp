@@ -9,7 +9,7 @@ namespace
 {
 
 constexpr std::size_t line_width = 110;
-constexpr std::size_t longest_on_line = 60; ///< of the text of a qualifier
+constexpr std::size_t longest_on_line = 80; ///< of the text of a qualifier
 
 /// Items with commas between them, in lines of bounded width that begin at `indent`. An item of several lines has
 /// them to itself.
