@@ -111,6 +111,7 @@ private:
             else
             {
                 check_override(c, feature, *member->feature);
+                check_kept_qualifiers(feature, member->declared_by);
                 *member = {&feature, &c};
             }
         }
@@ -142,6 +143,59 @@ private:
         }
         if (is_set(base.qualifiers, "Key") && !is_set(feature.qualifiers, "Key"))
             refuse(feature.place, what + " overrides a key and does not repeat Key");
+        for (const Feature& parameter : feature.parameters)
+            for (const Feature& overridden : base.parameters)
+                if (same_name(parameter.name, overridden.name) && !same_form(parameter, overridden))
+                    refuse(parameter.place,
+                           "parameter " + in_quotes(parameter.name) + " overrides one of another type");
+    }
+
+    static bool same_form(const Feature& a, const Feature& b)
+    {
+        return a.kind == b.kind && a.embedded == b.embedded && same_name(a.type, b.type) && a.subscript == b.subscript;
+    }
+
+    /// What a superclass says with a qualifier that cannot be overridden holds for subclasses; they may repeat it.
+    void check_kept_qualifiers(const Feature& feature, const Class* overridden_in)
+    {
+        for (const Qualifier& qualifier : feature.qualifiers)
+        {
+            const QualifierDeclaration* declaration = _schema.find_qualifier(qualifier.name);
+            const Qualifier* kept = nearest_qualifier(overridden_in, feature.name, qualifier.name);
+            if (declaration && has_flavor(*declaration, "DisableOverride") && kept &&
+                said_by(*declaration, qualifier) != said_by(*declaration, *kept))
+                refuse(feature.place,
+                       in_quotes(feature.name) + " changes the qualifier " + in_quotes(declaration->name));
+        }
+    }
+
+    /// The qualifier of a feature as the class or the nearest superclass that has it says it.
+    static const Qualifier* nearest_qualifier(const Class* owner, const std::string& feature_name,
+                                              const std::string& qualifier_name)
+    {
+        for (; owner; owner = owner->superclass)
+            for (const Feature& feature : owner->features)
+                if (same_name(feature.name, feature_name))
+                    if (const Qualifier* qualifier = find(feature.qualifiers, qualifier_name))
+                        return qualifier;
+        return nullptr;
+    }
+
+    static bool has_flavor(const QualifierDeclaration& declaration, std::string_view flavor)
+    {
+        return std::any_of(declaration.flavors.begin(), declaration.flavors.end(),
+                           [&](const std::string& other) { return same_name(other, flavor); });
+    }
+
+    /// The texts of the qualifier's value; a boolean without value is true.
+    static std::vector<std::string> said_by(const QualifierDeclaration& declaration, const Qualifier& qualifier)
+    {
+        if (!qualifier.value)
+            return {same_name(declaration.type, "boolean") ? "true" : ""};
+        std::vector<std::string> texts;
+        for (const Literal& item : qualifier.value->items)
+            texts.push_back(item.text);
+        return texts;
     }
 
     /// True if the first class is the second or derives from it, or if one is unknown, which is refused apart.
@@ -334,6 +388,8 @@ std::vector<std::string> check(Schema& schema)
     std::vector<std::string> refusals = check_qualifiers(schema);
     const std::vector<std::string> others = Check(schema).run();
     refusals.insert(refusals.end(), others.begin(), others.end());
+    const std::vector<std::string> maps = check_value_maps(schema);
+    refusals.insert(refusals.end(), maps.begin(), maps.end());
     return refusals;
 }
 

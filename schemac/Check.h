@@ -16,4 +16,8 @@ std::vector<std::string> check(Schema& schema);
 /// The part that concerns qualifiers: declared, allowed where they stand, each once and with a fitting value.
 std::vector<std::string> check_qualifiers(const Schema& schema);
 
+/// The part that concerns what people are shown of values: a name for each value or bit, values of the type, each once,
+/// and units of numbers alone.
+std::vector<std::string> check_value_maps(const Schema& schema);
+
 } // namespace schemac

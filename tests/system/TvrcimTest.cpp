@@ -583,7 +583,7 @@ TEST(TvrcimDiag, TellsHowATestEnded)
          {"TVR:FCHBA Echo Test of 1000027A51320602  FAILED\n", ", exception\n", "  state             failed\n",
           "1 failed\n", "  suggested         a) Verify end devices b) Verify switch configuration"},
          "the test did not pass"},
-        {"1000027A51320601 echo", 4, {}, "RunDiagnosticService returned 5 (Invalid Parameter)"},
+        {"1000027A51320601 echo", 4, {}, "RunDiagnosticService returned Invalid Parameter (5)"},
         {"1000027A51320604 dport", 4, {}, "RunDiagnosticService returned "},
         {"1000027A51320605 self", 4, {}, "RunDiagnosticService made no job"},
         {"1000027A51320601 e", 2, {}, "TEST: 'e' may be echo, external-loopback"},

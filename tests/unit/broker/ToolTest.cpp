@@ -270,7 +270,7 @@ TEST(ValueMaps, NameValuesRangesAndAllOthers)
     EXPECT_EQ(valueName(std::span(rows).subspan(1), Value::uint32(1)), "");
     EXPECT_EQ(valueName(rows, Value::null(CMPI_uint32)), "");
     EXPECT_EQ(namedValueText(rows, Value::array(CMPI_uint16, {Value::uint16(0), Value::null(CMPI_uint16)})),
-              "[0 (Done), null]");
+              "[Done (0), null]");
 }
 
 TEST(Printing, ControlCharactersStayOnTheirLine)

@@ -131,23 +131,25 @@ TEST(Tables, EveryClassStandsInOneChunk)
     }
 }
 
-TEST(ValueMaps, AreThoseOfMethodsAndParameters)
+TEST(Texts, AreThoseOfClassesFeaturesAndParameters)
 {
-    const OutputFiles files = write_value_maps(
-        checked("Qualifier Values : string[], Scope(property, method, parameter);\n"
-                "class T_Pump : T_Disk {\n"
+    const OutputFiles files = write_texts(
+        checked("[Description ( \"Moves\\nwater.\" )] class T_Pump : T_Disk {\n"
                 "   [ValueMap { \"0\", \"..\" }, Values { \"Done\", \"Not \\\"done\\\"\" }]\n"
                 "   uint32 Run([In, ValueMap { \"1..\" }, Values { \"Any\" }] uint16 Level, [In] uint16 Time);\n"
-                "   [ValueMap { \"2\" }, Values { \"of a property\" }] uint16 Speed;\n"
+                "   [PUnit ( \"meter\" ), Description ( \"Lift.\" )] uint16 Height;\n"
+                "   [ValueMap { \"2\" }] uint16 Unnamed;\n"
                 "};\n"));
-    const std::string& text = text_of_file(files, "schema/ValueMaps.cpp");
-    EXPECT_THAT(text, HasSubstr("constexpr Value_Name T_Pump_Run_method_names[] = {\n    {\"0\", \"Done\"},\n"
+    const std::string& text = text_of_file(files, "schema/SchemaTexts.cpp");
+    EXPECT_THAT(text, HasSubstr("constexpr Value_Name T_Pump_Run_names[] = {\n    {\"0\", \"Done\"},\n"
                                 "    {\"..\", \"Not \\\"done\\\"\"},\n};\n"));
-    EXPECT_THAT(text, HasSubstr("const Value_Map value_maps[] = {\n"
-                                "    {\"T_Pump\", \"Run\", \"\", T_Pump_Run_method_names, "
-                                "std::size(T_Pump_Run_method_names)},\n"
-                                "    {\"T_Pump\", \"Run\", \"Level\", T_Pump_Run_method_Level_names, "
-                                "std::size(T_Pump_Run_method_Level_names)},\n};\n"));
+    EXPECT_THAT(text, HasSubstr("const Schema_Text schema_texts[] = {\n"
+                                "    {\"T_Pump\", \"\", \"\", \"Moves\\nwater.\", \"\", nullptr, 0},\n"
+                                "    {\"T_Pump\", \"Run\", \"\", \"\", \"\", T_Pump_Run_names, "
+                                "std::size(T_Pump_Run_names)},\n"
+                                "    {\"T_Pump\", \"Run\", \"Level\", \"\", \"\", T_Pump_Run_Level_names, "
+                                "std::size(T_Pump_Run_Level_names)},\n"
+                                "    {\"T_Pump\", \"Height\", \"\", \"Lift.\", \"meter\", nullptr, 0},\n};\n"));
 }
 
 TEST(ServerFiles, ClassesStandAfterWhatTheyName)

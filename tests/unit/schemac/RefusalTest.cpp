@@ -123,6 +123,14 @@ const Row features[] = {
      "2: \"Dependent\" overrides a reference to \"T_Disk\" with a class that does not derive from it"},
     {"OverrideDropsTheKey", "class T_A : T_Device { [Override ( \"InstanceID\" )] string InstanceID; };",
      "1: \"InstanceID\" overrides a key and does not repeat Key"},
+    {"OverrideChangesAFixedQualifier",
+     "class T_A : T_Element { [Octetstring] uint8 Bytes[]; };\n"
+     "class T_B : T_A { [Override ( \"Bytes\" )] uint8 Bytes[]; };\n"
+     "class T_C : T_B { [Override ( \"Bytes\" ), Octetstring ( false )] uint8 Bytes[]; };",
+     "3: \"Bytes\" changes the qualifier \"Octetstring\""},
+    {"OverrideChangesAParameter",
+     "class T_A : T_Element { [Override ( \"Start\" )] uint32 Start([In] string Level); };",
+     "1: parameter \"Level\" overrides one of another type"},
     {"WordOfCpp", "class T_A { string default; };", "1: \"default\" is a reserved name"},
     {"NameOfTheRecordHead", "class T_A { string __refs; };", "1: \"__refs\" is a reserved name"},
     {"UnknownType", "class T_A { text A; };", "1: property \"A\" has the unknown type \"text\""},
@@ -159,6 +167,21 @@ const Row methods[] = {
      "1: reference \"A\" is of the unknown class \"T_None\""},
 };
 INSTANTIATE_TEST_SUITE_P(Methods, Refusal, testing::ValuesIn(methods), row_name);
+
+const Row texts[] = {
+    {"FewerNamesThanValues", "class T_A { [ValueMap { \"1\", \"2\" },\n Values { \"One\" }] uint8 A; };",
+     "2: qualifier \"Values\" of \"A\" has not as many texts as \"ValueMap\""},
+    {"MoreNamesThanBits", "class T_A { [BitMap { \"1\" }, BitValues { \"One\", \"Two\" }] uint8 A; };",
+     "1: qualifier \"BitValues\" of \"A\" has not as many texts as \"BitMap\""},
+    {"ValueOutsideOfTheType", "class T_A { uint32 M([In, ValueMap { \"255\", \"..\", \"256..\" }] uint8 A); };",
+     "1: qualifier \"ValueMap\" of \"A\" has \"256..\", which is no value of its type"},
+    {"ValueThatIsNoNumber", "class T_A { [ValueMap { \"0x10..0x1F\", \"One\" }] uint32 M(); };",
+     "1: qualifier \"ValueMap\" of \"M\" has \"One\", which is no value of its type"},
+    {"ValueTwice", "class T_A { [ValueMap { \"OK\", \"Error\", \"OK\" }] string A; };",
+     "1: qualifier \"ValueMap\" of \"A\" has \"OK\" twice"},
+    {"UnitOfAText", "class T_A { [PUnit ( \"byte\" )] string A; };", "1: qualifier \"PUnit\" of \"A\" is of no number"},
+};
+INSTANTIATE_TEST_SUITE_P(Texts, Refusal, testing::ValuesIn(texts), row_name);
 
 /// Defaults that are no value of their type; all give the same refusal.
 TEST(Defaults, ValuesOfAnotherTypeOrRangeAreRefused)
