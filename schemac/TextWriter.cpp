@@ -34,6 +34,8 @@ struct Schema_Text
     const char* unit; ///< in the notation of the qualifier PUnit
     const Value_Name* names;
     std::size_t num_names;
+    const Value_Name* bits; ///< names of bits, by their numbers
+    std::size_t num_bits;
 };
 
 /// Those of a class stand together.
@@ -43,11 +45,11 @@ extern const std::size_t num_schema_texts;
 } // namespace cimple
 )";
 
-/// The rows that a value map gives, a line each; empty without one.
-std::string rows_of(const Qualifiers& qualifiers)
+/// The rows that a map of values or bits gives, a line each; empty without one.
+std::string rows_of(const Qualifiers& qualifiers, const char* map_name, const char* names_name)
 {
-    const Qualifier* map = find(qualifiers, "ValueMap");
-    const Qualifier* names = find(qualifiers, "Values");
+    const Qualifier* map = find(qualifiers, map_name);
+    const Qualifier* names = find(qualifiers, names_name);
     if (!map || !names || !map->value || !names->value || map->value->items.size() != names->value->items.size())
         return {};
     std::string text;
@@ -70,16 +72,24 @@ struct Tables
 
     void add(const Class& c, const std::string& feature, const std::string& parameter, const Qualifiers& qualifiers)
     {
-        const std::string rows = rows_of(qualifiers);
-        if (rows.empty() && !text_of(qualifiers, "Description") && !text_of(qualifiers, "PUnit"))
+        const std::string rows = rows_of(qualifiers, "ValueMap", "Values");
+        const std::string bits = rows_of(qualifiers, "BitMap", "BitValues");
+        if (rows.empty() && bits.empty() && !text_of(qualifiers, "Description") && !text_of(qualifiers, "PUnit"))
             return;
-        const std::string name = c.name + "_" + feature + (parameter.empty() ? "" : "_" + parameter) + "_names";
-        if (!rows.empty())
-            names += "constexpr Value_Name " + name + "[] = {\n" + rows + "};\n";
+        const std::string name = c.name + "_" + feature + (parameter.empty() ? "" : "_" + parameter);
         texts += "    {" + as_string_literal(c.name) + ", " + as_string_literal(feature) + ", " +
                  as_string_literal(parameter) + ", " + literal_of(qualifiers, "Description") + ", " +
-                 literal_of(qualifiers, "PUnit") + ", " +
-                 (rows.empty() ? "nullptr, 0" : name + ", std::size(" + name + ")") + "},\n";
+                 literal_of(qualifiers, "PUnit") + ", " + add_names(name + "_names", rows) + ", " +
+                 add_names(name + "_bits", bits) + "},\n";
+    }
+
+    /// A table of these rows, as a pointer and a number; none if there are no rows.
+    std::string add_names(const std::string& name, const std::string& rows)
+    {
+        if (rows.empty())
+            return "nullptr, 0";
+        names += "constexpr Value_Name " + name + "[] = {\n" + rows + "};\n";
+        return name + ", std::size(" + name + ")";
     }
 
     void add(const Class& c)

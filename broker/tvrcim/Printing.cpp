@@ -39,13 +39,14 @@ bool isNumber(CMPIType type)
 std::string shownText(const ClassInfo* info, const Value& value, std::string_view feature,
                       std::string_view parameter = {})
 {
-    if (info && isNumber(value.type()))
-    {
-        const ValueNames names = valueNames(*info, feature, parameter);
-        const std::string_view unit = names.empty() ? unitOf(*info, feature, parameter) : std::string_view();
-        return unit.empty() ? namedValueText(names, value) : measureText(unit, value);
-    }
-    return oneLine(valueText(value));
+    if (!info || !isNumber(value.type()))
+        return oneLine(valueText(value));
+    if (const ValueNames names = valueNames(*info, feature, parameter); !names.empty())
+        return namedValueText(names, value);
+    if (const ValueNames bits = bitNames(*info, feature, parameter); !bits.empty())
+        return namedBitsText(bits, value);
+    const std::string_view unit = unitOf(*info, feature, parameter);
+    return unit.empty() ? valueText(value) : measureText(unit, value);
 }
 
 void printBlock(std::ostream& out, const ClassTable& classes, const Object& object)
@@ -117,35 +118,55 @@ void printText(std::ostream& out, std::string_view text, const std::string& inde
         out << indent << line << '\n';
 }
 
-/// What the schema says of a parameter or of what a method returns, with a line for each value that has a name.
-void printMeaning(std::ostream& out, const std::string& of, std::string_view description, std::string_view unit,
-                  ValueNames names)
+/// What the schema says of a property, a method or a parameter.
+struct Meaning
 {
-    if (description.empty() && unit.empty() && names.empty())
-        return;
-    out << '\n' << of << (unit.empty() ? "" : ", in " + std::string(unit)) << '\n';
-    printText(out, description, textIndent);
-    std::size_t width = 0;
-    for (const cimple::Value_Name& row : names)
-        width = std::max(width, std::string_view(row.values).size());
-    for (const cimple::Value_Name& row : names)
-        out << textIndent << padded(row.values, width) << "  " << row.name << '\n';
+    Meaning(const ClassInfo& info, std::string_view feature, std::string_view parameter = {})
+        : description(descriptionOf(info, feature, parameter)), unit(unitOf(info, feature, parameter))
+    {
+        for (const cimple::Value_Name& row : valueNames(info, feature, parameter))
+            values.emplace_back(row.values, row.name);
+        for (const cimple::Value_Name& row : bitNames(info, feature, parameter))
+            values.emplace_back("bit " + std::string(row.values), row.name);
+    }
+
+    std::string_view description;
+    std::string_view unit;
+    std::vector<std::pair<std::string, std::string>> values; ///< with their names
+};
+
+/// The name and the unit on a line of their own; false for a meaning that says nothing.
+bool printHeading(std::ostream& out, const std::string& of, const Meaning& meaning)
+{
+    if (meaning.description.empty() && meaning.unit.empty() && meaning.values.empty())
+        return false;
+    out << '\n' << of << (meaning.unit.empty() ? "" : ", in " + std::string(meaning.unit)) << '\n';
+    return true;
 }
 
-/// What the schema says of a property or method of a class, in few lines.
-void printShortly(std::ostream& out, const ClassInfo& info, const std::string& feature)
+/// With a line for each value that has a name.
+void printMeaning(std::ostream& out, const std::string& of, const Meaning& meaning)
 {
-    const std::string_view description = descriptionOf(info, feature);
-    const std::string_view unit = unitOf(info, feature);
-    const ValueNames names = valueNames(info, feature);
-    if (description.empty() && unit.empty() && names.empty())
+    if (!printHeading(out, of, meaning))
         return;
-    out << '\n' << feature << (unit.empty() ? "" : ", in " + std::string(unit)) << '\n';
-    printText(out, description, textIndent);
-    std::vector<std::string> meanings;
-    for (const cimple::Value_Name& row : names)
-        meanings.push_back(std::string(row.values) + " " + row.name);
-    printText(out, joined(meanings), textIndent);
+    printText(out, meaning.description, textIndent);
+    std::size_t width = 0;
+    for (const auto& [values, name] : meaning.values)
+        width = std::max(width, values.size());
+    for (const auto& [values, name] : meaning.values)
+        out << textIndent << padded(values, width) << "  " << name << '\n';
+}
+
+/// In few lines.
+void printShortly(std::ostream& out, const std::string& of, const Meaning& meaning)
+{
+    if (!printHeading(out, of, meaning))
+        return;
+    printText(out, meaning.description, textIndent);
+    std::vector<std::string> items;
+    for (const auto& [values, name] : meaning.values)
+        items.push_back(values == name ? name : values + " " + name);
+    printText(out, joined(items), textIndent);
 }
 
 /// The type with the qualifiers that are not the direction.
@@ -170,9 +191,10 @@ void printMethod(std::ostream& out, const ClassInfo& info, const MethodInfo& met
     table.add({returned, "", typeText(method.returnType)});
     table.print(out);
     for (const FeatureInfo& parameter : method.parameters)
-        printMeaning(out, parameter.name, descriptionOf(info, method.name, parameter.name),
-                     unitOf(info, method.name, parameter.name), valueNames(info, method.name, parameter.name));
-    printMeaning(out, returned, {}, unitOf(info, method.name), valueNames(info, method.name));
+        printMeaning(out, parameter.name, {info, method.name, parameter.name});
+    Meaning result(info, method.name);
+    result.description = {}; // stands above
+    printMeaning(out, returned, result);
 }
 
 void printClassTable(std::ostream& out, const ClassInfo& info)
@@ -200,9 +222,9 @@ void printClassTable(std::ostream& out, const ClassInfo& info)
     if (!info.methods.empty())
         methods.print(out);
     for (const FeatureInfo& property : info.properties)
-        printShortly(out, info, property.name);
+        printShortly(out, property.name, {info, property.name});
     for (const MethodInfo& method : info.methods)
-        printShortly(out, info, method.name);
+        printShortly(out, method.name, {info, method.name});
 }
 
 } // namespace

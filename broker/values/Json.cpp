@@ -29,7 +29,8 @@ Json featureToJson(const FeatureInfo& feature)
     return json;
 }
 
-/// What the schema says of a feature or a parameter: its description, its unit and the names of values, by the values.
+/// What the schema says of a feature or a parameter: its description, its unit, and the names of values
+/// and of bits, by their numbers.
 /// Nothing where it says nothing.
 void addTexts(Json& json, const ClassInfo& info, std::string_view feature, std::string_view parameter = {})
 {
@@ -39,6 +40,8 @@ void addTexts(Json& json, const ClassInfo& info, std::string_view feature, std::
         json["unit"] = unit;
     for (const cimple::Value_Name& row : valueNames(info, feature, parameter))
         json["values"][row.values] = row.name;
+    for (const cimple::Value_Name& row : bitNames(info, feature, parameter))
+        json["bits"][row.values] = row.name;
 }
 
 [[noreturn]] void refuse(const Json& json, CMPIType type)

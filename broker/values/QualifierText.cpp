@@ -43,6 +43,11 @@ std::vector<std::string> textQualifiers(const ClassInfo& info, std::string_view 
         items.push_back(listQualifier("ValueMap", names, &cimple::Value_Name::values));
         items.push_back(listQualifier("Values", names, &cimple::Value_Name::name));
     }
+    if (const ValueNames bits = bitNames(info, feature, parameter); !bits.empty())
+    {
+        items.push_back(listQualifier("BitMap", bits, &cimple::Value_Name::values));
+        items.push_back(listQualifier("BitValues", bits, &cimple::Value_Name::name));
+    }
     return items;
 }
 

@@ -70,4 +70,10 @@ ValueNames valueNames(const ClassInfo& info, std::string_view feature, std::stri
                    [](const cimple::Schema_Text& text) { return ValueNames(text.names, text.num_names); });
 }
 
+ValueNames bitNames(const ClassInfo& info, std::string_view feature, std::string_view parameter)
+{
+    return nearest(info, feature, parameter,
+                   [](const cimple::Schema_Text& text) { return ValueNames(text.bits, text.num_bits); });
+}
+
 } // namespace broker

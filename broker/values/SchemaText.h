@@ -23,5 +23,7 @@ std::string_view descriptionOf(const ClassInfo& info, std::string_view feature, 
 /// The unit of a number, in the notation of the qualifier PUnit: "bit / second".
 std::string_view unitOf(const ClassInfo& info, std::string_view feature, std::string_view parameter = {});
 ValueNames valueNames(const ClassInfo& info, std::string_view feature, std::string_view parameter = {});
+/// The names of bits, with their numbers.
+ValueNames bitNames(const ClassInfo& info, std::string_view feature, std::string_view parameter = {});
 
 } // namespace broker

@@ -36,6 +36,30 @@ bool covers(std::string_view values, std::uint64_t number)
            number <= numberIn(values.substr(mark + rangeMark.size()), highest);
 }
 
+constexpr std::uint64_t numBits = std::numeric_limits<std::uint64_t>::digits;
+
+bool hasBit(const Value& value, std::uint64_t bit)
+{
+    return isInteger(value.type()) && bit < numBits && (value.asUnsigned() >> bit & 1U) != 0;
+}
+
+/// The value, or the values of an array, each behind what `name` makes of it unless that is nothing or the same.
+template <class Name> std::string textOfEach(const Value& value, Name name)
+{
+    if (value.isNull())
+        return valueText(value);
+    if (value.isArray())
+    {
+        std::string text;
+        for (const Value& element : value.asList())
+            text += (text.empty() ? "" : ", ") + textOfEach(element, name);
+        return "[" + text + "]";
+    }
+    const std::string number = valueText(value);
+    const std::string named = name(value);
+    return named.empty() || named == number ? number : named + " (" + number + ")";
+}
+
 } // namespace
 
 std::string_view valueName(ValueNames names, const Value& value)
@@ -57,17 +81,20 @@ std::string_view valueName(ValueNames names, const Value& value)
 
 std::string namedValueText(ValueNames names, const Value& value)
 {
-    if (names.empty() || value.isNull())
-        return valueText(value);
-    if (value.isArray())
-    {
-        std::string text;
-        for (const Value& element : value.asList())
-            text += (text.empty() ? "" : ", ") + namedValueText(names, element);
-        return "[" + text + "]";
-    }
-    const std::string_view name = valueName(names, value);
-    return name.empty() ? valueText(value) : std::string(name) + " (" + valueText(value) + ")";
+    return textOfEach(value, [names](const Value& element) { return std::string(valueName(names, element)); });
+}
+
+std::string namedBitsText(ValueNames bits, const Value& value)
+{
+    return textOfEach(value,
+                      [bits](const Value& element)
+                      {
+                          std::string names;
+                          for (const cimple::Value_Name& row : bits)
+                              if (hasBit(element, numberIn(row.values, numBits)))
+                                  names += (names.empty() ? "" : ", ") + std::string(row.name);
+                          return names;
+                      });
 }
 
 } // namespace broker

@@ -139,17 +139,20 @@ TEST(Texts, AreThoseOfClassesFeaturesAndParameters)
                 "   uint32 Run([In, ValueMap { \"1..\" }, Values { \"Any\" }] uint16 Level, [In] uint16 Time);\n"
                 "   [PUnit ( \"meter\" ), Description ( \"Lift.\" )] uint16 Height;\n"
                 "   [ValueMap { \"2\" }] uint16 Unnamed;\n"
+                "   [BitMap { \"2\" }, BitValues { \"Dry\" }] uint16 Faults;\n"
                 "};\n"));
     const std::string& text = text_of_file(files, "schema/SchemaTexts.cpp");
     EXPECT_THAT(text, HasSubstr("constexpr Value_Name T_Pump_Run_names[] = {\n    {\"0\", \"Done\"},\n"
                                 "    {\"..\", \"Not \\\"done\\\"\"},\n};\n"));
     EXPECT_THAT(text, HasSubstr("const Schema_Text schema_texts[] = {\n"
-                                "    {\"T_Pump\", \"\", \"\", \"Moves\\nwater.\", \"\", nullptr, 0},\n"
+                                "    {\"T_Pump\", \"\", \"\", \"Moves\\nwater.\", \"\", nullptr, 0, nullptr, 0},\n"
                                 "    {\"T_Pump\", \"Run\", \"\", \"\", \"\", T_Pump_Run_names, "
-                                "std::size(T_Pump_Run_names)},\n"
+                                "std::size(T_Pump_Run_names), nullptr, 0},\n"
                                 "    {\"T_Pump\", \"Run\", \"Level\", \"\", \"\", T_Pump_Run_Level_names, "
-                                "std::size(T_Pump_Run_Level_names)},\n"
-                                "    {\"T_Pump\", \"Height\", \"\", \"Lift.\", \"meter\", nullptr, 0},\n};\n"));
+                                "std::size(T_Pump_Run_Level_names), nullptr, 0},\n"
+                                "    {\"T_Pump\", \"Height\", \"\", \"Lift.\", \"meter\", nullptr, 0, nullptr, 0},\n"
+                                "    {\"T_Pump\", \"Faults\", \"\", \"\", \"\", nullptr, 0, T_Pump_Faults_bits, "
+                                "std::size(T_Pump_Faults_bits)},\n};\n"));
 }
 
 TEST(ServerFiles, ClassesStandAfterWhatTheyName)
