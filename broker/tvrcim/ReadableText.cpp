@@ -107,7 +107,9 @@ std::string measureText(std::string_view unit, const broker::Value& value)
     const auto* row =
         std::find_if(std::begin(units), std::end(units), [&](const UnitRow& r) { return r.unit == unit; });
     const bool known = row != std::end(units);
-    if (known && !row->larger.empty() && broker::isInteger(value.type()) && isRound(value.asUnsigned(), row->larger))
+    const bool scalable =
+        known && !row->larger.empty() && broker::isInteger(value.type()) && !broker::isSignedInteger(value.type());
+    if (scalable && isRound(value.asUnsigned(), row->larger))
         return scaled(value.asUnsigned(), row->larger);
     return broker::valueText(value) + " " + (known ? row->text : std::string(unit));
 }

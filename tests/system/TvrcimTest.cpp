@@ -306,6 +306,42 @@ TEST(Tvrcim, ShowsTheLogs)
     std::remove(none.c_str());
 }
 
+/// People read names and units, programs numbers.
+TEST(Tvrcim, ReadsNumbersAsTheSchemaNamesThem)
+{
+    const struct
+    {
+        const char* arguments;
+        const char* expected;
+    } rows[] = {
+        {"enum TVRHBA_FCPort --properties DeviceID,OperationalStatus,Speed,PortType,SupportedCOS,FECState",
+         "1000027A51160210  [OK (2)]           8 Gbit/s   N (10)       [2, 3]        Not Supported (2)\n"},
+        {"enum TVRHBA_Transceiver --properties Connector,WaveLength,Temperature,TxBiasCurrent,Vcc",
+         "LC (7)     850 nm      38.5 °C      6.82 mA        3.295 V\n"},
+        {"enum TVRHBA_StorageVolume --properties BlockSize,Capacity,DeviceType",
+         "512 bytes  100 GiB   Direct access block device (0)\n"},
+        {"enum TVRHBA_FCPortStatistics --properties BytesTransmitted,LinkFailures", "1608754176 bytes  1\n"},
+        {"call TVRHBA_FCHBAWWNService GetWWNCapability Target=TVRHBA_FCPort.DeviceID=1000027A51160210",
+         "WWNCapability  Non-volatile names can be changed, Volatile names can be changed, A change needs a reset of "
+         "the "
+         "adapter (8204)\n"},
+        {"class TVRHBA_Chip", "\nBoardTemperature, in degree celsius\n    The temperature of the board; null where no "
+                              "sensor reports one.\n"},
+        {"class TVRHBA_Chip", "\nRemovalConditions\n    0 Unknown, 2 Not Applicable,"},
+        {"class TVRHBA_DumpData --format mof",
+         "    [Read, Write,\n     Description ( \"How many dump files are kept, 1 to 20; older ones go.\" )]\n"
+         "    uint32 RetentionCount;\n"},
+    };
+    for (const auto& row : rows)
+        EXPECT_THAT(tvrcim(row.arguments).out, HasSubstr(row.expected)) << row.arguments;
+    const nlohmann::json port = json("enum TVRHBA_FCPort")[0]["properties"];
+    EXPECT_EQ(port["Speed"], 8'000'000'000);
+    EXPECT_EQ(port["OperationalStatus"], nlohmann::json({2}));
+    for (const nlohmann::json& property : json("class TVRHBA_VirtualFCPort")["properties"])
+        if (property["name"] == "Speed")
+            EXPECT_EQ(property["unit"], "bit / second");
+}
+
 TEST(Tvrcim, KnowsAllClasses)
 {
     EXPECT_EQ(json("classes").size(), 159u);

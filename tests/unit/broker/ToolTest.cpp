@@ -4,6 +4,7 @@
 #include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/CommandLine.h"
 #include "broker/tvrcim/Printing.h"
+#include "broker/tvrcim/ReadableText.h"
 #include "broker/values/ValueMap.h"
 
 #include <gmock/gmock.h>
@@ -271,6 +272,62 @@ TEST(ValueMaps, NameValuesRangesAndAllOthers)
     EXPECT_EQ(valueName(rows, Value::null(CMPI_uint32)), "");
     EXPECT_EQ(namedValueText(rows, Value::array(CMPI_uint16, {Value::uint16(0), Value::null(CMPI_uint16)})),
               "[Done (0), null]");
+    const cimple::Value_Name numbers[] = {{"2", "2"}, {"3", "Third"}};
+    EXPECT_EQ(namedValueText(numbers, Value::array(CMPI_uint16, {Value::uint16(2), Value::uint16(3)})),
+              "[2, Third (3)]");
+    const cimple::Value_Name bits[] = {{"0", "Low"}, {"4", "High"}, {"64", "None"}};
+    EXPECT_EQ(namedBitsText(bits, Value::array(CMPI_uint8, {Value::uint8(17), Value::uint8(2), Value::uint8(0)})),
+              "[Low, High (17), 2, 0]");
+}
+
+/// A larger unit is used only where it loses nothing.
+TEST(Measures, HaveTheirUnit)
+{
+    const struct
+    {
+        const char* unit;
+        Value value;
+        const char* text;
+    } expected[] = {
+        {"bit / second", Value::uint64(16'000'000'000), "16 Gbit/s"},
+        {"bit / second", Value::uint64(2'500'000'000), "2.5 Gbit/s"},
+        {"bit / second", Value::uint64(1'062'500'000), "1062500000 bit/s"},
+        {"bit / second", Value::uint64(0), "0 bit/s"},
+        {"byte", Value::uint64(1536), "1.5 KiB"},
+        {"byte", Value::uint64(1537), "1537 bytes"},
+        {"byte", Value::uint64(~0ULL), "18446744073709551615 bytes"},
+        {"byte", Value::sint64(-1), "-1 bytes"},
+        {"byte", Value::array(CMPI_uint32, {Value::uint32(8), Value::uint32(1024)}), "[8 bytes, 1 KiB]"},
+        {"degree celsius", Value::real32(-3.5F), "-3.5 °C"},
+        {"hour", Value::uint64(7), "7 hour"},
+        {"hour", Value::null(CMPI_uint64), "null"},
+    };
+    for (const auto& row : expected)
+        EXPECT_EQ(measureText(row.unit, row.value), row.text);
+}
+
+/// What a class says is looked for from the class upwards, and of the class itself in the class alone.
+TEST(SchemaTexts, AreThoseOfTheNearestDeclaration)
+{
+    ClassInfo network;
+    network.name = "CIM_NetworkPort";
+    ClassInfo port;
+    port.name = "TVRHBA_FCPort";
+    port.superclass = &network;
+    ClassInfo special;
+    special.name = "T_SpecialPort";
+    special.superclass = &port;
+    EXPECT_EQ(unitOf(special, "maxspeed"), "");
+    EXPECT_EQ(unitOf(special, "speed"), "bit / second");
+    EXPECT_EQ(valueName(valueNames(special, "LocationIndicator"), Value::uint16(3)), "Off");
+    EXPECT_EQ(descriptionOf(special, "FCID"), "The address that the fabric gave the port; 0 without a fabric.");
+    EXPECT_NE(descriptionOf(port), "");
+    EXPECT_EQ(descriptionOf(special), "");
+    ClassInfo service;
+    service.name = "TVRHBA_FCHBAWWNService";
+    EXPECT_EQ(valueName(valueNames(service, "readwwn", "type"), Value::uint16(2)), "Factory default");
+    EXPECT_EQ(bitNames(service, "GetWWNCapability", "WWNCapability").size(), 5U);
+    EXPECT_TRUE(bitNames(service, "GetWWNCapability").empty());
 }
 
 TEST(Printing, ControlCharactersStayOnTheirLine)
