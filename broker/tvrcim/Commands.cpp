@@ -186,7 +186,7 @@ void refuseUnlessZero(const ClassInfo& info, const MethodInfo& method, const Met
 {
     const Value& returned = reply.returnValue;
     if (!returned.isNull() && isInteger(returned.type()) && returned.asUnsigned() != 0)
-        throw MethodRefusal(method.name + " returned " + namedValueText(valueNames(info, method.name), returned));
+        throw MethodRefusal(method.name + " returned " + valueWithName(valueNames(info, method.name), returned));
 }
 
 void call(Session& session, const Command& command)

@@ -521,7 +521,7 @@ Path jobOf(const Session& session, const MethodReply& reply, const Object& test)
         throw MethodRefusal("RunDiagnosticService made no job: the test cannot run on the port as it is");
     const ClassInfo& info = *session.broker.classes().find(test.path.className);
     throw MethodRefusal("RunDiagnosticService returned " +
-                        namedValueText(valueNames(info, "RunDiagnosticService"), reply.returnValue));
+                        valueWithName(valueNames(info, "RunDiagnosticService"), reply.returnValue));
 }
 
 void runTest(Session& session, const Command& command)

@@ -84,6 +84,12 @@ std::string namedValueText(ValueNames names, const Value& value)
     return textOfEach(value, [names](const Value& element) { return std::string(valueName(names, element)); });
 }
 
+std::string valueWithName(ValueNames names, const Value& value)
+{
+    const std::string_view name = valueName(names, value);
+    return valueText(value) + (name.empty() ? "" : " (" + std::string(name) + ")");
+}
+
 std::string namedBitsText(ValueNames bits, const Value& value)
 {
     return textOfEach(value,

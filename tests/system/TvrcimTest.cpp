@@ -337,9 +337,12 @@ TEST(Tvrcim, ReadsNumbersAsTheSchemaNamesThem)
     const nlohmann::json port = json("enum TVRHBA_FCPort")[0]["properties"];
     EXPECT_EQ(port["Speed"], 8'000'000'000);
     EXPECT_EQ(port["OperationalStatus"], nlohmann::json({2}));
-    for (const nlohmann::json& property : json("class TVRHBA_VirtualFCPort")["properties"])
-        if (property["name"] == "Speed")
-            EXPECT_EQ(property["unit"], "bit / second");
+    const nlohmann::json declared = json("class TVRHBA_VirtualFCPort");
+    std::map<std::string, nlohmann::json> properties;
+    for (const nlohmann::json& property : declared["properties"])
+        properties[property["name"]] = property;
+    EXPECT_EQ(properties["Speed"]["unit"], "bit / second");
+    EXPECT_EQ(properties["PortType"]["values"]["10"], "N");
 }
 
 TEST(Tvrcim, KnowsAllClasses)
@@ -619,7 +622,7 @@ TEST(TvrcimDiag, TellsHowATestEnded)
          {"TVR:FCHBA Echo Test of 1000027A51320602  FAILED\n", ", exception\n", "  state             failed\n",
           "1 failed\n", "  suggested         a) Verify end devices b) Verify switch configuration"},
          "the test did not pass"},
-        {"1000027A51320601 echo", 4, {}, "RunDiagnosticService returned Invalid Parameter (5)"},
+        {"1000027A51320601 echo", 4, {}, "RunDiagnosticService returned 5 (Invalid Parameter)"},
         {"1000027A51320604 dport", 4, {}, "RunDiagnosticService returned "},
         {"1000027A51320605 self", 4, {}, "RunDiagnosticService made no job"},
         {"1000027A51320601 e", 2, {}, "TEST: 'e' may be echo, external-loopback"},
