@@ -1,8 +1,10 @@
 #include "schemac/Check.h"
 
+#include "schemac/Output.h"
 #include "schemac/Types.h"
 
 #include <algorithm>
+#include <iterator>
 
 namespace schemac
 {
@@ -94,7 +96,7 @@ private:
 
     void resolve_members(Class& c)
     {
-        for (const Feature& feature : c.features)
+        for (Feature& feature : c.features)
         {
             const auto same = [&](const Member& member) { return same_name(member.feature->name, feature.name); };
             const auto member = std::find_if(c.members.begin(), c.members.end(), same);
@@ -104,7 +106,7 @@ private:
                     refuse(feature.place, in_quotes(feature.name) + " overrides nothing");
                 c.members.push_back({&feature, &c});
             }
-            else if (member->declared_by == &c)
+            else if (declares_before(c, feature))
             {
                 refuse(feature.place, "feature " + in_quotes(feature.name) + " is declared twice");
             }
@@ -112,12 +114,21 @@ private:
             {
                 check_override(c, feature, *member->feature);
                 check_kept_qualifiers(feature, member->declared_by);
-                *member = {&feature, &c};
+                feature.only_explains = is_served(c) && only_explains(feature, *member->feature);
+                if (!feature.only_explains)
+                    *member = {&feature, &c};
             }
         }
         for (std::size_t i = 0; i < c.members.size(); ++i)
             if (is_set(c.members[i].feature->qualifiers, "Key"))
                 c.keys.push_back(i);
+    }
+
+    static bool declares_before(const Class& c, const Feature& feature)
+    {
+        const auto first = std::find_if(c.features.begin(), c.features.end(),
+                                        [&](const Feature& other) { return same_name(other.name, feature.name); });
+        return &*first != &feature;
     }
 
     void check_override(const Class& c, const Feature& feature, const Feature& base)
@@ -148,6 +159,32 @@ private:
                 if (same_name(parameter.name, overridden.name) && !same_form(parameter, overridden))
                     refuse(parameter.place,
                            "parameter " + in_quotes(parameter.name) + " overrides one of another type");
+    }
+
+    /// True if the override has texts of its own and the tables would have the same of it as of what it overrides.
+    /// Published classes keep the overrides that they are published with.
+    static bool only_explains(const Feature& feature, const Feature& base)
+    {
+        constexpr const char* texts[] = {"Description", "ValueMap", "BitMap", "PUnit"};
+        return std::any_of(std::begin(texts), std::end(texts),
+                           [&](const char* name) { return find(feature.qualifiers, name); }) &&
+               feature_flags(feature) == feature_flags(base) && same_record(feature, base) &&
+               std::equal(feature.parameters.begin(), feature.parameters.end(), base.parameters.begin(),
+                          base.parameters.end(),
+                          [](const Feature& a, const Feature& b) {
+                              return a.name == b.name && parameter_flags(a) == parameter_flags(b) && same_record(a, b);
+                          });
+    }
+
+    static bool same_record(const Feature& a, const Feature& b)
+    {
+        const auto value = [](const Feature& feature)
+        { return feature.default_value ? feature.default_value->items : std::vector<Literal>(); };
+        const std::vector<Literal> x = value(a);
+        const std::vector<Literal> y = value(b);
+        return same_form(a, b) && a.class_name == b.class_name &&
+               std::equal(x.begin(), x.end(), y.begin(), y.end(),
+                          [](const Literal& p, const Literal& q) { return p.kind == q.kind && p.text == q.text; });
     }
 
     static bool same_form(const Feature& a, const Feature& b)

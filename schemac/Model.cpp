@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cctype>
+#include <iterator>
 
 namespace schemac
 {
@@ -55,6 +56,14 @@ const std::string* text_of(const Qualifiers& qualifiers, std::string_view name)
         return nullptr;
     const Literal& literal = qualifier->value->items.front();
     return literal.kind == Literal::Kind::String ? &literal.text : nullptr;
+}
+
+std::vector<Feature> recorded_features(const Class& c)
+{
+    std::vector<Feature> features;
+    std::copy_if(c.features.begin(), c.features.end(), std::back_inserter(features),
+                 [](const Feature& feature) { return !feature.only_explains; });
+    return features;
 }
 
 bool is_or_derives_from(const Class* descendant, const Class* ancestor)

@@ -98,6 +98,9 @@ struct Feature
     Qualifiers qualifiers;
     std::vector<Feature> parameters;
     Place place;
+
+    // resolved by check()
+    bool only_explains = false; ///< an override that changes nothing but texts, which the meta tables do not have
 };
 
 struct Class;
@@ -146,6 +149,9 @@ bool is_set(const Qualifiers& qualifiers, std::string_view name);
 
 /// The text of a string qualifier; null if it is absent or has no text.
 const std::string* text_of(const Qualifiers& qualifiers, std::string_view name);
+
+/// The own features of a class without those that only explain inherited ones (checked classes only).
+std::vector<Feature> recorded_features(const Class& c);
 
 /// True if `ancestor` is `descendant` or one of its superclasses (resolved classes only).
 bool is_or_derives_from(const Class* descendant, const Class* ancestor);

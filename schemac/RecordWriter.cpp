@@ -47,7 +47,7 @@ std::string record(const std::string& name, const std::string& base, const std::
 std::string class_record(const Class& c)
 {
     std::string slots;
-    for (const Feature& feature : c.features)
+    for (const Feature& feature : recorded_features(c))
         if (feature.kind != FeatureKind::Method && !find(feature.qualifiers, "Override"))
             slots += slot(feature);
     return record(c.name, c.superclass ? c.superclass->name : "Instance", slots, "Meta_Class static_meta_class");
@@ -68,12 +68,12 @@ OutputFile class_header(const Class& c)
                        (c.superclass ? header_name(*c.superclass) : "runtime/meta/Instance.h") +
                        "\"\n\nnamespace cimple\n{\n\n";
     std::set<std::string> targets;
-    collect_targets(c.features, targets);
+    collect_targets(recorded_features(c), targets);
     targets.erase(c.name);
     for (const std::string& target : targets)
         text += "class " + target + ";\n";
     text += (targets.empty() ? "" : "\n") + class_record(c);
-    for (const Feature& feature : c.features)
+    for (const Feature& feature : recorded_features(c))
         if (feature.kind == FeatureKind::Method)
             text += method_record(c, feature);
     return {header_name(c), text + "\n} // namespace cimple\n"};

@@ -165,7 +165,7 @@ std::string tables_of(const Class& c)
 {
     std::string features;
     std::string methods;
-    for (const Feature& feature : c.features)
+    for (const Feature& feature : recorded_features(c))
     {
         if (feature.kind == FeatureKind::Method)
         {
@@ -188,7 +188,7 @@ OutputFile feature_declarations(const Schema& schema)
                        "\nnamespace cimple::features\n{\n\n";
     for (const Class& c : schema.classes)
     {
-        for (const Feature& feature : c.features)
+        for (const Feature& feature : recorded_features(c))
         {
             if (feature.kind != FeatureKind::Method)
             {
@@ -219,7 +219,7 @@ OutputFile chunk(const Schema& schema, std::size_t number, std::size_t begin, st
     {
         const Class& c = schema.classes[i];
         headers.insert(header_name(c));
-        collect_headers(schema, c.features, headers);
+        collect_headers(schema, recorded_features(c), headers);
         tables += (i == begin ? "" : "\n") + tables_of(c);
     }
     std::string text = banner("the schema");

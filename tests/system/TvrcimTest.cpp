@@ -327,6 +327,7 @@ TEST(Tvrcim, ReadsNumbersAsTheSchemaNamesThem)
          "adapter (8204)\n"},
         {"class TVRHBA_Chip", "\nBoardTemperature, in degree celsius\n    The temperature of the board; null where no "
                               "sensor reports one.\n"},
+        {"methods TVRHBA_FCHBADiagnosticTest RunDiagnosticService", "\n    40064           Adapter busy\n"},
         {"class TVRHBA_Chip", "\nRemovalConditions\n    0 Unknown, 2 Not Applicable,"},
         {"class TVRHBA_DumpData --format mof",
          "    [Read, Write,\n     Description ( \"How many dump files are kept, 1 to 20; older ones go.\" )]\n"

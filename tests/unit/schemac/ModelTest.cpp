@@ -41,6 +41,40 @@ TEST(Model, OverridesStandInTheInheritedPlaceAndKeysCountTheChain)
     EXPECT_FALSE(is_or_derives_from(schema.find_class("T_Device"), &b));
 }
 
+/// An override with nothing but texts is for people: the tables have what it overrides. Any other is a record.
+TEST(Model, OverridesThatOnlyExplainHaveNoRecord)
+{
+    const struct
+    {
+        const char* declaration;
+        bool recorded;
+    } overrides[] = {
+        {"[Override ( \"State\" ), ValueMap { \"5\" }, Values { \"Five\" }] uint16 State = 5;", false},
+        {"[Override ( \"Start\" ), Description ( \"Go.\" )] uint32 Start([In] uint16 Level);", false},
+        {"[Override ( \"State\" )] uint16 State = 5;", true},
+        {"[Override ( \"State\" ), Description ( \"S.\" )] uint16 State = 6;", true},
+        {"[Override ( \"State\" ), Description ( \"S.\" ), Write] uint16 State = 5;", true},
+        {"[Override ( \"Start\" ), Description ( \"Go.\" )] uint32 Start([Out] uint16 Level);", true},
+        {"[Override ( \"Start\" ), Description ( \"Go.\" )] uint32 Start();", true},
+    };
+    for (const auto& row : overrides)
+    {
+        SCOPED_TRACE(row.declaration);
+        for (const std::string name : {"TVRHBA_A", "T_A"})
+        {
+            const Schema schema = checked("class " + name + " : T_Element { " + row.declaration + " };");
+            const Class& c = schema.classes.back();
+            const bool recorded = row.recorded || name == "T_A"; // published classes stay as they are
+            EXPECT_EQ(recorded_features(c).size(), recorded ? 1u : 0u) << name;
+            EXPECT_EQ(c.members[c.features.front().kind == FeatureKind::Method ? 3 : 2].declared_by->name,
+                      recorded ? name : "T_Element");
+        }
+    }
+    EXPECT_THAT(refusals_of(std::string("class TVRHBA_A : T_Element {\n") + overrides[0].declaration + "\n" +
+                            overrides[0].declaration + " };"),
+                testing::ElementsAre("t.mof:3: feature \"State\" is declared twice"));
+}
+
 TEST(Model, AReferenceMayNarrowToAClassThatStandsBehind)
 {
     EXPECT_THAT(
