@@ -32,7 +32,7 @@ const std::string pegasusPlatform = "cimmof -w -aE -n root/ibmse " + mof + "qual
                                     "cimmof -w -aE -n root/ibmse " + mof + "cim_classes.mof\n" +
                                     "cimmof -w -aE -n root/ibmse TMP/platform_classes.mof\n" +
                                     "cimmof -n root/ibmse TMP/platform_instances.mof\n";
-const std::string pegasusProviders = "cimmof -w -n root/PG_InterOp " + mof + "tavrin_fc_provider_registration.mof\n";
+const std::string pegasusProviders = "cimmof -w -n root/PG_InterOp TMP/registration.mof\n";
 
 std::string linesWith(const std::string& text, const std::string& part)
 {
@@ -171,7 +171,25 @@ TEST(Register, OpenGroupServerWithTrouble)
     std::filesystem::remove(servers.root() / "pegasus/running");
     const Servers::Run down = servers.run("register");
     EXPECT_EQ(down.exitCode, 1);
-    EXPECT_THAT(down.text, HasSubstr("pegasus: does not answer; start it, and run this again\n"));
+    EXPECT_EQ(down.text, "pegasus: does not answer; start it, and run this again\n");
+    EXPECT_EQ(servers.run("status").text, down.text);
+}
+
+/// Its builder may have chosen another name for its interop namespace.
+TEST(Register, OpenGroupServerWithAnotherInteropNamespace)
+{
+    const Servers servers;
+    servers.installOpenGroup();
+    std::filesystem::rename(servers.root() / "pegasus/root/PG_InterOp", servers.root() / "pegasus/root/interop");
+    const std::string before = servers.stateOf("pegasus");
+    const Servers::Run run = servers.run("register");
+    EXPECT_EQ(run.exitCode, 0) << run.text;
+    EXPECT_EQ(linesWith(servers.takeCalls(), "registration.mof"), "cimmof -w -n root/interop TMP/registration.mof\n");
+    const std::string registered = textOf(servers.root() / "pegasus/root/interop/registration");
+    EXPECT_THAT(registered, HasSubstr("Namespaces = { \"root/tavrin\", \"root/interop\" };"));
+    EXPECT_THAT(registered, Not(HasSubstr("PG_InterOp")));
+    EXPECT_EQ(servers.run("remove").exitCode, 0);
+    EXPECT_EQ(servers.stateOf("pegasus"), before);
 }
 
 TEST(Register, BothServersOneOrNone)

@@ -49,7 +49,7 @@ sed -n 's/^class \([A-Za-z0-9_]*\) : \([A-Za-z0-9_]*\).*/\1 \2/p; s/^class \([A-
 sed -n 's/^Qualifier \([A-Za-z0-9_]*\).*/\1/p' "$1" | { grep -vxFf $namespace/qualifiers || :; } >>$namespace/qualifiers
 sed -n 's/^instance of \(IBMSD_[A-Za-z]*\).*/\1.Name="host"/p' "$1" >>$namespace/instances
 [ -s $namespace/instances ] || rm $namespace/instances
-if grep -q 'instance of PG_ProviderModule' "$1"; then touch $ROOT/pegasus/registered; fi
+if grep -q 'instance of PG_ProviderModule' "$1"; then cp "$1" $namespace/registration; fi
 )sh";
 constexpr const char* cimcliReading = R"sh(
 [ -f $ROOT/pegasus/running ] || exit 1
@@ -134,7 +134,8 @@ void Servers::installOpenGroup() const
     tool("cimcli", cimcliReading + log + cimcliChanging);
     tool("cimconfig", "echo \"Current value: $ROOT/pegasus/lib:$ROOT/nowhere\"\n");
     tool("cimprovider",
-         "[ $1 != -l ] || { [ -f $ROOT/pegasus/registered ]; exit; }\n" + log + "rm $ROOT/pegasus/registered\n");
+         "registration=$ROOT/pegasus/root/*/registration\n[ $1 != -l ] || { [ -f $registration ]; exit; }\n" + log +
+             "rm $registration\n");
     // It is asked for each class by itself: what comes of some classes and those below them is enough.
     const std::string mof = _root / "usr/share/tavrin-fc-provider/mof";
     for (const char* file : {"cim_classes.mof", "tavrin_classes.mof"})
@@ -145,7 +146,8 @@ void Servers::installOpenGroup() const
     _root.write("pegasus/running", "");
     const std::string interop = _root / "pegasus/root/PG_InterOp";
     ASSERT_EQ(runCommand(_root / "bin/cimmof" + " -n root/PG_InterOp " + mof + "/cim_classes.mof && " +
-                         "sed -i -E '/^(" + experimental + ") /d' " + interop + "/classes")
+                         "sed -i -E '/^(" + experimental + ") /d; $ a PG_ProviderModule CIM_ProviderModule' " +
+                         interop + "/classes")
                   .exitCode,
               0);
     takeCalls();
