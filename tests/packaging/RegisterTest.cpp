@@ -175,6 +175,20 @@ TEST(Register, OpenGroupServerWithTrouble)
     EXPECT_EQ(servers.run("status").text, down.text);
 }
 
+/// Of a registration that is not the script's, the module's own classes are known to be its own.
+TEST(Register, OpenGroupServerRegisteredByHand)
+{
+    const Servers servers;
+    servers.installOpenGroup();
+    const std::string before = servers.stateOf("pegasus");
+    const std::string declarations = servers.root() / "usr/share/tavrin-fc-provider/mof/";
+    for (const char* file : {"tavrin_classes.mof", "tavrin_fc_provider_registration.mof"})
+        runCommand(servers.root() / "bin/cimmof" + " -n root/PG_InterOp " + declarations + file);
+    EXPECT_EQ(servers.run("status").text, "pegasus: registered, but not by this script\n");
+    EXPECT_THAT(servers.run("remove").text, HasSubstr("pegasus: removed\n"));
+    EXPECT_EQ(servers.stateOf("pegasus"), before);
+}
+
 /// Its builder may have chosen another name for its interop namespace.
 TEST(Register, OpenGroupServerWithAnotherInteropNamespace)
 {
