@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <string>
 
+using testing::EndsWith;
 using testing::HasSubstr;
 using testing::Not;
 
@@ -86,11 +87,15 @@ TEST(Register, SmallFootprintServerAndBack)
     EXPECT_THAT(platform, HasSubstr("   Tag = \"host.example.net chassis\";\n"));
     servers.root().write("usr/share/tavrin-fc-provider/mof/tavrin_fc_provider.reg", "[TVRHBA_Card]\n#\n");
     EXPECT_THAT(servers.run("status").text, HasSubstr("register again"));
+    servers.installSystemd("sfcb");
     EXPECT_EQ(servers.run("register").exitCode, 0);
-    EXPECT_THAT(servers.takeCalls(), HasSubstr("sfcbstage -n root/ibmse"));
+    const std::string again = servers.takeCalls();
+    EXPECT_THAT(again, HasSubstr("sfcbstage -n root/ibmse"));
+    EXPECT_THAT(again, EndsWith("sfcbrepos -f\nsystemctl restart sfcb\n"));
 
     EXPECT_THAT(servers.run("remove").text, HasSubstr("sfcb: removed\n"));
-    EXPECT_EQ(servers.takeCalls(), sfcbRemove + "sfcbunstage -n root/ibmse tavrin_platform.mof\n" + "sfcbrepos -f\n");
+    EXPECT_EQ(servers.takeCalls(), sfcbRemove + "sfcbunstage -n root/ibmse tavrin_platform.mof\n" +
+                                       "sfcbrepos -f\nsystemctl restart sfcb\n");
     EXPECT_EQ(servers.stateOf("sfcb"), before);
     EXPECT_FALSE(std::filesystem::exists(servers.root() / "state"));
     EXPECT_EQ(servers.run("remove").text, "sfcb: not registered\n");

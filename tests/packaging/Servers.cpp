@@ -14,6 +14,8 @@ namespace
 constexpr const char* experimental = "CIM_FCHBADiagnosticServiceCapabilities|CIM_FCHBADiagnosticSettingData|"
                                      "CIM_FCHBADiagnosticTest|CIM_SCSIArbitraryLogicalUnit";
 
+const std::string logCall = "echo \"${0##*/} $*\" >>$ROOT/calls\n";
+
 // Files are staged, and the repository is built of them. A file "refuse" has it refuse the module's classes.
 constexpr const char* sfcbstage = R"sh(
 while [ $# -gt 0 ]; do case $1 in
@@ -109,10 +111,9 @@ void Servers::tool(const std::string& name, const std::string& body) const
 
 void Servers::installSmallFootprint() const
 {
-    const std::string log = "echo \"${0##*/} $*\" >>$ROOT/calls\n";
-    tool("sfcbstage", log + sfcbstage);
-    tool("sfcbunstage", log + sfcbunstage);
-    tool("sfcbrepos", sfcbreposHelp + log + sfcbrepos);
+    tool("sfcbstage", logCall + sfcbstage);
+    tool("sfcbunstage", logCall + sfcbunstage);
+    tool("sfcbrepos", sfcbreposHelp + logCall + sfcbrepos);
     _root.write("etc/sfcb/sfcb.cfg",
                 "httpPort: 5988\nproviderDirs: " + _root / "sfcb/lib " + _root / "sfcb/cmpi" + "\n");
     for (const char* folder : {"lib", "cmpi", "stage/regs", "stage/mofs/root/interop", "registration"})
@@ -129,12 +130,11 @@ void Servers::installSmallFootprint() const
 
 void Servers::installOpenGroup() const
 {
-    const std::string log = "echo \"${0##*/} $*\" >>$ROOT/calls\n";
-    tool("cimmof", log + cimmof);
-    tool("cimcli", cimcliReading + log + cimcliChanging);
+    tool("cimmof", logCall + cimmof);
+    tool("cimcli", cimcliReading + logCall + cimcliChanging);
     tool("cimconfig", "echo \"Current value: $ROOT/pegasus/lib:$ROOT/nowhere\"\n");
     tool("cimprovider",
-         "registration=$ROOT/pegasus/root/*/registration\n[ $1 != -l ] || { [ -f $registration ]; exit; }\n" + log +
+         "registration=$ROOT/pegasus/root/*/registration\n[ $1 != -l ] || { [ -f $registration ]; exit; }\n" + logCall +
              "rm $registration\n");
     // It is asked for each class by itself: what comes of some classes and those below them is enough.
     const std::string mof = _root / "usr/share/tavrin-fc-provider/mof";
@@ -151,6 +151,11 @@ void Servers::installOpenGroup() const
                   .exitCode,
               0);
     takeCalls();
+}
+
+void Servers::installSystemd(const std::string& unit) const
+{
+    tool("systemctl", "case \"$*\" in *is-active*) [ \"$3\" = " + unit + " ]; exit ;; esac\n" + logCall);
 }
 
 Servers::Run Servers::run(const std::string& arguments) const

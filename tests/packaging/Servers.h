@@ -17,6 +17,9 @@ public:
     void installSmallFootprint() const;
     void installOpenGroup() const;
 
+    /// Of its units that one is active.
+    void installSystemd(const std::string& unit) const;
+
     /// Runs the script. What it printed has "ROOT" for the test's folder and "TMP" for its temporary one.
     struct Run
     {
