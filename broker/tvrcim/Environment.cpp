@@ -61,9 +61,10 @@ std::string findModule()
 {
     const std::string file = "libtavrin_fc_provider.so";
     const fs::path folder = executableFolder();
-    const fs::path path = locate({folder / "../module", folder / "../lib", folder / "../lib/cmpi",
-                                  folder / "../lib/" TVRCIM_MULTIARCH "/cmpi", TVRCIM_BUILD_FOLDER "/module"},
-                                 file);
+    const fs::path path =
+        locate({folder / "../module", folder / "../lib", folder / "../lib64/cmpi", folder / "../lib/cmpi",
+                folder / "../lib/" TVRCIM_MULTIARCH "/cmpi", TVRCIM_BUILD_FOLDER "/module"},
+               file);
     return path.empty() ? file : path.lexically_normal().string();
 }
 
@@ -73,8 +74,9 @@ std::string findRegistration(const std::string& module)
     std::string name = path.stem();
     const std::string file = name.erase(0, name.starts_with("lib") ? 3 : 0) + ".reg";
     const fs::path beside = path.has_parent_path() ? path.parent_path() : executableFolder();
-    return locate({beside, beside / "../generated/mof", beside / "../share/tavrin-fc-provider",
-                   TVRCIM_BUILD_FOLDER "/generated/mof"},
+    const char* installed = "share/tavrin-fc-provider/mof"; // the module is in lib/cmpi or in lib/<architecture>/cmpi
+    return locate({beside, beside / "../generated/mof", beside / "../.." / installed, beside / "../../.." / installed,
+                   executableFolder() / ".." / installed, TVRCIM_BUILD_FOLDER "/generated/mof"},
                   file)
         .string();
 }

@@ -1,4 +1,5 @@
 // The command-line tool as a person or a script uses it: a process of its own, its output and its exit code.
+#include "tests/support/Command.h"
 #include "tests/support/Eventually.h"
 
 #include <gmock/gmock.h>
@@ -27,34 +28,10 @@ using testing::HasSubstr;
 namespace
 {
 
-struct Answer
-{
-    int exitCode;
-    std::string out;
-    std::string err;
-};
-
-std::string textOf(const std::string& file)
-{
-    std::ifstream stream(file);
-    return {std::istreambuf_iterator<char>(stream), {}};
-}
-
 /// Runs the tool with arguments as a shell would read them, in an environment that assignments may change.
 Answer tvrcim(const std::string& arguments, const std::string& environment = "")
 {
-    const std::string errors = testing::TempDir() + "tvrcim-" + std::to_string(getpid()) + ".err";
-    const std::string command = environment + TVR_TVRCIM + " " + arguments + " 2>" + errors;
-    FILE* pipe = popen(command.c_str(), "r");
-    EXPECT_TRUE(pipe);
-    std::string out;
-    char buffer[4096];
-    while (std::size_t size = fread(buffer, 1, sizeof(buffer), pipe))
-        out.append(buffer, size);
-    const int status = pclose(pipe);
-    const Answer run{WIFEXITED(status) ? WEXITSTATUS(status) : -1, out, textOf(errors)};
-    std::remove(errors.c_str());
-    return run;
+    return runCommand(environment + TVR_TVRCIM + " " + arguments);
 }
 
 nlohmann::json json(const std::string& arguments)

@@ -1,0 +1,239 @@
+// The script that registers the module, against stand-ins of both servers' tools.
+#include "tests/packaging/Servers.h"
+#include "tests/support/Command.h"
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <string>
+
+using testing::EndsWith;
+using testing::HasSubstr;
+using testing::Not;
+
+namespace
+{
+
+const std::string mof = "ROOT/usr/share/tavrin-fc-provider/mof/";
+const std::string link = "libtavrin_fc_provider.so";
+
+const std::string sfcbRegister = "sfcbstage -n root/tavrin -r " + mof + "tavrin_fc_provider.reg " + mof +
+                                 "cim_classes.mof " + mof + "tavrin_classes.mof\n" +
+                                 "sfcbstage -n root/interop TMP/tavrin_cim_classes.mof " + mof + "tavrin_classes.mof\n";
+const std::string sfcbRemove =
+    "sfcbunstage -n root/tavrin -r tavrin_fc_provider.reg cim_classes.mof tavrin_classes.mof\n"
+    "sfcbunstage -n root/interop tavrin_cim_classes.mof tavrin_classes.mof\n";
+
+const std::string pegasusClasses = "cimmof -w -aE -n root/tavrin " + mof + "qualifiers.mof\n" +
+                                   "cimmof -w -aE -n root/tavrin " + mof + "cim_classes.mof\n" +
+                                   "cimmof -w -aE -n root/tavrin " + mof + "tavrin_classes.mof\n" +
+                                   "cimmof -w -aE -n root/PG_InterOp " + mof + "cim_classes.mof\n" +
+                                   "cimmof -w -aE -n root/PG_InterOp " + mof + "tavrin_classes.mof\n";
+const std::string pegasusPlatform = "cimmof -w -aE -n root/ibmse " + mof + "qualifiers.mof\n" +
+                                    "cimmof -w -aE -n root/ibmse " + mof + "cim_classes.mof\n" +
+                                    "cimmof -w -aE -n root/ibmse TMP/platform_classes.mof\n" +
+                                    "cimmof -n root/ibmse TMP/platform_instances.mof\n";
+const std::string pegasusProviders = "cimmof -w -n root/PG_InterOp TMP/registration.mof\n";
+
+std::string linesWith(const std::string& text, const std::string& part)
+{
+    std::string lines;
+    for (std::size_t begin = 0, end; begin < text.size(); begin = end + 1)
+    {
+        end = std::min(text.find('\n', begin), text.size() - 1);
+        const std::string line = text.substr(begin, end + 1 - begin);
+        if (line.find(part) != line.npos)
+            lines += line;
+    }
+    return lines;
+}
+
+TEST(Register, SmallFootprintServerAndBack)
+{
+    const Servers servers;
+    servers.installSmallFootprint();
+    const std::string before = servers.stateOf("sfcb");
+    EXPECT_EQ(servers.run("status").text, "sfcb: not registered\n");
+
+    // Its configuration is beside its tools.
+    const Servers::Run first = servers.run("register");
+    EXPECT_EQ(first.exitCode, 0) << first.text;
+    EXPECT_THAT(first.text, HasSubstr("sfcb: restart the server if it runs\nsfcb: registered\n"));
+    EXPECT_EQ(servers.takeCalls(), sfcbRegister + "sfcbrepos -f\n");
+    EXPECT_EQ(textOf(servers.root() / "sfcb/cmpi/" + link), "the module");
+    // Of the schema only what the server lacks.
+    const std::string added = textOf(servers.root() / "sfcb/stage/mofs/root/interop/tavrin_cim_classes.mof");
+    EXPECT_EQ(linesWith(added, "class CIM_"),
+              "class CIM_FCHBADiagnosticServiceCapabilities : CIM_DiagnosticServiceCapabilities {\n"
+              "class CIM_FCHBADiagnosticSettingData : CIM_DiagnosticSettingData {\n"
+              "class CIM_FCHBADiagnosticTest : CIM_DiagnosticTest {\n"
+              "class CIM_SCSIArbitraryLogicalUnit : CIM_LogicalDevice {\n");
+
+    const Servers::Run second = servers.run("");
+    EXPECT_EQ(second.text, "sfcb: registered already\n");
+    EXPECT_EQ(servers.takeCalls(), "");
+    const Servers::Run status = servers.run("status");
+    EXPECT_EQ(status.text, "sfcb: registered\n");
+    EXPECT_EQ(status.exitCode, 0);
+
+    // An update of the package has other files; a platform stays once it is there.
+    EXPECT_EQ(servers.run("register --platform").exitCode, 0);
+    EXPECT_EQ(servers.takeCalls(),
+              sfcbRegister + "sfcbstage -n root/ibmse TMP/tavrin_platform.mof\n" + "sfcbrepos -f\n");
+    const std::string platform = textOf(servers.root() / "sfcb/stage/mofs/root/ibmse/tavrin_platform.mof");
+    EXPECT_EQ(linesWith(platform, "class IBMSD"), "class IBMSD_Chassis : CIM_Chassis {\n"
+                                                  "class IBMSD_ComputerSystem : CIM_ComputerSystem {\n");
+    EXPECT_THAT(platform, HasSubstr("   Name = \"host.example.net\";\n"));
+    EXPECT_THAT(platform, HasSubstr("   Tag = \"host.example.net chassis\";\n"));
+    servers.root().write("usr/share/tavrin-fc-provider/mof/tavrin_fc_provider.reg", "[TVRHBA_Card]\n#\n");
+    EXPECT_THAT(servers.run("status").text, HasSubstr("register again"));
+    servers.installSystemd("sfcb");
+    EXPECT_EQ(servers.run("register").exitCode, 0);
+    const std::string again = servers.takeCalls();
+    EXPECT_THAT(again, HasSubstr("sfcbstage -n root/ibmse"));
+    EXPECT_THAT(again, EndsWith("sfcbrepos -f\nsystemctl restart sfcb\n"));
+
+    EXPECT_THAT(servers.run("remove").text, HasSubstr("sfcb: removed\n"));
+    EXPECT_EQ(servers.takeCalls(), sfcbRemove + "sfcbunstage -n root/ibmse tavrin_platform.mof\n" +
+                                       "sfcbrepos -f\nsystemctl restart sfcb\n");
+    EXPECT_EQ(servers.stateOf("sfcb"), before);
+    EXPECT_FALSE(std::filesystem::exists(servers.root() / "state"));
+    EXPECT_EQ(servers.run("remove").text, "sfcb: not registered\n");
+    EXPECT_EQ(servers.takeCalls(), "");
+}
+
+/// The server's repository is gone where it refuses one file: without a second build it would serve nobody.
+TEST(Register, SmallFootprintServerRefusesAndIsAsBefore)
+{
+    const Servers servers;
+    servers.installSmallFootprint();
+    const std::string before = servers.stateOf("sfcb");
+    servers.root().write("refuse", "");
+    const Servers::Run run = servers.run("register");
+    EXPECT_EQ(run.exitCode, 1);
+    EXPECT_THAT(run.text, HasSubstr("sfcb:   error near line 7\n"));
+    EXPECT_EQ(servers.takeCalls(), sfcbRegister + "sfcbrepos -f\n" + sfcbRemove + "sfcbrepos -f\n");
+    EXPECT_EQ(servers.stateOf("sfcb"), before);
+}
+
+TEST(Register, OpenGroupServerAndBack)
+{
+    const Servers servers;
+    servers.installOpenGroup();
+    const std::string before = servers.stateOf("pegasus");
+    EXPECT_EQ(servers.run("register").exitCode, 0);
+    EXPECT_EQ(servers.takeCalls(), pegasusClasses + pegasusProviders);
+    EXPECT_EQ(textOf(servers.root() / "pegasus/lib/" + link), "the module");
+    EXPECT_EQ(servers.run("register").text, "pegasus: registered already\n");
+    EXPECT_EQ(servers.takeCalls(), "");
+
+    // What the server has does not become another by compiling, so that all is taken out first.
+    EXPECT_EQ(servers.run("register --platform").exitCode, 0);
+    const std::string again = servers.takeCalls();
+    EXPECT_EQ(linesWith(again, "cimprovider"), "cimprovider -r -m tavrin_fc_provider\n");
+    EXPECT_EQ(linesWith(again, "cimmof"), pegasusClasses + pegasusPlatform + pegasusProviders);
+    EXPECT_LT(again.find("dc TVRHBA_"), again.find("cimmof"));
+
+    const Servers::Run removed = servers.run("remove");
+    EXPECT_THAT(removed.text, HasSubstr("pegasus: removed\n"));
+    EXPECT_THAT(removed.text, Not(HasSubstr("keeps")));
+    const std::string calls = servers.takeCalls();
+    EXPECT_EQ(linesWith(calls, "cimcli di"),
+              "cimcli di IBMSD_Chassis.Name=\"host\" -n root/ibmse\n"
+              "cimcli di IBMSD_ComputerSystem.Name=\"host\" -n root/ibmse\n"
+              "cimcli di PG_NameSpace.CreationClassName=\"PG_Namespace\",Name=\"root/ibmse\" -n root/PG_InterOp\n"
+              "cimcli di PG_NameSpace.CreationClassName=\"PG_Namespace\",Name=\"root/tavrin\" -n root/PG_InterOp\n");
+    EXPECT_EQ(linesWith(linesWith(calls, "dc CIM_"), "root/PG_InterOp"),
+              "cimcli dc CIM_SCSIArbitraryLogicalUnit -n root/PG_InterOp\n"
+              "cimcli dc CIM_FCHBADiagnosticTest -n root/PG_InterOp\n"
+              "cimcli dc CIM_FCHBADiagnosticSettingData -n root/PG_InterOp\n"
+              "cimcli dc CIM_FCHBADiagnosticServiceCapabilities -n root/PG_InterOp\n");
+    EXPECT_EQ(servers.stateOf("pegasus"), before);
+    EXPECT_FALSE(std::filesystem::exists(servers.root() / "state"));
+}
+
+/// What was put in before a failure is in the record, and a class that others use stays with a word about it.
+TEST(Register, OpenGroupServerWithTrouble)
+{
+    const Servers servers;
+    servers.installOpenGroup();
+    const std::string before = servers.stateOf("pegasus");
+    servers.root().write("refuse", "");
+    const Servers::Run refused = servers.run("register");
+    EXPECT_EQ(refused.exitCode, 1);
+    EXPECT_THAT(refused.text, HasSubstr("pegasus:   error near line 7\n"));
+    EXPECT_EQ(linesWith(servers.takeCalls(), "registration.mof"), "");
+    EXPECT_EQ(servers.run("remove").exitCode, 0);
+    EXPECT_EQ(servers.stateOf("pegasus"), before);
+
+    std::filesystem::remove(servers.root() / "refuse");
+    EXPECT_EQ(servers.run("register").exitCode, 0);
+    runCommand("echo 'Other_Test CIM_FCHBADiagnosticTest' >>" + servers.root() / "pegasus/root/PG_InterOp/classes");
+    const Servers::Run kept = servers.run("remove");
+    EXPECT_THAT(kept.text, HasSubstr("pegasus: keeps the class CIM_FCHBADiagnosticTest in root/PG_InterOp: "
+                                     "CIM_ERR_CLASS_HAS_CHILDREN: CIM_FCHBADiagnosticTest\n"));
+
+    std::filesystem::remove(servers.root() / "pegasus/running");
+    const Servers::Run down = servers.run("register");
+    EXPECT_EQ(down.exitCode, 1);
+    EXPECT_EQ(down.text, "pegasus: does not answer; start it, and run this again\n");
+    EXPECT_EQ(servers.run("status").text, down.text);
+}
+
+/// Of a registration that is not the script's, the module's own classes are known to be its own.
+TEST(Register, OpenGroupServerRegisteredByHand)
+{
+    const Servers servers;
+    servers.installOpenGroup();
+    const std::string before = servers.stateOf("pegasus");
+    const std::string declarations = servers.root() / "usr/share/tavrin-fc-provider/mof/";
+    for (const char* file : {"tavrin_classes.mof", "tavrin_fc_provider_registration.mof"})
+        runCommand(servers.root() / "bin/cimmof" + " -n root/PG_InterOp " + declarations + file);
+    EXPECT_EQ(servers.run("status").text, "pegasus: registered, but not by this script\n");
+    EXPECT_THAT(servers.run("remove").text, HasSubstr("pegasus: removed\n"));
+    EXPECT_EQ(servers.stateOf("pegasus"), before);
+}
+
+/// Its builder may have chosen another name for its interop namespace.
+TEST(Register, OpenGroupServerWithAnotherInteropNamespace)
+{
+    const Servers servers;
+    servers.installOpenGroup();
+    std::filesystem::rename(servers.root() / "pegasus/root/PG_InterOp", servers.root() / "pegasus/root/interop");
+    const std::string before = servers.stateOf("pegasus");
+    const Servers::Run run = servers.run("register");
+    EXPECT_EQ(run.exitCode, 0) << run.text;
+    EXPECT_EQ(linesWith(servers.takeCalls(), "registration.mof"), "cimmof -w -n root/interop TMP/registration.mof\n");
+    const std::string registered = textOf(servers.root() / "pegasus/root/interop/registration");
+    EXPECT_THAT(registered, HasSubstr("Namespaces = { \"root/tavrin\", \"root/interop\" };"));
+    EXPECT_THAT(registered, Not(HasSubstr("PG_InterOp")));
+    EXPECT_EQ(servers.run("remove").exitCode, 0);
+    EXPECT_EQ(servers.stateOf("pegasus"), before);
+}
+
+TEST(Register, BothServersOneOrNone)
+{
+    const Servers servers;
+    const Servers::Run none = servers.run("register");
+    EXPECT_EQ(none.exitCode, 1);
+    EXPECT_THAT(none.text, HasSubstr("no CIM server found"));
+
+    servers.installSmallFootprint();
+    servers.installOpenGroup();
+    // The platform's own classes are left alone.
+    servers.root().write("sfcb/stage/mofs/root/ibmse/platform.mof",
+                         "class IBMSD_ComputerSystem : CIM_ComputerSystem {};\n");
+    servers.root().write("pegasus/root/ibmse/classes", "IBMSD_ComputerSystem CIM_ComputerSystem\n");
+    EXPECT_EQ(servers.run("register --server pegasus --platform").exitCode, 0);
+    EXPECT_EQ(servers.takeCalls(), pegasusClasses + pegasusProviders);
+    const Servers::Run half = servers.run("status");
+    EXPECT_EQ(half.exitCode, 1);
+    EXPECT_EQ(half.text, "sfcb: not registered\npegasus: registered\n");
+    EXPECT_EQ(servers.run("register --platform").exitCode, 0);
+    EXPECT_EQ(servers.takeCalls(), sfcbRegister + "sfcbrepos -f\n");
+
+    for (const char* wrong : {"registre", "--server other", "register remove", "remove --platform"})
+        EXPECT_EQ(servers.run(wrong).exitCode, 2) << wrong;
+}
+
+} // namespace
