@@ -1,0 +1,389 @@
+#include "broker/cimxml/Operations.h"
+
+#include "broker/cimxml/Encode.h"
+#include "broker/cimxml/Request.h"
+
+#include <algorithm>
+#include <optional>
+#include <span>
+#include <vector>
+
+namespace cimxml
+{
+
+using namespace broker;
+using pugi::xml_node;
+
+namespace
+{
+
+/// An operation that failed; the client gets its code and text.
+struct CimFailure
+{
+    CMPIrc status;
+    std::string text;
+};
+
+void expect(const Outcome& outcome)
+{
+    if (!outcome.ok())
+        throw CimFailure{outcome.status, outcome.message};
+}
+
+/// One request that is carried out: its parameters, and where the result is written.
+class Operation
+{
+public:
+    Operation(Broker& target, const Request& request, XmlText& result)
+        : broker(target), xml(result), _request(request), _decoder(target.classes(), request.nameSpace)
+    {}
+
+    Broker& broker;
+    XmlText& xml;
+
+    const Request& request() const { return _request; }
+    const std::string& nameSpace() const { return _request.nameSpace; }
+    const Decoder& decoder() const { return _decoder; }
+    const ClassInfo* classOf(const Object& object) const { return broker.classes().find(object.path.className); }
+
+    xml_node required(const char* name) const
+    {
+        const xml_node node = firstElement(_request.parameter(name));
+        if (!node)
+            throw CimFailure{CMPI_RC_ERR_INVALID_PARAMETER, std::string("there is no ") + name};
+        return node;
+    }
+    /// The name of a class; empty where the client gave none.
+    std::string className(const char* name) const
+    {
+        return firstElement(_request.parameter(name)).attribute("NAME").value();
+    }
+    const ClassInfo& requiredClass(const char* name) const
+    {
+        const std::string text = required(name).attribute("NAME").value();
+        const ClassInfo* info = broker.classes().find(text);
+        if (!info)
+            throw CimFailure{CMPI_RC_ERR_INVALID_CLASS, "there is no class '" + text + "'"};
+        return *info;
+    }
+    std::string text(const char* name) const { return childOf(_request.parameter(name), "VALUE").text().get(); }
+    bool flag(const char* name, bool otherwise) const
+    {
+        const std::string value = text(name);
+        return value.empty() ? otherwise : sameName(value, "true");
+    }
+    PropertyList properties() const
+    {
+        const xml_node list = childOf(_request.parameter("PropertyList"), "VALUE.ARRAY");
+        if (!list)
+            return std::nullopt;
+        std::vector<std::string> names;
+        for (const xml_node& name : list.children("VALUE"))
+            names.emplace_back(name.text().get());
+        return names;
+    }
+    AssociationFilter filter() const
+    {
+        const bool ofAssociations = _request.name.starts_with("Reference");
+        return {className(ofAssociations ? "ResultClass" : "AssocClass"),
+                ofAssociations ? std::string() : className("ResultClass"), text("Role"), text("ResultRole")};
+    }
+
+private:
+    const Request& _request;
+    Decoder _decoder;
+};
+
+// --- instances
+
+void writeNamed(const Operation& operation, const Object& object)
+{
+    const XmlElement named(operation.xml, "VALUE.NAMEDINSTANCE");
+    writeInstanceName(operation.xml, object.path);
+    writeInstance(operation.xml, object, operation.classOf(object));
+}
+
+void writeWithPath(const Operation& operation, const Object& object)
+{
+    const XmlElement whole(operation.xml, "VALUE.OBJECTWITHPATH");
+    writeInstancePath(operation.xml, object.path);
+    writeInstance(operation.xml, object, operation.classOf(object));
+}
+
+void enumerateInstances(Operation& operation)
+{
+    const Reply reply = operation.broker.enumerateInstances(
+        operation.nameSpace(), operation.requiredClass("ClassName").name, operation.properties());
+    expect(reply);
+    for (const Object& object : reply.objects)
+        writeNamed(operation, object);
+}
+
+void enumerateInstanceNames(Operation& operation)
+{
+    const NamesReply reply =
+        operation.broker.enumerateInstanceNames(operation.nameSpace(), operation.requiredClass("ClassName").name);
+    expect(reply);
+    for (const Path& path : reply.paths)
+        writeInstanceName(operation.xml, path);
+}
+
+void getInstance(Operation& operation)
+{
+    const Reply reply = operation.broker.getInstance(operation.decoder().path(operation.required("InstanceName")),
+                                                     operation.properties());
+    expect(reply);
+    for (const Object& object : reply.objects)
+        writeInstance(operation.xml, object, operation.classOf(object));
+}
+
+void createInstance(Operation& operation)
+{
+    const NamesReply reply =
+        operation.broker.createInstance(operation.decoder().instance(operation.required("NewInstance")));
+    expect(reply);
+    for (const Path& path : reply.paths)
+        writeInstanceName(operation.xml, path);
+}
+
+void modifyInstance(Operation& operation)
+{
+    expect(operation.broker.modifyInstance(operation.decoder().namedInstance(operation.required("ModifiedInstance")),
+                                           operation.properties()));
+}
+
+void deleteInstance(Operation& operation)
+{
+    expect(operation.broker.deleteInstance(operation.decoder().path(operation.required("InstanceName"))));
+}
+
+// --- associations
+
+Path objectName(const Operation& operation)
+{
+    return operation.decoder().path(operation.required("ObjectName"));
+}
+
+void writeObjects(const Operation& operation, const Reply& reply)
+{
+    expect(reply);
+    for (const Object& object : reply.objects)
+        writeWithPath(operation, object);
+}
+
+void writePaths(const Operation& operation, const NamesReply& reply)
+{
+    expect(reply);
+    for (const Path& path : reply.paths)
+    {
+        const XmlElement whole(operation.xml, "OBJECTPATH");
+        writeInstancePath(operation.xml, path);
+    }
+}
+
+void associators(Operation& operation)
+{
+    writeObjects(operation,
+                 operation.broker.associators(objectName(operation), operation.filter(), operation.properties()));
+}
+
+void associatorNames(Operation& operation)
+{
+    writePaths(operation, operation.broker.associatorNames(objectName(operation), operation.filter()));
+}
+
+void references(Operation& operation)
+{
+    writeObjects(operation,
+                 operation.broker.references(objectName(operation), operation.filter(), operation.properties()));
+}
+
+void referenceNames(Operation& operation)
+{
+    writePaths(operation, operation.broker.referenceNames(objectName(operation), operation.filter()));
+}
+
+// --- classes
+
+ClassView viewOf(const Operation& operation)
+{
+    ClassView view{.localOnly = operation.flag("LocalOnly", true),
+                   .qualifiers = operation.flag("IncludeQualifiers", true),
+                   .origin = operation.flag("IncludeClassOrigin", false)};
+    if (const PropertyList list = operation.properties())
+        view.shows = [list](std::string_view name)
+        { return std::ranges::any_of(*list, [&](const std::string& known) { return sameName(known, name); }); };
+    return view;
+}
+
+/// Below the class that the client names, or the top; all of them, or one generation.
+std::vector<const ClassInfo*> classesBelow(const Operation& operation)
+{
+    const bool deep = operation.flag("DeepInheritance", false);
+    const bool named = !operation.className("ClassName").empty();
+    const ClassInfo* root = named ? &operation.requiredClass("ClassName") : nullptr;
+    std::vector<const ClassInfo*> below;
+    for (const auto& info : operation.broker.classes().all())
+        if (deep ? !root || (info.get() != root && info->isA(root->name)) : info->superclass == root)
+            below.push_back(info.get());
+    return below;
+}
+
+void getClass(Operation& operation)
+{
+    writeClass(operation.xml, operation.requiredClass("ClassName"), viewOf(operation));
+}
+
+void enumerateClasses(Operation& operation)
+{
+    for (const ClassInfo* info : classesBelow(operation))
+        writeClass(operation.xml, *info, viewOf(operation));
+}
+
+void enumerateClassNames(Operation& operation)
+{
+    for (const ClassInfo* info : classesBelow(operation))
+        operation.xml.leaf("CLASSNAME", "", {{"NAME", info->name}});
+}
+
+struct Row
+{
+    std::string_view name;
+    void (*carryOut)(Operation&);
+    bool hasResult = true; ///< an IRETURNVALUE, be it empty
+};
+
+constexpr Row rows[] = {
+    {"EnumerateInstances", enumerateInstances},
+    {"EnumerateInstanceNames", enumerateInstanceNames},
+    {"GetInstance", getInstance},
+    {"CreateInstance", createInstance},
+    {"ModifyInstance", modifyInstance, false},
+    {"DeleteInstance", deleteInstance, false},
+    {"Associators", associators},
+    {"AssociatorNames", associatorNames},
+    {"References", references},
+    {"ReferenceNames", referenceNames},
+    {"GetClass", getClass},
+    {"EnumerateClasses", enumerateClasses},
+    {"EnumerateClassNames", enumerateClassNames},
+};
+
+void carryOutIntrinsic(Operation& operation)
+{
+    const auto* row =
+        std::ranges::find_if(rows, [&](const Row& known) { return sameName(known.name, operation.request().name); });
+    if (row == std::end(rows))
+        throw CimFailure{CMPI_RC_ERR_NOT_SUPPORTED,
+                         "the operation '" + operation.request().name + "' is not supported"};
+    std::optional<XmlElement> result;
+    if (row->hasResult)
+        result.emplace(operation.xml, "IRETURNVALUE");
+    row->carryOut(operation);
+}
+
+// --- methods of classes
+
+std::vector<Property> argumentsOf(const Operation& operation, const MethodInfo& method)
+{
+    std::vector<Property> arguments;
+    for (const xml_node& node : operation.request().call.children("PARAMVALUE"))
+    {
+        const std::string name = node.attribute("NAME").value();
+        const FeatureInfo* known = method.parameter(name);
+        if (!known)
+            throw CimFailure{CMPI_RC_ERR_INVALID_PARAMETER, method.name + " has no parameter '" + name + "'"};
+        const Target target(operation.broker.classes(), operation.nameSpace(), *known);
+        setNamed(arguments, known->name, operation.decoder().value(node, target));
+    }
+    return arguments;
+}
+
+/// Null output parameters are left out: a client crashes on them.
+void writeReply(XmlText& xml, const MethodReply& reply)
+{
+    if (!reply.returnValue.isNull())
+    {
+        const XmlElement result(xml, "RETURNVALUE", {{"PARAMTYPE", xmlType(reply.returnValue.type())}});
+        writeValue(xml, reply.returnValue);
+    }
+    for (const Property& parameter : reply.out)
+        if (!parameter.value.isNull())
+        {
+            const XmlElement out(xml, "PARAMVALUE",
+                                 {{"NAME", parameter.name}, {"PARAMTYPE", xmlType(parameter.value.type())}});
+            writeValue(xml, parameter.value);
+        }
+}
+
+void carryOutExtrinsic(Operation& operation)
+{
+    const Request& request = operation.request();
+    const Path path = operation.decoder().path(firstElement(request.call));
+    const ClassInfo* info = operation.broker.classes().find(path.className);
+    if (!info)
+        throw CimFailure{CMPI_RC_ERR_INVALID_CLASS, "there is no class '" + path.className + "'"};
+    const MethodInfo* method = info->method(request.name);
+    if (!method)
+        throw CimFailure{CMPI_RC_ERR_METHOD_NOT_FOUND, info->name + " has no method '" + request.name + "'"};
+    const MethodReply reply = operation.broker.invokeMethod(path, method->name, argumentsOf(operation, *method));
+    expect(reply);
+    writeReply(operation.xml, reply);
+}
+
+/// Codes above 17 are CMPI's alone.
+std::string codeOf(CMPIrc status)
+{
+    return std::to_string(status >= CMPI_RC_ERR_FAILED && status <= CMPI_RC_ERR_METHOD_NOT_FOUND ? status
+                                                                                                 : CMPI_RC_ERR_FAILED);
+}
+
+/// What stands between the tags of the response: the result, or the error in its place.
+std::string contentOf(Broker& broker, const Request& request)
+{
+    const auto failure = [](CMPIrc status, std::string_view text)
+    {
+        std::string content;
+        XmlText(content).leaf("ERROR", "", {{"CODE", codeOf(status)}, {"DESCRIPTION", text}});
+        return content;
+    };
+    try
+    {
+        std::string content;
+        XmlText xml(content);
+        Operation operation(broker, request, xml);
+        request.extrinsic ? carryOutExtrinsic(operation) : carryOutIntrinsic(operation);
+        return content;
+    }
+    catch (const CimFailure& error)
+    {
+        return failure(error.status, error.text.empty() ? statusName(error.status) : error.text);
+    }
+    catch (const std::invalid_argument& error)
+    {
+        return failure(CMPI_RC_ERR_INVALID_PARAMETER, error.what());
+    }
+}
+
+} // namespace
+
+std::string answer(Broker& broker, std::string_view text)
+{
+    pugi::xml_document document;
+    parseXml(document, text);
+    const Request request = readRequest(document);
+    const std::string content = contentOf(broker, request);
+    std::string response = R"(<?xml version="1.0" encoding="utf-8"?>)";
+    {
+        XmlText xml(response);
+        const XmlElement cim(xml, "CIM", {{"CIMVERSION", "2.0"}, {"DTDVERSION", "2.0"}});
+        const XmlElement message(xml, "MESSAGE", {{"ID", request.id}, {"PROTOCOLVERSION", "1.0"}});
+        const XmlElement simple(xml, "SIMPLERSP");
+        const XmlElement result(xml, request.extrinsic ? "METHODRESPONSE" : "IMETHODRESPONSE",
+                                {{"NAME", request.name}});
+        response += content;
+    }
+    return response;
+}
+
+} // namespace cimxml
