@@ -61,10 +61,8 @@ public:
     const ClassInfo& requiredClass(const char* name) const
     {
         const std::string text = required(name).attribute("NAME").value();
-        const ClassInfo* info = broker.classes().find(text);
-        if (!info)
-            throw CimFailure{CMPI_RC_ERR_INVALID_CLASS, "there is no class '" + text + "'"};
-        return *info;
+        expect(broker.findClass(nameSpace(), text));
+        return *broker.classes().find(text);
     }
     std::string text(const char* name) const { return childOf(_request.parameter(name), "VALUE").text().get(); }
     bool flag(const char* name, bool otherwise) const
@@ -222,9 +220,11 @@ std::vector<const ClassInfo*> classesBelow(const Operation& operation)
     const bool deep = operation.flag("DeepInheritance", false);
     const bool named = !operation.className("ClassName").empty();
     const ClassInfo* root = named ? &operation.requiredClass("ClassName") : nullptr;
+    const auto isBelow = [&](const ClassInfo& info)
+    { return deep ? !root || (&info != root && info.isA(root->name)) : info.superclass == root; };
     std::vector<const ClassInfo*> below;
     for (const auto& info : operation.broker.classes().all())
-        if (deep ? !root || (info.get() != root && info->isA(root->name)) : info->superclass == root)
+        if (isBelow(*info) && operation.broker.findClass(operation.nameSpace(), info->name).ok())
             below.push_back(info.get());
     return below;
 }
@@ -320,9 +320,8 @@ void carryOutExtrinsic(Operation& operation)
 {
     const Request& request = operation.request();
     const Path path = operation.decoder().path(firstElement(request.call));
+    expect(operation.broker.findClass(path.nameSpace, path.className));
     const ClassInfo* info = operation.broker.classes().find(path.className);
-    if (!info)
-        throw CimFailure{CMPI_RC_ERR_INVALID_CLASS, "there is no class '" + path.className + "'"};
     const MethodInfo* method = info->method(request.name);
     if (!method)
         throw CimFailure{CMPI_RC_ERR_METHOD_NOT_FOUND, info->name + " has no method '" + request.name + "'"};
@@ -352,6 +351,7 @@ std::string contentOf(Broker& broker, const Request& request)
         std::string content;
         XmlText xml(content);
         Operation operation(broker, request, xml);
+        expect(broker.findClass(request.nameSpace, {}));
         request.extrinsic ? carryOutExtrinsic(operation) : carryOutIntrinsic(operation);
         return content;
     }
