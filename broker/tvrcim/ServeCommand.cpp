@@ -4,7 +4,7 @@
 #include "broker/tvrcim/SignalEnd.h"
 
 #include <charconv>
-#include <iostream>
+#include <ostream>
 
 namespace tvrcim
 {
@@ -53,8 +53,8 @@ void serve(Session& session, const Command& command)
     const cimxml::ServerOptions options = optionsOf(command);
     const Interruptible interruptible(session.signals);
     const cimxml::Server server(session.broker, options);
-    std::cerr << "tvrcim: listening on " << (options.certificate.empty() ? "http" : "https") << "://" << options.address
-              << ':' << server.port() << std::endl;
+    session.out << "listening on " << (options.certificate.empty() ? "http" : "https") << "://" << options.address
+                << ':' << server.port() << std::endl;
     while (session.signals && !session.signals->awaitInterrupt(1h))
         ;
 }

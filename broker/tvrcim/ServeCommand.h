@@ -6,7 +6,7 @@
 namespace tvrcim
 {
 
-/// Says on standard error where it listens, and answers until SIGINT.
+/// Says where it listens, and answers until SIGINT.
 void serve(Session& session, const Command& command);
 
 } // namespace tvrcim
