@@ -17,10 +17,15 @@ using pugi::xml_node;
 namespace
 {
 
+/// Codes of pulled results, which CMPI does not know.
+constexpr int wrongContext = 21;
+constexpr int noFilters = 25;
+constexpr int limitsExceeded = 27;
+
 /// An operation that failed; the client gets its code and text.
 struct CimFailure
 {
-    CMPIrc status;
+    int status;
     std::string text;
 };
 
@@ -34,11 +39,12 @@ void expect(const Outcome& outcome)
 class Operation
 {
 public:
-    Operation(Broker& target, const Request& request, XmlText& result)
-        : broker(target), xml(result), _request(request), _decoder(target.classes(), request.nameSpace)
+    Operation(Broker& target, Pulls& kept, const Request& request, XmlText& result)
+        : broker(target), pulls(kept), xml(result), _request(request), _decoder(target.classes(), request.nameSpace)
     {}
 
     Broker& broker;
+    Pulls& pulls;
     XmlText& xml;
 
     const Request& request() const { return _request; }
@@ -70,6 +76,14 @@ public:
         const std::string value = text(name);
         return value.empty() ? otherwise : sameName(value, "true");
     }
+    std::optional<std::uint32_t> number(const char* name) const
+    {
+        const std::string value = text(name);
+        if (value.empty())
+            return std::nullopt;
+        const Target target(broker.classes(), nameSpace(), CMPI_uint32);
+        return static_cast<std::uint32_t>(parseScalar(target, value).asUnsigned());
+    }
     PropertyList properties() const
     {
         const xml_node list = childOf(_request.parameter("PropertyList"), "VALUE.ARRAY");
@@ -82,7 +96,7 @@ public:
     }
     AssociationFilter filter() const
     {
-        const bool ofAssociations = _request.name.starts_with("Reference");
+        const bool ofAssociations = _request.name.find("Reference") != std::string::npos;
         return {className(ofAssociations ? "ResultClass" : "AssocClass"),
                 ofAssociations ? std::string() : className("ResultClass"), text("Role"), text("ResultRole")};
     }
@@ -246,11 +260,133 @@ void enumerateClassNames(Operation& operation)
         operation.xml.leaf("CLASSNAME", "", {{"NAME", info->name}});
 }
 
+// --- results in parts
+
+constexpr std::uint32_t longestTime = 300; ///< seconds between two requests
+
+void writePart(Operation& operation, const Part& part)
+{
+    {
+        const XmlElement result(operation.xml, "IRETURNVALUE");
+        for (const std::string& element : part.elements)
+            operation.xml.markup(element);
+    }
+    const auto write = [&](const char* name, const char* type, std::string_view value)
+    {
+        const XmlElement out(operation.xml, "PARAMVALUE", {{"NAME", name}, {"PARAMTYPE", type}});
+        operation.xml.leaf("VALUE", value);
+    };
+    write("EnumerationContext", "string", part.context);
+    write("EndOfSequence", "boolean", part.context.empty() ? "TRUE" : "FALSE");
+}
+
+/// `write(xml, item)` makes an element of an item of the result.
+template <class Items, class Write>
+void openResult(Operation& operation, PulledKind kind, const Items& items, Write write)
+{
+    std::vector<std::string> elements;
+    for (const auto& item : items)
+    {
+        XmlText xml(elements.emplace_back());
+        write(xml, item);
+    }
+    const std::uint32_t time = operation.number("OperationTimeout").value_or(0);
+    const std::optional<Part> part =
+        operation.pulls.open(kind, std::move(elements), operation.number("MaxObjectCount").value_or(0),
+                             std::chrono::seconds(time == 0 ? longestTime : std::min(time, longestTime)));
+    if (!part)
+        throw CimFailure{limitsExceeded, "too many results are being pulled"};
+    writePart(operation, *part);
+}
+
+void expectNoFilter(const Operation& operation)
+{
+    if (!operation.text("FilterQueryLanguage").empty() || !operation.text("FilterQuery").empty())
+        throw CimFailure{noFilters, "filters are not supported"};
+}
+
+void openObjects(Operation& operation, const Reply& reply)
+{
+    expectNoFilter(operation);
+    expect(reply);
+    openResult(operation, PulledKind::instances, reply.objects,
+               [&](XmlText& xml, const Object& object)
+               {
+                   const XmlElement whole(xml, "VALUE.INSTANCEWITHPATH");
+                   writeInstancePath(xml, object.path);
+                   writeInstance(xml, object, operation.classOf(object));
+               });
+}
+
+void openPaths(Operation& operation, const NamesReply& reply)
+{
+    expectNoFilter(operation);
+    expect(reply);
+    openResult(operation, PulledKind::paths, reply.paths, writeInstancePath);
+}
+
+Path instanceName(const Operation& operation)
+{
+    return operation.decoder().path(operation.required("InstanceName"));
+}
+
+void openInstances(Operation& operation)
+{
+    openObjects(operation,
+                operation.broker.enumerateInstances(operation.nameSpace(), operation.requiredClass("ClassName").name,
+                                                    operation.properties()));
+}
+
+void openInstancePaths(Operation& operation)
+{
+    openPaths(operation, operation.broker.enumerateInstanceNames(operation.nameSpace(),
+                                                                 operation.requiredClass("ClassName").name));
+}
+
+void openAssociators(Operation& operation)
+{
+    openObjects(operation,
+                operation.broker.associators(instanceName(operation), operation.filter(), operation.properties()));
+}
+
+void openAssociatorPaths(Operation& operation)
+{
+    openPaths(operation, operation.broker.associatorNames(instanceName(operation), operation.filter()));
+}
+
+void openReferences(Operation& operation)
+{
+    openObjects(operation,
+                operation.broker.references(instanceName(operation), operation.filter(), operation.properties()));
+}
+
+void openReferencePaths(Operation& operation)
+{
+    openPaths(operation, operation.broker.referenceNames(instanceName(operation), operation.filter()));
+}
+
+template <PulledKind kind> void pull(Operation& operation)
+{
+    const std::optional<std::uint32_t> most = operation.number("MaxObjectCount");
+    if (!most)
+        throw CimFailure{CMPI_RC_ERR_INVALID_PARAMETER, "there is no MaxObjectCount"};
+    const std::optional<Part> part = operation.pulls.pull(kind, operation.text("EnumerationContext"), *most);
+    if (!part)
+        throw CimFailure{wrongContext, "there is no such result any more"};
+    writePart(operation, *part);
+}
+
+void closeEnumeration(Operation& operation)
+{
+    if (!operation.pulls.close(operation.text("EnumerationContext")))
+        throw CimFailure{wrongContext, "there is no such result any more"};
+}
+
 struct Row
 {
     std::string_view name;
     void (*carryOut)(Operation&);
-    bool hasResult = true; ///< an IRETURNVALUE, be it empty
+    bool hasResult = true; ///< an IRETURNVALUE, be it empty, around what it writes
 };
 
 constexpr Row rows[] = {
@@ -267,6 +403,15 @@ constexpr Row rows[] = {
     {"GetClass", getClass},
     {"EnumerateClasses", enumerateClasses},
     {"EnumerateClassNames", enumerateClassNames},
+    {"OpenEnumerateInstances", openInstances, false},
+    {"OpenEnumerateInstancePaths", openInstancePaths, false},
+    {"OpenAssociatorInstances", openAssociators, false},
+    {"OpenAssociatorInstancePaths", openAssociatorPaths, false},
+    {"OpenReferenceInstances", openReferences, false},
+    {"OpenReferenceInstancePaths", openReferencePaths, false},
+    {"PullInstancesWithPath", pull<PulledKind::instances>, false},
+    {"PullInstancePaths", pull<PulledKind::paths>, false},
+    {"CloseEnumeration", closeEnumeration, false},
 };
 
 void carryOutIntrinsic(Operation& operation)
@@ -330,17 +475,17 @@ void carryOutExtrinsic(Operation& operation)
     writeReply(operation.xml, reply);
 }
 
-/// Codes above 17 are CMPI's alone.
-std::string codeOf(CMPIrc status)
+/// Those above are CMPI's alone.
+std::string codeOf(int status)
 {
-    return std::to_string(status >= CMPI_RC_ERR_FAILED && status <= CMPI_RC_ERR_METHOD_NOT_FOUND ? status
-                                                                                                 : CMPI_RC_ERR_FAILED);
+    constexpr int lastCode = 28;
+    return std::to_string(status >= CMPI_RC_ERR_FAILED && status <= lastCode ? status : CMPI_RC_ERR_FAILED);
 }
 
 /// What stands between the tags of the response: the result, or the error in its place.
-std::string contentOf(Broker& broker, const Request& request)
+std::string contentOf(Broker& broker, Pulls& pulls, const Request& request)
 {
-    const auto failure = [](CMPIrc status, std::string_view text)
+    const auto failure = [](int status, std::string_view text)
     {
         std::string content;
         XmlText(content).leaf("ERROR", "", {{"CODE", codeOf(status)}, {"DESCRIPTION", text}});
@@ -350,14 +495,14 @@ std::string contentOf(Broker& broker, const Request& request)
     {
         std::string content;
         XmlText xml(content);
-        Operation operation(broker, request, xml);
+        Operation operation(broker, pulls, request, xml);
         expect(broker.findClass(request.nameSpace, {}));
         request.extrinsic ? carryOutExtrinsic(operation) : carryOutIntrinsic(operation);
         return content;
     }
     catch (const CimFailure& error)
     {
-        return failure(error.status, error.text.empty() ? statusName(error.status) : error.text);
+        return failure(error.status, error.text.empty() ? statusName(static_cast<CMPIrc>(error.status)) : error.text);
     }
     catch (const std::invalid_argument& error)
     {
@@ -367,12 +512,12 @@ std::string contentOf(Broker& broker, const Request& request)
 
 } // namespace
 
-std::string answer(Broker& broker, std::string_view text)
+std::string answer(Broker& broker, Pulls& pulls, std::string_view text)
 {
     pugi::xml_document document;
     parseXml(document, text);
     const Request request = readRequest(document);
-    const std::string content = contentOf(broker, request);
+    const std::string content = contentOf(broker, pulls, request);
     std::string response = R"(<?xml version="1.0" encoding="utf-8"?>)";
     {
         XmlText xml(response);

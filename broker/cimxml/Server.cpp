@@ -52,12 +52,12 @@ void limit(httplib::Server& server)
     server.set_keep_alive_timeout(secondsOfSilence);
 }
 
-void answerTo(broker::Broker& broker, const httplib::Request& request, httplib::Response& response)
+void answerTo(broker::Broker& broker, Pulls& pulls, const httplib::Request& request, httplib::Response& response)
 {
     try
     {
         response.set_header("CIMOperation", "MethodResponse");
-        response.set_content(answer(broker, request.body), "application/xml; charset=\"utf-8\"");
+        response.set_content(answer(broker, pulls, request.body), "application/xml; charset=\"utf-8\"");
     }
     catch (const HttpRefusal& refusal)
     {
@@ -83,8 +83,8 @@ struct Server::Listener
                 response.set_header("WWW-Authenticate", "Basic realm=\"tvrcim\"");
                 return httplib::Server::HandlerResponse::Handled;
             });
-        server->Post(".*", [&broker](const httplib::Request& request, httplib::Response& response)
-                     { answerTo(broker, request, response); });
+        server->Post(".*", [this, &broker](const httplib::Request& request, httplib::Response& response)
+                     { answerTo(broker, pulls, request, response); });
         port = options.port == 0                                     ? server->bind_to_any_port(options.address)
                : server->bind_to_port(options.address, options.port) ? options.port
                                                                      : -1;
@@ -106,6 +106,7 @@ struct Server::Listener
         thread.join();
     }
 
+    Pulls pulls;
     std::unique_ptr<httplib::Server> server;
     int port = -1;
     std::atomic<bool> ended = false;

@@ -25,6 +25,8 @@ public:
     void close(std::string_view element);
     /// Escaped. What XML cannot hold, or is no UTF-8, becomes a question mark.
     void characters(std::string_view text);
+    /// As it is.
+    void markup(std::string_view text) { _text += text; }
     void leaf(std::string_view element, std::string_view text, std::initializer_list<XmlAttribute> attributes = {});
 
 private:

@@ -43,6 +43,11 @@ std::string ofClass(const std::string& name)
     return parameter("ClassName", "<CLASSNAME NAME=\"" + name + "\"/>");
 }
 
+std::string most(unsigned count)
+{
+    return parameter("MaxObjectCount", "<VALUE>" + std::to_string(count) + "</VALUE>");
+}
+
 std::string methodCall(const std::string& arguments, const std::string& method = "Add")
 {
     return message("<METHODCALL NAME=\"" + method + "\"><LOCALINSTANCEPATH>" + nameSpace + portOne +
@@ -67,7 +72,8 @@ struct Host : Fixture
                return ok;
            });
     }
-    std::string ask(const std::string& request) { return answer(*broker, request); }
+    cimxml::Pulls pulls;
+    std::string ask(const std::string& request) { return answer(*broker, pulls, request); }
 };
 
 TEST(CimXmlOperations, AnswersHaveTheFrameOfTheirRequests)
@@ -91,7 +97,11 @@ TEST(CimXmlOperations, FailuresAreAnswersWithTheirCodes)
         std::string request;
         int code;
     } rows[] = {
-        {operation("OpenEnumerateInstances", ofClass("TST_Base")), 7},
+        {operation("ExecQuery", ""), 7},
+        {operation("PullInstancePaths", parameter("EnumerationContext", "<VALUE>x</VALUE>") + most(1)), 21},
+        {operation("CloseEnumeration", parameter("EnumerationContext", "<VALUE>x</VALUE>")), 21},
+        {operation("OpenEnumerateInstancePaths", ofClass("TST_Base") + parameter("FilterQuery", "<VALUE>x</VALUE>")),
+         25},
         {operation("EnumerateInstances", ofClass("TST_Base"), elsewhere), 3},
         {operation("EnumerateClassNames", "", elsewhere), 3},
         {operation("EnumerateInstances", ofClass("None")), 5},
@@ -175,6 +185,25 @@ TEST(CimXmlOperations, ArgumentsGetTheTypesOfTheClass)
         host.ask(methodCall(R"(<PARAMVALUE NAME="a"><VALUE>41</VALUE></PARAMVALUE>)")),
         HasSubstr(R"(<METHODRESPONSE NAME="Add"><RETURNVALUE PARAMTYPE="uint32"><VALUE>0</VALUE></RETURNVALUE>)"
                   R"(<PARAMVALUE NAME="Sum" PARAMTYPE="uint32"><VALUE>42</VALUE></PARAMVALUE></METHODRESPONSE>)"));
+}
+
+TEST(CimXmlOperations, ResultsArePulledInParts)
+{
+    Host host;
+    const std::string opened = host.ask(operation("OpenEnumerateInstancePaths", ofClass("TST_Base")));
+    EXPECT_THAT(opened, HasSubstr(R"(<IRETURNVALUE></IRETURNVALUE>)"));
+    EXPECT_THAT(opened, HasSubstr(R"(<PARAMVALUE NAME="EndOfSequence" PARAMTYPE="boolean"><VALUE>FALSE</VALUE>)"));
+    const std::string mark = R"(<PARAMVALUE NAME="EnumerationContext" PARAMTYPE="string">)";
+    const std::size_t at = opened.find(mark) + mark.size();
+    const std::string context =
+        parameter("EnumerationContext", opened.substr(at, opened.find("</PARAMVALUE>", at) - at));
+    EXPECT_THAT(host.ask(operation("PullInstancesWithPath", context + most(1))), HasSubstr(error(21)));
+    const std::string pulled = host.ask(operation("PullInstancePaths", context + most(9)));
+    EXPECT_THAT(pulled, HasSubstr(R"(<IRETURNVALUE><INSTANCEPATH>)"));
+    EXPECT_THAT(pulled, HasSubstr(R"(PARAMTYPE="boolean"><VALUE>TRUE</VALUE>)"));
+    EXPECT_THAT(host.ask(operation("PullInstancePaths", context + most(1))), HasSubstr(error(21)));
+    EXPECT_THAT(host.ask(operation("OpenEnumerateInstancePaths", ofClass("TST_Base") + most(9))),
+                HasSubstr(R"(<VALUE>TRUE</VALUE>)"));
 }
 
 TEST(CimXmlOperations, ClassesAreGivenByGeneration)
