@@ -139,6 +139,18 @@ MethodReply Broker::invokeMethod(const Path& path, const std::string& method, co
     return guarded<MethodReply>([&](Dispatcher dispatcher) { return dispatcher.invokeMethod(path, method, in); });
 }
 
+Outcome Broker::findClass(std::string_view nameSpace, std::string_view className)
+{
+    return guarded<Outcome>(
+        [&](Dispatcher dispatcher)
+        {
+            Outcome outcome;
+            if (!className.empty() || !dispatcher.exists(nameSpace))
+                dispatcher.findClass(nameSpace, className, outcome);
+            return outcome;
+        });
+}
+
 const ClassTable& Broker::classes() const
 {
     return _core->classes;

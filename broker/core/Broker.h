@@ -50,6 +50,9 @@ public:
     Outcome deleteInstance(const Path& path);
     MethodReply invokeMethod(const Path& path, const std::string& method, const std::vector<Property>& in = {});
 
+    /// Whether the namespace is there, and has the class, as the operations would say; an empty name asks for the
+    /// namespace alone.
+    Outcome findClass(std::string_view nameSpace, std::string_view className);
     const ClassTable& classes() const;
     Store& store();
     /// Classes that the module serves, in its order of linking.

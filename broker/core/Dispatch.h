@@ -34,11 +34,12 @@ public:
     Reply references(const Path& path, const AssociationFilter& filter, const PropertyList& properties);
     NamesReply referenceNames(const Path& path, const AssociationFilter& filter);
     MethodReply invokeMethod(const Path& path, const std::string& method, const std::vector<Property>& in);
+    /// Null, with the reason in `outcome`, where the namespace has no such class.
+    const ClassInfo* findClass(std::string_view nameSpace, std::string_view className, Outcome& outcome);
+    bool exists(std::string_view nameSpace) const;
 
 private:
-    const ClassInfo* findClass(std::string_view nameSpace, std::string_view className, Outcome& outcome);
     const ClassInfo* findClassOf(const Path& path, Outcome& outcome);
-    bool exists(std::string_view nameSpace) const;
     Provider* providerOf(const ClassInfo& info, std::string_view nameSpace) const;
     bool skips(const Outcome& outcome, std::size_t providers) const;
     PropertyList listOfSuperclass(std::string_view className) const;

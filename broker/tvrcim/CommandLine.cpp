@@ -104,6 +104,16 @@ public:
                              "name=value of TVRHBA_FCHBADiagnosticSettingData, such as TargetDevice=WWPN");
         return *this;
     }
+    CommandOptions& port()
+    {
+        _current->add_option("--listen", _command.listen, "address and port")->default_str("127.0.0.1:5988");
+        _current->add_option("--tls", _command.tls, "files of a certificate and of its key, both PEM")
+            ->expected(2)
+            ->check(CLI::ExistingFile);
+        _current->add_option("--users", _command.users, "file of lines name:hash; 'openssl passwd -6' prints the hash")
+            ->check(CLI::ExistingFile);
+        return *this;
+    }
     CommandOptions& associationClass(const char* option)
     {
         _current->add_option(option, _command.filter.assocClass, "association class");
@@ -167,6 +177,7 @@ void addCommands(CommandOptions& options)
         .add("diag", "run a diagnostic test of a port and tell how it ended; exits with 5 when it did not pass. SIGINT "
                      "cancels a D-Port test and waits for its end")
         .test();
+    options.add("serve", "answer CIM clients over HTTP until SIGINT; other hosts need --tls and --users").port();
 }
 
 std::vector<std::string> serverNames()

@@ -7,6 +7,7 @@
 #include "broker/tvrcim/LogCommand.h"
 #include "broker/tvrcim/Progress.h"
 #include "broker/tvrcim/Replies.h"
+#include "broker/tvrcim/ServeCommand.h"
 #include "broker/tvrcim/Topology.h"
 #include "broker/values/PathText.h"
 #include "broker/values/ValueMap.h"
@@ -308,7 +309,7 @@ struct CommandRow
     void (*run)(Session& session, const Command& command);
 };
 
-constexpr std::array<CommandRow, 16> commands{{
+constexpr std::array<CommandRow, 17> commands{{
     {"classes", listClasses},
     {"class", showClass},
     {"methods", showMethods},
@@ -325,6 +326,7 @@ constexpr std::array<CommandRow, 16> commands{{
     {"topology", drawTopology},
     {"log", showLog},
     {"diag", diagnose},
+    {"serve", serve},
 }};
 
 } // namespace

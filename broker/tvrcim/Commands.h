@@ -68,6 +68,9 @@ struct Command
     bool follow = false;
     unsigned level = 0; ///< the last that is shown; 0 for all
     std::string test = {};
+    std::string listen = {};           ///< address:port
+    std::vector<std::string> tls = {}; ///< files of a certificate and its key
+    std::string users = {};            ///< a file
 };
 
 class SignalEnd;

@@ -118,29 +118,6 @@ Value parseArray(const Target& target, std::string_view text)
     return json.is_discarded() ? parsePlainArray(target, text) : valueFromJson(target, json);
 }
 
-Value parseScalar(const Target& target, std::string_view text)
-{
-    if (isInteger(target.type) || target.type == CMPI_char16)
-        return parseInteger(text, target.type);
-    switch (target.type)
-    {
-    case CMPI_boolean:
-        return Value::boolean(parseBoolean(text));
-    case CMPI_real32:
-        return Value::real32(parseNumber<float>(text, target.type));
-    case CMPI_real64:
-        return Value::real64(parseNumber<double>(text, target.type));
-    case CMPI_dateTime:
-        return Value::dateTime(parseDateTime(text));
-    case CMPI_ref:
-        return Value::reference(parsePath(text, target.classes, target.nameSpace));
-    case CMPI_string:
-        return Value::string(std::string(text));
-    default:
-        throw std::invalid_argument("a value of " + typeText(target.type) + " cannot be written as text");
-    }
-}
-
 } // namespace
 
 std::string typeText(CMPIType type)
@@ -188,6 +165,29 @@ std::string mofValue(const Value& value)
     const bool bare =
         isInteger(type) || type == CMPI_char16 || type == CMPI_boolean || type == CMPI_real32 || type == CMPI_real64;
     return bare ? valueText(value) : quoteText(valueText(value));
+}
+
+Value parseScalar(const Target& target, std::string_view text)
+{
+    if (isInteger(target.type) || target.type == CMPI_char16)
+        return parseInteger(text, target.type);
+    switch (target.type)
+    {
+    case CMPI_boolean:
+        return Value::boolean(parseBoolean(text));
+    case CMPI_real32:
+        return Value::real32(parseNumber<float>(text, target.type));
+    case CMPI_real64:
+        return Value::real64(parseNumber<double>(text, target.type));
+    case CMPI_dateTime:
+        return Value::dateTime(parseDateTime(text));
+    case CMPI_ref:
+        return Value::reference(parsePath(text, target.classes, target.nameSpace));
+    case CMPI_string:
+        return Value::string(std::string(text));
+    default:
+        throw std::invalid_argument("a value of " + typeText(target.type) + " cannot be written as text");
+    }
 }
 
 std::string quoteText(std::string_view text)

@@ -42,4 +42,8 @@ struct Target
 /// text in double quotes is a JSON string. Throws std::invalid_argument with the reason.
 Value parseValue(const Target& target, std::string_view text);
 
+/// Reads a text that is as it stands a value of the target's type, which is no array. Throws std::invalid_argument with
+/// the reason.
+Value parseScalar(const Target& target, std::string_view text);
+
 } // namespace broker

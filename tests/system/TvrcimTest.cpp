@@ -1,6 +1,6 @@
 // The command-line tool as a person or a script uses it: a process of its own, its output and its exit code.
-#include "tests/support/Command.h"
 #include "tests/support/Eventually.h"
+#include "tests/system/Tool.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -23,16 +23,11 @@
 #include <utility>
 #include <vector>
 
+using namespace system_test;
 using testing::HasSubstr;
 
 namespace
 {
-
-/// Runs the tool with arguments as a shell would read them, in an environment that assignments may change.
-Answer tvrcim(const std::string& arguments, const std::string& environment = "")
-{
-    return runCommand(environment + TVR_TVRCIM + " " + arguments);
-}
 
 nlohmann::json json(const std::string& arguments)
 {
@@ -444,87 +439,6 @@ std::size_t semaphoresOf(pid_t process)
                                   return name.starts_with("sem.TVR") && name.ends_with(ending);
                               }));
 }
-
-/// The tool at work, with its output in a pipe that holds a page.
-class Running
-{
-public:
-    explicit Running(std::vector<const char*> words)
-    {
-        words.insert(words.begin(), TVR_TVRCIM);
-        words.push_back(nullptr);
-        int ends[2];
-        EXPECT_EQ(pipe2(ends, O_CLOEXEC), 0);
-        fcntl(ends[1], F_SETPIPE_SZ, 4096);
-        _process = fork();
-        if (_process == 0)
-        {
-            dup2(ends[1], STDOUT_FILENO);
-            execv(words[0], const_cast<char* const*>(words.data()));
-            _exit(127);
-        }
-        close(ends[1]);
-        _output = ends[0];
-    }
-    ~Running()
-    {
-        close(_output);
-        if (_process > 0)
-        {
-            kill(_process, SIGKILL);
-            waitpid(_process, nullptr, 0);
-        }
-    }
-    Running(const Running&) = delete;
-    Running& operator=(const Running&) = delete;
-
-    pid_t process() const { return _process; }
-    bool awaitOutput() const
-    {
-        pollfd ready{_output, POLLIN, 0};
-        return poll(&ready, 1, 20000) == 1;
-    }
-    /// Its exit code after the signal; -1 when that killed it.
-    int endBy(int signal)
-    {
-        kill(_process, signal);
-        return exitCode();
-    }
-
-    std::string readLine() const
-    {
-        std::string line;
-        for (char c = 0; awaitOutput() && read(_output, &c, 1) == 1 && c != '\n';)
-            line += c;
-        return line;
-    }
-    /// Its exit code when nobody reads any more.
-    int closeOutput()
-    {
-        close(std::exchange(_output, -1));
-        return exitCode();
-    }
-
-    /// Its exit code after all of its output.
-    int readAll()
-    {
-        char buffer[4096];
-        while (read(_output, buffer, sizeof buffer) > 0)
-            continue;
-        return exitCode();
-    }
-
-private:
-    int exitCode()
-    {
-        int status = 0;
-        waitpid(std::exchange(_process, -1), &status, 0);
-        return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-    }
-
-    pid_t _process;
-    int _output;
-};
 
 /// A signal finds the tool between two operations, or inside one that never ends: what it says about itself in the
 /// system is gone afterwards all the same.

@@ -1,0 +1,39 @@
+// The CIM-XML port: operations over HTTP (DSP0200).
+#pragma once
+
+#include "broker/cimxml/Users.h"
+#include "broker/core/Broker.h"
+
+#include <memory>
+#include <string>
+
+namespace cimxml
+{
+
+struct ServerOptions
+{
+    std::string address = "127.0.0.1";
+    int port = 5988;              ///< 0 takes a free one
+    std::string certificate = {}; ///< file in PEM; empty for HTTP
+    std::string key = {};
+    Users users = {};
+};
+
+/// Answers from the time it is made, on threads of its own, until it is destroyed. The broker outlives it.
+class Server
+{
+public:
+    /// Throws std::runtime_error where it cannot listen, or would do so for other hosts without users and TLS.
+    Server(broker::Broker& broker, const ServerOptions& options);
+    ~Server();
+    Server(const Server&) = delete;
+    Server& operator=(const Server&) = delete;
+
+    int port() const;
+
+private:
+    struct Listener;
+    std::unique_ptr<Listener> _listener;
+};
+
+} // namespace cimxml

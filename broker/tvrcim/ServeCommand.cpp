@@ -1,0 +1,62 @@
+#include "broker/tvrcim/ServeCommand.h"
+
+#include "broker/cimxml/Server.h"
+#include "broker/tvrcim/SignalEnd.h"
+
+#include <charconv>
+#include <ostream>
+
+namespace tvrcim
+{
+
+namespace
+{
+
+/// "address:port", of which either part may be missing; an address of IPv6 stands in brackets.
+void readListen(cimxml::ServerOptions& options, const std::string& text)
+{
+    const std::size_t mark = text.rfind(':');
+    const bool hasPort = mark != text.npos && text.find(']', mark) == text.npos;
+    std::string address = hasPort ? text.substr(0, mark) : text;
+    if (address.starts_with('[') && address.ends_with(']'))
+        address = address.substr(1, address.size() - 2);
+    if (!address.empty())
+        options.address = address;
+    if (!hasPort)
+        return;
+    constexpr int largestPort = 65535;
+    const char* end = text.data() + text.size();
+    const auto read = std::from_chars(text.data() + mark + 1, end, options.port);
+    if (read.ec != std::errc() || read.ptr != end || options.port < 0 || options.port > largestPort)
+        throw UsageError("--listen: '" + text.substr(mark + 1) + "' is no port");
+}
+
+cimxml::ServerOptions optionsOf(const Command& command)
+{
+    cimxml::ServerOptions options;
+    readListen(options, command.listen);
+    if (command.tls.size() == 2)
+    {
+        options.certificate = command.tls[0];
+        options.key = command.tls[1];
+    }
+    if (!command.users.empty())
+        options.users = cimxml::Users(command.users);
+    return options;
+}
+
+} // namespace
+
+void serve(Session& session, const Command& command)
+{
+    using namespace std::chrono_literals;
+    const cimxml::ServerOptions options = optionsOf(command);
+    const Interruptible interruptible(session.signals);
+    const cimxml::Server server(session.broker, options);
+    session.out << "listening on " << (options.certificate.empty() ? "http" : "https") << "://" << options.address
+                << ':' << server.port() << std::endl;
+    while (session.signals && !session.signals->awaitInterrupt(1h))
+        ;
+}
+
+} // namespace tvrcim

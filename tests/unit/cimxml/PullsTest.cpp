@@ -1,0 +1,54 @@
+// What is kept of results between two requests.
+#include "broker/cimxml/Pulls.h"
+
+#include <gtest/gtest.h>
+
+using namespace cimxml;
+using namespace std::chrono_literals;
+
+namespace
+{
+
+TEST(Pulls, GiveEachElementOnceAndInOrder)
+{
+    Pulls pulls;
+    std::optional<Part> part = pulls.open(PulledKind::paths, {"a", "b", "c", "d", "e"}, 2, 60s);
+    ASSERT_TRUE(part);
+    std::vector<std::string> all = part->elements;
+    const std::string context = part->context;
+    while (!part->context.empty())
+    {
+        part = pulls.pull(PulledKind::paths, context, 2);
+        ASSERT_TRUE(part);
+        all.insert(all.end(), part->elements.begin(), part->elements.end());
+    }
+    EXPECT_EQ(all, (std::vector<std::string>{"a", "b", "c", "d", "e"}));
+    EXPECT_FALSE(pulls.pull(PulledKind::paths, context, 1));
+    EXPECT_FALSE(pulls.close(context));
+}
+
+TEST(Pulls, AreGivenUpInTime)
+{
+    Pulls pulls;
+    const std::string context = pulls.open(PulledKind::instances, {"a"}, 0, -1s)->context;
+    EXPECT_FALSE(pulls.pull(PulledKind::instances, context, 1));
+    EXPECT_EQ(pulls.open(PulledKind::instances, {}, 0, 60s)->context, "");
+}
+
+TEST(Pulls, KeepSoManyAndSoMuchAtOnce)
+{
+    Pulls pulls;
+    std::string first;
+    for (int i = 0; i < 64; i++)
+    {
+        const std::optional<Part> part = pulls.open(PulledKind::paths, {"a"}, 0, 60s);
+        ASSERT_TRUE(part) << i;
+        first = first.empty() ? part->context : first;
+    }
+    EXPECT_FALSE(pulls.open(PulledKind::paths, {"a"}, 0, 60s));
+    EXPECT_TRUE(pulls.close(first));
+    EXPECT_FALSE(pulls.open(PulledKind::paths, {std::string((64 << 20) + 1, 'x')}, 0, 60s));
+    EXPECT_TRUE(pulls.open(PulledKind::paths, {std::string(1 << 20, 'x')}, 0, 60s));
+}
+
+} // namespace
