@@ -1,7 +1,7 @@
 #include "broker/cimxml/Encode.h"
 
 #include "broker/values/QualifierText.h"
-#include "broker/values/ValueMap.h"
+#include "broker/values/SchemaText.h"
 #include "broker/values/ValueText.h"
 
 #include <array>
@@ -132,15 +132,15 @@ void writeFlags(XmlText& xml, std::uint32_t flags)
         writeFlag(xml, name);
 }
 
-void writeEmbedded(XmlText& xml, const FeatureInfo& feature)
+void writeText(XmlText& xml, std::string_view name, std::string_view text)
 {
-    if (!isEmbedded(feature.type))
+    if (text.empty())
         return;
-    const XmlElement qualifier(xml, "QUALIFIER", {{"NAME", "EmbeddedInstance"}, {"TYPE", "string"}});
-    xml.leaf("VALUE", feature.referenceClass);
+    const XmlElement qualifier(xml, "QUALIFIER", {{"NAME", name}, {"TYPE", "string"}});
+    xml.leaf("VALUE", text);
 }
 
-void writeValueMap(XmlText& xml, ValueNames names)
+void writeNames(XmlText& xml, std::string_view ofValues, std::string_view ofNames, ValueNames names)
 {
     std::vector<std::string> values, texts;
     for (const cimple::Value_Name& row : names)
@@ -150,8 +150,23 @@ void writeValueMap(XmlText& xml, ValueNames names)
     }
     if (names.empty())
         return;
-    writeTexts(xml, "ValueMap", values);
-    writeTexts(xml, "Values", texts);
+    writeTexts(xml, ofValues, values);
+    writeTexts(xml, ofNames, texts);
+}
+
+/// What the schema says to people of a feature, or of a parameter of it.
+void writeTextsOf(XmlText& xml, const ClassInfo& info, std::string_view feature, std::string_view parameter = {})
+{
+    writeText(xml, "Description", descriptionOf(info, feature, parameter));
+    writeText(xml, "PUnit", unitOf(info, feature, parameter));
+    writeNames(xml, "ValueMap", "Values", valueNames(info, feature, parameter));
+    writeNames(xml, "BitMap", "BitValues", bitNames(info, feature, parameter));
+}
+
+void writeEmbedded(XmlText& xml, const FeatureInfo& feature)
+{
+    if (isEmbedded(feature.type))
+        writeText(xml, "EmbeddedInstance", feature.referenceClass);
 }
 
 /// Writes an element whose attributes the view may widen by the class that declares it.
@@ -183,6 +198,7 @@ void writeDeclaration(XmlText& xml, const ClassInfo& info, const FeatureInfo& fe
                      {
                          writeFlags(xml, feature.flags);
                          writeEmbedded(xml, feature);
+                         writeTextsOf(xml, info, feature.name);
                      }
                      writeValue(xml, feature.defaultValue);
                  });
@@ -203,7 +219,7 @@ void writeParameter(XmlText& xml, const ClassInfo& info, const MethodInfo& metho
         return;
     writeFlags(xml, parameter.flags);
     writeEmbedded(xml, parameter);
-    writeValueMap(xml, valueNames(info, method.name, parameter.name));
+    writeTextsOf(xml, info, method.name, parameter.name);
 }
 
 void writeMethod(XmlText& xml, const ClassInfo& info, const MethodInfo& method, const ClassView& view)
@@ -215,7 +231,7 @@ void writeMethod(XmlText& xml, const ClassInfo& info, const MethodInfo& method, 
                      if (view.qualifiers)
                      {
                          writeFlags(xml, method.flags);
-                         writeValueMap(xml, valueNames(info, method.name));
+                         writeTextsOf(xml, info, method.name);
                      }
                      for (const FeatureInfo& parameter : method.parameters)
                          writeParameter(xml, info, method, parameter, view);
@@ -303,7 +319,10 @@ void writeClass(XmlText& xml, const ClassInfo& info, const ClassView& view)
     else
         xml.open("CLASS", {{"NAME", info.name}});
     if (view.qualifiers)
+    {
         writeFlags(xml, info.flags);
+        writeText(xml, "Description", descriptionOf(info));
+    }
     for (const FeatureInfo& property : info.properties)
         if (isShown(property) && (!view.shows || view.shows(property.name)))
             writeDeclaration(xml, info, property, view);
