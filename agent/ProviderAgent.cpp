@@ -176,7 +176,7 @@ void ProviderAgent::finish()
     try
     {
         TVR_LOG(TVR_DBG, "Entering dtor ~ProviderAgent()");
-        const bool joined = !m_DataMutex.isMine() && joinThreads();
+        const bool joined = joinThreads();
         m_config.save(); // while a failure can still be logged
         if (!joined)
             return m_pMethodWrapper.reset(); // the locks of the thread that ends the process are its own
@@ -205,9 +205,11 @@ bool ProviderAgent::isOnRefreshThread()
     return m_bThreadRunning && Thread::self() == m_dataFetchThread;
 }
 
-/// False on one of the threads themselves, where a library of the hardware or the resolver called exit().
+/// False on one of the threads themselves, where a library of the hardware or the resolver called exit(), and on one
+/// that holds the data, for which the others may wait.
 bool ProviderAgent::joinThreads()
 {
+    const bool waitedFor = m_DataMutex.isMine();
     const bool dportEnded = endDportThread();
 
     m_ThreadMutex.lock();
@@ -219,8 +221,9 @@ bool ProviderAgent::joinThreads()
     if (running)
         TVR_LOG(TVR_DBG, "PERF: Clearing the previous thread...with join");
     void* value = nullptr;
-    const bool refreshEnded = !joinable || Thread::join(m_dataFetchThread, value) == 0;
-    return dportEnded && refreshEnded;
+    const bool mayJoin = !(waitedFor && running);
+    const bool refreshEnded = !joinable || (mayJoin && Thread::join(m_dataFetchThread, value) == 0);
+    return !waitedFor && dportEnded && refreshEnded;
 }
 
 // --- the thread of the D-Port test
@@ -271,11 +274,11 @@ void ProviderAgent::joinDportThread()
         Thread::join(m_dportThread, value);
 }
 
-/// False on the thread itself, and on that of the refresh, which has what the other may wait for.
+/// False on the thread itself, and on that of the refresh or one that holds the data, which the other may wait for.
 bool ProviderAgent::endDportThread()
 {
     m_bDportThreadEnd = true;
-    if (onDportThread || isOnRefreshThread())
+    if (onDportThread || isOnRefreshThread() || m_DataMutex.isMine())
         return false;
     Auto_Mutex lock(m_DportThreadMutex); // a method may be waiting for the same end
     joinDportThread();

@@ -547,6 +547,40 @@ TEST(DiagnosticRun, JobsThatCannotBeCancelled)
     host.unload();
 }
 
+/// Associations have ends of their own, which clients get once the port has gone, and once a log was cleared, which
+/// leaves the records of settings.
+TEST(DiagnosticRun, WhatItLeftOutlivesThePort)
+{
+    TestHost host;
+    const std::string id = jobOf(host.run("Host Loopback", {overrides("Host Loopback", {})}));
+    const broker::Path job = theOne(host, "TVRHBA_ConcreteJob", "InstanceID", id).path;
+    const broker::Path record = host.instancesOf("TVRHBA_DiagnosticServiceRecord").at(0).path;
+    const broker::Path completion = host.instancesOf("TVRHBA_DiagnosticCompletionRecord").at(0).path;
+    host.addFault(R"({"function": "HBA_GetAdapterName", "subject": "Tavrin-TV1602-1", "status": 1})");
+    advanceClock(10min);
+    host.count("TVRHBA_Card");
+    ASSERT_TRUE(host.awaitRefresh(2));
+    EXPECT_EQ(host.broker().getInstance(host.controller).status, CMPI_RC_ERR_NOT_FOUND);
+    for (const auto& [path, association] :
+         {std::pair(job, "TVRHBA_AffectedJobElement"), std::pair(record, "TVRHBA_RecordAppliesToElement"),
+          std::pair(completion, "TVRHBA_RecordAppliesToElement")})
+    {
+        const broker::Reply ports = host.broker().associators(path, {.assocClass = association});
+        ASSERT_EQ(ports.objects.size(), 1u) << association << broker::statusName(ports.status);
+        EXPECT_EQ(text(ports.objects[0], "DeviceID"), firstPort);
+    }
+    broker::Path log = job;
+    log.className = "TVRHBA_DiagnosticsLog";
+    log.keys = {{"InstanceID", Value::string(nameOf("Host Loopback"))}};
+    EXPECT_EQ(host.broker().invokeMethod(log, "ClearLog", {}).returnValue.asUnsigned(), 0u);
+    EXPECT_EQ(host.count("TVRHBA_DiagnosticServiceRecord"), 0u);
+    const broker::Path settings = host.instancesOf("TVRHBA_DiagnosticSettingDataRecord").at(0).path;
+    EXPECT_EQ(
+        host.broker().associators(settings, {.assocClass = "TVRHBA_CorrespondingSettingDataRecord"}).objects.size(),
+        2u);
+    host.unload();
+}
+
 // --- beside a run
 
 TEST(DiagnosticRun, ReadersWaitForItAndNoRefreshStarts)
