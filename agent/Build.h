@@ -11,6 +11,7 @@
 #include <cstdint>
 #include <initializer_list>
 #include <new>
+#include <optional>
 #include <string_view>
 #include <type_traits>
 
@@ -73,6 +74,19 @@ template <class Make> auto unlessOutOfMemory(Make make) -> decltype(make())
     }
 }
 
+/// Puts what `make` gives in the map, and is what stands there: null, with `refused` in the log, if the map did not
+/// take it. Nothing, with `notMade` in the log, when memory ran out on the way.
+template <class Record, class Make>
+std::optional<Record*> insertMade(const TypedMap<Record>& map, Make make, const LogText& notMade,
+                                  const LogText& refused)
+{
+    const std::optional<Record*> inserted =
+        unlessOutOfMemory([&] { return std::optional<Record*>(map.insert(make(), refused)); });
+    if (!inserted)
+        notMade.log();
+    return inserted;
+}
+
 /// What came of an association.
 enum class Joined
 {
@@ -87,19 +101,18 @@ enum class Joined
 template <class Association, class Fill>
 Joined insertFilled(const TypedMap<Association>& map, const LogText& refused, Fill fill)
 {
-    Ref<Association> made = unlessOutOfMemory(
+    const std::optional<Association*> made = insertMade(
+        map,
         [&]
         {
             Ref<Association> association = fresh<Association>();
             fill(*association);
             return association;
-        });
+        },
+        {TVR_CRIT, "Could not create the instance of the Association class"}, refused);
     if (!made)
-    {
-        TVR_LOG(TVR_CRIT, "Could not create the instance of the Association class");
         return Joined::NoInstance;
-    }
-    return map.insert(std::move(made), refused) ? Joined::Made : Joined::Refused;
+    return *made ? Joined::Made : Joined::Refused;
 }
 
 /// Makes an association with defaults whose two references hold copies of the ends, as these are now, has it filled by

@@ -76,18 +76,17 @@ template <class Association, class Element, class Holder1, class Holder2>
 bool joinJob(InstanceCache& cache, CIM_Job* Holder1::*jobRole, const TVRHBA_ConcreteJob* job,
              Element* Holder2::*elementRole, const Element* element, const LogText& notMade, const LogText& refused)
 {
-    const bool hadMemory = unlessOutOfMemory(
-        [&]
-        {
-            Ref<Association> association = fresh<Association>();
-            (*association).*jobRole = shared_end(job).release();
-            (*association).*elementRole = shared_end(element).release();
-            mapOf<Association>(cache).insert(std::move(association), refused);
-            return true;
-        });
-    if (!hadMemory)
-        notMade.log();
-    return hadMemory;
+    return insertMade(
+               mapOf<Association>(cache),
+               [&]
+               {
+                   Ref<Association> association = fresh<Association>();
+                   (*association).*jobRole = shared_end(job).release();
+                   (*association).*elementRole = shared_end(element).release();
+                   return association;
+               },
+               notMade, refused)
+        .has_value();
 }
 
 /// Takes the job's association out of its map.
@@ -152,15 +151,10 @@ TVRHBA_ConcreteJob* CreateConcreteJobInstantiateNonBlocking(InstanceCache& cache
     using Owning = TVRHBA_OwningJobElement;
     using Affected = TVRHBA_AffectedJobElement;
     TVR_LOG(TVR_DBG, "CreateConcreteJobInstantiateNonBlocking");
-    TVRHBA_ConcreteJob* job = nullptr;
-    const bool hadMemory = unlessOutOfMemory(
-        [&]
-        {
-            job = mapOf<TVRHBA_ConcreteJob>(cache).insert(makeJob(order), "Insert Failed: TVRHBA_ConcreteJob");
-            return true;
-        });
-    if (!hadMemory)
-        TVR_LOG(TVR_ERR, "Unable to create TVRHBA_ConcreteJob");
+    TVRHBA_ConcreteJob* job = insertMade(
+                                  mapOf<TVRHBA_ConcreteJob>(cache), [&] { return makeJob(order); },
+                                  {TVR_ERR, "Unable to create TVRHBA_ConcreteJob"}, "Insert Failed: TVRHBA_ConcreteJob")
+                                  .value_or(nullptr);
     if (!job)
         return nullptr;
     const CIM_ManagedElement* test = mapOf<TVRHBA_FCHBADiagnosticTest>(cache).findFirst(

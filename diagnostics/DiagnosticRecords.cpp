@@ -281,15 +281,9 @@ private:
     template <class Record, class Make>
     bool insert(Make make, const LogText& notMade, const LogText& refused, const Record*& record)
     {
-        const bool hadMemory = unlessOutOfMemory(
-            [&]
-            {
-                record = mapOf<Record>(_cache).insert(make(), refused);
-                return true;
-            });
-        if (!hadMemory)
-            notMade.log();
-        return hadMemory;
+        const std::optional<Record*> inserted = insertMade(mapOf<Record>(_cache), make, notMade, refused);
+        record = inserted.value_or(nullptr);
+        return inserted.has_value();
     }
 
     /// Either end may be null.
