@@ -24,7 +24,8 @@ fs::path executableFolder()
     return error ? fs::path() : executable.parent_path();
 }
 
-/// The first of the folders that has the file; empty if none has.
+/// The first of the folders that has the file; empty if none has. Folders are named from the executable's: the same one
+/// serves where it is built and where it is installed, and knows neither place.
 fs::path locate(std::initializer_list<fs::path> folders, const std::string& file)
 {
     for (const fs::path& folder : folders)
@@ -39,8 +40,7 @@ fs::path locate(std::initializer_list<fs::path> folders, const std::string& file
 void* openLibrary(const std::string& file)
 {
     const fs::path folder = executableFolder();
-    const fs::path path = locate(
-        {folder / "../simulator", folder / "../lib/tavrin-fc-simulator", TVRCIM_BUILD_FOLDER "/simulator"}, file);
+    const fs::path path = locate({folder / "../simulator", folder / "../lib/tavrin-fc-simulator"}, file);
     if (path.empty())
         throw std::runtime_error("the simulator's " + file + " is not installed; use --hardware for real adapters");
     void* library = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
@@ -61,10 +61,9 @@ std::string findModule()
 {
     const std::string file = "libtavrin_fc_provider.so";
     const fs::path folder = executableFolder();
-    const fs::path path =
-        locate({folder / "../module", folder / "../lib", folder / "../lib64/cmpi", folder / "../lib/cmpi",
-                folder / "../lib/" TVRCIM_MULTIARCH "/cmpi", TVRCIM_BUILD_FOLDER "/module"},
-               file);
+    const fs::path path = locate({folder / "../module", folder / "../lib", folder / "../lib64/cmpi",
+                                  folder / "../lib/cmpi", folder / "../lib/" TVRCIM_MULTIARCH "/cmpi"},
+                                 file);
     return path.empty() ? file : path.lexically_normal().string();
 }
 
@@ -76,7 +75,7 @@ std::string findRegistration(const std::string& module)
     const fs::path beside = path.has_parent_path() ? path.parent_path() : executableFolder();
     const char* installed = "share/tavrin-fc-provider/mof"; // the module is in lib/cmpi or in lib/<architecture>/cmpi
     return locate({beside, beside / "../generated/mof", beside / "../.." / installed, beside / "../../.." / installed,
-                   executableFolder() / ".." / installed, TVRCIM_BUILD_FOLDER "/generated/mof"},
+                   executableFolder() / ".." / installed, executableFolder() / "../generated/mof"},
                   file)
         .string();
 }
