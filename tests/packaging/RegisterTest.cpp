@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <string>
 
+using testing::AllOf;
 using testing::EndsWith;
 using testing::HasSubstr;
 using testing::Not;
@@ -35,6 +36,9 @@ const std::string pegasusPlatform = "cimmof -w -aE -n root/ibmse " + mof + "qual
                                     "cimmof -n root/ibmse TMP/platform_instances.mof\n";
 const std::string pegasusProviders = "cimmof -w -n root/PG_InterOp TMP/registration.mof\n";
 
+const std::string absentSfcb = "sfcb\t-\t-\tno\t-\n";
+const std::string absentPegasus = "pegasus\t-\t-\tno\t-\n";
+
 std::string linesWith(const std::string& text, const std::string& part)
 {
     std::string lines;
@@ -53,7 +57,7 @@ TEST(Register, SmallFootprintServerAndBack)
     const Servers servers;
     servers.installSmallFootprint();
     const std::string before = servers.stateOf("sfcb");
-    EXPECT_EQ(servers.run("status").text, "sfcb: not registered\n");
+    EXPECT_EQ(servers.run("status").text, "sfcb\tROOT/tools\tSTATE\tno\t-\n" + absentPegasus);
 
     // Its configuration is beside its tools.
     const Servers::Run first = servers.run("register");
@@ -72,9 +76,14 @@ TEST(Register, SmallFootprintServerAndBack)
     const Servers::Run second = servers.run("");
     EXPECT_EQ(second.text, "sfcb: registered already\n");
     EXPECT_EQ(servers.takeCalls(), "");
-    const Servers::Run status = servers.run("status");
-    EXPECT_EQ(status.text, "sfcb: registered\n");
+    const Servers::Run status = servers.run("--status");
+    EXPECT_EQ(status.text, "sfcb\tROOT/tools\tSTATE\tregistered\tROOT/sfcb/cmpi/" + link + "\n" + absentPegasus);
     EXPECT_EQ(status.exitCode, 0);
+
+    // What is there already is mended where it suffered.
+    std::filesystem::remove(servers.root() / "sfcb/cmpi/" + link);
+    EXPECT_THAT(servers.run("").text, EndsWith("sfcb: registered already\n"));
+    EXPECT_EQ(textOf(servers.root() / "sfcb/cmpi/" + link), "the module");
 
     // An update of the package has other files; a platform stays once it is there.
     EXPECT_EQ(servers.run("register --platform").exitCode, 0);
@@ -86,7 +95,7 @@ TEST(Register, SmallFootprintServerAndBack)
     EXPECT_THAT(platform, HasSubstr("   Name = \"host.example.net\";\n"));
     EXPECT_THAT(platform, HasSubstr("   Tag = \"host.example.net chassis\";\n"));
     servers.root().write("usr/share/tavrin-fc-provider/mof/tavrin_fc_provider.reg", "[TVRHBA_Card]\n#\n");
-    EXPECT_THAT(servers.run("status").text, HasSubstr("register again"));
+    EXPECT_THAT(servers.run("status").text, HasSubstr("\toutdated\t"));
     servers.installSystemd("sfcb");
     EXPECT_EQ(servers.run("register").exitCode, 0);
     const std::string again = servers.takeCalls();
@@ -172,12 +181,79 @@ TEST(Register, OpenGroupServerWithTrouble)
     const Servers::Run kept = servers.run("remove");
     EXPECT_THAT(kept.text, HasSubstr("pegasus: keeps the class CIM_FCHBADiagnosticTest in root/PG_InterOp: "
                                      "CIM_ERR_CLASS_HAS_CHILDREN: CIM_FCHBADiagnosticTest\n"));
+}
 
+/// A server that is down runs for as long as it is worked on, and nobody from outside meets it.
+TEST(Register, OpenGroupServerThatIsStopped)
+{
+    const Servers servers;
+    servers.installOpenGroup();
     std::filesystem::remove(servers.root() / "pegasus/running");
+    const std::string before = servers.stateOf("pegasus");
+    const std::string line = "pegasus\tROOT/tools\tstopped\t";
+    EXPECT_EQ(servers.run("status").text, absentSfcb + line + "unknown\t-\n");
+    EXPECT_EQ(servers.takeCalls(), "");
+
+    const std::string start = "cimserver enableHttpConnection=false enableHttpsConnection=false\n";
+    EXPECT_EQ(servers.run("register").exitCode, 0);
+    EXPECT_EQ(servers.takeCalls(), start + pegasusClasses + pegasusProviders + "cimserver -s\n");
+    EXPECT_EQ(servers.run("status").text, absentSfcb + line + "registered\tROOT/pegasus/lib/" + link + "\n");
+    EXPECT_EQ(servers.run("remove").exitCode, 0);
+    EXPECT_EQ(linesWith(servers.takeCalls(), "cimserver"), start + "cimserver -s\n");
+    EXPECT_EQ(servers.stateOf("pegasus"), before);
+
+    servers.root().write("broken", "");
     const Servers::Run down = servers.run("register");
     EXPECT_EQ(down.exitCode, 1);
-    EXPECT_EQ(down.text, "pegasus: does not answer; start it, and run this again\n");
-    EXPECT_EQ(servers.run("status").text, down.text);
+    EXPECT_THAT(down.text, EndsWith("pegasus: does not run, and did not start; start it, and run: "
+                                    "ROOT/usr/sbin/tavrin-fc-register register\n"));
+}
+
+/// A package is removed in another environment than the module was registered in: by what is on record.
+TEST(Register, PackageIsUpdatedAndRemoved)
+{
+    const Servers servers;
+    servers.installSmallFootprint();
+    servers.installOpenGroup();
+    const std::string sfcb = servers.stateOf("sfcb"), pegasus = servers.stateOf("pegasus");
+    EXPECT_EQ(servers.runByPackage("hooks/after-install configure").text, ""); // the first: nobody asked for more
+    EXPECT_EQ(servers.run("register").exitCode, 0);
+    EXPECT_EQ(servers.runByPackage("hooks/before-removal upgrade").text, "");
+    servers.root().write("usr/share/tavrin-fc-provider/mof/tavrin_fc_provider.reg", "[TVRHBA_Card]\n#\n");
+    servers.takeCalls();
+    EXPECT_THAT(servers.runByPackage("hooks/after-install configure").text,
+                AllOf(HasSubstr("\nsfcb: registered\n"), EndsWith("\npegasus: registered\n")));
+    EXPECT_EQ(linesWith(servers.takeCalls(), "mof"), sfcbRegister + pegasusClasses + pegasusProviders);
+    EXPECT_EQ(servers.run("status").exitCode, 0);
+
+    // One cannot be told now: what is needed later stays.
+    std::filesystem::remove(servers.root() / "pegasus/running");
+    servers.root().write("broken", "");
+    const Servers::Run removed = servers.runByPackage("hooks/before-removal remove");
+    EXPECT_EQ(removed.exitCode, 0);
+    EXPECT_THAT(removed.text,
+                AllOf(HasSubstr("\nsfcb: removed\n"),
+                      EndsWith("tavrin-fc-provider: still registered in pegasus; once that can be started: "
+                               "ROOT/state/tavrin-fc-register remove\n")));
+    EXPECT_EQ(servers.stateOf("sfcb"), sfcb);
+    std::filesystem::remove_all(servers.root() / "usr");
+    std::filesystem::remove(servers.root() / "broken");
+    EXPECT_THAT(servers.runByPackage("state/tavrin-fc-register remove").text, HasSubstr("\npegasus: removed\n"));
+    servers.root().write("pegasus/running", "");
+    EXPECT_EQ(servers.stateOf("pegasus"), pegasus);
+    EXPECT_FALSE(std::filesystem::exists(servers.root() / "state"));
+}
+
+/// With the server its repository has gone: there is nothing to take out but the link.
+TEST(Register, ServerIsRemovedFirst)
+{
+    const Servers servers;
+    servers.installSmallFootprint();
+    EXPECT_EQ(servers.run("register").exitCode, 0);
+    std::filesystem::remove_all(servers.root() / "tools");
+    EXPECT_EQ(servers.runByPackage("hooks/before-removal 0").text,
+              "sfcb: rm -f ROOT/sfcb/cmpi/" + link + "\nsfcb: is not here any more, and its record neither\n");
+    EXPECT_FALSE(std::filesystem::exists(servers.root() / "state"));
 }
 
 /// Of a registration that is not the script's, the module's own classes are known to be its own.
@@ -188,8 +264,8 @@ TEST(Register, OpenGroupServerRegisteredByHand)
     const std::string before = servers.stateOf("pegasus");
     const std::string declarations = servers.root() / "usr/share/tavrin-fc-provider/mof/";
     for (const char* file : {"tavrin_classes.mof", "tavrin_fc_provider_registration.mof"})
-        runCommand(servers.root() / "bin/cimmof" + " -n root/PG_InterOp " + declarations + file);
-    EXPECT_EQ(servers.run("status").text, "pegasus: registered, but not by this script\n");
+        runCommand(servers.root() / "tools/cimmof" + " -n root/PG_InterOp " + declarations + file);
+    EXPECT_EQ(servers.run("status").text, absentSfcb + "pegasus\tROOT/tools\trunning\tforeign\t-\n");
     EXPECT_THAT(servers.run("remove").text, HasSubstr("pegasus: removed\n"));
     EXPECT_EQ(servers.stateOf("pegasus"), before);
 }
@@ -228,7 +304,8 @@ TEST(Register, BothServersOneOrNone)
     EXPECT_EQ(servers.takeCalls(), pegasusClasses + pegasusProviders);
     const Servers::Run half = servers.run("status");
     EXPECT_EQ(half.exitCode, 1);
-    EXPECT_EQ(half.text, "sfcb: not registered\npegasus: registered\n");
+    EXPECT_EQ(half.text, "sfcb\tROOT/tools\tSTATE\tno\t-\npegasus\tROOT/tools\trunning\tregistered\tROOT/pegasus/lib/" +
+                             link + "\n");
     EXPECT_EQ(servers.run("register --platform").exitCode, 0);
     EXPECT_EQ(servers.takeCalls(), sfcbRegister + "sfcbrepos -f\n");
 

@@ -28,6 +28,9 @@ public:
     };
     Run run(const std::string& arguments) const;
 
+    /// Runs one of the script's files as package managers do: with the system's tools in PATH, and none of a server's.
+    Run runByPackage(const std::string& command) const;
+
     /// What the tools that change something were called with since the last time, a call a line.
     std::string takeCalls() const;
 
@@ -37,7 +40,9 @@ public:
     const Folder& root() const { return _root; }
 
 private:
-    void tool(const std::string& name, const std::string& body) const;
+    void tool(const std::string& name, const std::string& body, const std::string& folder = "bin") const;
+    void serverTool(const std::string& name, const std::string& body) const;
+    Run shell(const std::string& environment, const std::string& command) const;
     std::string readable(std::string text) const;
 
     Folder _root;
