@@ -143,6 +143,7 @@ TEST(Register, OpenGroupServerAndBack)
     EXPECT_EQ(linesWith(again, "cimmof"), pegasusClasses + pegasusPlatform + pegasusProviders);
     EXPECT_LT(again.find("dc TVRHBA_"), again.find("cimmof"));
 
+    servers.startOpenGroup();
     const Servers::Run removed = servers.run("remove");
     EXPECT_THAT(removed.text, HasSubstr("pegasus: removed\n"));
     EXPECT_THAT(removed.text, Not(HasSubstr("keeps")));
@@ -177,10 +178,18 @@ TEST(Register, OpenGroupServerWithTrouble)
 
     std::filesystem::remove(servers.root() / "refuse");
     EXPECT_EQ(servers.run("register").exitCode, 0);
-    runCommand("echo 'Other_Test CIM_FCHBADiagnosticTest' >>" + servers.root() / "pegasus/root/PG_InterOp/classes");
-    const Servers::Run kept = servers.run("remove");
+    const std::string classes = servers.root() / "pegasus/root/PG_InterOp/classes";
+    runCommand("echo 'Other_Test CIM_FCHBADiagnosticTest' >>" + classes);
+    servers.root().write("usr/share/tavrin-fc-provider/mof/tavrin_fc_provider.reg", "[TVRHBA_Card]\n");
+    const Servers::Run kept = servers.run("register");
+    EXPECT_EQ(kept.exitCode, 0);
     EXPECT_THAT(kept.text, HasSubstr("pegasus: keeps the class CIM_FCHBADiagnosticTest in root/PG_InterOp: "
                                      "CIM_ERR_CLASS_HAS_CHILDREN: CIM_FCHBADiagnosticTest\n"));
+
+    // It is known to be the module's, though it was there when this version was registered.
+    runCommand("sed -i /Other_Test/d " + classes);
+    EXPECT_EQ(servers.run("remove").exitCode, 0);
+    EXPECT_EQ(servers.stateOf("pegasus"), before);
 }
 
 /// A server that is down runs for as long as it is worked on, and nobody from outside meets it.

@@ -53,8 +53,15 @@ sed -n 's/^instance of \(IBMSD_[A-Za-z]*\).*/\1.Name="host"/p' "$1" >>$namespace
 [ -s $namespace/instances ] || rm $namespace/instances
 if grep -q 'instance of PG_ProviderModule' "$1"; then cp "$1" $namespace/registration; fi
 )sh";
+// Its start adds two classes to each namespace that can have them.
 constexpr const char* cimserver = R"sh(
-case $1 in -s) rm $ROOT/pegasus/running ;; *) [ ! -f $ROOT/broken ] && touch $ROOT/pegasus/running ;; esac
+[ $1 != -s ] || { rm $ROOT/pegasus/running; exit; }
+[ ! -f $ROOT/broken ] || exit 1
+touch $ROOT/pegasus/running
+for classes in $(grep -l "^CIM_ElementConformsToProfile " $ROOT/pegasus/root/*/classes); do
+    grep -q ^PG_ElementConf $classes || echo "PG_ElementConformsToProfile CIM_ElementConformsToProfile" >>$classes
+    grep -q ^PG_Registered $classes || echo "PG_RegisteredProfile CIM_RegisteredProfile" >>$classes
+done
 )sh";
 // It finds the server by its home.
 constexpr const char* cimcliReading = R"sh(
@@ -153,16 +160,21 @@ void Servers::installOpenGroup() const
     for (const char* file : {"cim_classes.mof", "tavrin_classes.mof"})
         runCommand("cd " + mof +
                    " && awk 'BEGIN { RS = \"\"; ORS = \"\\n\\n\" } /class (CIM_|TVRHBA_)[A-Za-z]*(Diagnostic|" +
-                   "SCSIArbitrary|FCPort)/' " + file + " >few && mv few " + file);
+                   "SCSIArbitrary|FCPort|ElementConf|RegisteredP)/' " + file + " >few && mv few " + file);
     fs::create_directories(_root / "pegasus/lib");
-    _root.write("pegasus/running", "");
     const std::string interop = _root / "pegasus/root/PG_InterOp";
     ASSERT_EQ(runCommand("PATH=" + _root / "bin" + " " + _root / "tools/cimmof" + " -n root/PG_InterOp " + mof +
                          "/cim_classes.mof && " + "sed -i -E '/^(" + experimental +
                          ") /d; $ a PG_ProviderModule CIM_ProviderModule' " + interop + "/classes")
                   .exitCode,
               0);
+    startOpenGroup();
     takeCalls();
+}
+
+void Servers::startOpenGroup() const
+{
+    EXPECT_EQ(runCommand("PATH=" + _root / "bin" + " " + _root / "tools/cimserver" + " now").exitCode, 0);
 }
 
 void Servers::installSystemd(const std::string& unit) const

@@ -16,6 +16,7 @@ public:
     /// experimental classes.
     void installSmallFootprint() const;
     void installOpenGroup() const;
+    void startOpenGroup() const;
 
     /// Of its units that one is active.
     void installSystemd(const std::string& unit) const;
