@@ -125,7 +125,7 @@ TEST(Package, DebHasAllFilesAndRuns)
     // Not the libraries that the simulator stands in for.
     EXPECT_THAT(control.out, AllOf(HasSubstr("Depends: libc6"), Not(HasSubstr("hbaapi"))));
     EXPECT_THAT(runCommand("dpkg-deb -e " + package + " " + root / "control && ls " + root / "control").out,
-                AllOf(HasSubstr("prerm\n"), HasSubstr("postinst\n")));
+                AllOf(HasSubstr("prerm\n"), HasSubstr("postinst\n"), HasSubstr("postrm\n")));
 }
 
 TEST(Package, RpmHasAllFilesAndClaimsNoForeignLibrary)
