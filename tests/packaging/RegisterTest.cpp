@@ -57,7 +57,7 @@ TEST(Register, SmallFootprintServerAndBack)
     const Servers servers;
     servers.installSmallFootprint();
     const std::string before = servers.stateOf("sfcb");
-    EXPECT_EQ(servers.run("status").text, "sfcb\tROOT/tools\tSTATE\tno\t-\n" + absentPegasus);
+    EXPECT_EQ(servers.run("--status").text, "sfcb\tROOT/tools\tSTATE\tno\t-\n" + absentPegasus);
 
     // Its configuration is beside its tools.
     const Servers::Run first = servers.run("register");
@@ -95,7 +95,9 @@ TEST(Register, SmallFootprintServerAndBack)
     EXPECT_THAT(platform, HasSubstr("   Name = \"host.example.net\";\n"));
     EXPECT_THAT(platform, HasSubstr("   Tag = \"host.example.net chassis\";\n"));
     servers.root().write("usr/share/tavrin-fc-provider/mof/tavrin_fc_provider.reg", "[TVRHBA_Card]\n#\n");
-    EXPECT_THAT(servers.run("status").text, HasSubstr("\toutdated\t"));
+    EXPECT_THAT(servers.run("--status").text, HasSubstr("\toutdated\t"));
+    EXPECT_THAT(servers.run("status").text,
+                AllOf(HasSubstr("sfcb: registered, with other classes"), EndsWith(": register again\n")));
     servers.installSystemd("sfcb");
     EXPECT_EQ(servers.run("register").exitCode, 0);
     const std::string again = servers.takeCalls();
@@ -200,13 +202,13 @@ TEST(Register, OpenGroupServerThatIsStopped)
     std::filesystem::remove(servers.root() / "pegasus/running");
     const std::string before = servers.stateOf("pegasus");
     const std::string line = "pegasus\tROOT/tools\tstopped\t";
-    EXPECT_EQ(servers.run("status").text, absentSfcb + line + "unknown\t-\n");
+    EXPECT_EQ(servers.run("--status").text, absentSfcb + line + "unknown\t-\n");
     EXPECT_EQ(servers.takeCalls(), "");
 
     const std::string start = "cimserver enableHttpConnection=false enableHttpsConnection=false\n";
     EXPECT_EQ(servers.run("register").exitCode, 0);
     EXPECT_EQ(servers.takeCalls(), start + pegasusClasses + pegasusProviders + "cimserver -s\n");
-    EXPECT_EQ(servers.run("status").text, absentSfcb + line + "registered\tROOT/pegasus/lib/" + link + "\n");
+    EXPECT_EQ(servers.run("--status").text, absentSfcb + line + "registered\tROOT/pegasus/lib/" + link + "\n");
     EXPECT_EQ(servers.run("remove").exitCode, 0);
     EXPECT_EQ(linesWith(servers.takeCalls(), "cimserver"), start + "cimserver -s\n");
     EXPECT_EQ(servers.stateOf("pegasus"), before);
@@ -233,7 +235,7 @@ TEST(Register, PackageIsUpdatedAndRemoved)
     EXPECT_THAT(servers.runByPackage("hooks/after-install configure").text,
                 AllOf(HasSubstr("\nsfcb: registered\n"), EndsWith("\npegasus: registered\n")));
     EXPECT_EQ(linesWith(servers.takeCalls(), "mof"), sfcbRegister + pegasusClasses + pegasusProviders);
-    EXPECT_EQ(servers.run("status").exitCode, 0);
+    EXPECT_EQ(servers.run("--status").exitCode, 0);
 
     // One cannot be told now: what is needed later stays.
     std::filesystem::remove(servers.root() / "pegasus/running");
@@ -274,7 +276,7 @@ TEST(Register, OpenGroupServerRegisteredByHand)
     const std::string declarations = servers.root() / "usr/share/tavrin-fc-provider/mof/";
     for (const char* file : {"tavrin_classes.mof", "tavrin_fc_provider_registration.mof"})
         runCommand(servers.root() / "tools/cimmof" + " -n root/PG_InterOp " + declarations + file);
-    EXPECT_EQ(servers.run("status").text, absentSfcb + "pegasus\tROOT/tools\trunning\tforeign\t-\n");
+    EXPECT_EQ(servers.run("--status").text, absentSfcb + "pegasus\tROOT/tools\trunning\tforeign\t-\n");
     EXPECT_THAT(servers.run("remove").text, HasSubstr("pegasus: removed\n"));
     EXPECT_EQ(servers.stateOf("pegasus"), before);
 }
@@ -311,7 +313,7 @@ TEST(Register, BothServersOneOrNone)
     servers.root().write("pegasus/root/ibmse/classes", "IBMSD_ComputerSystem CIM_ComputerSystem\n");
     EXPECT_EQ(servers.run("register --server pegasus --platform").exitCode, 0);
     EXPECT_EQ(servers.takeCalls(), pegasusClasses + pegasusProviders);
-    const Servers::Run half = servers.run("status");
+    const Servers::Run half = servers.run("--status");
     EXPECT_EQ(half.exitCode, 1);
     EXPECT_EQ(half.text, "sfcb\tROOT/tools\tSTATE\tno\t-\npegasus\tROOT/tools\trunning\tregistered\tROOT/pegasus/lib/" +
                              link + "\n");
