@@ -43,6 +43,7 @@ std::vector<std::string> expectedFiles(const std::string& moduleFolder)
         "usr/lib/tavrin-fc-simulator/libtvrsim_tagging.so",
         "usr/lib/tavrin-fc-simulator/libtvrsim_vendor.so",
         "usr/sbin/tavrin-fc-register",
+        "usr/share/doc/tavrin-fc-provider/CHANGELOG.md",
         "usr/share/doc/tavrin-fc-provider/README.md",
         "usr/share/doc/tavrin-fc-provider/copyright",
         "usr/share/man/man1/tvrcim.1",
