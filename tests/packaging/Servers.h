@@ -28,6 +28,9 @@ public:
     };
     Run run(const std::string& arguments) const;
 
+    /// What the tool's check of the host says of CIM servers.
+    std::string check() const;
+
     /// What the tools that change something were called with since the last time, a call a line.
     std::string takeCalls() const;
 
