@@ -8,11 +8,11 @@
 #include "broker/tvrcim/ReadableText.h"
 #include "broker/tvrcim/Replies.h"
 
+#include <cstdlib>
 #include <exception>
 #include <filesystem>
 #include <iterator>
 #include <memory>
-#include <optional>
 
 #include <dlfcn.h>
 
@@ -170,12 +170,13 @@ int checkHost(const Settings& settings, SignalEnd& signals, std::ostream& out, b
 {
     if (settings.format == Format::mof)
         throw UsageError("--format: a check is none of MOF");
-    Findings files = checkFiles(); // as they are before the module writes to them
+    Findings files = checkFiles();
+    // A module writes its settings and a log: here it has a folder for that, so that a check changes nothing.
+    unsetenv("TVR_FILE_ROOT");
+    const FileRoot root(signals);
     Findings findings;
-    std::optional<FileRoot> root;
     if (!settings.hardware)
     {
-        root.emplace(signals);
         startSimulator(settings.scenario);
         findings.push_back({State::note, "simulation", "the libraries and adapters below are those of the simulator",
                             "'tvrcim --hardware check' looks at this machine's"});

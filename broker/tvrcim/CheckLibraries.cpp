@@ -111,7 +111,7 @@ Finding foundLibrary(const char* subject, const Library& library, const Called& 
         finding.text += ", has all " + std::to_string(entries.count) + " entry points";
         return finding;
     }
-    finding.state = State::warning;
+    finding.state = entries.absent.size() < entries.count ? State::warning : State::wrong;
     finding.text += ", lacks " + std::to_string(entries.absent.size()) + " of " + std::to_string(entries.count) +
                     " entry points: " + shortened(joined(entries.absent, ", "), 200);
     finding.remedy = "install a newer version of it: what needs these fails";

@@ -86,8 +86,8 @@ TEST(TvrcimCheck, AMachineThatHasAll)
     const Machine machine;
     machine.installAll();
     machine.installScript("echo 'sfcb: registered'\n");
-    machine.write("etc/tavrin_fc_provider.conf",
-                  "TVR_PROVIDER_CACHE_TIMEOUT = 3\nTVR_PROVIDER_REFRESH_SANDATA = FALSE\n");
+    const std::string settings = "TVR_PROVIDER_CACHE_TIMEOUT = 3\nTVR_PROVIDER_REFRESH_SANDATA = FALSE\n";
+    machine.write("etc/tavrin_fc_provider.conf", settings);
     machine.write("etc/tvr_smis.conf", "# the page\nhttps://host.example.net/page\n");
     machine.write("etc/tavrin_fc_provider.dmp", "4,5,1\n" + machine / "provider.log");
     machine.write("provider.log", std::string(2048, 'x'));
@@ -111,6 +111,7 @@ TEST(TvrcimCheck, AMachineThatHasAll)
               "all that is needed is there\n");
     EXPECT_EQ(run.err, "");
     EXPECT_EQ(run.exitCode, 0);
+    EXPECT_EQ(textOf(machine / "etc/tavrin_fc_provider.conf"), settings);
 }
 
 TEST(TvrcimCheck, AMachineThatHasNothing)
@@ -293,9 +294,14 @@ TEST(TvrcimCheck, FilesThatAreNotInOrder)
             machine.write(row.file, row.text);
         else
             fs::create_directories(machine / row.file);
-        const Answer run = machine.run("check");
+        machine.installAll();
+        const Answer run = machine.run("--hardware check");
         EXPECT_THAT(run.out, HasSubstr(row.line)) << run.err;
         EXPECT_EQ(run.exitCode, row.exitCode) << row.line;
+        if (row.text)
+        {
+            EXPECT_EQ(textOf(machine / row.file), row.text); // a check changes nothing
+        }
     }
 }
 
