@@ -23,13 +23,9 @@ template <std::size_t Row, class Result, class... Args> class Binding<Row, Resul
     static_assert(std::is_void_v<Result> == (absent == absentNothing));
     static_assert(!std::is_pointer_v<Result> || absent == absentZero);
 
-    /// Exists where the program has a call of the row, and tells the loader so when the program is loaded.
-    static inline const bool isBound = markBound(Row);
-
 public:
     Result operator()(Args... args) const
     {
-        static_cast<void>(&isBound);
         if (void* entry = resolveEntry(Row))
             return reinterpret_cast<Result (*)(Args...)>(entry)(args...);
         if constexpr (std::is_pointer_v<Result>)

@@ -38,8 +38,7 @@ DynamicLoader dynamicLoader = {
 
 std::array<std::atomic<void*>, slotCount> slots{};
 std::array<std::atomic<void*>, entryPoints.size()> firstLookups{};
-std::array<std::atomic<bool>, entryPoints.size()> boundRows{};
-/// The look-ups of every bound row are in `firstLookups`, absent ones included.
+/// The look-ups of every row that is called are in `firstLookups`, absent ones included.
 std::atomic<bool> allResolved{false};
 
 const char* loaderError()
@@ -116,7 +115,7 @@ void* lookUp(std::size_t row)
 void lookUpAbsent()
 {
     for (std::size_t row = 0; row < entryPoints.size(); ++row)
-        if (boundRows[row] && !firstLookups[row])
+        if (entryPoints[row].use == called && !firstLookups[row])
             if (void* entry = lookUp(row))
                 firstLookups[row] = entry;
 }
@@ -178,11 +177,6 @@ void resolveAbsentEntries()
 void* resolveEntry(std::size_t row)
 {
     return allResolved ? firstLookups[row].load() : lookUp(row);
-}
-
-bool markBound(std::size_t row) noexcept
-{
-    return boundRows[row] = true;
 }
 
 } // namespace cimple

@@ -50,7 +50,4 @@ void resolveAbsentEntries();
 /// look-ups in the fallback library are made anew on every call.
 void* resolveEntry(std::size_t row);
 
-/// The program calls this row. For bindings, before the program starts.
-bool markBound(std::size_t row) noexcept;
-
 } // namespace cimple

@@ -177,6 +177,8 @@ void addCommands(CommandOptions& options)
         .add("diag", "run a diagnostic test of a port and tell how it ended; exits with 5 when it did not pass. SIGINT "
                      "cancels a D-Port test and waits for its end")
         .test();
+    options.add("check", "tell what of libraries, module, settings, logs and CIM servers is there, what is missing and "
+                         "what to do about it; exits with 7 where something is missing or wrong");
     options.add("serve", "answer CIM clients over HTTP until SIGINT; other hosts need --tls and --users").port();
 }
 

@@ -80,6 +80,13 @@ std::string findRegistration(const std::string& module)
         .string();
 }
 
+std::string findRegisterScript()
+{
+    const std::string file = "tavrin-fc-register";
+    const fs::path path = locate({executableFolder() / "../sbin"}, file);
+    return path.empty() ? file : path.string();
+}
+
 void startSimulator(const std::string& scenario)
 {
     void* core = openLibrary("libtvrsim.so");

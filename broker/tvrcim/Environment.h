@@ -16,6 +16,9 @@ std::string findModule();
 /// The registration file of a module: beside it, in the build tree, or in an installation; empty if there is none.
 std::string findRegistration(const std::string& module);
 
+/// The script that registers the module in CIM servers: of the tool's installation, or a name to look for in PATH.
+std::string findRegisterScript();
+
 /// Opens the simulator's libraries, so that the module finds them by name, and loads a scenario file unless its name is
 /// empty (the simulator then shows its default host). Throws std::runtime_error with the reason.
 void startSimulator(const std::string& scenario);

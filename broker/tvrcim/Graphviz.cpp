@@ -1,17 +1,9 @@
 #include "broker/tvrcim/Graphviz.h"
 
-#include <array>
-#include <cerrno>
-#include <csignal>
-#include <cstring>
+#include "broker/tvrcim/ChildProcess.h"
+
 #include <stdexcept>
 #include <system_error>
-#include <utility>
-
-#include <spawn.h>
-#include <sys/mman.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace tvrcim
 {
@@ -19,132 +11,26 @@ namespace tvrcim
 namespace
 {
 
-[[noreturn]] void fail(const char* what, int error)
+ProgramEnd runDot(const std::string& dot, const std::string& option)
+try
 {
-    throw std::system_error(error, std::generic_category(), what);
+    return runProgram({"dot", option}, dot);
 }
-
-/// A file without a name. Unlike a pipe it takes a text of any size, whether anybody reads it or not.
-class MemoryFile
+catch (const std::system_error& error)
 {
-public:
-    explicit MemoryFile(const char* name) : _file(memfd_create(name, MFD_CLOEXEC))
-    {
-        if (_file < 0)
-            fail("cannot make a file in memory", errno);
-    }
-    ~MemoryFile() { close(_file); }
-    MemoryFile(const MemoryFile&) = delete;
-    MemoryFile& operator=(const MemoryFile&) = delete;
-
-    int descriptor() const { return _file; }
-
-    /// The text, to be read from its beginning.
-    void put(const std::string& text)
-    {
-        for (std::size_t at = 0; at < text.size();)
-        {
-            const ssize_t written = write(_file, text.data() + at, text.size() - at);
-            if (written < 0 && errno != EINTR)
-                fail("cannot hand the graph to dot", errno);
-            at += written > 0 ? static_cast<std::size_t>(written) : 0;
-        }
-        lseek(_file, 0, SEEK_SET);
-    }
-
-    std::string text() const
-    {
-        std::string text;
-        std::array<char, 65536> buffer{};
-        for (off_t at = 0;;)
-        {
-            const ssize_t size = pread(_file, buffer.data(), buffer.size(), at);
-            if (size < 0 && errno == EINTR)
-                continue;
-            if (size <= 0)
-                return text;
-            text.append(buffer.data(), static_cast<std::size_t>(size));
-            at += size;
-        }
-    }
-
-private:
-    int _file;
-};
-
-/// What becomes of the files and signals of a new process.
-class SpawnSettings
-{
-public:
-    SpawnSettings()
-    {
-        posix_spawn_file_actions_init(&_actions);
-        posix_spawnattr_init(&_attributes);
-        sigset_t none;
-        sigemptyset(&none);
-        posix_spawnattr_setsigmask(&_attributes, &none); // the tool blocks signals, its child is to end by them
-        posix_spawnattr_setflags(&_attributes, POSIX_SPAWN_SETSIGMASK);
-    }
-    ~SpawnSettings()
-    {
-        posix_spawnattr_destroy(&_attributes);
-        posix_spawn_file_actions_destroy(&_actions);
-    }
-    SpawnSettings(const SpawnSettings&) = delete;
-    SpawnSettings& operator=(const SpawnSettings&) = delete;
-
-    void redirect(int descriptor, const MemoryFile& file)
-    {
-        posix_spawn_file_actions_adddup2(&_actions, file.descriptor(), descriptor);
-    }
-    pid_t start(const char* const* words) const
-    {
-        pid_t process = 0;
-        const int error =
-            posix_spawnp(&process, words[0], &_actions, &_attributes, const_cast<char* const*>(words), environ);
-        if (error == ENOENT)
-            throw std::runtime_error("the program dot is not installed: pictures need graphviz (apt-get install "
-                                     "graphviz)");
-        if (error != 0)
-            fail("cannot run dot", error);
-        return process;
-    }
-
-private:
-    posix_spawn_file_actions_t _actions{};
-    posix_spawnattr_t _attributes{};
-};
-
-int endOf(pid_t process)
-{
-    int status = 0;
-    while (waitpid(process, &status, 0) < 0)
-        if (errno != EINTR)
-            fail("cannot wait for dot", errno);
-    return status;
+    if (error.code() == std::errc::no_such_file_or_directory)
+        throw std::runtime_error("the program dot is not installed: pictures need graphviz (apt-get install graphviz)");
+    throw;
 }
 
 } // namespace
 
 std::string drawnByGraphviz(const std::string& dot, const std::string& format)
 {
-    MemoryFile input("graph");
-    const MemoryFile output("picture");
-    const MemoryFile errors("errors");
-    input.put(dot);
-    SpawnSettings settings;
-    settings.redirect(STDIN_FILENO, input);
-    settings.redirect(STDOUT_FILENO, output);
-    settings.redirect(STDERR_FILENO, errors);
-    const std::string option = "-T" + format;
-    const char* const words[] = {"dot", option.c_str(), nullptr};
-    const int status = endOf(settings.start(words));
-    if (WIFSIGNALED(status))
-        throw std::runtime_error("dot was ended by signal " + std::to_string(WTERMSIG(status)));
-    std::string picture = output.text();
-    if (WEXITSTATUS(status) != 0 || picture.empty())
-        throw std::runtime_error("dot cannot draw the picture: " + errors.text());
-    return picture;
+    ProgramEnd end = runDot(dot, "-T" + format);
+    if (end.exitCode != 0 || end.out.empty())
+        throw std::runtime_error("dot cannot draw the picture: " + end.err);
+    return std::move(end.out);
 }
 
 } // namespace tvrcim

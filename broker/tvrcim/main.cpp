@@ -1,4 +1,6 @@
 // tvrcim: the provider module in a process of its own, for demos, tests and diagnosis.
+#include "broker/tvrcim/CheckCommand.h"
+#include "broker/tvrcim/CheckLibraries.h"
 #include "broker/tvrcim/CommandLine.h"
 #include "broker/tvrcim/Environment.h"
 
@@ -16,10 +18,16 @@ namespace
 
 using namespace tvrcim;
 
-int report(const char* kind, const std::exception& error, int exitCode)
+int report(const std::string& text, int exitCode)
 {
-    std::cerr << "tvrcim: " << kind << error.what() << '\n';
+    std::cerr << "tvrcim: " << text << '\n';
     return exitCode;
+}
+
+/// Others show what the module declares.
+bool asksTheHost(const Command& command)
+{
+    return command.name != "classes" && command.name != "class" && command.name != "methods";
 }
 
 /// A terminal that shows colours, and nobody asked for none (no-color.org).
@@ -41,24 +49,24 @@ int runAndReport(Session& session, const Command& command, SignalEnd& signals)
     catch (const CimError& error)
     {
         signals.passIfNone(); // a signal unloads the module under the command
-        return report("", error, exitCimError);
+        return report(error.what(), exitCimError);
     }
     catch (const MethodRefusal& error)
     {
-        return report("", error, exitRefusal);
+        return report(error.what(), exitRefusal);
     }
     catch (const TestFailure& error)
     {
-        return report("", error, exitTestFailed);
+        return report(error.what(), exitTestFailed);
     }
     catch (const Interruption& error)
     {
         constexpr int endedBySignal = 128;
-        return report("", error, endedBySignal + SIGINT);
+        return report(error.what(), endedBySignal + SIGINT);
     }
     catch (const UsageError& error)
     {
-        return report("", error, exitUsage);
+        return report(error.what(), exitUsage);
     }
 }
 
@@ -74,7 +82,12 @@ void showWork(Session& session)
 int run(const Settings& settings)
 {
     SignalEnd signals;
+    if (settings.command.name == "check")
+        return checkHost(settings, signals, std::cout, wantsColour());
     std::optional<FileRoot> files;
+    if (settings.hardware && asksTheHost(settings.command))
+        if (const Libraries libraries; !libraries.anyFound())
+            return report(libraries.absence(), exitIncomplete);
     if (!settings.hardware)
     {
         files.emplace(signals);
@@ -110,7 +123,7 @@ int parseAndRun(int argc, char** argv)
     }
     catch (const std::exception& error)
     {
-        return report("", error, exitUsage);
+        return report(error.what(), exitUsage);
     }
 }
 

@@ -62,13 +62,16 @@ std::vector<std::string> expectedFiles(const std::string& moduleFolder)
     return files;
 }
 
-/// The installed tool finds the simulator, the module and its registration, which is told by a class that this lacks.
+/// The installed tool finds the simulator, the script, the module and its registration, which is told by a class that
+/// this lacks.
 void expectToolRuns(const std::string& root, const std::string& moduleFolder)
 {
     const std::string tool = root + "/usr/bin/tvrcim ";
     const Answer found = runCommand(tool + "enum TVRHBA_Card --names");
     EXPECT_EQ(found.exitCode, 0) << found.err;
     EXPECT_THAT(found.out, HasSubstr("TV16A02417"));
+
+    EXPECT_THAT(runCommand(tool + "check").out, Not(HasSubstr("tavrin-fc-register, which knows them")));
 
     const std::string registration = root + "/usr/share/tavrin-fc-provider/mof/tavrin_fc_provider.reg";
     ASSERT_EQ(runCommand("sed -i '/^.TVRHBA_Card]/,/^#/d' " + registration).exitCode, 0);

@@ -113,6 +113,41 @@ TEST(Register, SmallFootprintServerAndBack)
     EXPECT_EQ(servers.takeCalls(), "");
 }
 
+TEST(Register, TheToolTellsTheSameOfServers)
+{
+    const Servers servers;
+    EXPECT_EQ(servers.check(),
+              "warning  CIM servers      no CIM server found: neither sfcb (sfcbstage, sfcbrepos) nor OpenPegasus "
+              "(cimmof, cimprovider, cimcli) is in PATH\n"
+              "                          -> install one, and run tavrin-fc-register; 'tvrcim serve' answers clients "
+              "without\n"
+              "all that is needed is there\n");
+    servers.installSmallFootprint();
+    servers.installOpenGroup();
+    EXPECT_EQ(servers.check(), "missing  sfcb             not registered\n"
+                               "                          -> run tavrin-fc-register\n"
+                               "missing  pegasus          not registered\n"
+                               "                          -> run tavrin-fc-register\n"
+                               "2 things are missing or wrong\n");
+    EXPECT_EQ(servers.run("register").exitCode, 0);
+    EXPECT_EQ(servers.check(), "ok       sfcb             registered\n"
+                               "ok       pegasus          registered\n"
+                               "all that is needed is there\n");
+    std::filesystem::remove(servers.root() / "pegasus/running");
+    servers.root().write("usr/share/tavrin-fc-provider/mof/tavrin_fc_provider.reg", "[TVRHBA_Card]\n#\n");
+    EXPECT_EQ(servers.check(), "warning  sfcb             registered, with other classes than those of "
+                               "ROOT/usr/share/tavrin-fc-provider/mof: register again\n"
+                               "                          -> run tavrin-fc-register\n"
+                               "warning  pegasus          does not answer; start it, and run this again\n"
+                               "                          -> start the server\n"
+                               "all that is needed is there\n");
+    std::filesystem::remove(servers.root() / "usr/lib/cmpi/libtavrin_fc_provider.so");
+    EXPECT_EQ(servers.check(), "warning  CIM servers      libtavrin_fc_provider.so is not installed in "
+                               "ROOT/usr/lib64/cmpi or ROOT/usr/lib/cmpi\n"
+                               "                          -> install the package tavrin-fc-provider\n"
+                               "all that is needed is there\n");
+}
+
 /// The server's repository is gone where it refuses one file: without a second build it would serve nobody.
 TEST(Register, SmallFootprintServerRefusesAndIsAsBefore)
 {

@@ -201,6 +201,16 @@ Servers::Run Servers::shell(const std::string& environment, const std::string& c
     return {answer.exitCode, readable(answer.out)};
 }
 
+std::string Servers::check() const
+{
+    const std::string out =
+        runCommand("env -i PATH=" + _root / "usr/sbin:" + _root / "bin" + " TAVRIN_FC_STATE=" + _root / "state" +
+                   " TVR_FILE_ROOT=" + _root.path() + " " TVR_BUILD "/broker/tvrcim check")
+            .out;
+    const std::size_t last = out.find("  driver log");
+    return readable(out.substr(std::min(out.find("\n", out.find(" -> ", last)) + 1, out.size())));
+}
+
 std::string Servers::takeCalls() const
 {
     const std::string calls = readable(textOf(_root / "calls"));

@@ -31,6 +31,8 @@ public:
 
     /// Runs one of the script's files as package managers do: with the system's tools in PATH, and none of a server's.
     Run runByPackage(const std::string& command) const;
+    /// What the tool's check of the host says of CIM servers.
+    std::string check() const;
 
     /// What the tools that change something were called with since the last time, a call a line.
     std::string takeCalls() const;

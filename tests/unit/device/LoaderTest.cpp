@@ -117,11 +117,12 @@ TEST(EntryPoints, SameFailureValuesWhenTheLibrariesLackTheFunctions)
     }
 }
 
-std::vector<void*> allEntries()
+std::vector<void*> calledEntries()
 {
     std::vector<void*> entries;
     for (std::size_t row = 0; row < entryPoints.size(); ++row)
-        entries.push_back(resolveEntry(row));
+        if (entryPoints[row].use == called)
+            entries.push_back(resolveEntry(row));
     return entries;
 }
 
@@ -134,10 +135,10 @@ TEST(EntryPoints, AreNotLookedUpAgainOnceAllAreResolved)
         host.files = files;
         host.absentSymbols = {"HBA_SendReadCapacity", "LRM_GetVPD", "RM_GetVPD"};
         loadAllLibraries();
-        const auto entries = allEntries();
+        const auto entries = calledEntries();
         resolveAllEntries();
         host.loaderCalls.clear();
-        EXPECT_EQ(allEntries(), entries);
+        EXPECT_EQ(calledEntries(), entries);
         EXPECT_THAT(host.loaderCalls, testing::IsEmpty());
         unloadAllLibraries();
     }
