@@ -24,7 +24,8 @@ OutputFiles write_records(const Schema& schema);
 /// The meta tables in `chunks` source files, and the repository.
 OutputFiles write_tables(const Schema& schema, std::size_t chunks);
 
-/// What people are shown of classes and their features: descriptions, units and the names of values.
+/// What people are shown of classes and their features: descriptions, units and the names of values. And the
+/// declarations of qualifiers.
 OutputFiles write_texts(const Schema& schema);
 
 /// What CIM servers read: qualifiers.mof, cim_classes.mof and tavrin_classes.mof, to be compiled in this order into

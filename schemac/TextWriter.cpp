@@ -1,8 +1,10 @@
-// What the schema tells people of classes, properties, methods and parameters, for programs that show it; the meta
-// tables have no qualifiers.
+// What the schema tells people of classes, properties, methods and parameters, and which qualifiers it declares, for
+// programs that show it; the meta tables have no qualifiers.
 #include "schemac/CppNames.h"
 #include "schemac/Output.h"
 #include "schemac/Types.h"
+
+#include <algorithm>
 
 namespace schemac
 {
@@ -41,6 +43,23 @@ struct Schema_Text
 /// Those of a class stand together.
 extern const Schema_Text schema_texts[];
 extern const std::size_t num_schema_texts;
+
+/// A qualifier as it is declared.
+struct Qualifier_Text
+{
+    const char* name;
+    const char* type;
+    bool is_array;
+    const char* default_value; ///< null for none
+    const char* scopes;        ///< what may have it, with blanks around each: " class property "
+    bool overridable;
+    bool to_subclass;
+    bool translatable;
+};
+
+/// In the order of their declarations.
+extern const Qualifier_Text qualifier_texts[];
+extern const std::size_t num_qualifier_texts;
 
 } // namespace cimple
 )";
@@ -104,6 +123,30 @@ struct Tables
     }
 };
 
+std::string as_bool(bool value)
+{
+    return value ? "true" : "false";
+}
+
+std::string row_of(const QualifierDeclaration& declaration)
+{
+    const auto has_flavor = [&](std::string_view name)
+    {
+        return std::any_of(declaration.flavors.begin(), declaration.flavors.end(),
+                           [&](const std::string& flavor) { return same_name(flavor, name); });
+    };
+    const bool has_default = declaration.default_value && !declaration.is_array &&
+                             declaration.default_value->items.front().kind != Literal::Kind::Null;
+    std::string scopes = " ";
+    for (const std::string& scope : declaration.scopes)
+        scopes += scope + " ";
+    return "    {" + as_string_literal(declaration.name) + ", " + as_string_literal(declaration.type) + ", " +
+           as_bool(declaration.is_array) + ", " +
+           (has_default ? as_string_literal(declaration.default_value->items.front().text) : "nullptr") + ", " +
+           as_string_literal(scopes) + ", " + as_bool(!has_flavor("DisableOverride")) + ", " +
+           as_bool(!has_flavor("Restricted")) + ", " + as_bool(has_flavor("Translatable")) + "},\n";
+}
+
 } // namespace
 
 OutputFiles write_texts(const Schema& schema)
@@ -111,6 +154,9 @@ OutputFiles write_texts(const Schema& schema)
     Tables tables;
     for (const Class& c : schema.classes)
         tables.add(c);
+    std::string qualifiers;
+    for (const QualifierDeclaration& declaration : schema.qualifiers)
+        qualifiers += row_of(declaration);
     return {{"schema/SchemaTexts.h", banner("the schema") + header_text},
             {"schema/SchemaTexts.cpp",
              banner("the schema") +
@@ -118,6 +164,9 @@ OutputFiles write_texts(const Schema& schema)
                  "namespace\n{\n\n" +
                  tables.names + "\n} // namespace\n\nconst Schema_Text schema_texts[] = {\n" + tables.texts +
                  "};\nconst std::size_t num_schema_texts = std::size(schema_texts);\n\n"
+                 "const Qualifier_Text qualifier_texts[] = {\n" +
+                 qualifiers +
+                 "};\nconst std::size_t num_qualifier_texts = std::size(qualifier_texts);\n\n"
                  "} // namespace cimple\n"}};
 }
 

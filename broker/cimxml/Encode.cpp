@@ -36,7 +36,10 @@ std::string realText(double number)
     std::array<char, 64> buffer{};
     const auto result =
         std::to_chars(buffer.data(), buffer.data() + buffer.size(), number, std::chars_format::scientific);
-    return {buffer.data(), result.ptr};
+    std::string text(buffer.data(), result.ptr);
+    if (text.find('.') == text.npos)
+        text.insert(text.find('e'), ".0"); // a real has a fraction
+    return text;
 }
 
 /// One UTF-16 code unit as UTF-8; half of a pair is no character.

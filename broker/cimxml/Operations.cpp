@@ -1,6 +1,7 @@
 #include "broker/cimxml/Operations.h"
 
 #include "broker/cimxml/Encode.h"
+#include "broker/cimxml/Qualifiers.h"
 #include "broker/cimxml/Request.h"
 
 #include <algorithm>
@@ -260,6 +261,58 @@ void enumerateClassNames(Operation& operation)
         operation.xml.leaf("CLASSNAME", "", {{"NAME", info->name}});
 }
 
+// --- single properties, and qualifiers
+
+Path instanceName(const Operation& operation)
+{
+    return operation.decoder().path(operation.required("InstanceName"));
+}
+
+const FeatureInfo& namedProperty(const Operation& operation, const Path& path)
+{
+    expect(operation.broker.findClass(path.nameSpace, path.className));
+    const ClassInfo* info = operation.broker.classes().find(path.className);
+    const std::string name = operation.text("PropertyName");
+    const FeatureInfo* property = info->property(name);
+    if (!property)
+        throw CimFailure{CMPI_RC_ERR_NO_SUCH_PROPERTY, info->name + " has no property '" + name + "'"};
+    return *property;
+}
+
+void getProperty(Operation& operation)
+{
+    const Path path = instanceName(operation);
+    const FeatureInfo& property = namedProperty(operation, path);
+    const Reply reply = operation.broker.getInstance(path, std::vector{property.name});
+    expect(reply);
+    for (const Object& object : reply.objects)
+        writeValue(operation.xml, object.get(property.name));
+}
+
+void setProperty(Operation& operation)
+{
+    const Path path = instanceName(operation);
+    const FeatureInfo& property = namedProperty(operation, path);
+    const Target target(operation.broker.classes(), operation.nameSpace(), property);
+    const Value value = operation.decoder().value(operation.request().parameter("NewValue"), target);
+    expect(operation.broker.modifyInstance({path, {{property.name, value}}}, std::vector{property.name}));
+}
+
+void getQualifier(Operation& operation)
+{
+    const std::string name = operation.text("QualifierName");
+    const cimple::Qualifier_Text* declaration = findQualifierDeclaration(name);
+    if (!declaration)
+        throw CimFailure{CMPI_RC_ERR_NOT_FOUND, "there is no qualifier '" + name + "'"};
+    writeQualifierDeclaration(operation.xml, *declaration);
+}
+
+void enumerateQualifiers(Operation& operation)
+{
+    for (const cimple::Qualifier_Text& declaration : qualifierDeclarations())
+        writeQualifierDeclaration(operation.xml, declaration);
+}
+
 // --- results in parts
 
 constexpr std::uint32_t longestTime = 300; ///< seconds between two requests
@@ -323,11 +376,6 @@ void openPaths(Operation& operation, const NamesReply& reply)
     expectNoFilter(operation);
     expect(reply);
     openResult(operation, PulledKind::paths, reply.paths, writeInstancePath);
-}
-
-Path instanceName(const Operation& operation)
-{
-    return operation.decoder().path(operation.required("InstanceName"));
 }
 
 void openInstances(Operation& operation)
@@ -403,6 +451,10 @@ constexpr Row rows[] = {
     {"GetClass", getClass},
     {"EnumerateClasses", enumerateClasses},
     {"EnumerateClassNames", enumerateClassNames},
+    {"GetProperty", getProperty},
+    {"SetProperty", setProperty, false},
+    {"GetQualifier", getQualifier},
+    {"EnumerateQualifiers", enumerateQualifiers},
     {"OpenEnumerateInstances", openInstances, false},
     {"OpenEnumerateInstancePaths", openInstancePaths, false},
     {"OpenAssociatorInstances", openAssociators, false},

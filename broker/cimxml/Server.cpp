@@ -43,6 +43,13 @@ std::unique_ptr<httplib::Server> makeServer(const ServerOptions& options)
     return server;
 }
 
+/// A port that another process listens on is in use, however it listens; one that a process left can be taken at once.
+void takeNoSharedPort(socket_t socket)
+{
+    const int yes = 1;
+    setsockopt(socket, SOL_SOCKET, SO_REUSEADDR, &yes, sizeof yes);
+}
+
 void limit(httplib::Server& server)
 {
     server.new_task_queue = [] { return new httplib::ThreadPool(mostConnections); };
@@ -50,6 +57,7 @@ void limit(httplib::Server& server)
     server.set_read_timeout(secondsForARequest);
     server.set_write_timeout(secondsForARequest);
     server.set_keep_alive_timeout(secondsOfSilence);
+    server.set_socket_options(takeNoSharedPort);
 }
 
 void answerTo(broker::Broker& broker, Pulls& pulls, const httplib::Request& request, httplib::Response& response)

@@ -51,6 +51,7 @@ Users::Users(const std::string& file)
         throw std::runtime_error("cannot read the users' file '" + file + "'");
     if (status.st_mode & (S_IWGRP | S_IWOTH))
         throw std::runtime_error("others may write the users' file '" + file + "'");
+    _readByOthers = status.st_mode & S_IROTH;
     std::size_t number = 0;
     for (std::string line; std::getline(stream, line);)
     {

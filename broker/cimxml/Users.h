@@ -19,11 +19,14 @@ public:
     explicit Users(const std::string& file);
 
     bool empty() const { return _hashes.empty(); }
+    /// Whether others can try passwords on the hashes, since they may read the file.
+    bool readByOthers() const { return _readByOthers; }
     /// Whether an Authorization header names one of them with the password (RFC 7617).
     bool admit(std::string_view authorization) const;
 
 private:
     std::map<std::string, std::string, std::less<>> _hashes;
+    bool _readByOthers = false;
 };
 
 } // namespace cimxml

@@ -156,6 +156,17 @@ const ClassTable& Broker::classes() const
     return _core->classes;
 }
 
+void Broker::declare(const ClassDeclaration& declaration)
+{
+    const std::unique_lock lock(_gate);
+    _core->classes.add(declaration);
+}
+
+std::vector<std::string> Broker::nameSpaces()
+{
+    return Dispatcher(*_core).nameSpaces();
+}
+
 Store& Broker::store()
 {
     return _core->store;

@@ -54,6 +54,10 @@ public:
     /// namespace alone.
     Outcome findClass(std::string_view nameSpace, std::string_view className);
     const ClassTable& classes() const;
+    /// Adds a class of the broker's own, of which the store has the instances. Before the first operation.
+    void declare(const ClassDeclaration& declaration);
+    /// All names by which namespaces can be reached.
+    std::vector<std::string> nameSpaces();
     Store& store();
     /// Classes that the module serves, in its order of linking.
     const std::vector<std::string>& servedClasses() const;

@@ -6,6 +6,8 @@
 
 #include <algorithm>
 #include <iterator>
+#include <set>
+#include <span>
 #include <type_traits>
 
 namespace broker
@@ -80,13 +82,28 @@ bool canReference(const ClassInfo& association, const ClassInfo& source)
 
 bool Dispatcher::exists(std::string_view nameSpace) const
 {
-    if (!_core.options.personality.interopAlias && sameName(nameSpace, "root/interop"))
-        return false;
+    const std::span<const std::string_view> known = _core.options.personality.knownInteropNames();
     const std::string wanted = canonicalNameSpace(nameSpace);
+    if (wanted == interopNames.front() &&
+        std::none_of(known.begin(), known.end(), [&](std::string_view name) { return sameName(name, nameSpace); }))
+        return false;
     const std::vector<std::string>& platform = _core.options.platformNamespaces;
     return _core.providers.inUse(wanted) ||
            std::any_of(platform.begin(), platform.end(),
                        [&](const std::string& space) { return canonicalNameSpace(space) == wanted; });
+}
+
+std::vector<std::string> Dispatcher::nameSpaces() const
+{
+    std::set<std::string> names = _core.providers.nameSpaces();
+    for (const std::string& name : _core.options.platformNamespaces)
+        names.insert(canonicalNameSpace(name));
+    if (names.contains(std::string(interopNames.front())))
+    {
+        const std::span<const std::string_view> known = _core.options.personality.knownInteropNames();
+        names.insert(known.begin(), known.end());
+    }
+    return {names.begin(), names.end()};
 }
 
 /// The class's provider if it is registered for the namespace, otherwise null.

@@ -37,6 +37,8 @@ public:
     /// Null, with the reason in `outcome`, where the namespace has no such class.
     const ClassInfo* findClass(std::string_view nameSpace, std::string_view className, Outcome& outcome);
     bool exists(std::string_view nameSpace) const;
+    /// All names by which namespaces can be reached.
+    std::vector<std::string> nameSpaces() const;
 
 private:
     const ClassInfo* findClassOf(const Path& path, Outcome& outcome);

@@ -4,6 +4,8 @@
 #include "runtime/cmpi/Cmpi.h"
 
 #include <array>
+#include <cstddef>
+#include <span>
 #include <string_view>
 
 #include <dlfcn.h>
@@ -62,6 +64,9 @@ enum class NullElements
     empty_text,
 };
 
+/// Names of the one interop namespace. Servers know the first ones.
+inline constexpr std::array<std::string_view, 3> interopNames{"root/pg_interop", "root/interop", "interop"};
+
 /// One row of the table below. The defaults are those of the strict broker.
 struct Personality
 {
@@ -85,8 +90,8 @@ struct Personality
     CleanupCalls cleanupCalls = CleanupCalls::each;
 
     // Requests.
-    bool interopAlias = true; ///< "root/interop" is another name of "root/pg_interop"
-    bool ownInterop = false;  ///< associations of the interop namespace are the module's only if the client names them
+    std::size_t interops = interopNames.size(); ///< so many of the names are known
+    bool ownInterop = false; ///< associations of the interop namespace are the module's only if the client names them
     Fanout fanout = Fanout::null_class;
     IntegerKeys integerKeys = IntegerKeys::signed64;
     bool nullForEmptyKeys = false;  ///< in source paths of associations and inside references
@@ -106,6 +111,8 @@ struct Personality
     // Up-calls.
     bool oneUpcall = false;  ///< lets one through at a time, over all providers and what they call from within it
     bool nullStates = false; ///< valid data of an enumeration carry the state of a null value
+
+    std::span<const std::string_view> knownInteropNames() const { return std::span(interopNames).first(interops); }
 };
 
 inline constexpr Personality strict{};
@@ -125,6 +132,7 @@ inline constexpr Personality smallFootprint{
     .openMode = RTLD_NOW | RTLD_GLOBAL,
     .loadKinds = LoadKinds::all,
     .cleanupCalls = CleanupCalls::last_of_kind,
+    .interops = 2,
     .integerKeys = IntegerKeys::unsigned64,
     .nullArguments = false,
     .principal = nullptr,
@@ -142,7 +150,7 @@ inline constexpr Personality openGroup{
     .objectVersion = 200,
     .servicesVersion = 200,
     .openMode = RTLD_LAZY | RTLD_GLOBAL,
-    .interopAlias = false,
+    .interops = 1,
     .ownInterop = true,
     .fanout = Fanout::own_class,
     .nullForEmptyKeys = true,

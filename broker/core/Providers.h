@@ -72,6 +72,7 @@ public:
     bool serves(std::string_view className, Kind kind) const;
     /// Whether a class is registered for the namespace of that canonical name.
     bool inUse(const std::string& nameSpace) const { return _nameSpaces.count(nameSpace) > 0; }
+    const std::set<std::string>& nameSpaces() const { return _nameSpaces; } ///< canonical names of those in use
     /// Classes with a provider, in the module's order of linking.
     const std::vector<std::string>& classNames() const { return _names; }
 

@@ -1,5 +1,6 @@
 #include "broker/core/Store.h"
 
+#include "broker/core/Personality.h"
 #include "broker/values/Json.h"
 
 #include <nlohmann/json.hpp>
@@ -33,7 +34,8 @@ std::string notFoundText(const Path& path)
 std::string canonicalNameSpace(std::string_view nameSpace)
 {
     std::string name = lowerCase(nameSpace);
-    return name == "root/interop" ? "root/pg_interop" : name;
+    const bool interop = std::find(interopNames.begin(), interopNames.end(), name) != interopNames.end();
+    return interop ? std::string(interopNames.front()) : name;
 }
 
 NamesReply Store::create(Object object)
@@ -59,6 +61,8 @@ NamesReply Store::create(Object object)
             stored.properties.push_back({feature.name, value});
     }
     const std::lock_guard lock(_mutex);
+    if (const Outcome outcome = changeable(info->name); !outcome.ok())
+        return refused(outcome.status, outcome.message);
     if (find(stored.path))
         return refused(CMPI_RC_ERR_ALREADY_EXISTS, "an instance of " + info->name + " with these keys exists");
     NamesReply reply;
@@ -105,6 +109,8 @@ Outcome Store::modify(const Object& object, const PropertyList& properties)
     const ClassInfo* info = _classes.find(object.path.className);
     if (!stored || !info)
         return {CMPI_RC_ERR_NOT_FOUND, notFoundText(object.path)};
+    if (const Outcome outcome = changeable(info->name); !outcome.ok())
+        return outcome;
     std::vector<std::string> names = properties.value_or(std::vector<std::string>());
     if (!properties)
     {
@@ -132,8 +138,23 @@ Outcome Store::remove(const Path& path)
     const Object* stored = find(path);
     if (!stored)
         return {CMPI_RC_ERR_NOT_FOUND, notFoundText(path)};
+    if (const Outcome outcome = changeable(path.className); !outcome.ok())
+        return outcome;
     _objects.erase(_objects.begin() + (stored - _objects.data()));
     return {};
+}
+
+void Store::close(std::string_view className)
+{
+    const std::lock_guard lock(_mutex);
+    _closed.emplace(className);
+}
+
+Outcome Store::changeable(const std::string& className) const
+{
+    if (!_closed.contains(className))
+        return {};
+    return {CMPI_RC_ERR_NOT_SUPPORTED, "instances of " + className + " cannot be changed"};
 }
 
 std::size_t Store::size() const

@@ -6,6 +6,7 @@
 
 #include <map>
 #include <mutex>
+#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -13,7 +14,7 @@
 namespace broker
 {
 
-/// "root/interop" and "root/pg_interop" are two names of one namespace.
+/// In lower case, and the interop namespace by the first of its names (Personality.h).
 std::string canonicalNameSpace(std::string_view nameSpace);
 
 /// Thread-safe. Properties of a stored instance are those of its class; its path is made of them.
@@ -32,14 +33,18 @@ public:
     /// Changes the listed properties, or those of the instance; keys stay.
     Outcome modify(const Object& object, const PropertyList& properties);
     Outcome remove(const Path& path);
+    /// From now on the instances of the class are what they are, and changes CMPI_RC_ERR_NOT_SUPPORTED.
+    void close(std::string_view className);
     std::size_t size() const;
 
 private:
     const Object* find(const Path& path) const;
+    Outcome changeable(const std::string& className) const;
 
     const ClassTable& _classes;
     mutable std::mutex _mutex;
     std::vector<Object> _objects;
+    std::set<std::string, NameLess> _closed;
 };
 
 /// Reads a platform file (docs/tvrcim.md has its format) into the store. Throws std::runtime_error with the reason.

@@ -1,9 +1,11 @@
 #include "broker/tvrcim/ServeCommand.h"
 
+#include "broker/cimxml/SelfDescription.h"
 #include "broker/cimxml/Server.h"
 #include "broker/tvrcim/SignalEnd.h"
 
 #include <charconv>
+#include <iostream>
 #include <ostream>
 
 namespace tvrcim
@@ -42,6 +44,8 @@ cimxml::ServerOptions optionsOf(const Command& command)
     }
     if (!command.users.empty())
         options.users = cimxml::Users(command.users);
+    if (options.users.readByOthers())
+        std::cerr << "tvrcim: warning: others may read the users' file '" << command.users << "'\n";
     return options;
 }
 
@@ -51,6 +55,7 @@ void serve(Session& session, const Command& command)
 {
     using namespace std::chrono_literals;
     const cimxml::ServerOptions options = optionsOf(command);
+    cimxml::describePort(session.broker);
     const Interruptible interruptible(session.signals);
     const cimxml::Server server(session.broker, options);
     session.out << "listening on " << (options.certificate.empty() ? "http" : "https") << "://" << options.address

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <stdexcept>
 
 namespace broker
 {
@@ -99,6 +100,17 @@ MethodInfo describe(const cimple::Meta_Method& method)
     return info;
 }
 
+/// For a class whose properties are complete.
+void index(ClassInfo& info)
+{
+    for (std::size_t i = 0; i < info.properties.size(); ++i)
+    {
+        info.propertyIndex.emplace(info.properties[i].name, i);
+        if (info.properties[i].isKey())
+            info.keys.push_back(info.properties[i].name);
+    }
+}
+
 void fill(ClassInfo& info, const cimple::Meta_Class& meta)
 {
     for (std::size_t i = 0; i < meta.num_meta_features; ++i)
@@ -109,11 +121,9 @@ void fill(ClassInfo& info, const cimple::Meta_Class& meta)
             info.methods.push_back(describe(static_cast<const cimple::Meta_Method&>(feature)));
             continue;
         }
-        info.propertyIndex.emplace(feature.name, info.properties.size());
         info.properties.push_back(describe(feature));
-        if (info.properties.back().isKey())
-            info.keys.emplace_back(feature.name);
     }
+    index(info);
 }
 
 /// The class nearest the root that shares the feature record: records are shared with the superclass until overridden.
@@ -188,6 +198,33 @@ ClassTable::ClassTable(const cimple::Meta_Repository* repository)
             (isMethod ? infos[i]->methods[method++].origin : infos[i]->properties[property++].origin) = origin;
         }
     }
+}
+
+void ClassTable::add(const ClassDeclaration& declaration)
+{
+    const auto above = _byName.find(declaration.superclass);
+    if (above == _byName.end() || find(declaration.name))
+        throw std::invalid_argument("the class " + std::string(declaration.name) + " cannot be added below " +
+                                    std::string(declaration.superclass));
+    const ClassInfo& superclass = *above->second;
+    ClassInfo& info = *_classes.emplace_back(std::make_unique<ClassInfo>());
+    info.name = declaration.name;
+    info.description = declaration.description;
+    info.flags = cimple::META_CLASS;
+    info.superclass = &superclass;
+    info.properties = superclass.properties;
+    info.methods = superclass.methods;
+    for (const FeatureInfo& own : declaration.properties)
+    {
+        const auto inherited = std::find_if(info.properties.begin(), info.properties.end(),
+                                            [&](const FeatureInfo& known) { return sameName(known.name, own.name); });
+        FeatureInfo& property =
+            inherited == info.properties.end() ? info.properties.emplace_back(own) : (*inherited = own);
+        property.origin = &info;
+    }
+    index(info);
+    _byName.emplace(info.name, &info);
+    const_cast<ClassInfo&>(superclass).subclasses.push_back(&info);
 }
 
 const ClassInfo* ClassTable::find(std::string_view name) const

@@ -24,6 +24,7 @@ struct FeatureInfo
     std::uint32_t flags = 0;      ///< cimple::Meta_Flag bits
     Value defaultValue;           ///< null if the schema has none
     const ClassInfo* origin = {}; ///< the class that declares it; null for a parameter
+    std::string_view description; ///< where the class is none of the schema's
 
     bool isKey() const { return (flags & cimple::META_KEY) != 0; }
     /// A reference to another object (an embedded instance is none).
@@ -58,6 +59,7 @@ struct ClassInfo
     std::vector<FeatureInfo> properties;      ///< references too
     std::vector<MethodInfo> methods;
     std::vector<std::string> keys;
+    std::string_view description; ///< of a class that is none of the schema's
 
     const FeatureInfo* property(std::string_view propertyName) const;
     const MethodInfo* method(std::string_view methodName) const;
@@ -69,12 +71,25 @@ struct ClassInfo
     std::map<std::string, std::size_t, NameLess> propertyIndex; ///< position in `properties` by name
 };
 
+/// A class that the module's tables do not have. Texts outlive the table.
+struct ClassDeclaration
+{
+    std::string_view name;
+    std::string_view superclass;
+    std::string_view description;
+    std::vector<FeatureInfo> properties; ///< its own; one of an inherited name overrides that
+};
+
 class ClassTable
 {
 public:
     ClassTable() = default;
     /// Copies all classes; null gives an empty table.
     explicit ClassTable(const cimple::Meta_Repository* repository);
+
+    /// Nobody else uses the table meanwhile. Throws std::invalid_argument for a class that it has, or below one that it
+    /// lacks.
+    void add(const ClassDeclaration& declaration);
 
     /// Any case; null if there is no such class.
     const ClassInfo* find(std::string_view name) const;

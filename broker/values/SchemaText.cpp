@@ -49,11 +49,13 @@ std::string_view descriptionOf(const ClassInfo& info)
     for (const cimple::Schema_Text& text : textsOf(info))
         if (!*text.feature)
             return text.description;
-    return {};
+    return info.description;
 }
 
 std::string_view descriptionOf(const ClassInfo& info, std::string_view feature, std::string_view parameter)
 {
+    if (const FeatureInfo* known = info.property(feature); known && !known->description.empty())
+        return known->description;
     return nearest(info, feature, parameter,
                    [](const cimple::Schema_Text& text) { return std::string_view(text.description); });
 }

@@ -259,9 +259,9 @@ TEST(Personalities, ClassesAreServedWhereTheyAreRegistered)
         Personality personality;
         std::vector<std::string> interop; ///< names of the interop namespace
         std::vector<std::string> unknown;
-    } rows[] = {{strict, {"root/interop", "root/pg_interop", "root/PG_InterOp"}, {"root/nowhere"}},
-                {smallFootprint, {"root/interop", "root/pg_interop"}, {"root/nowhere"}},
-                {openGroup, {"root/PG_InterOp", "ROOT/pg_interop"}, {"root/interop", "root/nowhere"}}};
+    } rows[] = {{strict, {"interop", "root/interop", "root/pg_interop", "root/PG_InterOp"}, {"root/nowhere"}},
+                {smallFootprint, {"root/interop", "root/pg_interop"}, {"interop", "root/nowhere"}},
+                {openGroup, {"root/PG_InterOp", "ROOT/pg_interop"}, {"interop", "root/interop", "root/nowhere"}}};
     for (const auto& row : rows)
     {
         SCOPED_TRACE(row.personality.name);

@@ -223,4 +223,35 @@ TEST(CimXmlOperations, ClassesAreGivenByGeneration)
     EXPECT_THAT(names(parameter("DeepInheritance", "<VALUE>TRUE</VALUE>")), HasSubstr("TST_Disk"));
 }
 
+TEST(CimXmlOperations, QualifiersAreThoseOfTheSchema)
+{
+    Host host;
+    const auto named = [](const std::string& name)
+    { return operation("GetQualifier", parameter("QualifierName", "<VALUE>" + name + "</VALUE>")); };
+    const struct
+    {
+        const char *name, *declaration;
+    } rows[] = {
+        {"key", R"(<IRETURNVALUE><QUALIFIER.DECLARATION NAME="Key" TYPE="boolean" ISARRAY="false" OVERRIDABLE="false" )"
+                R"(TOSUBCLASS="true" TRANSLATABLE="false"><SCOPE CLASS="false" ASSOCIATION="false" REFERENCE="true" )"
+                R"(PROPERTY="true" METHOD="false" PARAMETER="false" INDICATION="false"></SCOPE><VALUE>FALSE</VALUE>)"
+                R"(</QUALIFIER.DECLARATION></IRETURNVALUE>)"},
+        {"Values", R"(TYPE="string" ISARRAY="true" OVERRIDABLE="true" TOSUBCLASS="true" TRANSLATABLE="true">)"},
+        {"Values", R"(PARAMETER="true" INDICATION="false"></SCOPE></QUALIFIER.DECLARATION>)"},
+        {"Version", R"(OVERRIDABLE="true" TOSUBCLASS="false" TRANSLATABLE="true"><SCOPE CLASS="true")"},
+        {"Description", R"(<SCOPE CLASS="true" ASSOCIATION="true" REFERENCE="true" PROPERTY="true" METHOD="true" )"
+                        R"(PARAMETER="true" INDICATION="true"></SCOPE></QUALIFIER.DECLARATION>)"},
+        {"ArrayType", "<VALUE>Bag</VALUE>"},
+    };
+    const std::string all = host.ask(operation("EnumerateQualifiers", ""));
+    for (const auto& row : rows)
+        EXPECT_THAT(host.ask(named(row.name)), HasSubstr(row.declaration)) << row.name;
+    EXPECT_THAT(host.ask(named("None")), HasSubstr(error(6)));
+    constexpr std::size_t declared = 71;
+    std::size_t count = 0;
+    for (std::size_t at = 0; (at = all.find("<QUALIFIER.DECLARATION ", at)) != all.npos; at++)
+        count++;
+    EXPECT_EQ(count, declared);
+}
+
 } // namespace

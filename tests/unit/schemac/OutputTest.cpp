@@ -155,6 +155,17 @@ TEST(Texts, AreThoseOfClassesFeaturesAndParameters)
                                 "std::size(T_Pump_Faults_bits)},\n};\n"));
 }
 
+TEST(Texts, HaveTheDeclarationsOfQualifiers)
+{
+    const std::string text = text_of_file(write_texts(checked("class T_Pump { };")), "schema/SchemaTexts.cpp");
+    for (const char* row :
+         {R"({"Abstract", "boolean", false, "false", " class association indication ", true, false, false},)",
+          R"({"BitMap", "string", true, nullptr, " property method parameter ", true, true, false},)",
+          R"({"Description", "string", false, nullptr, " any ", true, true, false},)",
+          R"({"Key", "boolean", false, "false", " property reference ", false, true, false},)"})
+        EXPECT_THAT(text, HasSubstr(row));
+}
+
 TEST(ServerFiles, ClassesStandAfterWhatTheyName)
 {
     const OutputFiles files = write_server_files(checked(served_classes), "1.2");

@@ -1,0 +1,123 @@
+// Who may talk to the port, over what, and what it refuses to start with.
+#include "tests/system/Serving.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <fstream>
+
+using namespace system_test;
+using testing::EndsWith;
+using testing::HasSubstr;
+using testing::StartsWith;
+
+namespace
+{
+
+namespace fs = std::filesystem;
+
+const std::string cards = "/root/tavrin:TVRHBA_Card";
+
+/// With the right password, and with all others.
+void expectPasswords(const Serving& server, const std::string& operation)
+{
+    EXPECT_THAT(server.wbemcli(operation, cards).err, HasSubstr("Username/password required"));
+    for (const char* wrong : {"joe:wrong@", "jim:secret@", "joe:@", "joe:secret%00@", "JOE:secret@"})
+        EXPECT_THAT(server.wbemcliAs(wrong, operation, cards).err, HasSubstr("Invalid username/password")) << wrong;
+    const Answer right = server.wbemcliAs("joe:secret@", operation, cards);
+    EXPECT_EQ(right.exitCode, 0) << right.err;
+    EXPECT_THAT(right.out, HasSubstr("TVRHBA_Card.Tag=\"TV16A02417\""));
+}
+
+TEST(ServeSecurity, UsersGiveTheirPasswords)
+{
+    const Folder folder;
+    const Serving server({"--users", folder.makeUsers("joe", "secret")});
+    expectPasswords(server, "ein");
+    const std::string headers = runCommand("curl --noproxy '*' -si -d x " + server.url() + "/cimom").out;
+    EXPECT_THAT(headers, StartsWith("HTTP/1.1 401"));
+    EXPECT_THAT(headers, HasSubstr("WWW-Authenticate: Basic realm="));
+}
+
+TEST(ServeSecurity, TheWholeTalkIsEncrypted)
+{
+    const Folder folder;
+    folder.makeCertificate("own");
+    folder.makeCertificate("other");
+    const Serving server(
+        {"--tls", folder.file("own.pem"), folder.file("own.key"), "--users", folder.makeUsers("joe", "secret")});
+    EXPECT_THAT(server.url(), StartsWith("https://"));
+    expectPasswords(server, "ein -cacert " + folder.file("own.pem"));
+    EXPECT_EQ(server.wbemcliAs("joe:secret@", "ein -noverify", cards).exitCode, 0);
+    EXPECT_EQ(server.wbemcliAs("joe:secret@", "ein -cacert " + folder.file("other.pem"), cards).exitCode, 16);
+    const std::string tls = runCommand("openssl s_client -connect 127.0.0.1:" + server.port() + " -CAfile " +
+                                       folder.file("own.pem") + " -verify_return_error </dev/null")
+                                .out;
+    EXPECT_THAT(tls, HasSubstr("TLSv1.3"));
+    EXPECT_NE(runCommand("curl --noproxy '*' -sk --tls-max 1.1 --ciphers DEFAULT@SECLEVEL=0 " + server.url()).exitCode,
+              0);
+    EXPECT_NE(runCommand("curl --noproxy '*' -s -d x http://127.0.0.1:" + server.port()).exitCode, 0);
+}
+
+/// One line of standard error, and the exit code of files and arguments that cannot be used.
+TEST(ServeSecurity, WhatIsNotSafeOrCannotBeUsedIsNotServed)
+{
+    const Folder folder;
+    folder.makeCertificate("own");
+    folder.makeCertificate("other");
+    const std::string users = folder.makeUsers("joe", "secret");
+    const auto file = [&](const char* name, const char* text, fs::perms permissions = fs::perms::owner_read)
+    {
+        std::ofstream(folder.file(name)) << text;
+        fs::permissions(folder.file(name), permissions);
+        return folder.file(name);
+    };
+    const std::string tls = " --tls " + folder.file("own.pem") + " " + folder.file("own.key");
+    const Serving server;
+    const struct
+    {
+        std::string arguments, message;
+    } rows[] = {
+        {"--listen 0.0.0.0:0", "other hosts are served with users and TLS alone"},
+        {"--listen [::]:0" + tls, "other hosts are served with users and TLS alone"},
+        {"--listen 0.0.0.0:0 --users " + users, "other hosts are served with users and TLS alone"},
+        {"--listen 127.0.0.1:99999", "'99999' is no port"},
+        {"--listen 127.0.0.1:http", "'http' is no port"},
+        {"--listen 192.0.2.1:0 --users " + users + tls, "cannot listen on 192.0.2.1:0"},
+        {"--listen 127.0.0.1:" + server.port(), "cannot listen on 127.0.0.1:" + server.port()},
+        {"--tls " + folder.file("own.pem") + " " + folder.file("other.key"),
+         "cannot use the certificate '" + folder.file("own.pem") + "' with its key"},
+        {"--tls " + users + " " + folder.file("own.key"), "cannot use the certificate '" + users + "' with its key"},
+        {"--users " + file("open", "joe:$6$x$y\n", fs::perms::owner_read | fs::perms::others_write),
+         "others may write the users' file '" + folder.file("open") + "'"},
+        {"--users " + file("broken", "joe:$6$x$y\njim\n"), folder.file("broken") + ":2: a line is written name:hash"},
+        {"--users " + file("empty", "# nobody\n"), "there is no user in '" + folder.file("empty") + "'"},
+    };
+    for (const auto& row : rows)
+    {
+        const std::string listen = row.arguments.starts_with("--listen") ? "" : "--listen 127.0.0.1:0 ";
+        const Answer answer = tvrcim("serve " + listen + row.arguments + " </dev/null", "timeout 20 ");
+        EXPECT_EQ(answer.exitCode, 2) << row.arguments;
+        EXPECT_EQ(answer.out, "") << row.arguments;
+        EXPECT_THAT(answer.err, StartsWith("tvrcim: "));
+        EXPECT_THAT(answer.err, EndsWith(row.message + "\n"));
+        EXPECT_EQ(std::count(answer.err.begin(), answer.err.end(), '\n'), 1) << answer.err;
+    }
+    for (const char* option : {"--users /nowhere", "--tls /nowhere /nowhere", "--tls /etc/passwd"})
+        EXPECT_EQ(tvrcim(std::string("serve --listen 127.0.0.1:0 ") + option, "timeout 20 ").exitCode, 2) << option;
+}
+
+/// Whoever reads the hashes can look for passwords; that is the administrator's to mend.
+TEST(ServeSecurity, AFileOfUsersThatOthersReadIsToldOf)
+{
+    const Folder folder;
+    const std::string users = folder.makeUsers("joe", "secret");
+    fs::permissions(users, fs::perms::others_read, fs::perm_options::add);
+    const Serving server;
+    const Answer answer = tvrcim("serve --users " + users + " --listen 127.0.0.1:" + server.port());
+    EXPECT_EQ(answer.err, "tvrcim: warning: others may read the users' file '" + users +
+                              "'\ntvrcim: cannot listen on " + "127.0.0.1:" + server.port() + "\n");
+}
+
+} // namespace
