@@ -221,6 +221,12 @@ Finding logSettings(const File& file, const LogData& data)
                        data);
 }
 
+std::string remedyForFolder(const std::string& folder)
+{
+    std::error_code error;
+    return fs::is_directory(folder, error) ? "let the server's user write to " + folder : "mkdir -p " + folder;
+}
+
 Finding logFile(const char* subject, const std::string& path)
 {
     constexpr std::size_t head = 16;
@@ -232,7 +238,7 @@ Finding logFile(const char* subject, const std::string& path)
     {
         if (file.folderTakesFiles)
             return finding(State::ok, subject, file, " is not there yet");
-        return finding(State::warning, subject, file, " cannot be made", "mkdir -p " + file.folder());
+        return finding(State::warning, subject, file, " cannot be made", remedyForFolder(file.folder()));
     }
     if (!file.text)
         return unreadable(subject, file);
@@ -263,7 +269,11 @@ Finding driverLog()
     if (!file.isThere())
         return finding(State::note, subject, file, " is not there: the driver's lines are not shown",
                        "install rsyslog, and have it write kern.* there");
-    return file.text ? finding(State::ok, subject, file, " can be read") : unreadable(subject, file);
+    if (file.text)
+        return finding(State::ok, subject, file, " can be read");
+    Finding found = unreadable(subject, file);
+    found.state = State::warning; // all else works without
+    return found;
 }
 
 void checkLogs(Findings& findings)

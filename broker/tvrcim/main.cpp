@@ -85,13 +85,15 @@ int run(const Settings& settings)
     if (settings.command.name == "check")
         return checkHost(settings, signals, std::cout, wantsColour());
     std::optional<FileRoot> files;
-    if (settings.hardware && asksTheHost(settings.command))
-        if (const Libraries libraries; !libraries.anyFound())
-            return report(libraries.absence(), exitIncomplete);
     if (!settings.hardware)
     {
         files.emplace(signals);
         startSimulator(settings.scenario);
+    }
+    else if (asksTheHost(settings.command))
+    {
+        if (const Libraries libraries; !libraries.anyFound())
+            return report(libraries.absence(), exitIncomplete);
     }
     const std::string module = settings.module.empty() ? findModule() : settings.module;
     broker::Broker broker(
