@@ -203,10 +203,10 @@ Servers::Run Servers::shell(const std::string& environment, const std::string& c
 
 std::string Servers::check() const
 {
-    const std::string out =
-        runCommand("env -i PATH=" + _root / "usr/sbin:" + _root / "bin" + " TAVRIN_FC_STATE=" + _root / "state" +
-                   " TVR_FILE_ROOT=" + _root.path() + " " TVR_BUILD "/broker/tvrcim check")
-            .out;
+    const std::string out = runCommand("env -i PATH=" + _root / "usr/sbin:" + _root / "bin:" + _root / "tools" +
+                                       " PEGASUS_HOME=" + _root / "pegasus" + " TAVRIN_FC_STATE=" + _root / "state" +
+                                       " TVR_FILE_ROOT=" + _root.path() + " " TVR_BUILD "/broker/tvrcim check")
+                                .out;
     const std::size_t last = out.find("  driver log");
     return readable(out.substr(std::min(out.find("\n", out.find(" -> ", last)) + 1, out.size())));
 }
@@ -230,6 +230,6 @@ std::string Servers::readable(std::string text) const
     for (std::size_t at; (at = text.find(_root.path())) != text.npos;)
         text.replace(at, _root.path().size(), "ROOT");
     // Whether this machine has that server's process is not the test's to say.
-    text = std::regex_replace(text, std::regex("(sfcb\tROOT/tools\t)(running|stopped)"), "$1STATE");
+    text = std::regex_replace(text, std::regex("(sfcb\tROOT/tools\t|sfcb  .*, )(running|stopped)"), "$1STATE");
     return std::regex_replace(text, std::regex("/tmp/tmp\\.[A-Za-z0-9]+"), "TMP");
 }

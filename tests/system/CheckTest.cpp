@@ -55,10 +55,10 @@ public:
     }
     void installAll() const { install({"libHBAAPI.so.2", "liblrmapi.so", "libtvrsim.so", "libtvrsim_tagging.so"}); }
 
-    /// The script that registers the module prints this for the status.
+    /// The script that registers the module prints this for the status of servers.
     void installScript(const std::string& prints) const
     {
-        write("bin/tavrin-fc-register", "#!/bin/sh\n[ \"$*\" = status ] || exit 2\n" + prints);
+        write("bin/tavrin-fc-register", "#!/bin/sh\n[ \"$*\" = --status ] || exit 2\n" + prints);
         fs::permissions(*this / "bin/tavrin-fc-register", fs::perms::owner_all);
     }
 
@@ -85,7 +85,8 @@ TEST(TvrcimCheck, AMachineThatHasAll)
 {
     const Machine machine;
     machine.installAll();
-    machine.installScript("echo 'sfcb: registered'\n");
+    machine.installScript(R"(printf 'sfcb\t/usr/bin\trunning\tregistered\t/usr/lib64/cmpi/libtavrin_fc_provider.so\n'
+)");
     const std::string settings = "TVR_PROVIDER_CACHE_TIMEOUT = 3\nTVR_PROVIDER_REFRESH_SANDATA = FALSE\n";
     machine.write("etc/tavrin_fc_provider.conf", settings);
     machine.write("etc/tvr_smis.conf", "# the page\nhttps://host.example.net/page\n");
@@ -107,7 +108,7 @@ TEST(TvrcimCheck, AMachineThatHasAll)
               "ok       log settings     ROOT/etc/tavrin_fc_provider.dmp: logs in memory and a file, mode 4, level 5\n"
               "ok       log              ROOT/provider.log has 2 KiB\n"
               "ok       driver log       ROOT/var/log/messages can be read\n"
-              "ok       sfcb             registered\n"
+              "ok       sfcb             registered, running, module /usr/lib64/cmpi/libtavrin_fc_provider.so\n"
               "all that is needed is there\n");
     EXPECT_EQ(run.err, "");
     EXPECT_EQ(run.exitCode, 0);
@@ -313,15 +314,14 @@ TEST(TvrcimCheck, WhatTheScriptSaysOfServers)
         std::string lines;
         int exitCode;
     } rows[] = {
-        {"echo 'sfcb: not registered'; echo 'pegasus: does not answer; start it, and run this again' >&2; exit 1\n",
-         "missing  sfcb             not registered\n"
-         "                          -> run tavrin-fc-register\n"
-         "warning  pegasus          does not answer; start it, and run this again\n"
-         "                          -> start the server\n"
+        {"printf 'sfcb\\t/usr/bin\\tstopped\\tregistered\\t-\\npegasus\\t/usr/sbin\\tdreaming\\tperhaps\\t/x.so\\n'\n",
+         "wrong    sfcb             registered, stopped, and has no module in its folders of providers\n"
+         "                          -> run tavrin-fc-register remove, and then tavrin-fc-register\n"
+         "note     pegasus          perhaps, dreaming, module /x.so\n"
          "1 thing is missing or wrong\n",
          7},
-        {"exit 3\n",
-         "wrong    CIM servers      tavrin-fc-register told nothing\n"
+        {"echo trouble >&2; exit 3\n",
+         "wrong    CIM servers      tavrin-fc-register tells nothing: trouble\\n\n"
          "                          -> run 'tavrin-fc-register status', and see what it says\n",
          7},
         {"kill -9 $$\n", "wrong    CIM servers      tavrin-fc-register was ended by signal 9\n", 7},
