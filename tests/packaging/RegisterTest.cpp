@@ -84,6 +84,17 @@ TEST(Register, SmallFootprintServerAndBack)
     std::filesystem::remove(servers.root() / "sfcb/cmpi/" + link);
     EXPECT_THAT(servers.run("").text, EndsWith("sfcb: registered already\n"));
     EXPECT_EQ(textOf(servers.root() / "sfcb/cmpi/" + link), "the module");
+    servers.root().write("usr/lib64/cmpi/" + link, "the module, installed elsewhere");
+    EXPECT_EQ(servers.run("").exitCode, 0);
+    EXPECT_EQ(textOf(servers.root() / "sfcb/cmpi/" + link), "the module, installed elsewhere");
+
+    // One that an administrator put there is told of, and left alone.
+    std::filesystem::remove(servers.root() / "sfcb/cmpi/" + link);
+    servers.root().write("sfcb/lib/" + link, "another module");
+    EXPECT_THAT(servers.run("").text,
+                HasSubstr("warning: ROOT/sfcb/lib/" + link + " is another module than ROOT/usr/lib64"));
+    EXPECT_EQ(textOf(servers.root() / "sfcb/lib/" + link), "another module");
+    std::filesystem::remove(servers.root() / "sfcb/lib/" + link);
 
     // An update of the package has other files; a platform stays once it is there.
     EXPECT_EQ(servers.run("register --platform").exitCode, 0);
