@@ -101,6 +101,14 @@ TEST(CimXml, PropertiesHaveBothTagsWithoutAValueToo)
               R"(&lt;VALUE&gt;&amp;lt;&lt;/VALUE&gt;&lt;/PROPERTY&gt;&lt;/INSTANCE&gt;</VALUE></PROPERTY>)");
 }
 
+TEST(CimXml, RealsHaveAFraction)
+{
+    for (const auto& [number, text] : {std::pair(30.0, "3.0e+01"), std::pair(-0.125, "-1.25e-01"),
+                                       std::pair(0.0, "0.0e+00"), std::pair(-1 / 0.0, "-INF")})
+        EXPECT_EQ(xmlOf([&](XmlText& xml) { writeValue(xml, Value::real64(number)); }),
+                  std::string("<VALUE>") + text + "</VALUE>");
+}
+
 TEST(CimXml, WhatXmlCannotHoldIsAQuestionMark)
 {
     const auto text = [](std::string_view raw) { return xmlOf([&](XmlText& xml) { xml.characters(raw); }); };
