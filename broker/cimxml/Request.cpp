@@ -73,4 +73,10 @@ Request readRequest(const pugi::xml_document& document)
     return request;
 }
 
+Message::Message(std::string_view text)
+{
+    parseXml(document, text);
+    request = readRequest(document);
+}
+
 } // namespace cimxml

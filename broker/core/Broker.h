@@ -32,6 +32,17 @@ public:
     Broker(const Broker&) = delete;
     Broker& operator=(const Broker&) = delete;
 
+    // Of operations whose results may be many there are two forms: one gives them to a sink as they come, the other
+    // collects them.
+    Outcome enumerateInstances(std::string_view nameSpace, std::string_view className, const PropertyList& properties,
+                               const ObjectSink& sink);
+    Outcome enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink);
+    Outcome associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                        const ObjectSink& sink);
+    Outcome associatorNames(const Path& path, const AssociationFilter& filter, const PathSink& sink);
+    Outcome references(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                       const ObjectSink& sink);
+    Outcome referenceNames(const Path& path, const AssociationFilter& filter, const PathSink& sink);
     Reply enumerateInstances(std::string_view nameSpace, std::string_view className,
                              const PropertyList& properties = std::nullopt);
     NamesReply enumerateInstanceNames(std::string_view nameSpace, std::string_view className);
