@@ -197,7 +197,7 @@ bool Connection::fill()
             _next = 0;
             _end = step.bytes;
             _received += step.bytes;
-            _receiving += timeOf(step.bytes);
+            _receiving = std::min(_receiving + timeOf(step.bytes), _limits.patience);
             return true;
         }
         if (step.awaited == 0 || !wait(step.awaited, _receiving))
@@ -241,7 +241,7 @@ bool Connection::give(std::string_view& bytes, bool waits)
     {
         const Step step = send(bytes);
         bytes.remove_prefix(step.bytes);
-        _sending += timeOf(step.bytes);
+        _sending = std::min(_sending + timeOf(step.bytes), _limits.patience);
         if (step.bytes > 0)
             continue;
         if (step.awaited == 0)

@@ -601,7 +601,7 @@ bool answer(Broker& broker, Pulls& pulls, const Message& message, const Output& 
     try
     {
         Operation operation(broker, pulls, request, response);
-        expect(broker.findClass(request.nameSpace, {}));
+        expect(broker.findNameSpace(request.nameSpace));
         request.extrinsic ? carryOutExtrinsic(operation) : carryOutIntrinsic(operation);
         return response.finish();
     }

@@ -76,7 +76,14 @@ Request readRequest(const pugi::xml_document& document)
 Message::Message(std::string_view text)
 {
     parseXml(document, text);
-    request = readRequest(document);
+    try
+    {
+        request = readRequest(document);
+    }
+    catch (const std::invalid_argument& error)
+    {
+        refuse(error.what());
+    }
 }
 
 } // namespace cimxml

@@ -5,6 +5,7 @@
 #include "broker/cimxml/Operations.h"
 
 #include <atomic>
+#include <malloc.h>
 #include <semaphore>
 #include <stdexcept>
 #include <sys/socket.h>
@@ -108,18 +109,32 @@ httplib::Server::HandlerResponse refuse(httplib::Response& response, int status)
     return httplib::Server::HandlerResponse::Handled;
 }
 
+/// The allocator keeps what a provider needed for a large result, for each of its arenas anew.
+void giveBackMemory(std::size_t responseBytes)
+{
+    constexpr std::size_t large = 1 << 20;
+    if (responseBytes > large)
+        malloc_trim(0);
+}
+
 /// The response, from within the operation. A client of HTTP 1.1 misses the last chunk of one that broke off, any other
 /// the end of the document.
 bool deliver(broker::Broker& broker, Pulls& pulls, const Message& message, httplib::DataSink& sink)
 {
     try
     {
-        const auto give = [&](std::string_view part) { return sink.write(part.data(), part.size()); };
+        std::size_t given = 0;
+        const auto give = [&](std::string_view part)
+        {
+            given += part.size();
+            return sink.write(part.data(), part.size());
+        };
         bool whole = false;
         {
             const Connection::Hurry hurry;
             whole = answer(broker, pulls, message, give);
         }
+        giveBackMemory(given);
         if (whole)
             sink.done();
         return whole;

@@ -175,14 +175,19 @@ MethodReply Broker::invokeMethod(const Path& path, const std::string& method, co
     return guarded<MethodReply>([&](Dispatcher dispatcher) { return dispatcher.invokeMethod(path, method, in); });
 }
 
+Outcome Broker::findNameSpace(std::string_view nameSpace)
+{
+    const Outcome outcome = findClass(nameSpace, {}); // of no class, unless the namespace is wrong already
+    return outcome.status == CMPI_RC_ERR_INVALID_CLASS ? Outcome() : outcome;
+}
+
 Outcome Broker::findClass(std::string_view nameSpace, std::string_view className)
 {
     return guarded<Outcome>(
         [&](Dispatcher dispatcher)
         {
             Outcome outcome;
-            if (!className.empty() || !dispatcher.exists(nameSpace))
-                dispatcher.findClass(nameSpace, className, outcome);
+            dispatcher.findClass(nameSpace, className, outcome);
             return outcome;
         });
 }

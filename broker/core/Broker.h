@@ -61,8 +61,8 @@ public:
     Outcome deleteInstance(const Path& path);
     MethodReply invokeMethod(const Path& path, const std::string& method, const std::vector<Property>& in = {});
 
-    /// Whether the namespace is there, and has the class, as the operations would say; an empty name asks for the
-    /// namespace alone.
+    /// Whether the namespace is there, and has the class, as the operations would say.
+    Outcome findNameSpace(std::string_view nameSpace);
     Outcome findClass(std::string_view nameSpace, std::string_view className);
     const ClassTable& classes() const;
     /// Adds a class of the broker's own, of which the store has the instances. Before the first operation.
