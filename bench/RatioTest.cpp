@@ -1,6 +1,7 @@
 // The figures that must hold on any machine: each is a ratio of two measured in the same run, best of several rounds.
 #include "bench/HostAndFloor.h"
 #include "bench/Workloads.h"
+#include "broker/cimxml/Server.h"
 #include "device/Target.h"
 #include "logs/NewestLines.h"
 #include "schema/TVRHBA_Card.h"
@@ -9,6 +10,7 @@
 #include "schema/TVRHBA_SCSIProtocolEndpoint.h"
 #include "schema/TVRHBA_StorageVolume.h"
 #include "schema/TVRHBA_StorageVolumeSystemDevice.h"
+#include "tests/support/RawClient.h"
 
 #include <gtest/gtest.h>
 
@@ -19,6 +21,7 @@
 #include <ctime>
 #include <fstream>
 #include <limits>
+#include <malloc.h>
 #include <set>
 #include <string>
 #include <unistd.h>
@@ -269,6 +272,66 @@ TEST(Ratio, OperationsOnAVolumeDoNotGrowWithTheSan)
         << many.associatorNames << " ns against " << few.associatorNames << " ns";
     EXPECT_LE(many.associators, 2 * some.associators)
         << many.associators << " ns a volume against " << some.associators << " ns";
+}
+
+// --- the port ---------------------------------------------------------------------------------------------
+
+/// Bytes of this process that are in memory, now and at the most since the last call.
+std::pair<std::size_t, std::size_t> memoryAndPeak()
+{
+    const auto kilobytes = [](const std::string& name)
+    {
+        std::ifstream status("/proc/self/status");
+        for (std::string line; std::getline(status, line);)
+            if (line.starts_with(name))
+                return std::stoul(line.substr(name.size())) << 10;
+        return 0ul;
+    };
+    const std::pair both(kilobytes("VmRSS:"), kilobytes("VmHWM:"));
+    std::ofstream("/proc/self/clear_refs") << "5"; // the peak begins anew
+    return both;
+}
+
+TEST(Ratio, PortCostsAtMostThreeTimesTheBrokerAndKeepsNoResult)
+{
+    constexpr std::uint32_t units = 16384;
+    bench::BenchHost host(hostOfUnits(units));
+    EXPECT_EQ(host.enumerate(volumeClass).size(), units);
+    bench::BenchHost::awaitEndOfRefresh();
+    const auto cost = [](auto work)
+    {
+        double best = std::numeric_limits<double>::max();
+        for (int round = 0; round < 3; round++)
+        {
+            const double before = processorTime();
+            work();
+            best = std::min(best, processorTime() - before);
+        }
+        return best / 1e6;
+    };
+    const double inProcess = cost([&] { keep(host.enumerate(volumeClass).size()); });
+
+    cimxml::Server server(host.broker(), {.port = 0});
+    std::size_t bytes = 0;
+    const auto overThePort = [&]
+    {
+        const RawClient client(server.port());
+        client.send(httpRequest(cimMessage("EnumerateInstances", volumeClass)));
+        bytes = 0;
+        client.read([&](std::string_view part) { bytes += part.size(); });
+    };
+    malloc_trim(0);
+    memoryAndPeak();
+    const std::size_t before = memoryAndPeak().first;
+    const double port = cost(overThePort);
+    const std::size_t grown = memoryAndPeak().second - before;
+    const std::size_t copy = units * TVRHBA_StorageVolume::static_meta_class.size;
+    EXPECT_GT(bytes, units * 1000);
+    RecordProperty("ms", std::to_string(port) + " beside " + std::to_string(inProcess));
+    RecordProperty("grown_kb",
+                   std::to_string(grown >> 10) + " with the module's copy of " + std::to_string(copy >> 10));
+    EXPECT_LE(port, 3 * inProcess) << port << " ms against " << inProcess << " ms";
+    EXPECT_LE(grown, copy + (32u << 20)) << (grown >> 20) << " MiB beside a copy of " << (copy >> 20);
 }
 
 // --- the driver's log -------------------------------------------------------------------------------------

@@ -5,6 +5,8 @@
 #include "broker/cimxml/Request.h"
 
 #include <algorithm>
+#include <exception>
+#include <new>
 #include <optional>
 #include <span>
 #include <vector>
@@ -30,6 +32,69 @@ struct CimFailure
     std::string text;
 };
 
+/// A response on its way: the frame of its request, and what the operation writes into it. Not more than a part of it
+/// is kept, so that a failure behind the first part cannot be told any more but by ending early.
+class ResponseText
+{
+public:
+    ResponseText(const Request& request, const Output& output) : _request(request), _output(output) { begin(); }
+
+    XmlText& xml() { return _xml; }
+    /// Between two elements: gives away what was written when that is much. False when nobody takes it.
+    bool passOn()
+    {
+        constexpr std::size_t much = 64 << 10;
+        return _text.size() < much || give();
+    }
+    /// The end of a result.
+    bool finish()
+    {
+        const char* const elements[] = {kind(), "SIMPLERSP", "MESSAGE", "CIM"};
+        for (const char* element : elements)
+            _xml.close(element);
+        return give();
+    }
+    /// The error in the place of the result. False when a part of that is on its way already.
+    bool fail(int status, std::string_view text)
+    {
+        if (_given)
+            return false;
+        begin();
+        _xml.leaf("ERROR", "", {{"CODE", codeOf(status)}, {"DESCRIPTION", text}});
+        return finish();
+    }
+
+private:
+    /// Those above are CMPI's alone.
+    static std::string codeOf(int status)
+    {
+        constexpr int lastCode = 28;
+        return std::to_string(status >= CMPI_RC_ERR_FAILED && status <= lastCode ? status : CMPI_RC_ERR_FAILED);
+    }
+    const char* kind() const { return _request.extrinsic ? "METHODRESPONSE" : "IMETHODRESPONSE"; }
+    void begin()
+    {
+        _text = R"(<?xml version="1.0" encoding="utf-8"?>)";
+        _xml.open("CIM", {{"CIMVERSION", "2.0"}, {"DTDVERSION", "2.0"}});
+        _xml.open("MESSAGE", {{"ID", _request.id}, {"PROTOCOLVERSION", "1.0"}});
+        _xml.open("SIMPLERSP");
+        _xml.open(kind(), {{"NAME", _request.name}});
+    }
+    bool give()
+    {
+        _given = true;
+        const bool taken = _output(_text);
+        _text.clear();
+        return taken;
+    }
+
+    const Request& _request;
+    const Output& _output;
+    std::string _text;
+    XmlText _xml{_text};
+    bool _given = false;
+};
+
 void expect(const Outcome& outcome)
 {
     if (!outcome.ok())
@@ -40,8 +105,9 @@ void expect(const Outcome& outcome)
 class Operation
 {
 public:
-    Operation(Broker& target, Pulls& kept, const Request& request, XmlText& result)
-        : broker(target), pulls(kept), xml(result), _request(request), _decoder(target.classes(), request.nameSpace)
+    Operation(Broker& target, Pulls& kept, const Request& request, ResponseText& response)
+        : broker(target), pulls(kept), xml(response.xml()), _request(request), _response(response),
+          _decoder(target.classes(), request.nameSpace)
     {}
 
     Broker& broker;
@@ -52,6 +118,8 @@ public:
     const std::string& nameSpace() const { return _request.nameSpace; }
     const Decoder& decoder() const { return _decoder; }
     const ClassInfo* classOf(const Object& object) const { return broker.classes().find(object.path.className); }
+    /// See ResponseText.
+    bool passOn() { return _response.passOn(); }
 
     xml_node required(const char* name) const
     {
@@ -95,6 +163,11 @@ public:
             names.emplace_back(name.text().get());
         return names;
     }
+    /// From where an association operation starts; pulled ones have another name for it.
+    Path source() const
+    {
+        return _decoder.path(required(_request.parameter("InstanceName") ? "InstanceName" : "ObjectName"));
+    }
     AssociationFilter filter() const
     {
         const bool ofAssociations = _request.name.find("Reference") != std::string::npos;
@@ -104,42 +177,113 @@ public:
 
 private:
     const Request& _request;
+    ResponseText& _response;
     Decoder _decoder;
 };
 
+// --- results of any size
+
+Outcome askInstances(const Operation& operation, const ObjectSink& sink)
+{
+    return operation.broker.enumerateInstances(operation.nameSpace(), operation.requiredClass("ClassName").name,
+                                               operation.properties(), sink);
+}
+
+Outcome askInstanceNames(const Operation& operation, const PathSink& sink)
+{
+    return operation.broker.enumerateInstanceNames(operation.nameSpace(), operation.requiredClass("ClassName").name,
+                                                   sink);
+}
+
+Outcome askAssociators(const Operation& operation, const ObjectSink& sink)
+{
+    return operation.broker.associators(operation.source(), operation.filter(), operation.properties(), sink);
+}
+
+Outcome askAssociatorNames(const Operation& operation, const PathSink& sink)
+{
+    return operation.broker.associatorNames(operation.source(), operation.filter(), sink);
+}
+
+Outcome askReferences(const Operation& operation, const ObjectSink& sink)
+{
+    return operation.broker.references(operation.source(), operation.filter(), operation.properties(), sink);
+}
+
+Outcome askReferenceNames(const Operation& operation, const PathSink& sink)
+{
+    return operation.broker.referenceNames(operation.source(), operation.filter(), sink);
+}
+
+/// Carries out what gives its results to a sink. `take(result)` says whether it wants more. Nothing is thrown through
+/// the provider.
+template <class Result, class Take>
+void forEach(const Operation& operation, Outcome (*ask)(const Operation&, const Sink<Result>&), Take take)
+{
+    std::exception_ptr thrown;
+    const auto guarded = [&](Result&& result)
+    {
+        try
+        {
+            return take(std::as_const(result));
+        }
+        catch (...)
+        {
+            thrown = std::current_exception();
+            return false;
+        }
+    };
+    const Outcome outcome = ask(operation, {.take = guarded, .forgets = true});
+    if (thrown)
+        std::rethrow_exception(thrown);
+    expect(outcome);
+}
+
+/// Writes each result as it comes.
+template <auto ask, auto write> void writeEach(Operation& operation)
+{
+    forEach(operation, ask,
+            [&](const auto& result)
+            {
+                write(operation, operation.xml, result);
+                return operation.passOn();
+            });
+}
+
+void writeNamed(const Operation& operation, XmlText& xml, const Object& object)
+{
+    const XmlElement named(xml, "VALUE.NAMEDINSTANCE");
+    writeInstanceName(xml, object.path);
+    writeInstance(xml, object, operation.classOf(object));
+}
+
+template <const auto& element> void writeWithPath(const Operation& operation, XmlText& xml, const Object& object)
+{
+    const XmlElement whole(xml, element);
+    writeInstancePath(xml, object.path);
+    writeInstance(xml, object, operation.classOf(object));
+}
+
+void writeName(const Operation&, XmlText& xml, const Path& path)
+{
+    writeInstanceName(xml, path);
+}
+
+void writePath(const Operation&, XmlText& xml, const Path& path)
+{
+    writeInstancePath(xml, path);
+}
+
+void writeObjectPath(const Operation& operation, XmlText& xml, const Path& path)
+{
+    const XmlElement whole(xml, "OBJECTPATH");
+    writePath(operation, xml, path);
+}
+
+constexpr char objectWithPath[] = "VALUE.OBJECTWITHPATH";
+constexpr char instanceWithPath[] = "VALUE.INSTANCEWITHPATH";
+
 // --- instances
-
-void writeNamed(const Operation& operation, const Object& object)
-{
-    const XmlElement named(operation.xml, "VALUE.NAMEDINSTANCE");
-    writeInstanceName(operation.xml, object.path);
-    writeInstance(operation.xml, object, operation.classOf(object));
-}
-
-void writeWithPath(const Operation& operation, const Object& object)
-{
-    const XmlElement whole(operation.xml, "VALUE.OBJECTWITHPATH");
-    writeInstancePath(operation.xml, object.path);
-    writeInstance(operation.xml, object, operation.classOf(object));
-}
-
-void enumerateInstances(Operation& operation)
-{
-    const Reply reply = operation.broker.enumerateInstances(
-        operation.nameSpace(), operation.requiredClass("ClassName").name, operation.properties());
-    expect(reply);
-    for (const Object& object : reply.objects)
-        writeNamed(operation, object);
-}
-
-void enumerateInstanceNames(Operation& operation)
-{
-    const NamesReply reply =
-        operation.broker.enumerateInstanceNames(operation.nameSpace(), operation.requiredClass("ClassName").name);
-    expect(reply);
-    for (const Path& path : reply.paths)
-        writeInstanceName(operation.xml, path);
-}
 
 void getInstance(Operation& operation)
 {
@@ -168,52 +312,6 @@ void modifyInstance(Operation& operation)
 void deleteInstance(Operation& operation)
 {
     expect(operation.broker.deleteInstance(operation.decoder().path(operation.required("InstanceName"))));
-}
-
-// --- associations
-
-Path objectName(const Operation& operation)
-{
-    return operation.decoder().path(operation.required("ObjectName"));
-}
-
-void writeObjects(const Operation& operation, const Reply& reply)
-{
-    expect(reply);
-    for (const Object& object : reply.objects)
-        writeWithPath(operation, object);
-}
-
-void writePaths(const Operation& operation, const NamesReply& reply)
-{
-    expect(reply);
-    for (const Path& path : reply.paths)
-    {
-        const XmlElement whole(operation.xml, "OBJECTPATH");
-        writeInstancePath(operation.xml, path);
-    }
-}
-
-void associators(Operation& operation)
-{
-    writeObjects(operation,
-                 operation.broker.associators(objectName(operation), operation.filter(), operation.properties()));
-}
-
-void associatorNames(Operation& operation)
-{
-    writePaths(operation, operation.broker.associatorNames(objectName(operation), operation.filter()));
-}
-
-void references(Operation& operation)
-{
-    writeObjects(operation,
-                 operation.broker.references(objectName(operation), operation.filter(), operation.properties()));
-}
-
-void referenceNames(Operation& operation)
-{
-    writePaths(operation, operation.broker.referenceNames(objectName(operation), operation.filter()));
 }
 
 // --- classes
@@ -252,7 +350,11 @@ void getClass(Operation& operation)
 void enumerateClasses(Operation& operation)
 {
     for (const ClassInfo* info : classesBelow(operation))
+    {
         writeClass(operation.xml, *info, viewOf(operation));
+        if (!operation.passOn())
+            return;
+    }
 }
 
 void enumerateClassNames(Operation& operation)
@@ -322,7 +424,11 @@ void writePart(Operation& operation, const Part& part)
     {
         const XmlElement result(operation.xml, "IRETURNVALUE");
         for (const std::string& element : part.elements)
+        {
             operation.xml.markup(element);
+            if (!operation.passOn())
+                break;
+        }
     }
     const auto write = [&](const char* name, const char* type, std::string_view value)
     {
@@ -333,84 +439,43 @@ void writePart(Operation& operation, const Part& part)
     write("EndOfSequence", "boolean", part.context.empty() ? "TRUE" : "FALSE");
 }
 
-/// `write(xml, item)` makes an element of an item of the result.
-template <class Items, class Write>
-void openResult(Operation& operation, PulledKind kind, const Items& items, Write write)
-{
-    std::vector<std::string> elements;
-    for (const auto& item : items)
-    {
-        XmlText xml(elements.emplace_back());
-        write(xml, item);
-    }
-    const std::uint32_t time = operation.number("OperationTimeout").value_or(0);
-    const std::optional<Part> part =
-        operation.pulls.open(kind, std::move(elements), operation.number("MaxObjectCount").value_or(0),
-                             std::chrono::seconds(time == 0 ? longestTime : std::min(time, longestTime)));
-    if (!part)
-        throw CimFailure{limitsExceeded, "too many results are being pulled"};
-    writePart(operation, *part);
-}
-
 void expectNoFilter(const Operation& operation)
 {
     if (!operation.text("FilterQueryLanguage").empty() || !operation.text("FilterQuery").empty())
         throw CimFailure{noFilters, "filters are not supported"};
 }
 
-void openObjects(Operation& operation, const Reply& reply)
+template <PulledKind kind, auto ask, auto write> void open(Operation& operation)
 {
     expectNoFilter(operation);
-    expect(reply);
-    openResult(operation, PulledKind::instances, reply.objects,
-               [&](XmlText& xml, const Object& object)
-               {
-                   const XmlElement whole(xml, "VALUE.INSTANCEWITHPATH");
-                   writeInstancePath(xml, object.path);
-                   writeInstance(xml, object, operation.classOf(object));
-               });
+    Collected result(operation.pulls);
+    forEach(operation, ask,
+            [&](const auto& item)
+            {
+                std::string element;
+                XmlText xml(element);
+                write(operation, xml, item);
+                if (!result.add(std::move(element)))
+                    throw CimFailure{limitsExceeded, "too many results are being pulled"};
+                return true;
+            });
+    const std::uint32_t time = operation.number("OperationTimeout").value_or(0);
+    const std::optional<Part> part =
+        operation.pulls.open(kind, result, operation.number("MaxObjectCount").value_or(0),
+                             std::chrono::seconds(time == 0 ? longestTime : std::min(time, longestTime)));
+    if (!part)
+        throw CimFailure{limitsExceeded, "too many results are being pulled"};
+    writePart(operation, *part);
 }
 
-void openPaths(Operation& operation, const NamesReply& reply)
+template <auto ask> void openObjects(Operation& operation)
 {
-    expectNoFilter(operation);
-    expect(reply);
-    openResult(operation, PulledKind::paths, reply.paths, writeInstancePath);
+    open<PulledKind::instances, ask, writeWithPath<instanceWithPath>>(operation);
 }
 
-void openInstances(Operation& operation)
+template <auto ask> void openPaths(Operation& operation)
 {
-    openObjects(operation,
-                operation.broker.enumerateInstances(operation.nameSpace(), operation.requiredClass("ClassName").name,
-                                                    operation.properties()));
-}
-
-void openInstancePaths(Operation& operation)
-{
-    openPaths(operation, operation.broker.enumerateInstanceNames(operation.nameSpace(),
-                                                                 operation.requiredClass("ClassName").name));
-}
-
-void openAssociators(Operation& operation)
-{
-    openObjects(operation,
-                operation.broker.associators(instanceName(operation), operation.filter(), operation.properties()));
-}
-
-void openAssociatorPaths(Operation& operation)
-{
-    openPaths(operation, operation.broker.associatorNames(instanceName(operation), operation.filter()));
-}
-
-void openReferences(Operation& operation)
-{
-    openObjects(operation,
-                operation.broker.references(instanceName(operation), operation.filter(), operation.properties()));
-}
-
-void openReferencePaths(Operation& operation)
-{
-    openPaths(operation, operation.broker.referenceNames(instanceName(operation), operation.filter()));
+    open<PulledKind::paths, ask, writePath>(operation);
 }
 
 template <PulledKind kind> void pull(Operation& operation)
@@ -438,16 +503,16 @@ struct Row
 };
 
 constexpr Row rows[] = {
-    {"EnumerateInstances", enumerateInstances},
-    {"EnumerateInstanceNames", enumerateInstanceNames},
+    {"EnumerateInstances", writeEach<askInstances, writeNamed>},
+    {"EnumerateInstanceNames", writeEach<askInstanceNames, writeName>},
     {"GetInstance", getInstance},
     {"CreateInstance", createInstance},
     {"ModifyInstance", modifyInstance, false},
     {"DeleteInstance", deleteInstance, false},
-    {"Associators", associators},
-    {"AssociatorNames", associatorNames},
-    {"References", references},
-    {"ReferenceNames", referenceNames},
+    {"Associators", writeEach<askAssociators, writeWithPath<objectWithPath>>},
+    {"AssociatorNames", writeEach<askAssociatorNames, writeObjectPath>},
+    {"References", writeEach<askReferences, writeWithPath<objectWithPath>>},
+    {"ReferenceNames", writeEach<askReferenceNames, writeObjectPath>},
     {"GetClass", getClass},
     {"EnumerateClasses", enumerateClasses},
     {"EnumerateClassNames", enumerateClassNames},
@@ -455,12 +520,12 @@ constexpr Row rows[] = {
     {"SetProperty", setProperty, false},
     {"GetQualifier", getQualifier},
     {"EnumerateQualifiers", enumerateQualifiers},
-    {"OpenEnumerateInstances", openInstances, false},
-    {"OpenEnumerateInstancePaths", openInstancePaths, false},
-    {"OpenAssociatorInstances", openAssociators, false},
-    {"OpenAssociatorInstancePaths", openAssociatorPaths, false},
-    {"OpenReferenceInstances", openReferences, false},
-    {"OpenReferenceInstancePaths", openReferencePaths, false},
+    {"OpenEnumerateInstances", openObjects<askInstances>, false},
+    {"OpenEnumerateInstancePaths", openPaths<askInstanceNames>, false},
+    {"OpenAssociatorInstances", openObjects<askAssociators>, false},
+    {"OpenAssociatorInstancePaths", openPaths<askAssociatorNames>, false},
+    {"OpenReferenceInstances", openObjects<askReferences>, false},
+    {"OpenReferenceInstancePaths", openPaths<askReferenceNames>, false},
     {"PullInstancesWithPath", pull<PulledKind::instances>, false},
     {"PullInstancePaths", pull<PulledKind::paths>, false},
     {"CloseEnumeration", closeEnumeration, false},
@@ -527,59 +592,43 @@ void carryOutExtrinsic(Operation& operation)
     writeReply(operation.xml, reply);
 }
 
-/// Those above are CMPI's alone.
-std::string codeOf(int status)
-{
-    constexpr int lastCode = 28;
-    return std::to_string(status >= CMPI_RC_ERR_FAILED && status <= lastCode ? status : CMPI_RC_ERR_FAILED);
-}
+} // namespace
 
-/// What stands between the tags of the response: the result, or the error in its place.
-std::string contentOf(Broker& broker, Pulls& pulls, const Request& request)
+bool answer(Broker& broker, Pulls& pulls, const Message& message, const Output& output)
 {
-    const auto failure = [](int status, std::string_view text)
-    {
-        std::string content;
-        XmlText(content).leaf("ERROR", "", {{"CODE", codeOf(status)}, {"DESCRIPTION", text}});
-        return content;
-    };
+    const Request& request = message.request;
+    ResponseText response(request, output);
     try
     {
-        std::string content;
-        XmlText xml(content);
-        Operation operation(broker, pulls, request, xml);
-        expect(broker.findClass(request.nameSpace, {}));
+        Operation operation(broker, pulls, request, response);
+        expect(broker.findNameSpace(request.nameSpace));
         request.extrinsic ? carryOutExtrinsic(operation) : carryOutIntrinsic(operation);
-        return content;
+        return response.finish();
     }
     catch (const CimFailure& error)
     {
-        return failure(error.status, error.text.empty() ? statusName(static_cast<CMPIrc>(error.status)) : error.text);
+        return response.fail(error.status,
+                             error.text.empty() ? statusName(static_cast<CMPIrc>(error.status)) : error.text);
     }
     catch (const std::invalid_argument& error)
     {
-        return failure(CMPI_RC_ERR_INVALID_PARAMETER, error.what());
+        return response.fail(CMPI_RC_ERR_INVALID_PARAMETER, error.what());
+    }
+    catch (const std::bad_alloc&)
+    {
+        return response.fail(CMPI_RC_ERR_FAILED, "there is not enough memory");
     }
 }
 
-} // namespace
-
-std::string answer(Broker& broker, Pulls& pulls, std::string_view text)
+std::string answer(Broker& broker, Pulls& pulls, std::string_view request)
 {
-    pugi::xml_document document;
-    parseXml(document, text);
-    const Request request = readRequest(document);
-    const std::string content = contentOf(broker, pulls, request);
-    std::string response = R"(<?xml version="1.0" encoding="utf-8"?>)";
+    std::string response;
+    const auto collect = [&](std::string_view part)
     {
-        XmlText xml(response);
-        const XmlElement cim(xml, "CIM", {{"CIMVERSION", "2.0"}, {"DTDVERSION", "2.0"}});
-        const XmlElement message(xml, "MESSAGE", {{"ID", request.id}, {"PROTOCOLVERSION", "1.0"}});
-        const XmlElement simple(xml, "SIMPLERSP");
-        const XmlElement result(xml, request.extrinsic ? "METHODRESPONSE" : "IMETHODRESPONSE",
-                                {{"NAME", request.name}});
-        response += content;
-    }
+        response += part;
+        return true;
+    };
+    answer(broker, pulls, Message(request), collect);
     return response;
 }
 

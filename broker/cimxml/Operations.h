@@ -2,16 +2,25 @@
 #pragma once
 
 #include "broker/cimxml/Pulls.h"
+#include "broker/cimxml/Request.h"
 #include "broker/core/Broker.h"
 
+#include <functional>
 #include <string>
 #include <string_view>
 
 namespace cimxml
 {
 
-/// The response to a request. What is left of a result that the client takes in parts goes to `pulls`. Failures of the
-/// operation are part of it; throws HttpRefusal for what is no request.
+/// Takes the next part of a response; false when nobody reads it any more.
+using Output = std::function<bool(std::string_view)>;
+
+/// Gives the response to a request in parts of about 64 KiB, while the provider is still at it. What is left of a
+/// result that the client takes in parts goes to `pulls`. Failures of the operation are part of the response; false for
+/// one that came behind the first part: then the response has no end, and its reader must be told so.
+bool answer(broker::Broker& broker, Pulls& pulls, const Message& message, const Output& output);
+
+/// The same as one text, of a request's text. Throws HttpRefusal for what is no request.
 std::string answer(broker::Broker& broker, Pulls& pulls, std::string_view request);
 
 } // namespace cimxml

@@ -1,7 +1,6 @@
 #include "broker/cimxml/Pulls.h"
 
-#include <algorithm>
-#include <numeric>
+#include <iterator>
 #include <random>
 #include <utility>
 
@@ -23,24 +22,39 @@ std::string newContext(std::uint64_t number)
 
 } // namespace
 
-std::optional<Part> Pulls::open(PulledKind kind, std::vector<std::string> elements, std::size_t most,
-                                std::chrono::seconds time)
+Collected::~Collected()
 {
-    const std::size_t bytes =
-        std::accumulate(elements.begin(), elements.end(), std::size_t{0},
-                        [](std::size_t sum, const std::string& element) { return sum + element.size(); });
-    if (elements.size() <= most)
-        return Part{std::move(elements)};
+    const std::lock_guard lock(_pulls._mutex);
+    _pulls._bytes -= _bytes;
+}
+
+bool Collected::add(std::string element)
+{
+    const std::size_t bytes = sizeof element + element.size();
+    const std::lock_guard lock(_pulls._mutex);
+    if (_pulls._bytes + bytes > mostBytes)
+        _pulls.forgetOld();
+    _tooMuch = _tooMuch || _pulls._bytes + bytes > mostBytes;
+    if (_tooMuch)
+        return false;
+    _elements.push_back(std::move(element));
+    _bytes += bytes;
+    _pulls._bytes += bytes;
+    return true;
+}
+
+std::optional<Part> Pulls::open(PulledKind kind, Collected& result, std::size_t most, std::chrono::seconds time)
+{
     const std::lock_guard lock(_mutex);
     forgetOld();
-    if (_rests.size() >= mostRests || _bytes + bytes > mostBytes)
+    if (result._tooMuch)
+        return std::nullopt;
+    if (result._elements.size() <= most)
+        return Part{{std::move_iterator(result._elements.begin()), std::move_iterator(result._elements.end())}};
+    if (_rests.size() >= mostRests)
         return std::nullopt;
     const std::string context = newContext(++_lastNumber);
-    _bytes += bytes;
-    Rest& rest = _rests[context] = {kind,
-                                    {std::move_iterator(elements.begin()), std::move_iterator(elements.end())},
-                                    bytes,
-                                    time,
+    Rest& rest = _rests[context] = {kind, std::move(result._elements), std::exchange(result._bytes, 0), time,
                                     Clock::now() + time};
     return take(context, rest, most);
 }

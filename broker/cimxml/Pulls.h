@@ -28,6 +28,28 @@ struct Part
     std::string context = {}; ///< by which the rest is asked for; empty behind the end
 };
 
+class Pulls;
+
+/// A result that is being collected. It counts among what is kept from its first element on.
+class Collected
+{
+public:
+    explicit Collected(Pulls& pulls) : _pulls(pulls) {}
+    ~Collected();
+    Collected(const Collected&) = delete;
+    Collected& operator=(const Collected&) = delete;
+
+    /// False, from then on too, if too much is kept already.
+    bool add(std::string element);
+
+private:
+    friend class Pulls;
+    Pulls& _pulls;
+    std::deque<std::string> _elements;
+    std::size_t _bytes = 0;
+    bool _tooMuch = false;
+};
+
 /// May be called from many threads at once. A result that nobody asks for is given up when its time is over.
 class Pulls
 {
@@ -35,19 +57,19 @@ public:
     using Clock = std::chrono::steady_clock;
 
     /// Keeps a result but for its first `most` elements, which are given. Nothing if too much is kept already.
-    std::optional<Part> open(PulledKind kind, std::vector<std::string> elements, std::size_t most,
-                             std::chrono::seconds time);
+    std::optional<Part> open(PulledKind kind, Collected& result, std::size_t most, std::chrono::seconds time);
     /// Nothing for a context that is not known, or of the other kind.
     std::optional<Part> pull(PulledKind kind, const std::string& context, std::size_t most);
     /// False for a context that is not known.
     bool close(const std::string& context);
 
 private:
+    friend class Collected;
     struct Rest
     {
         PulledKind kind;
         std::deque<std::string> elements;
-        std::size_t bytes;
+        std::size_t bytes; ///< of all its elements, until the last is taken
         std::chrono::seconds time;
         Clock::time_point end;
     };

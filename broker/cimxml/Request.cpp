@@ -73,4 +73,17 @@ Request readRequest(const pugi::xml_document& document)
     return request;
 }
 
+Message::Message(std::string_view text)
+{
+    parseXml(document, text);
+    try
+    {
+        request = readRequest(document);
+    }
+    catch (const std::invalid_argument& error)
+    {
+        refuse(error.what());
+    }
+}
+
 } // namespace cimxml

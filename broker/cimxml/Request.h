@@ -25,4 +25,13 @@ struct Request
 /// Throws HttpRefusal for another frame (DSP0200 7.3.1 has the statuses).
 Request readRequest(const pugi::xml_document& document);
 
+/// A message of a client, and the call in it. Throws HttpRefusal for what is none.
+struct Message
+{
+    explicit Message(std::string_view text);
+
+    pugi::xml_document document = {};
+    Request request;
+};
+
 } // namespace cimxml

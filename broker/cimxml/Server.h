@@ -4,6 +4,7 @@
 #include "broker/cimxml/Users.h"
 #include "broker/core/Broker.h"
 
+#include <chrono>
 #include <memory>
 #include <string>
 
@@ -17,6 +18,8 @@ struct ServerOptions
     std::string certificate = {}; ///< file in PEM; empty for HTTP
     std::string key = {};
     Users users = {};
+    std::chrono::milliseconds patience = std::chrono::seconds(10); ///< with a client who stands still
+    std::chrono::milliseconds silence = std::chrono::seconds(5);   ///< between two requests of a connection
 };
 
 /// Answers from the time it is made, on threads of its own, until it is destroyed. The broker outlives it.

@@ -2,6 +2,8 @@
 
 #include "broker/values/Utf8.h"
 
+#include <algorithm>
+
 namespace cimxml
 {
 
@@ -39,10 +41,20 @@ std::string_view entityOf(char c)
     }
 }
 
+bool isPlain(char c)
+{
+    return c >= 0x20 && c < 0x7F && c != '&' && c != '<' && c != '>' && c != '"';
+}
+
 void appendEscaped(std::string& out, std::string_view text)
 {
-    while (!text.empty())
+    for (;;)
     {
+        const auto plain = static_cast<std::size_t>(std::ranges::find_if_not(text, isPlain) - text.begin());
+        out.append(text.substr(0, plain));
+        text.remove_prefix(plain);
+        if (text.empty())
+            return;
         std::size_t length = 1;
         if (static_cast<unsigned char>(text.front()) >= 0x80)
         {

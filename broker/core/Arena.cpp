@@ -66,6 +66,22 @@ std::size_t Frame::release(const void* mark)
     return ended;
 }
 
+void Frame::resultGiven()
+{
+    constexpr std::size_t resultsBetween = 64;
+    if (++_results == 1)
+        _lasting = _objects.size();
+    if (!forgets || marked() || _results % resultsBetween != 0)
+        return;
+    const auto later = _objects.begin() + static_cast<std::ptrdiff_t>(_lasting);
+    const auto isUsed = [](const std::unique_ptr<Tracked>& object) { return object->used.exchange(false); };
+    const auto unused = std::stable_partition(later, _objects.end(), isUsed);
+    std::vector<std::unique_ptr<Tracked>> dead(std::make_move_iterator(unused),
+                                               std::make_move_iterator(_objects.end()));
+    _objects.erase(unused, _objects.end());
+    core.graveyard.accept(std::move(dead));
+}
+
 int objectVersion(const Core& core)
 {
     return core.options.personality.objectVersion;

@@ -48,6 +48,7 @@ public:
 
     Core* core;
     std::atomic<bool> alive{true};
+    std::atomic<bool> used{true}; ///< since the frame last looked
     bool isClone = false;
 };
 
@@ -96,6 +97,10 @@ public:
     std::size_t release(const void* mark);
     bool marked() const { return !_marks.empty(); }
 
+    /// The provider has given a result. In a frame that forgets, objects that were made behind the first and that it
+    /// leaves alone for a while die.
+    void resultGiven();
+
     Core& core;
     const CMPIBroker* broker;
     std::string what;
@@ -103,9 +108,12 @@ public:
 private:
     std::vector<std::unique_ptr<Tracked>> _objects;   ///< the first is the context
     std::vector<std::unique_ptr<std::size_t>> _marks; ///< how many objects there were
+    std::size_t _results = 0;
+    std::size_t _lasting = 0; ///< how many objects there were at the first result
 
 public:
     ContextHandle* context;
+    bool forgets = false;
     bool attached = false;     ///< pushed by attachThread rather than by a call
     bool unmarkedWork = false; ///< an up-call was made while no mark was set
 };

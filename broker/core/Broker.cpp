@@ -82,16 +82,28 @@ template <class Answer, class Operation> Answer Broker::guarded(Operation operat
     return operation(Dispatcher(*_core));
 }
 
+Outcome Broker::enumerateInstances(std::string_view nameSpace, std::string_view className,
+                                   const PropertyList& properties, const ObjectSink& sink)
+{
+    return guarded<Outcome>([&](Dispatcher dispatcher)
+                            { return dispatcher.enumerateInstances(nameSpace, className, properties, sink); });
+}
+
 Reply Broker::enumerateInstances(std::string_view nameSpace, std::string_view className, const PropertyList& properties)
 {
-    return guarded<Reply>([&](Dispatcher dispatcher)
-                          { return dispatcher.enumerateInstances(nameSpace, className, properties); });
+    return collectObjects([&](const ObjectSink& sink)
+                          { return enumerateInstances(nameSpace, className, properties, sink); });
+}
+
+Outcome Broker::enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink)
+{
+    return guarded<Outcome>([&](Dispatcher dispatcher)
+                            { return dispatcher.enumerateInstanceNames(nameSpace, className, sink); });
 }
 
 NamesReply Broker::enumerateInstanceNames(std::string_view nameSpace, std::string_view className)
 {
-    return guarded<NamesReply>([&](Dispatcher dispatcher)
-                               { return dispatcher.enumerateInstanceNames(nameSpace, className); });
+    return collectPaths([&](const PathSink& sink) { return enumerateInstanceNames(nameSpace, className, sink); });
 }
 
 Reply Broker::getInstance(const Path& path, const PropertyList& properties)
@@ -99,24 +111,48 @@ Reply Broker::getInstance(const Path& path, const PropertyList& properties)
     return guarded<Reply>([&](Dispatcher dispatcher) { return dispatcher.getInstance(path, properties); });
 }
 
+Outcome Broker::associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                            const ObjectSink& sink)
+{
+    return guarded<Outcome>([&](Dispatcher dispatcher)
+                            { return dispatcher.associators(path, filter, properties, sink); });
+}
+
 Reply Broker::associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties)
 {
-    return guarded<Reply>([&](Dispatcher dispatcher) { return dispatcher.associators(path, filter, properties); });
+    return collectObjects([&](const ObjectSink& sink) { return associators(path, filter, properties, sink); });
+}
+
+Outcome Broker::associatorNames(const Path& path, const AssociationFilter& filter, const PathSink& sink)
+{
+    return guarded<Outcome>([&](Dispatcher dispatcher) { return dispatcher.associatorNames(path, filter, sink); });
 }
 
 NamesReply Broker::associatorNames(const Path& path, const AssociationFilter& filter)
 {
-    return guarded<NamesReply>([&](Dispatcher dispatcher) { return dispatcher.associatorNames(path, filter); });
+    return collectPaths([&](const PathSink& sink) { return associatorNames(path, filter, sink); });
+}
+
+Outcome Broker::references(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                           const ObjectSink& sink)
+{
+    return guarded<Outcome>([&](Dispatcher dispatcher)
+                            { return dispatcher.references(path, filter, properties, sink); });
 }
 
 Reply Broker::references(const Path& path, const AssociationFilter& filter, const PropertyList& properties)
 {
-    return guarded<Reply>([&](Dispatcher dispatcher) { return dispatcher.references(path, filter, properties); });
+    return collectObjects([&](const ObjectSink& sink) { return references(path, filter, properties, sink); });
+}
+
+Outcome Broker::referenceNames(const Path& path, const AssociationFilter& filter, const PathSink& sink)
+{
+    return guarded<Outcome>([&](Dispatcher dispatcher) { return dispatcher.referenceNames(path, filter, sink); });
 }
 
 NamesReply Broker::referenceNames(const Path& path, const AssociationFilter& filter)
 {
-    return guarded<NamesReply>([&](Dispatcher dispatcher) { return dispatcher.referenceNames(path, filter); });
+    return collectPaths([&](const PathSink& sink) { return referenceNames(path, filter, sink); });
 }
 
 NamesReply Broker::createInstance(const Object& object)
@@ -139,14 +175,19 @@ MethodReply Broker::invokeMethod(const Path& path, const std::string& method, co
     return guarded<MethodReply>([&](Dispatcher dispatcher) { return dispatcher.invokeMethod(path, method, in); });
 }
 
+Outcome Broker::findNameSpace(std::string_view nameSpace)
+{
+    const Outcome outcome = findClass(nameSpace, {}); // of no class, unless the namespace is wrong already
+    return outcome.status == CMPI_RC_ERR_INVALID_CLASS ? Outcome() : outcome;
+}
+
 Outcome Broker::findClass(std::string_view nameSpace, std::string_view className)
 {
     return guarded<Outcome>(
         [&](Dispatcher dispatcher)
         {
             Outcome outcome;
-            if (!className.empty() || !dispatcher.exists(nameSpace))
-                dispatcher.findClass(nameSpace, className, outcome);
+            dispatcher.findClass(nameSpace, className, outcome);
             return outcome;
         });
 }

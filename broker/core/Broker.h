@@ -32,6 +32,17 @@ public:
     Broker(const Broker&) = delete;
     Broker& operator=(const Broker&) = delete;
 
+    // Of operations whose results may be many there are two forms: one gives them to a sink as they come, the other
+    // collects them.
+    Outcome enumerateInstances(std::string_view nameSpace, std::string_view className, const PropertyList& properties,
+                               const ObjectSink& sink);
+    Outcome enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink);
+    Outcome associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                        const ObjectSink& sink);
+    Outcome associatorNames(const Path& path, const AssociationFilter& filter, const PathSink& sink);
+    Outcome references(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                       const ObjectSink& sink);
+    Outcome referenceNames(const Path& path, const AssociationFilter& filter, const PathSink& sink);
     Reply enumerateInstances(std::string_view nameSpace, std::string_view className,
                              const PropertyList& properties = std::nullopt);
     NamesReply enumerateInstanceNames(std::string_view nameSpace, std::string_view className);
@@ -50,8 +61,8 @@ public:
     Outcome deleteInstance(const Path& path);
     MethodReply invokeMethod(const Path& path, const std::string& method, const std::vector<Property>& in = {});
 
-    /// Whether the namespace is there, and has the class, as the operations would say; an empty name asks for the
-    /// namespace alone.
+    /// Whether the namespace is there, and has the class, as the operations would say.
+    Outcome findNameSpace(std::string_view nameSpace);
     Outcome findClass(std::string_view nameSpace, std::string_view className);
     const ClassTable& classes() const;
     /// Adds a class of the broker's own, of which the store has the instances. Before the first operation.

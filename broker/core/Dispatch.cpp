@@ -40,23 +40,6 @@ const char* filterText(const std::string& text)
     return text.empty() ? nullptr : text.c_str();
 }
 
-ResultContent delivered(ResultContent&& result, NullElements nullElements)
-{
-    for (Object& object : result.objects)
-        object.properties = delivered(std::move(object.properties), nullElements);
-    return std::move(result);
-}
-
-void append(Reply& answer, ResultContent&& result)
-{
-    std::move(result.objects.begin(), result.objects.end(), std::back_inserter(answer.objects));
-}
-
-void append(NamesReply& answer, ResultContent&& result)
-{
-    std::move(result.paths.begin(), result.paths.end(), std::back_inserter(answer.paths));
-}
-
 template <class Answer> Answer failed(const Outcome& outcome)
 {
     Answer answer;
@@ -204,6 +187,7 @@ ResultContent Dispatcher::run(Provider& provider, const std::string& what, std::
     if (!mi)
         return {};
     CallFrame frame(_core, provider.broker, what, contextEntries(nameSpace));
+    frame.forgets = expected.objects.forgets || expected.paths.forgets;
     ResultHandle* result = frame.make<ResultHandle>(std::move(expected));
     const CMPIStatus status = call(mi, frame, result);
     outcome = outcomeOf(status, *provider.info);
@@ -213,8 +197,7 @@ ResultContent Dispatcher::run(Provider& provider, const std::string& what, std::
         _core.violation("success without returnDone");
     if (outcome.ok() && result->content.kind == ResultKind::data && !result->content.data)
         _core.violation("success of a method without returnData");
-    return outcome.ok() ? delivered(std::move(result->content), _core.options.personality.nullElements)
-                        : ResultContent();
+    return outcome.ok() ? std::move(result->content) : ResultContent();
 }
 
 /// Whether the failure of one of so many providers leaves the request to the others.
@@ -223,28 +206,35 @@ bool Dispatcher::skips(const Outcome& outcome, std::size_t providers) const
     return _core.options.personality.skipsNotSupported && providers > 1 && outcome.status == CMPI_RC_ERR_NOT_SUPPORTED;
 }
 
-/// What the client gets of the instances where the broker applies the property list.
-Reply Dispatcher::cut(Reply answer, const PropertyList& properties) const
+ResultContent Dispatcher::resultFor(const ObjectSink& sink, const PropertyList& properties) const
 {
-    if (_core.options.personality.propertyFilters == PropertyFilters::broker)
-        for (Object& object : answer.objects)
-            object = filtered(std::move(object), properties);
-    return answer;
+    const Personality& personality = _core.options.personality;
+    const bool cuts = personality.propertyFilters == PropertyFilters::broker;
+    const auto take = [&sink, &personality, list = cuts ? properties : std::nullopt](Object&& object)
+    {
+        object.properties = delivered(std::move(object.properties), personality.nullElements);
+        return sink.take(filtered(std::move(object), list));
+    };
+    return {.kind = ResultKind::instances, .objects = {take, sink.forgets}};
+}
+
+ResultContent Dispatcher::resultFor(const PathSink& sink)
+{
+    return {.kind = ResultKind::paths, .paths = sink};
 }
 
 // --- instances -----------------------------------------------------------------------------------------
 
 /// Enumerates through the providers and the store. `call` gets the MI, the context, the result and the class path;
-/// `stored` adds one of the store's instances to the answer.
-template <class Answer, class Call, class Stored>
-Answer Dispatcher::enumerate(const char* operation, std::string_view nameSpace, std::string_view className, Call call,
-                             Stored stored)
+/// `stored` gives one of the store's instances to the client, and says whether he wants more.
+template <class Call, class Stored>
+Outcome Dispatcher::enumerate(const char* operation, std::string_view nameSpace, std::string_view className,
+                              const ResultContent& result, Call call, Stored stored)
 {
-    Answer answer;
-    const ClassInfo* root = findClass(nameSpace, className, answer);
+    Outcome outcome;
+    const ClassInfo* root = findClass(nameSpace, className, outcome);
     if (!root)
-        return answer;
-    const ResultKind kind = std::is_same_v<Answer, Reply> ? ResultKind::instances : ResultKind::paths;
+        return outcome;
     const std::vector<const ClassInfo*> family = _core.classes.withSubclasses(*root);
     const auto served = [&](const ClassInfo* info) { return providerOf(*info, nameSpace) != nullptr; };
     const auto providers = static_cast<std::size_t>(std::count_if(family.begin(), family.end(), served));
@@ -254,40 +244,42 @@ Answer Dispatcher::enumerate(const char* operation, std::string_view nameSpace, 
         if (!provider)
         {
             for (Object& object : _core.store.enumerate(nameSpace, info->name))
-                stored(answer, std::move(object));
+                if (!stored(std::move(object)))
+                    return failure(CMPI_RC_ERR_FAILED, "the client wants no more");
             continue;
         }
-        const auto ask = [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result) {
-            return call(mi, frame.context, result, makePath(frame, {std::string(nameSpace), info->name, {}}));
+        const auto ask = [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* results) {
+            return call(mi, frame.context, results, makePath(frame, {std::string(nameSpace), info->name, {}}));
         };
-        Outcome outcome;
-        append(answer, run<Kind::instance>(*provider, operation + (" " + info->name), nameSpace,
-                                           {.kind = kind, .expectedClass = info}, true, outcome, ask));
+        ResultContent expected = result;
+        expected.expectedClass = info;
+        run<Kind::instance>(*provider, operation + (" " + info->name), nameSpace, std::move(expected), true, outcome,
+                            ask);
         if (!outcome.ok() && !skips(outcome, providers))
-            return failed<Answer>(outcome);
+            return outcome;
     }
-    return answer;
+    return {};
 }
 
-Reply Dispatcher::enumerateInstances(std::string_view nameSpace, std::string_view className,
-                                     const PropertyList& properties)
+Outcome Dispatcher::enumerateInstances(std::string_view nameSpace, std::string_view className,
+                                       const PropertyList& properties, const ObjectSink& sink)
 {
     const PropertyList list = properties ? properties : listOfSuperclass(className);
     NameList names(listOf(list));
-    const auto ask = [&](CMPIInstanceMI* mi, ContextHandle* context, ResultHandle* result, PathHandle* path)
-    { return mi->ft->enumerateInstances(mi, context, result, path, names.get()); };
-    const auto stored = [&](Reply& answer, Object&& object)
-    { answer.objects.push_back(filtered(std::move(object), properties)); };
-    return cut(enumerate<Reply>("enumerateInstances", nameSpace, className, ask, stored), list);
+    return enumerate(
+        "enumerateInstances", nameSpace, className, resultFor(sink, list),
+        [&](CMPIInstanceMI* mi, ContextHandle* context, ResultHandle* result, PathHandle* path)
+        { return mi->ft->enumerateInstances(mi, context, result, path, names.get()); },
+        [&](Object&& object) { return sink.take(filtered(std::move(object), list)); });
 }
 
-NamesReply Dispatcher::enumerateInstanceNames(std::string_view nameSpace, std::string_view className)
+Outcome Dispatcher::enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink)
 {
-    return enumerate<NamesReply>(
-        "enumerateInstanceNames", nameSpace, className,
+    return enumerate(
+        "enumerateInstanceNames", nameSpace, className, resultFor(sink),
         [&](CMPIInstanceMI* mi, ContextHandle* context, ResultHandle* result, PathHandle* path)
         { return mi->ft->enumerateInstanceNames(mi, context, result, path); },
-        [](NamesReply& answer, Object&& object) { answer.paths.push_back(std::move(object.path)); });
+        [&](Object&& object) { return sink.take(std::move(object.path)); });
 }
 
 Reply Dispatcher::getInstance(const Path& path, const PropertyList& properties)
@@ -307,15 +299,23 @@ Reply Dispatcher::getInstance(const Path& path, const PropertyList& properties)
     NameList names(listOf(properties));
     const auto ask = [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
     { return mi->ft->getInstance(mi, frame.context, result, passed(frame, path), names.get()); };
-    append(answer,
-           run<Kind::instance>(*provider, "getInstance " + info->name, path.nameSpace,
-                               {.kind = ResultKind::instances, .expectedClass = info, .limit = 1}, true, answer, ask));
+    answer = collectObjects(
+        [&](const ObjectSink& sink)
+        {
+            ResultContent expected = resultFor(sink, properties);
+            expected.expectedClass = info;
+            expected.limit = 1;
+            Outcome outcome;
+            run<Kind::instance>(*provider, "getInstance " + info->name, path.nameSpace, std::move(expected), true,
+                                outcome, ask);
+            return outcome;
+        });
     if (answer.ok() && answer.objects.empty())
     {
         _core.violation("getInstance " + info->name + " answered OK without an instance");
         return failed<Reply>(failure(CMPI_RC_ERR_FAILED, info->name + " gave no instance"));
     }
-    return answer.ok() ? cut(std::move(answer), properties) : failed<Reply>(answer);
+    return answer;
 }
 
 NamesReply Dispatcher::createInstance(const Object& object)
@@ -329,10 +329,17 @@ NamesReply Dispatcher::createInstance(const Object& object)
         return _core.store.create(object);
     const auto ask = [&](CMPIInstanceMI* mi, Frame& frame, ResultHandle* result)
     { return mi->ft->createInstance(mi, frame.context, result, passed(frame, object.path), passed(frame, object)); };
-    append(answer,
-           run<Kind::instance>(*provider, "createInstance " + info->name, object.path.nameSpace,
-                               {.kind = ResultKind::paths, .expectedClass = info, .limit = 1}, true, answer, ask));
-    return answer.ok() ? answer : failed<NamesReply>(answer);
+    return collectPaths(
+        [&](const PathSink& sink)
+        {
+            ResultContent expected = resultFor(sink);
+            expected.expectedClass = info;
+            expected.limit = 1;
+            Outcome outcome;
+            run<Kind::instance>(*provider, "createInstance " + info->name, object.path.nameSpace, std::move(expected),
+                                true, outcome, ask);
+            return outcome;
+        });
 }
 
 Outcome Dispatcher::modifyInstance(const Object& object, const PropertyList& properties)
@@ -415,44 +422,44 @@ std::vector<Provider*> Dispatcher::associationProviders(const Path& path, const 
 
 /// Calls all association providers in question. `call` gets the MI, the frame, the result, the path and the association
 /// class to name (null for none).
-template <class Answer, class Call>
-Answer Dispatcher::fanOutAssociations(const char* operation, const Path& path, const AssociationFilter& filter,
-                                      Call call)
+template <class Call>
+Outcome Dispatcher::fanOutAssociations(const char* operation, const Path& path, const AssociationFilter& filter,
+                                       const ResultContent& result, Call call)
 {
-    Answer answer;
-    const ResultKind kind = std::is_same_v<Answer, Reply> ? ResultKind::instances : ResultKind::paths;
-    const std::vector<Provider*> providers = associationProviders(path, filter, answer);
+    Outcome outcome;
+    const std::vector<Provider*> providers = associationProviders(path, filter, outcome);
     for (Provider* provider : providers)
     {
         const bool own = filter.assocClass.empty() && _core.options.personality.fanout == Fanout::own_class;
         const std::string& assocClass = own ? provider->info->name : filter.assocClass;
-        const auto ask = [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result)
-        { return call(mi, frame, result, passed(frame, path, true), filterText(assocClass)); };
-        Outcome outcome;
-        append(answer, run<Kind::association>(*provider, operation + (" " + provider->info->name), path.nameSpace,
-                                              {.kind = kind}, true, outcome, ask));
+        const auto ask = [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* results)
+        { return call(mi, frame, results, passed(frame, path, true), filterText(assocClass)); };
+        run<Kind::association>(*provider, operation + (" " + provider->info->name), path.nameSpace, result, true,
+                               outcome, ask);
         if (!outcome.ok() && !skips(outcome, providers.size()))
-            return failed<Answer>(outcome);
+            return outcome;
+        outcome = {};
     }
-    return answer;
+    return outcome;
 }
 
-Reply Dispatcher::associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties)
+Outcome Dispatcher::associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                                const ObjectSink& sink)
 {
     NameList names(listOf(properties));
-    const auto ask =
+    return fanOutAssociations(
+        "associators", path, filter, resultFor(sink, properties),
         [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
-    {
-        return mi->ft->associators(mi, frame.context, result, source, assocClass, filterText(filter.resultClass),
-                                   filterText(filter.role), filterText(filter.resultRole), names.get());
-    };
-    return cut(fanOutAssociations<Reply>("associators", path, filter, ask), properties);
+        {
+            return mi->ft->associators(mi, frame.context, result, source, assocClass, filterText(filter.resultClass),
+                                       filterText(filter.role), filterText(filter.resultRole), names.get());
+        });
 }
 
-NamesReply Dispatcher::associatorNames(const Path& path, const AssociationFilter& filter)
+Outcome Dispatcher::associatorNames(const Path& path, const AssociationFilter& filter, const PathSink& sink)
 {
-    return fanOutAssociations<NamesReply>(
-        "associatorNames", path, filter,
+    return fanOutAssociations(
+        "associatorNames", path, filter, resultFor(sink),
         [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
         {
             return mi->ft->associatorNames(mi, frame.context, result, source, assocClass,
@@ -461,19 +468,22 @@ NamesReply Dispatcher::associatorNames(const Path& path, const AssociationFilter
         });
 }
 
-Reply Dispatcher::references(const Path& path, const AssociationFilter& filter, const PropertyList& properties)
+Outcome Dispatcher::references(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                               const ObjectSink& sink)
 {
     NameList names(listOf(properties));
-    const auto ask =
-        [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
-    { return mi->ft->references(mi, frame.context, result, source, assocClass, filterText(filter.role), names.get()); };
-    return cut(fanOutAssociations<Reply>("references", path, filter, ask), properties);
+    return fanOutAssociations(
+        "references", path, filter, resultFor(sink, properties),
+        [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass) {
+            return mi->ft->references(mi, frame.context, result, source, assocClass, filterText(filter.role),
+                                      names.get());
+        });
 }
 
-NamesReply Dispatcher::referenceNames(const Path& path, const AssociationFilter& filter)
+Outcome Dispatcher::referenceNames(const Path& path, const AssociationFilter& filter, const PathSink& sink)
 {
-    return fanOutAssociations<NamesReply>(
-        "referenceNames", path, filter,
+    return fanOutAssociations(
+        "referenceNames", path, filter, resultFor(sink),
         [&](CMPIAssociationMI* mi, Frame& frame, ResultHandle* result, PathHandle* source, const char* assocClass)
         { return mi->ft->referenceNames(mi, frame.context, result, source, assocClass, filterText(filter.role)); });
 }

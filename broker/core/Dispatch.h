@@ -21,18 +21,21 @@ public:
     explicit Dispatcher(Core& core) : _core(core) {}
 
     /// The class's instances and those of its subclasses, each from its own class's provider.
-    Reply enumerateInstances(std::string_view nameSpace, std::string_view className, const PropertyList& properties);
-    NamesReply enumerateInstanceNames(std::string_view nameSpace, std::string_view className);
+    Outcome enumerateInstances(std::string_view nameSpace, std::string_view className, const PropertyList& properties,
+                               const ObjectSink& sink);
+    Outcome enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink);
     Reply getInstance(const Path& path, const PropertyList& properties);
     /// The path of the new instance.
     NamesReply createInstance(const Object& object);
     Outcome modifyInstance(const Object& object, const PropertyList& properties);
     Outcome deleteInstance(const Path& path);
     /// Asked of all association providers that can refer to the path's class; nothing is filtered here.
-    Reply associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties);
-    NamesReply associatorNames(const Path& path, const AssociationFilter& filter);
-    Reply references(const Path& path, const AssociationFilter& filter, const PropertyList& properties);
-    NamesReply referenceNames(const Path& path, const AssociationFilter& filter);
+    Outcome associators(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                        const ObjectSink& sink);
+    Outcome associatorNames(const Path& path, const AssociationFilter& filter, const PathSink& sink);
+    Outcome references(const Path& path, const AssociationFilter& filter, const PropertyList& properties,
+                       const ObjectSink& sink);
+    Outcome referenceNames(const Path& path, const AssociationFilter& filter, const PathSink& sink);
     MethodReply invokeMethod(const Path& path, const std::string& method, const std::vector<Property>& in);
     /// Null, with the reason in `outcome`, where the namespace has no such class.
     const ClassInfo* findClass(std::string_view nameSpace, std::string_view className, Outcome& outcome);
@@ -49,7 +52,10 @@ private:
     PathHandle* passed(Frame& frame, const Path& path, bool source = false) const;
     InstanceHandle* passed(Frame& frame, const Object& object) const;
     std::vector<Property> passed(const std::vector<Property>& arguments) const;
-    Reply cut(Reply answer, const PropertyList& properties) const;
+    /// What a provider gives, on its way to the sink: as the server hands it on, and cut to the list where it does
+    /// that.
+    ResultContent resultFor(const ObjectSink& sink, const PropertyList& properties) const;
+    static ResultContent resultFor(const PathSink& sink);
     std::vector<Property> contextEntries(std::string_view nameSpace) const;
     const ClassInfo* associationSource(const Path& path, const AssociationFilter& filter, Outcome& outcome);
     std::vector<Provider*> associationProviders(const Path& path, const AssociationFilter& filter, Outcome& outcome);
@@ -57,11 +63,12 @@ private:
     template <Kind K, class Call>
     ResultContent run(Provider& provider, const std::string& what, std::string_view nameSpace, ResultContent expected,
                       bool mustBeDone, Outcome& outcome, Call call);
-    template <class Answer, class Call, class Stored>
-    Answer enumerate(const char* operation, std::string_view nameSpace, std::string_view className, Call call,
-                     Stored stored);
-    template <class Answer, class Call>
-    Answer fanOutAssociations(const char* operation, const Path& path, const AssociationFilter& filter, Call call);
+    template <class Call, class Stored>
+    Outcome enumerate(const char* operation, std::string_view nameSpace, std::string_view className,
+                      const ResultContent& result, Call call, Stored stored);
+    template <class Call>
+    Outcome fanOutAssociations(const char* operation, const Path& path, const AssociationFilter& filter,
+                               const ResultContent& result, Call call);
 
     Core& _core;
 };

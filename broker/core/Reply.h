@@ -3,6 +3,7 @@
 
 #include "broker/values/Value.h"
 
+#include <functional>
 #include <optional>
 #include <string>
 #include <vector>
@@ -30,6 +31,48 @@ struct NamesReply : Outcome
 {
     std::vector<Path> paths = {};
 };
+
+/// Takes the results of an operation one by one as the provider gives them, on the thread and under the locks of its
+/// call. False: no more are wanted, and the provider is told that it failed. What was taken of an operation that fails
+/// in the end is a part of nothing.
+template <class Result> struct Sink
+{
+    std::function<bool(Result&&)> take;
+    /// Whether objects of the provider die before the end of its call once it leaves them alone, so that a result of
+    /// any size needs the room of a few. One that it comes back to later is a violation then.
+    bool forgets = false;
+};
+using ObjectSink = Sink<Object>;
+using PathSink = Sink<Path>;
+
+/// Runs an operation that gives its results to a sink, and collects them.
+template <class Operation> Reply collectObjects(Operation operation)
+{
+    Reply reply;
+    std::vector<Object> objects;
+    static_cast<Outcome&>(reply) = operation(ObjectSink{[&](Object&& object)
+                                                        {
+                                                            objects.push_back(std::move(object));
+                                                            return true;
+                                                        }});
+    if (reply.ok())
+        reply.objects = std::move(objects);
+    return reply;
+}
+
+template <class Operation> NamesReply collectPaths(Operation operation)
+{
+    NamesReply reply;
+    std::vector<Path> paths;
+    static_cast<Outcome&>(reply) = operation(PathSink{[&](Path&& path)
+                                                      {
+                                                          paths.push_back(std::move(path));
+                                                          return true;
+                                                      }});
+    if (reply.ok())
+        reply.paths = std::move(paths);
+    return reply;
+}
 
 struct MethodReply : Outcome
 {

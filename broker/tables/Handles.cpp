@@ -52,6 +52,7 @@ Tracked* openTracked(const void* object, bool isOurs, void* hdl, const char* kin
                         call + (tracked->isClone ? " of a released clone" : " of an object whose request has ended"));
         return nullptr;
     }
+    tracked->used.store(true, std::memory_order_relaxed);
     return tracked;
 }
 

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "broker/core/Arena.h"
+#include "broker/core/Reply.h"
 #include "broker/values/ClassInfo.h"
 
 #include <algorithm>
@@ -176,8 +177,9 @@ struct ResultContent
     const ClassInfo* expectedClass = {}; ///< instances and paths are of it or of a subclass; null for any
     std::size_t limit = SIZE_MAX;        ///< results that the operation may give
     const MethodInfo* method = {};       ///< gives the type of the data
-    std::vector<Object> objects = {};
-    std::vector<Path> paths = {};
+    ObjectSink objects = {};
+    PathSink paths = {};
+    std::size_t given = 0;
     std::optional<Value> data = {};
     bool done = false;
 };

@@ -209,11 +209,10 @@ ResultHandle* openResult(const CMPIResult* result, ResultContent::Kind kind, con
     if (!handle)
         return nullptr;
     const ResultContent& content = handle->content;
-    const std::size_t given = content.objects.size() + content.paths.size() + (content.data ? 1 : 0);
-    const char* fault = content.done             ? " after returnDone"
-                        : content.kind != kind   ? " in an operation that gives no such result"
-                        : given >= content.limit ? " though the operation gives only one result"
-                                                 : nullptr;
+    const char* fault = content.done                     ? " after returnDone"
+                        : content.kind != kind           ? " in an operation that gives no such result"
+                        : content.given >= content.limit ? " though the operation gives only one result"
+                                                         : nullptr;
     if (fault)
     {
         handle->core->violation(function + std::string(fault));
@@ -221,6 +220,15 @@ ResultHandle* openResult(const CMPIResult* result, ResultContent::Kind kind, con
         return nullptr;
     }
     return handle;
+}
+
+/// Counts a result that the client gets; false from him ends the provider's call.
+CMPIStatus deliver(ResultHandle& result, bool taken)
+{
+    result.content.given++;
+    if (Frame* frame = Frame::current(*result.core))
+        frame->resultGiven();
+    return makeStatus(taken ? CMPI_RC_OK : CMPI_RC_ERR_FAILED);
 }
 
 void checkReturned(const ResultHandle& result, const Path& path, const char* function)
@@ -253,8 +261,7 @@ CMPIStatus returnInstance(const CMPIResult* result, const CMPIInstance* instance
             !fault.empty())
             handle->core->violation("returnInstance: " + object.path.className + "." + property.name + " is " + fault);
     }
-    handle->content.objects.push_back(std::move(object));
-    return status;
+    return deliver(*handle, handle->content.objects.take(std::move(object)));
 }
 
 CMPIStatus returnObjectPath(const CMPIResult* result, const CMPIObjectPath* path)
@@ -262,12 +269,10 @@ CMPIStatus returnObjectPath(const CMPIResult* result, const CMPIObjectPath* path
     CMPIStatus status{};
     auto* handle = openResult(result, ResultContent::Kind::paths, "returnObjectPath", status);
     const auto* returned = handle ? open<PathHandle>(path, "returnObjectPath", &status) : nullptr;
-    if (returned)
-    {
-        checkReturned(*handle, returned->content.path, "returnObjectPath");
-        handle->content.paths.push_back(returned->content.path);
-    }
-    return status;
+    if (!returned)
+        return status;
+    checkReturned(*handle, returned->content.path, "returnObjectPath");
+    return deliver(*handle, handle->content.paths.take(Path(returned->content.path)));
 }
 
 CMPIStatus returnData(const CMPIResult* result, const CMPIValue* value, const CMPIType type)
@@ -283,8 +288,10 @@ CMPIStatus returnData(const CMPIResult* result, const CMPIValue* value, const CM
         handle->core->violation("returnData of " + typeText(data.type()) + " where " + method->name + " returns " +
                                 typeText(method->returnType));
     }
-    if (status.rc == CMPI_RC_OK)
-        handle->content.data = std::move(data);
+    if (status.rc != CMPI_RC_OK)
+        return status;
+    handle->content.data = std::move(data);
+    handle->content.given++;
     return status;
 }
 

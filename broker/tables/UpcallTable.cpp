@@ -200,16 +200,25 @@ CMPIEnumeration* enumerateInstanceNames(const CMPIBroker* mb, const CMPIContext*
                                         CMPIStatus* rc)
 {
     return enumerated(mb, ctx, path, "enumerateInstanceNames", rc,
-                      [](Dispatcher dispatcher, const Path& of)
-                      { return dispatcher.enumerateInstanceNames(of.nameSpace, of.className); });
+                      [&](Dispatcher dispatcher, const Path& of)
+                      {
+                          return collectPaths(
+                              [&](const PathSink& sink)
+                              { return dispatcher.enumerateInstanceNames(of.nameSpace, of.className, sink); });
+                      });
 }
 
 CMPIEnumeration* enumerateInstances(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
                                     const char** properties, CMPIStatus* rc)
 {
-    return enumerated(mb, ctx, path, "enumerateInstances", rc,
-                      [&](Dispatcher dispatcher, const Path& of)
-                      { return dispatcher.enumerateInstances(of.nameSpace, of.className, propertyList(properties)); });
+    return enumerated(
+        mb, ctx, path, "enumerateInstances", rc,
+        [&](Dispatcher dispatcher, const Path& of)
+        {
+            return collectObjects(
+                [&](const ObjectSink& sink)
+                { return dispatcher.enumerateInstances(of.nameSpace, of.className, propertyList(properties), sink); });
+        });
 }
 
 CMPIInstance* getInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
@@ -287,7 +296,11 @@ CMPIEnumeration* associators(const CMPIBroker* mb, const CMPIContext* ctx, const
     const AssociationFilter filter{text(assocClass), text(resultClass), text(role), text(resultRole)};
     return enumerated(mb, ctx, path, "associators", rc,
                       [&](Dispatcher dispatcher, const Path& source)
-                      { return dispatcher.associators(source, filter, propertyList(properties)); });
+                      {
+                          return collectObjects(
+                              [&](const ObjectSink& sink)
+                              { return dispatcher.associators(source, filter, propertyList(properties), sink); });
+                      });
 }
 
 CMPIEnumeration* associatorNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
@@ -296,8 +309,10 @@ CMPIEnumeration* associatorNames(const CMPIBroker* mb, const CMPIContext* ctx, c
 {
     const AssociationFilter filter{text(assocClass), text(resultClass), text(role), text(resultRole)};
     return enumerated(mb, ctx, path, "associatorNames", rc,
-                      [&](Dispatcher dispatcher, const Path& source)
-                      { return dispatcher.associatorNames(source, filter); });
+                      [&](Dispatcher dispatcher, const Path& source) {
+                          return collectPaths([&](const PathSink& sink)
+                                              { return dispatcher.associatorNames(source, filter, sink); });
+                      });
 }
 
 CMPIEnumeration* references(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
@@ -306,7 +321,11 @@ CMPIEnumeration* references(const CMPIBroker* mb, const CMPIContext* ctx, const 
     const AssociationFilter filter{text(resultClass), "", text(role), ""};
     return enumerated(mb, ctx, path, "references", rc,
                       [&](Dispatcher dispatcher, const Path& source)
-                      { return dispatcher.references(source, filter, propertyList(properties)); });
+                      {
+                          return collectObjects(
+                              [&](const ObjectSink& sink)
+                              { return dispatcher.references(source, filter, propertyList(properties), sink); });
+                      });
 }
 
 CMPIEnumeration* referenceNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* path,
@@ -314,8 +333,10 @@ CMPIEnumeration* referenceNames(const CMPIBroker* mb, const CMPIContext* ctx, co
 {
     const AssociationFilter filter{text(resultClass), "", text(role), ""};
     return enumerated(mb, ctx, path, "referenceNames", rc,
-                      [&](Dispatcher dispatcher, const Path& source)
-                      { return dispatcher.referenceNames(source, filter); });
+                      [&](Dispatcher dispatcher, const Path& source) {
+                          return collectPaths([&](const PathSink& sink)
+                                              { return dispatcher.referenceNames(source, filter, sink); });
+                      });
 }
 
 // --- methods and properties ----------------------------------------------------------------------------

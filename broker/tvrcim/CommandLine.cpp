@@ -110,6 +110,9 @@ public:
         _current->add_option("--tls", _command.tls, "files of a certificate and of its key, both PEM")
             ->expected(2)
             ->check(CLI::ExistingFile);
+        _current->add_option("--patience", _command.patience, "seconds that a client may stand still in a request")
+            ->default_val(_command.patience)
+            ->check(CLI::Range(1, 3600));
         _current->add_option("--users", _command.users, "file of lines name:hash; 'openssl passwd -6' prints the hash")
             ->check(CLI::ExistingFile);
         return *this;

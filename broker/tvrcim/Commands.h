@@ -70,6 +70,7 @@ struct Command
     std::string test = {};
     std::string listen = {};           ///< address:port
     std::vector<std::string> tls = {}; ///< files of a certificate and its key
+    int patience = 10;                 ///< seconds
     std::string users = {};            ///< a file
 };
 

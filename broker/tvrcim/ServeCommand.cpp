@@ -37,6 +37,7 @@ cimxml::ServerOptions optionsOf(const Command& command)
 {
     cimxml::ServerOptions options;
     readListen(options, command.listen);
+    options.patience = std::chrono::seconds(command.patience);
     if (command.tls.size() == 2)
     {
         options.certificate = command.tls[0];

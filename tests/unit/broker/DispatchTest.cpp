@@ -79,6 +79,46 @@ TEST(Dispatch, OneFailureFailsTheWholeOperation)
     EXPECT_TRUE(reply.objects.empty());
 }
 
+/// A server that streams cannot keep what a provider made for all results of a call.
+TEST(Dispatch, SinksGetResultsOneByOneAndMayForgetTheirObjects)
+{
+    for (const bool forgets : {false, true})
+    {
+        Fixture fixture;
+        std::string late;
+        fixture.on("enumerateInstanceNames",
+                   [&](const Call& call)
+                   {
+                       const CMPIObjectPath* early = newBasePath(call, "early");
+                       const CMPIObjectPath* second = nullptr;
+                       const CMPIObjectPath* used = nullptr;
+                       for (int i = 0; i < 1000; i++)
+                       {
+                           const CMPIObjectPath* path = newBasePath(call, "1");
+                           second = i == 1 ? path : second;
+                           used = i == 2 ? path : used;
+                           CMReturnObjectPath(call.result, path);
+                           if (used)
+                               CMGetClassName(used, nullptr);
+                       }
+                       EXPECT_TRUE(CMGetClassName(early, nullptr));
+                       EXPECT_TRUE(CMGetClassName(used, nullptr));
+                       EXPECT_EQ(CMGetClassName(second, nullptr) != nullptr, !forgets);
+                       CMReturnDone(call.result);
+                       return ok;
+                   });
+        std::size_t taken = 0;
+        const auto take = [&](Path&&)
+        {
+            taken++;
+            return true;
+        };
+        EXPECT_TRUE(fixture.broker->enumerateInstanceNames(ns, "TST_Disk", {take, forgets}).ok());
+        EXPECT_EQ(taken, 1000u);
+        EXPECT_EQ(fixture.violations().empty(), !forgets) << fixture.violations();
+    }
+}
+
 TEST(Dispatch, AssociationsFanOutToWhatCanReferToTheClass)
 {
     for (const auto& [personality, expected] : {std::pair{strict, "(null)"}, {openGroup, "TST_Link"}})

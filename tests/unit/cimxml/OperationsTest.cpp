@@ -6,6 +6,10 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <iterator>
+#include <random>
+
 using namespace broker_test;
 using cimxml::answer;
 using cimxml::HttpRefusal;
@@ -106,6 +110,8 @@ TEST(CimXmlOperations, FailuresAreAnswersWithTheirCodes)
         {operation("EnumerateClassNames", "", elsewhere), 3},
         {operation("EnumerateInstances", ofClass("None")), 5},
         {operation("GetClass", ofClass("None")), 5},
+        {operation("GetClass", ofClass("")), 5},
+        {methodCall("").replace(methodCall("").find("TST_Base"), 8, ""), 5},
         {operation("EnumerateInstances", ""), 4},
         {operation("GetInstance", parameter("InstanceName", "<VALUE>x</VALUE>")), 4},
         {operation("CreateInstance", parameter("NewInstance", R"(<INSTANCE CLASSNAME="TST_Base"><PROPERTY NAME="X">)"
@@ -252,6 +258,107 @@ TEST(CimXmlOperations, QualifiersAreThoseOfTheSchema)
     for (std::size_t at = 0; (at = all.find("<QUALIFIER.DECLARATION ", at)) != all.npos; at++)
         count++;
     EXPECT_EQ(count, declared);
+}
+
+/// What a client sees of a failure depends on how much of the result is on its way.
+TEST(CimXmlOperations, LateFailuresLeaveTheResponseWithoutAnEnd)
+{
+    for (const int results : {1, 5000})
+    {
+        Host host;
+        host.on("enumerateInstanceNames",
+                [&](const Call& call)
+                {
+                    for (int i = 0; i < results; i++)
+                        CMReturnObjectPath(call.result, newBasePath(call, std::to_string(i).c_str()));
+                    return CMPIStatus{CMPI_RC_ERR_ACCESS_DENIED, nullptr};
+                });
+        std::string response;
+        std::size_t longest = 0;
+        const auto take = [&](std::string_view part)
+        {
+            response += part;
+            longest = std::max(longest, part.size());
+            return true;
+        };
+        const cimxml::Message request(operation("EnumerateInstanceNames", ofClass("TST_Base")));
+        const bool whole = answer(*host.broker, host.pulls, request, take);
+        EXPECT_EQ(whole, results == 1);
+        EXPECT_EQ(response.find(error(2)) != response.npos, whole);
+        EXPECT_EQ(response.ends_with("</CIM>"), whole);
+        EXPECT_LT(longest, 80000u) << "of a part";
+    }
+}
+
+TEST(CimXmlOperations, ProvidersEndWhenTheClientHasGone)
+{
+    Host host;
+    int given = 0;
+    host.on("enumerateInstanceNames",
+            [&](const Call& call)
+            {
+                CMPIStatus status = ok;
+                while (status.rc == CMPI_RC_OK && given++ < 100000)
+                    status = CMReturnObjectPath(call.result, newBasePath(call, "1"));
+                return status;
+            });
+    const cimxml::Message request(operation("EnumerateInstanceNames", ofClass("TST_Base")));
+    EXPECT_FALSE(answer(*host.broker, host.pulls, request, [](std::string_view) { return false; }));
+    EXPECT_LT(given, 1000);
+}
+
+/// Requests with bytes changed, doubled, taken out and put in; whatever comes of them, it is an answer or a refusal.
+TEST(CimXmlOperations, DamagedRequestsAreAnsweredOrRefused)
+{
+    Host host;
+    const std::string requests[] = {
+        operation("EnumerateInstanceNames", ofClass("TST_Base")),
+        operation("GetInstance", parameter("InstanceName", portOne)),
+        operation("OpenEnumerateInstancePaths", ofClass("TST_Base") + most(1)),
+        operation("CreateInstance", parameter("NewInstance", R"(<INSTANCE CLASSNAME="TST_Disk"><PROPERTY NAME="Size">)"
+                                                             "<VALUE>7</VALUE></PROPERTY></INSTANCE>")),
+        operation("GetClass", ofClass("TST_Disk") + parameter("LocalOnly", "<VALUE>FALSE</VALUE>")),
+        methodCall(R"(<PARAMVALUE NAME="A"><VALUE>&#x41;1</VALUE></PARAMVALUE>)"),
+    };
+    std::minstd_rand random(4711);
+    const auto below = [&](std::size_t end) { return random() % end; };
+    constexpr std::string_view marks = "<>\"'&;/=! \xC3\xFF";
+    std::size_t answered = 0, refused = 0;
+    for (int round = 0; round < 5000; round++)
+    {
+        std::string text = requests[below(std::size(requests))];
+        for (std::size_t changes = 1 + below(2); changes > 0; changes--)
+        {
+            const std::size_t at = below(text.size());
+            const std::string piece = text.substr(at, below(40));
+            switch (below(4))
+            {
+            case 0:
+                text[at] = marks[below(marks.size())];
+                break;
+            case 1:
+                text.erase(at, piece.size());
+                break;
+            case 2:
+                text.insert(below(text.size()), piece);
+                break;
+            default:
+                text.insert(at, 1, static_cast<char>(random()));
+            }
+            text += text.empty() ? "<" : "";
+        }
+        try
+        {
+            EXPECT_THAT(host.ask(text), EndsWith("</CIM>"));
+            answered++;
+        }
+        catch (const HttpRefusal&)
+        {
+            refused++;
+        }
+    }
+    EXPECT_GT(answered, 500u);
+    EXPECT_GT(refused, 500u);
 }
 
 } // namespace

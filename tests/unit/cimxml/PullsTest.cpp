@@ -9,10 +9,19 @@ using namespace std::chrono_literals;
 namespace
 {
 
+std::optional<Part> open(Pulls& pulls, PulledKind kind, const std::vector<std::string>& elements, std::size_t most,
+                         std::chrono::seconds time)
+{
+    Collected result(pulls);
+    for (const std::string& element : elements)
+        result.add(element);
+    return pulls.open(kind, result, most, time);
+}
+
 TEST(Pulls, GiveEachElementOnceAndInOrder)
 {
     Pulls pulls;
-    std::optional<Part> part = pulls.open(PulledKind::paths, {"a", "b", "c", "d", "e"}, 2, 60s);
+    std::optional<Part> part = open(pulls, PulledKind::paths, {"a", "b", "c", "d", "e"}, 2, 60s);
     ASSERT_TRUE(part);
     std::vector<std::string> all = part->elements;
     const std::string context = part->context;
@@ -30,9 +39,9 @@ TEST(Pulls, GiveEachElementOnceAndInOrder)
 TEST(Pulls, AreGivenUpInTime)
 {
     Pulls pulls;
-    const std::string context = pulls.open(PulledKind::instances, {"a"}, 0, -1s)->context;
+    const std::string context = open(pulls, PulledKind::instances, {"a"}, 0, -1s)->context;
     EXPECT_FALSE(pulls.pull(PulledKind::instances, context, 1));
-    EXPECT_EQ(pulls.open(PulledKind::instances, {}, 0, 60s)->context, "");
+    EXPECT_EQ(open(pulls, PulledKind::instances, {}, 0, 60s)->context, "");
 }
 
 TEST(Pulls, KeepSoManyAndSoMuchAtOnce)
@@ -41,14 +50,16 @@ TEST(Pulls, KeepSoManyAndSoMuchAtOnce)
     std::string first;
     for (int i = 0; i < 64; i++)
     {
-        const std::optional<Part> part = pulls.open(PulledKind::paths, {"a"}, 0, 60s);
+        const std::optional<Part> part = open(pulls, PulledKind::paths, {"a"}, 0, 60s);
         ASSERT_TRUE(part) << i;
         first = first.empty() ? part->context : first;
     }
-    EXPECT_FALSE(pulls.open(PulledKind::paths, {"a"}, 0, 60s));
+    EXPECT_FALSE(open(pulls, PulledKind::paths, {"a"}, 0, 60s));
     EXPECT_TRUE(pulls.close(first));
-    EXPECT_FALSE(pulls.open(PulledKind::paths, {std::string((64 << 20) + 1, 'x')}, 0, 60s));
-    EXPECT_TRUE(pulls.open(PulledKind::paths, {std::string(1 << 20, 'x')}, 0, 60s));
+    EXPECT_FALSE(open(pulls, PulledKind::paths, {std::string((64 << 20) + 1, 'x')}, 0, 60s));
+    EXPECT_TRUE(open(pulls, PulledKind::paths, {std::string(1 << 20, 'x')}, 0, 60s));
+    Collected other(pulls);
+    EXPECT_FALSE(other.add(std::string(64 << 20, 'x'))) << "what is being collected counts too";
 }
 
 } // namespace
