@@ -163,7 +163,8 @@ public:
             names.emplace_back(name.text().get());
         return names;
     }
-    /// From where an association operation starts; pulled ones have another name for it.
+    /// The instance that the operation is about. Those of associations have another name for it, unless they are
+    /// pulled.
     Path source() const
     {
         return _decoder.path(required(_request.parameter("InstanceName") ? "InstanceName" : "ObjectName"));
@@ -365,11 +366,6 @@ void enumerateClassNames(Operation& operation)
 
 // --- single properties, and qualifiers
 
-Path instanceName(const Operation& operation)
-{
-    return operation.decoder().path(operation.required("InstanceName"));
-}
-
 const FeatureInfo& namedProperty(const Operation& operation, const Path& path)
 {
     expect(operation.broker.findClass(path.nameSpace, path.className));
@@ -383,7 +379,7 @@ const FeatureInfo& namedProperty(const Operation& operation, const Path& path)
 
 void getProperty(Operation& operation)
 {
-    const Path path = instanceName(operation);
+    const Path path = operation.source();
     const FeatureInfo& property = namedProperty(operation, path);
     const Reply reply = operation.broker.getInstance(path, std::vector{property.name});
     expect(reply);
@@ -393,7 +389,7 @@ void getProperty(Operation& operation)
 
 void setProperty(Operation& operation)
 {
-    const Path path = instanceName(operation);
+    const Path path = operation.source();
     const FeatureInfo& property = namedProperty(operation, path);
     const Target target(operation.broker.classes(), operation.nameSpace(), property);
     const Value value = operation.decoder().value(operation.request().parameter("NewValue"), target);
