@@ -219,8 +219,8 @@ struct Server::Listener
         }
         if (request.has_header("Content-Encoding"))
             return refuse(response, 415);
-        const bool known = request.has_header("Content-Length") && !request.has_header("Transfer-Encoding");
-        const auto length = known ? request.get_header_value<std::uint64_t>("Content-Length") : largestBody;
+        const bool chunked = request.has_header("Transfer-Encoding"); // then it may become as large as any
+        const auto length = chunked ? largestBody : request.get_header_value<std::uint64_t>("Content-Length");
         if (length > largestBody)
             return refuse(response, 413);
         if (length > smallBody && !takeSeat())
