@@ -141,10 +141,23 @@ protected:
     template <class Call> Answer ask(broker::ResultContent::Kind kind, const Path& path, Call call)
     {
         broker::CallFrame frame(*core, &providerBroker.cmpi, "call", {});
+        Answer answer = {};
         auto* result = frame.make<broker::ResultHandle>({.kind = kind});
+        result->content.objects.take = [&answer](broker::Object&& object)
+        {
+            answer.objects.push_back(std::move(object));
+            return true;
+        };
+        result->content.paths.take = [&answer](Path&& taken)
+        {
+            answer.paths.push_back(std::move(taken));
+            return true;
+        };
         const CMPIStatus status = call(frame, result, broker::makePath(frame, path));
         EXPECT_EQ(status.msg, nullptr);
-        return {status.rc, result->content.paths, result->content.objects, result->content.done};
+        answer.status = status.rc;
+        answer.done = result->content.done;
+        return answer;
     }
 
     template <class MI> static std::uint32_t magicOf(const MI* mi)
