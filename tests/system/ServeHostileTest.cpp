@@ -1,4 +1,5 @@
 // The port and clients that mean it no good: each is answered or closed, the others are served, and memory has an end.
+#include "tests/support/Eventually.h"
 #include "tests/support/RawClient.h"
 #include "tests/support/Sanitized.h"
 #include "tests/system/Tool.h"
@@ -63,6 +64,19 @@ public:
             if (line.starts_with("VmRSS:"))
                 return std::atol(line.c_str() + 6) / 1024;
         return 0;
+    }
+
+    /// Sockets that it has open.
+    std::size_t sockets() const
+    {
+        std::size_t count = 0;
+        for (const auto& entry :
+             std::filesystem::directory_iterator("/proc/" + std::to_string(_tool.process()) + "/fd"))
+        {
+            std::error_code gone;
+            count += std::filesystem::read_symlink(entry, gone).native().starts_with("socket:") ? 1 : 0;
+        }
+        return count;
     }
 
 private:
@@ -143,7 +157,7 @@ TEST(ServeHostile, BodiesAreAsLongAsTheySay)
     EXPECT_THAT(port.answer(saying(good.size() / 2)), StartsWith("HTTP/1.1 400"));
     const Clock::time_point start = Clock::now();
     EXPECT_THAT(port.answer(saying(good.size() + 1)), AnyOf(IsEmpty(), StartsWith("HTTP/1.1 4")));
-    EXPECT_LT(Clock::now() - start, 4s);
+    EXPECT_LT(Clock::now() - start, 15s);
     port.expectService();
 }
 
@@ -151,18 +165,20 @@ TEST(ServeHostile, BodiesAreAsLongAsTheySay)
 TEST(ServeHostile, LargeBodiesWaitNowhere)
 {
     const Port port;
-    std::vector<RawClient> clients;
-    for (int i = 0; i < 4; i++)
+    const auto refusesOneOfFive = [&]
     {
-        clients.emplace_back(port.number());
-        clients.back().send(httpHead("Content-Length: 1000000\r\n") + "<");
-    }
-    while (port.answer(httpHead("Content-Length: 1000000\r\n")).find("HTTP/1.1 503") == std::string::npos)
-        std::this_thread::yield();
-    port.expectService();
-    clients.clear();
-    while (port.answer(httpRequest(std::string(1000000, ' '))).find("HTTP/1.1 503") != std::string::npos)
-        std::this_thread::yield();
+        std::vector<RawClient> clients;
+        for (int i = 0; i < 5; i++)
+        {
+            clients.emplace_back(port.number());
+            clients.back().send(httpHead("Content-Length: 1000000\r\n") + "<");
+        }
+        port.expectService();
+        return std::ranges::count_if(clients, [](const RawClient& client)
+                                     { return client.readAll().starts_with("HTTP/1.1 503"); }) == 1;
+    };
+    EXPECT_TRUE(test_support::eventually(refusesOneOfFive)); // all five came before one was given up
+    EXPECT_THAT(port.answer(httpRequest(std::string(1000000, ' '))), StartsWith("HTTP/1.1 400"));
 }
 
 TEST(ServeHostile, WhoTricklesIsClosedWhileOthersAreServed)
@@ -204,6 +220,8 @@ TEST(ServeHostile, WhoDoesNotReadHoldsNobodyUp)
     const Port port;
     EXPECT_TRUE(port.ask("EnumerateInstances", volumes).ends_with(lastChunk));
     const long before = port.memory();
+    EXPECT_TRUE(test_support::eventually([&] { return port.sockets() <= 1; }));
+    const std::size_t listening = port.sockets();
     const std::string request = httpRequest(cimMessage("EnumerateInstances", volumes));
     std::vector<RawClient> idle;
     for (int i = 0; i < 4; i++)
@@ -220,6 +238,7 @@ TEST(ServeHostile, WhoDoesNotReadHoldsNobodyUp)
     EXPECT_TRUE(port.ask("EnumerateInstances", volumes).ends_with(lastChunk));
     EXPECT_LT(Clock::now() - start, TVR_SANITIZED ? 60s : 15s);
     EXPECT_LT(port.memory() - before, 100 * memoryFactor);
+    EXPECT_TRUE(test_support::eventually([&] { return port.sockets() == listening; }));
     for (const RawClient& client : idle)
         EXPECT_FALSE(client.readAll().ends_with(lastChunk)); // given up, and he can tell
     port.expectService();
