@@ -105,7 +105,7 @@ TEST(CimXml, RealsHaveAFraction)
 {
     for (const auto& [number, text] : {std::pair(30.0, "3.0e+01"), std::pair(-0.125, "-1.25e-01"),
                                        std::pair(0.0, "0.0e+00"), std::pair(-1 / 0.0, "-INF")})
-        EXPECT_EQ(xmlOf([&](XmlText& xml) { writeValue(xml, Value::real64(number)); }),
+        EXPECT_EQ(xmlOf([&, real = number](XmlText& xml) { writeValue(xml, Value::real64(real)); }),
                   std::string("<VALUE>") + text + "</VALUE>");
 }
 
