@@ -40,6 +40,7 @@ public:
     bool shakeHands();
     /// False when none comes.
     bool awaitRequest();
+    std::size_t received() const { return _received; } ///< bytes of this request
     /// Sends what the client has not taken. False when there will be no other request.
     bool finishRequest();
 

@@ -167,7 +167,16 @@ public:
     /// pulled.
     Path source() const
     {
-        return _decoder.path(required(_request.parameter("InstanceName") ? "InstanceName" : "ObjectName"));
+        const xml_node node = required(_request.parameter("InstanceName") ? "InstanceName" : "ObjectName");
+        if (std::string_view(node.name()) == "CLASSNAME")
+            throw CimFailure{CMPI_RC_ERR_NOT_SUPPORTED, "associations of classes are not supported"};
+        return _decoder.path(node);
+    }
+    /// Fails unless the namespace has the class of an INSTANCE.
+    void expectClassOf(const xml_node& instance) const
+    {
+        if (std::string_view(instance.name()) == "INSTANCE")
+            expect(broker.findClass(nameSpace(), instance.attribute("CLASSNAME").value()));
     }
     AssociationFilter filter() const
     {
@@ -297,8 +306,9 @@ void getInstance(Operation& operation)
 
 void createInstance(Operation& operation)
 {
-    const NamesReply reply =
-        operation.broker.createInstance(operation.decoder().instance(operation.required("NewInstance")));
+    const xml_node instance = operation.required("NewInstance");
+    operation.expectClassOf(instance);
+    const NamesReply reply = operation.broker.createInstance(operation.decoder().instance(instance));
     expect(reply);
     for (const Path& path : reply.paths)
         writeInstanceName(operation.xml, path);
@@ -306,8 +316,9 @@ void createInstance(Operation& operation)
 
 void modifyInstance(Operation& operation)
 {
-    expect(operation.broker.modifyInstance(operation.decoder().namedInstance(operation.required("ModifiedInstance")),
-                                           operation.properties()));
+    const xml_node named = operation.required("ModifiedInstance");
+    operation.expectClassOf(childOf(named, "INSTANCE"));
+    expect(operation.broker.modifyInstance(operation.decoder().namedInstance(named), operation.properties()));
 }
 
 void deleteInstance(Operation& operation)

@@ -4,6 +4,7 @@
 #include "broker/cimxml/Decode.h"
 #include "broker/cimxml/Operations.h"
 
+#include <arpa/inet.h>
 #include <atomic>
 #include <malloc.h>
 #include <semaphore>
@@ -27,7 +28,10 @@ constexpr int waitingConnections = 512;       ///< that are not accepted yet
 
 bool isOfThisHost(const std::string& address)
 {
-    return address == "localhost" || address == "::1" || address.starts_with("127.");
+    in_addr number{};
+    constexpr std::uint32_t loopback = 127; // the first of four bytes
+    return address == "localhost" || address == "::1" ||
+           (inet_pton(AF_INET, address.c_str(), &number) == 1 && ntohl(number.s_addr) >> 24 == loopback);
 }
 
 void expectSafe(const ServerOptions& options)
@@ -36,6 +40,14 @@ void expectSafe(const ServerOptions& options)
         return;
     if (options.users.empty() || options.certificate.empty())
         throw std::runtime_error("other hosts are served with users and TLS alone");
+}
+
+/// The allocator keeps what a large request or result needed, for each of its arenas anew.
+void giveBackMemory(std::size_t bytes)
+{
+    constexpr std::size_t large = 1 << 20;
+    if (bytes > large)
+        malloc_trim(0);
 }
 
 /// The library's server, of HTTP or HTTPS, on connections that are ours.
@@ -66,6 +78,7 @@ private:
             bool closes = false;
             goesOn = this->process_request(connection, left == 1, closes, nullptr);
             goesOn = connection.finishRequest() && goesOn && !closes;
+            giveBackMemory(connection.received());
         }
         return goesOn;
     }
@@ -93,10 +106,19 @@ void takeNoSharedPort(socket_t socket)
     setsockopt(socket, SOL_SOCKET, SO_REUSEADDR, &yes, sizeof yes);
 }
 
+/// The body of a request that the library refuses by its head is unread, and would be taken for the next request.
+void endBehindError(const httplib::Request&, httplib::Response& response)
+{
+    response.set_header("Connection", "close");
+    Connection::current().endBehindResponse();
+}
+
 void setUp(httplib::Server& server)
 {
     server.new_task_queue = [] { return new httplib::ThreadPool(mostConnections); };
     server.set_payload_max_length(largestBody);
+    server.set_keep_alive_max_count(mostRequests); // clients are told
+    server.set_error_handler(httplib::Server::Handler(endBehindError));
     server.set_socket_options(takeNoSharedPort);
 }
 
@@ -107,14 +129,6 @@ httplib::Server::HandlerResponse refuse(httplib::Response& response, int status)
     response.set_header("Connection", "close");
     Connection::current().endBehindResponse();
     return httplib::Server::HandlerResponse::Handled;
-}
-
-/// The allocator keeps what a provider needed for a large result, for each of its arenas anew.
-void giveBackMemory(std::size_t responseBytes)
-{
-    constexpr std::size_t large = 1 << 20;
-    if (responseBytes > large)
-        malloc_trim(0);
 }
 
 /// The response, from within the operation. A client of HTTP 1.1 misses the last chunk of one that broke off, any other
@@ -217,9 +231,16 @@ struct Server::Listener
             response.set_header("WWW-Authenticate", "Basic realm=\"tvrcim\"");
             return refuse(response, 401);
         }
+        // A page of another site can have a browser send what needs no header of its own; and browsers name the site.
+        if (request.has_header("Origin"))
+            return refuse(response, 403);
+        if (request.method == "POST" && !request.has_header("CIMOperation"))
+            return refuse(response, 400);
         if (request.has_header("Content-Encoding"))
             return refuse(response, 415);
         const bool chunked = request.has_header("Transfer-Encoding"); // then it may become as large as any
+        if (request.method == "POST" && !chunked && !request.has_header("Content-Length"))
+            return refuse(response, 411);
         const auto length = chunked ? largestBody : request.get_header_value<std::uint64_t>("Content-Length");
         if (length > largestBody)
             return refuse(response, 413);

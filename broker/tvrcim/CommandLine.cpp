@@ -182,7 +182,8 @@ void addCommands(CommandOptions& options)
         .test();
     options.add("check", "tell what of libraries, module, settings, logs and CIM servers is there, what is missing and "
                          "what to do about it; exits with 7 where something is missing or wrong");
-    options.add("serve", "answer CIM clients over HTTP until SIGINT; other hosts need --tls and --users").port();
+    options.add("serve", "answer CIM clients over HTTP until SIGINT or SIGTERM; other hosts need --tls and --users")
+        .port();
 }
 
 std::vector<std::string> serverNames()

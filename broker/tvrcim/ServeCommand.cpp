@@ -59,8 +59,9 @@ void serve(Session& session, const Command& command)
     cimxml::describePort(session.broker);
     const Interruptible interruptible(session.signals);
     const cimxml::Server server(session.broker, options);
-    session.out << "listening on " << (options.certificate.empty() ? "http" : "https") << "://" << options.address
-                << ':' << server.port() << std::endl;
+    const bool bracketed = options.address.find(':') != std::string::npos;
+    session.out << "listening on " << (options.certificate.empty() ? "http" : "https") << "://"
+                << (bracketed ? "[" + options.address + "]" : options.address) << ':' << server.port() << std::endl;
     while (session.signals && !session.signals->awaitInterrupt(1h))
         ;
 }

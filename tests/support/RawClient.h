@@ -70,7 +70,9 @@ private:
 /// The head of a request on a connection of its own.
 inline std::string httpHead(const std::string& fields, const std::string& line = "POST /cimom HTTP/1.1")
 {
-    return line + "\r\nHost: localhost\r\nConnection: close\r\nContent-Type: application/xml; charset=\"utf-8\"\r\n" +
+    return line +
+           "\r\nHost: localhost\r\nConnection: close\r\nContent-Type: application/xml; charset=\"utf-8\"\r\n"
+           "CIMOperation: MethodCall\r\n" +
            fields + "\r\n";
 }
 

@@ -126,6 +126,9 @@ TEST(ServeHostile, WhatIsNoRequestIsAnsweredOrClosed)
         {httpHead("Content-Length: 17000000\r\n"), {"HTTP/1.1 413"}},
         {httpHead("Content-Length: 99999999999999999999\r\n"), {"HTTP/1.1 413"}},
         {httpHead("Content-Length: 20\r\nContent-Encoding: gzip\r\n") + std::string(20, 'x'), {"HTTP/1.1 415"}},
+        {httpHead("Origin: http://other.example\r\nContent-Length: 0\r\n"), {"HTTP/1.1 403"}},
+        {"POST / HTTP/1.1\r\nContent-Length: " + std::to_string(good.size()) + "\r\n\r\n" + good, {"HTTP/1.1 400"}},
+        {httpHead(""), {"HTTP/1.1 411"}},
         {chunked("FFFFFFFFFFFFFFFF\r\nx"), {}},
         {chunked("x\r\nx"), {}},
         {"POST /" + std::string(1 << 20, 'x'), {}},
@@ -146,6 +149,24 @@ TEST(ServeHostile, WhatIsNoRequestIsAnsweredOrClosed)
     }
     port.expectService();
     EXPECT_LT(port.memory(), 300 * memoryFactor);
+}
+
+/// What is refused by its head leaves its body unread, which is no request of its own.
+TEST(ServeHostile, BodiesOfRefusedRequestsAreNotObeyed)
+{
+    const Port port;
+    std::string inner = httpRequest(cimMessage("EnumerateInstanceNames", "TVRHBA_Card"));
+    const std::string length = "Content-Length: " + std::to_string(inner.size()) + "\r\n\r\n" + inner;
+    const std::string heads[] = {"POST /" + std::string(20000, 'a') + " HTTP/1.1\r\n", "NONE / HTTP/1.1\r\n",
+                                 "GET / HTTP/1.1\r\n", "OPTIONS / HTTP/1.1\r\n",
+                                 "POST / HTTP/1.1\r\nRange: bytes=x\r\n"};
+    for (const std::string& head : heads)
+    {
+        const std::string answer = port.answer(head + "Host: localhost\r\n" + length);
+        EXPECT_THAT(answer, StartsWith("HTTP/1.1 4")) << head.substr(0, 40);
+        EXPECT_THAT(answer, Not(HasSubstr("<INSTANCENAME"))) << head.substr(0, 40);
+    }
+    port.expectService();
 }
 
 TEST(ServeHostile, BodiesAreAsLongAsTheySay)
@@ -267,7 +288,9 @@ TEST(ServeHostile, WhoReadsLateGetsTheWhole)
     EXPECT_TRUE(body(client.readAll()) == body(whole));
     const std::string message = cimMessage("EnumerateInstances", volumes);
     const std::string length = std::to_string(message.size());
-    EXPECT_TRUE(port.answer("POST / HTTP/1.0\r\nContent-Length: " + length + "\r\n\r\n" + message).ends_with("</CIM>"));
+    EXPECT_TRUE(
+        port.answer("POST / HTTP/1.0\r\nCIMOperation: MethodCall\r\nContent-Length: " + length + "\r\n\r\n" + message)
+            .ends_with("</CIM>"));
 }
 
 } // namespace

@@ -117,6 +117,8 @@ TEST(CimXmlOperations, FailuresAreAnswersWithTheirCodes)
         {operation("CreateInstance", parameter("NewInstance", R"(<INSTANCE CLASSNAME="TST_Base"><PROPERTY NAME="X">)"
                                                               "</PROPERTY></INSTANCE>")),
          4},
+        {operation("CreateInstance", parameter("NewInstance", R"(<INSTANCE CLASSNAME="None"></INSTANCE>)")), 5},
+        {operation("Associators", parameter("ObjectName", R"(<CLASSNAME NAME="TST_Base"/>)")), 7},
         {operation("DeleteInstance", parameter("InstanceName", portOne)), 7}, // of the provider
         {methodCall("", "Multiply"), 17},
         {methodCall(R"(<PARAMVALUE NAME="C"><VALUE>1</VALUE></PARAMVALUE>)"), 4},
