@@ -9,7 +9,6 @@
 #include <fstream>
 #include <malloc.h>
 #include <poll.h>
-#include <semaphore.h>
 #include <stdexcept>
 #include <sys/inotify.h>
 #include <sys/wait.h>
@@ -38,24 +37,15 @@ std::size_t residentBytes()
 
 bool leaksPass = false;
 
+/// A test counts from none.
+[[maybe_unused]] const bool fresh = (test_support::forgetSemaphoresOf(getpid()), true);
+
 } // namespace
 
 /// Asked by the leak sanitizer.
 extern "C" __attribute__((visibility("default"))) int __lsan_is_turned_off()
 {
     return leaksPass;
-}
-
-std::size_t semaphoresOf(int process)
-{
-    const std::string ending = "_" + std::to_string(process);
-    return static_cast<std::size_t>(std::ranges::count_if(fs::directory_iterator("/dev/shm"), fs::directory_iterator(),
-                                                          [&](const fs::directory_entry& entry)
-                                                          {
-                                                              const std::string name = entry.path().filename();
-                                                              return name.starts_with("sem.TVR") &&
-                                                                     name.ends_with(ending);
-                                                          }));
 }
 
 Footprint Footprint::take(std::size_t threads)
@@ -114,15 +104,15 @@ int inChild(const std::function<void()>& body)
     const pid_t child = fork();
     if (child == 0)
     {
+        test_support::forgetSemaphoresOf(getpid());
         body();
         std::exit(failures() > before ? 1 : 0);
     }
     int status = 0;
     if (child < 0 || waitpid(child, &status, 0) != child)
         throw std::runtime_error("no child process");
-    for (const char* name : {"/TVR_RM_INIT_LIB_", "/TVR_RM_INIT_LIB_DONE_"})
-        if (WIFSIGNALED(status)) // what a child that was ended by a signal left, or a later one of its number meets it
-            sem_unlink((name + std::to_string(child)).c_str());
+    if (WIFSIGNALED(status))
+        test_support::forgetSemaphoresOf(child);
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
 

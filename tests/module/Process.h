@@ -1,6 +1,8 @@
 // What a process holds of the machine, what happens to its files, and processes that end by themselves.
 #pragma once
 
+#include "tests/support/Semaphores.h"
+
 #include <cstddef>
 #include <filesystem>
 #include <functional>
@@ -24,8 +26,7 @@ struct Footprint
     static Footprint take(std::size_t threads = 1);
 };
 
-/// How many semaphores the module has in the process of that id.
-std::size_t semaphoresOf(int process);
+using test_support::semaphoresOf;
 
 /// Counts changes of a folder from its creation on.
 class FolderWatch

@@ -18,7 +18,7 @@ public:
     /// `receiveBuffer` is how much waits for this end to read; 0 for what the system gives.
     explicit RawClient(int port, int receiveBuffer = 0) : _socket(socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0))
     {
-        const timeval longest{20, 0};
+        const timeval longest{60, 0};
         setsockopt(_socket, SOL_SOCKET, SO_RCVTIMEO, &longest, sizeof longest);
         setsockopt(_socket, SOL_SOCKET, SO_SNDTIMEO, &longest, sizeof longest);
         if (receiveBuffer != 0)

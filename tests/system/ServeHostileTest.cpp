@@ -239,18 +239,19 @@ TEST(ServeHostile, TwoHundredAtOnceAreAnswered)
 TEST(ServeHostile, WhoDoesNotReadHoldsNobodyUp)
 {
     const Port port;
+    constexpr int clients = TVR_SANITIZED ? 1 : 4; // of each kind
     EXPECT_TRUE(port.ask("EnumerateInstances", volumes).ends_with(lastChunk));
     const long before = port.memory();
     EXPECT_TRUE(test_support::eventually([&] { return port.sockets() <= 1; }));
     const std::size_t listening = port.sockets();
     const std::string request = httpRequest(cimMessage("EnumerateInstances", volumes));
     std::vector<RawClient> idle;
-    for (int i = 0; i < 4; i++)
+    for (int i = 0; i < clients; i++)
     {
         idle.emplace_back(port.number(), 4096);
         idle.back().send(request);
     }
-    for (int i = 0; i < 4; i++)
+    for (int i = 0; i < clients; i++)
     {
         const RawClient leaving(port.number(), 4096);
         leaving.send(request);

@@ -1,4 +1,5 @@
 #include "tests/system/Tool.h"
+#include "tests/support/Semaphores.h"
 
 #include <gtest/gtest.h>
 
@@ -22,16 +23,23 @@ Running::Running(std::vector<const char*> words)
     words.insert(words.begin(), TVR_TVRCIM);
     words.push_back(nullptr);
     int ends[2];
+    int started[2];
     EXPECT_EQ(pipe2(ends, O_CLOEXEC), 0);
+    EXPECT_EQ(pipe2(started, O_CLOEXEC), 0); // ends where the tool begins
     fcntl(ends[1], F_SETPIPE_SZ, 4096);
     _process = fork();
     if (_process == 0)
     {
+        test_support::forgetSemaphoresOf(getpid());
         dup2(ends[1], STDOUT_FILENO);
         execv(words[0], const_cast<char* const*>(words.data()));
         _exit(127);
     }
     close(ends[1]);
+    close(started[1]);
+    char none;
+    EXPECT_EQ(read(started[0], &none, 1), 0);
+    close(started[0]);
     _output = ends[0];
 }
 

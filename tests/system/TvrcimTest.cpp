@@ -1,5 +1,6 @@
 // The command-line tool as a person or a script uses it: a process of its own, its output and its exit code.
 #include "tests/support/Eventually.h"
+#include "tests/support/Semaphores.h"
 #include "tests/system/Tool.h"
 
 #include <gmock/gmock.h>
@@ -24,6 +25,7 @@
 #include <vector>
 
 using namespace system_test;
+using test_support::semaphoresOf;
 using testing::HasSubstr;
 
 namespace
@@ -427,18 +429,6 @@ public:
 private:
     std::string _path = testing::TempDir() + "tvrcim-XXXXXX";
 };
-
-std::size_t semaphoresOf(pid_t process)
-{
-    const std::string ending = "_" + std::to_string(process);
-    return static_cast<std::size_t>(
-        std::ranges::count_if(std::filesystem::directory_iterator("/dev/shm"), std::filesystem::directory_iterator(),
-                              [&](const std::filesystem::directory_entry& entry)
-                              {
-                                  const std::string name = entry.path().filename();
-                                  return name.starts_with("sem.TVR") && name.ends_with(ending);
-                              }));
-}
 
 /// A signal finds the tool between two operations, or inside one that never ends: what it says about itself in the
 /// system is gone afterwards all the same.

@@ -2,7 +2,6 @@
 // that are there already, a port without a name, records of tests that nobody ran.
 #include "diagnostics/DiagnosticSettings.h"
 #include "agent/Build.h"
-#include "agent/MethodCall.h"
 #include "diagnostics/ConcreteJobs.h"
 #include "diagnostics/DiagnosticFeature.h"
 #include "diagnostics/DiagnosticRun.h"
@@ -19,14 +18,17 @@
 #include "schema/TVRHBA_LogManagesRecord.h"
 #include "schema/TVRHBA_PortController.h"
 #include "schema/TVRHBA_RecordAppliesToElement.h"
+#include "tests/support/Eventually.h"
 #include "tests/unit/device/FakeHost.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <functional>
 #include <map>
 #include <optional>
+#include <string_view>
 
 using namespace cimple;
 using testing::ElementsAre;
@@ -85,17 +87,40 @@ TEST(DiagnosticSettings, PatternsAreFittedToTheSize)
     }
 }
 
+/// Waits for the last line of the refresh thread, which it writes after it let go of the model.
+class RefreshEnd : public TVR_LoggerInterface
+{
+public:
+    RefreshEnd() { TVR_Logger::instance().addSink(this); }
+    ~RefreshEnd() override { TVR_Logger::instance().removeSink(this); }
+    void logMessage(int, const char*, unsigned, const char* message) override
+    {
+        if (std::string_view(message).ends_with("Thread END"))
+            _ended = true;
+    }
+    void start() override {}
+    void stop() override {}
+    void clearLog() override {}
+
+    bool await() const
+    {
+        return test_support::eventually([&] { return _ended.load(); });
+    }
+
+private:
+    std::atomic<bool> _ended = false;
+};
+
 /// An agent with a system, and a port that no library knows.
 class DiagnosticMaps : public testing::Test
 {
 protected:
     DiagnosticMaps() : agent(*ProviderAgent::instance())
     {
+        const RefreshEnd refresh;
         ProviderAgent::addRef();
         agent.BuildCimpleInfo();
-        {
-            MethodGuard ready(agent); // the only refresh is over
-        }
+        EXPECT_TRUE(refresh.await());
         Ref<CIM_ComputerSystem> system = fresh<CIM_ComputerSystem>();
         system->CreationClassName.set("CIM_ComputerSystem");
         system->Name.set("host");
