@@ -3,6 +3,7 @@
 #include "device/ForeignText.h"
 #include "model/FcpEndpoint.h"
 #include "model/LogicalDevices.h"
+#include "runtime/base/Bulk.h"
 #include "schema/TVRHBA_LocalHostedAccessPoint.h"
 
 #include <optional>
@@ -51,6 +52,7 @@ struct SanContext
     RepeatedText targetWwpn, targetWwnn, product;
     const Target* lastTarget = nullptr; ///< that an inquiry text was made of
     String inquiry;
+    Bulk bulk; ///< of what the units do not have in common
 };
 
 /// A port with the initiator endpoint that stands for it.

@@ -1,6 +1,8 @@
-// Raw memory for the runtime's records, aligned for every plain type and given back with std::free. Where there is
-// none, all three throw std::bad_alloc: the operation fails, the process goes on.
+// Raw memory for the runtime's records, aligned for what a slot holds. Where there is none, std::bad_alloc is thrown:
+// the operation fails, the process goes on.
 #pragma once
+
+#include "runtime/base/Bulk.h"
 
 #include <atomic>
 #include <cstddef>
@@ -23,15 +25,26 @@ inline void* require(void* block)
 /// Uninitialised memory.
 inline void* allocate(std::size_t size)
 {
-    return detail::require(std::malloc(size));
+    void* block = Bulk::take(size);
+    return block ? block : detail::require(std::malloc(size));
 }
 
 inline void* allocate_zeroed(std::size_t size)
 {
-    return detail::require(std::calloc(1, size));
+    void* block = Bulk::take(size);
+    return block ? block : detail::require(std::calloc(1, size));
 }
 
-/// A failure leaves the block as it was.
+/// Gives back what these have given. Accepts null.
+inline void deallocate(void* block) noexcept
+{
+    if (Bulk::has(block))
+        Bulk::give_back(block);
+    else
+        std::free(block);
+}
+
+/// Of memory that is given back with std::free: at first null. A failure leaves the block as it was.
 inline void* reallocate(void* block, std::size_t size)
 {
     return detail::require(std::realloc(block, size));

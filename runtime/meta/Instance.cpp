@@ -89,7 +89,7 @@ void destroy_record(Instance* instance, std::size_t slots)
         destroy_slot(instance, mf);
     std::destroy_at(&instance->__name_space);
     std::destroy_at(&instance->__refs);
-    std::free(instance);
+    deallocate(instance);
     unref_meta(record);
 }
 

@@ -45,12 +45,12 @@ template <class Record> void free_record(const Record* record)
     volatile std::uint32_t* words = static_cast<volatile std::uint32_t*>(block);
     for (std::size_t i = 0; i < sizeof(Record) / sizeof(released_pattern); ++i)
         words[i] = released_pattern;
-    std::free(block);
+    deallocate(block);
 }
 
 void free_block(const void* block)
 {
-    std::free(const_cast<void*>(block));
+    deallocate(const_cast<void*>(block));
 }
 
 struct Free_Block

@@ -15,7 +15,7 @@ namespace cimple
 
 /// Head of a representation; the elements lie directly behind it. A `cap` of 0 marks the shared empty one of
 /// its traits, which is never written.
-struct alignas(std::max_align_t) Array_Base::Rep
+struct Array_Base::Rep
 {
     const Array_Traits* traits;
     std::size_t size;
@@ -86,7 +86,7 @@ void destruct_elements(Array_Base::Rep* rep, std::size_t pos, std::size_t count)
 void drop(Array_Base::Rep* rep)
 {
     destruct_elements(rep, 0, rep->size);
-    std::free(rep);
+    deallocate(rep);
 }
 
 /// A representation in the making: it dies with its elements unless it is taken.
@@ -233,8 +233,10 @@ void Array_Base::take_memory(std::size_t capacity)
     const Array_Traits* traits = _rep->traits;
     if (owns_memory() && moves_as_bytes(traits))
     {
-        _rep = static_cast<Rep*>(reallocate(_rep, block_size(traits, capacity)));
-        _rep->cap = capacity;
+        Rep* moved = make_rep(traits, capacity);
+        moved->size = _rep->size;
+        std::memcpy(moved->elements(), _rep->elements(), _rep->size * traits->element_size);
+        deallocate(std::exchange(_rep, moved));
         return;
     }
     Draft moved(traits, capacity);

@@ -101,7 +101,7 @@ template <class T> bool equal_elements(const void* a, const void* b)
 /// Functions only where bytes are not enough.
 template <class T> constexpr Array_Traits make_array_traits()
 {
-    static_assert(alignof(T) <= alignof(std::max_align_t), "elements lie in memory of malloc");
+    static_assert(alignof(T) <= alignof(void*), "elements lie behind the head of a representation");
     Array_Traits traits{sizeof(T), nullptr, nullptr, nullptr};
     if constexpr (!std::is_trivially_copyable_v<T>)
     {

@@ -159,7 +159,7 @@ constinit Datetime::Rep Datetime::_zero = {2, 0, 0, 0};
 void Datetime::free(Rep* rep) noexcept
 {
     rep->~Rep();
-    std::free(rep);
+    deallocate(rep);
 }
 
 Datetime& Datetime::operator=(const Datetime& other) noexcept

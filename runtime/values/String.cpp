@@ -47,7 +47,7 @@ String::Rep* String::make(std::size_t capacity)
 void String::free(Rep* rep) noexcept
 {
     rep->~Rep();
-    std::free(rep);
+    deallocate(rep);
 }
 
 /// True when the text is private and may grow to `capacity` characters in place.

@@ -1,0 +1,104 @@
+#include "runtime/base/Bulk.h"
+
+#include <atomic>
+#include <new>
+#include <sys/mman.h>
+#include <utility>
+
+namespace cimple
+{
+
+namespace
+{
+
+/// Of a chunk, and what it is aligned to, so that a block tells its chunk: a huge page, which takes the system little
+/// more than a small one does.
+constexpr std::size_t chunk_size = std::size_t{2} << 20;
+
+/// Used of the first chunk, in small pages: few instances shall not take a huge one.
+constexpr std::size_t first_size = std::size_t{256} << 10;
+
+constexpr std::size_t largest_block = 4096;
+
+/// More than the blocks of a chunk: what it counts while blocks are still taken from it.
+constexpr std::int64_t open = std::int64_t{1} << 32;
+
+#ifdef TVR_NO_BULK_MEMORY
+constexpr bool is_used = false;
+#else
+constexpr bool is_used = true;
+#endif
+
+/// Zeroed memory for a chunk, or null.
+char* map_chunk() noexcept
+{
+    void* mapped =
+        mmap(nullptr, 2 * chunk_size, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS | MAP_NORESERVE, -1, 0);
+    if (mapped == MAP_FAILED)
+        return nullptr;
+    auto* const area = static_cast<char*>(mapped);
+    const std::size_t before = -reinterpret_cast<std::uintptr_t>(area) & (chunk_size - 1);
+    if (before != 0)
+        munmap(area, before);
+    munmap(area + before + chunk_size, chunk_size - before);
+    return area + before;
+}
+
+} // namespace
+
+/// The head of a chunk.
+struct Bulk::Chunk
+{
+    std::atomic<std::int64_t> blocks; ///< that are not given back
+
+    static Chunk* of(void* block)
+    {
+        return reinterpret_cast<Chunk*>(reinterpret_cast<std::uintptr_t>(block) & ~(chunk_size - 1));
+    }
+    void count_down(std::int64_t by) noexcept
+    {
+        if (blocks.fetch_sub(by, std::memory_order_acq_rel) == by)
+            munmap(this, chunk_size);
+    }
+};
+
+constinit thread_local Bulk* Bulk::running = nullptr;
+
+Bulk::Bulk() : _outer(std::exchange(running, this)) {}
+
+Bulk::~Bulk()
+{
+    close_chunk();
+    running = _outer;
+}
+
+void Bulk::close_chunk() noexcept
+{
+    if (_chunk)
+        _chunk->count_down(open - _taken);
+    _chunk = nullptr;
+    _next = _end = nullptr;
+    _taken = 0;
+}
+
+void* Bulk::take_from_new_chunk(std::size_t room) noexcept
+{
+    char* const memory = is_used && room <= largest_block ? map_chunk() : nullptr;
+    if (!memory)
+        return nullptr;
+    const std::size_t size = std::exchange(_is_first, false) ? first_size : chunk_size;
+    if (size == chunk_size)
+        madvise(memory, chunk_size, MADV_HUGEPAGE);
+    close_chunk();
+    _chunk = new (memory) Chunk{open};
+    _next = memory + 2 * slot_alignment + slot_alignment;
+    _end = memory + size;
+    return take_block(room);
+}
+
+void Bulk::give_back(void* block) noexcept
+{
+    Chunk::of(block)->count_down(1);
+}
+
+} // namespace cimple
