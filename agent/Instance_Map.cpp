@@ -61,6 +61,15 @@ std::uint64_t hashProperty(std::uint64_t hash, const Instance* instance, const M
     return hashBytes(hash, &slot<char>(instance, property->offset), type_width(property->type));
 }
 
+/// The first class of the chain that has all keys of `mc`, which are properties: what refers to an instance by one of
+/// its superclasses, and the instance's own map, have one hash of them.
+const Meta_Class* ownerOfKeys(const Meta_Class* mc)
+{
+    while (mc->super_meta_class && mc->super_meta_class->num_keys == mc->num_keys)
+        mc = mc->super_meta_class;
+    return mc;
+}
+
 /// Adds the keys of `as`, which is the instance's class or one of its superclasses.
 bool hashKeys(std::uint64_t& hash, const Instance* instance, const Meta_Class* as);
 
@@ -90,8 +99,8 @@ bool hashKey(std::uint64_t& hash, const Instance* instance, const Meta_Feature* 
         return true;
     }
     // Ends of different subclasses can be equal, so only what all of them have is looked at.
-    const auto keys =
-        SharedEnds::keyHash(end, reference->meta_class, [&] { return hashOf(end, reference->meta_class); });
+    const Meta_Class* as = ownerOfKeys(reference->meta_class);
+    const auto keys = SharedEnds::keyHash(end, as, [&] { return hashOf(end, as); });
     hash = mix(hash, keys.value_or(0));
     return keys.has_value();
 }
@@ -101,13 +110,22 @@ bool hashKeys(std::uint64_t& hash, const Instance* instance, const Meta_Class* a
     return all_keys(as, [&](std::size_t index) { return hashKey(hash, instance, features_of(as)[index]); });
 }
 
-/// 32 bits of the instance's keys, those of `as` alone; nothing when they cannot be reduced safely.
-std::optional<std::uint32_t> reduce(const Instance* instance, const Meta_Class* as)
+std::optional<std::uint32_t> folded(std::optional<std::uint64_t> hash)
 {
-    const std::optional<std::uint64_t> hash = hashOf(instance, as);
     if (!hash)
         return std::nullopt;
     return static_cast<std::uint32_t>(*hash ^ (*hash >> 32));
+}
+
+/// 32 bits of the instance's keys, those of `as` alone; nothing when they cannot be reduced safely.
+std::optional<std::uint32_t> reduce(const Instance* instance, const Meta_Class* as)
+{
+    return folded(hashOf(instance, as));
+}
+
+bool refersByKeys(const Meta_Class* mc)
+{
+    return !all_keys(mc, [mc](std::size_t index) { return !as_reference(features_of(mc)[index]); });
 }
 
 /// From so many entries on a map has a table: up to there a pass over the fingerprints is as fast.
@@ -138,11 +156,16 @@ Instance_Map::~Instance_Map()
     clear();
 }
 
-std::optional<Instance_Map::Fingerprint> Instance_Map::fingerprintLocked(const Instance* keys) const
+std::optional<std::uint64_t> Instance_Map::hashLocked(const Instance* keys) const
 {
     if (!_printed || keys->__meta_class != _keyClass)
         return std::nullopt;
-    return reduce(keys, _keyClass);
+    return hashOf(keys, _keyClass);
+}
+
+std::optional<Instance_Map::Fingerprint> Instance_Map::fingerprintLocked(const Instance* keys) const
+{
+    return folded(hashLocked(keys));
 }
 
 std::ptrdiff_t Instance_Map::findLocked(const Instance* keys, std::optional<Fingerprint> print) const
@@ -173,25 +196,29 @@ std::ptrdiff_t Instance_Map::insert(Instance* instance)
     if (!instance)
         return -1;
     Auto_Mutex lock(_lock);
-    if (_entries.size() == 0)
+    if (_entries.empty())
     {
         _printed = true;
         _keyClass = instance->__meta_class;
+        _keysRefer = refersByKeys(_keyClass);
         _roles.clear();
         _table.clear();
     }
-    const std::optional<Fingerprint> print = fingerprintLocked(instance);
+    const std::optional<std::uint64_t> hash = hashLocked(instance);
+    const std::optional<Fingerprint> print = folded(hash);
     if (findLocked(instance, print) != -1)
         return -1;
 
     const std::size_t index = _entries.size();
     reserveOneMore(); // all that may throw: until here the instance is the caller's
-    _entries.append(instance);
+    _entries.push_back(instance);
     if (print)
     {
         _prints.push_back(*print);
         if (!_table.empty())
             enterLocked(index);
+        if (!_keysRefer)
+            SharedEnds::remember(instance, ownerOfKeys(_keyClass), *hash);
     }
     else
     {
@@ -328,7 +355,7 @@ Instance* Instance_Map::remove_at(std::size_t index)
 Instance* Instance_Map::takeLocked(std::size_t index)
 {
     Instance* instance = _entries[index];
-    _entries.remove(index);
+    _entries.erase(_entries.begin() + static_cast<std::ptrdiff_t>(index));
     if (!_table.empty())
         leaveLocked(index);
     if (_printed)
@@ -459,7 +486,7 @@ namespace
 /// What was taken out of a map.
 struct Taken
 {
-    Array<Instance*> entries;
+    std::vector<Instance*> entries;
 
     Taken() = default;
     ~Taken()
@@ -473,7 +500,7 @@ struct Taken
 
 } // namespace
 
-void Instance_Map::takeAll(Array<Instance*>& entries)
+void Instance_Map::takeAll(std::vector<Instance*>& entries)
 {
     Auto_Mutex lock(_lock);
     entries.swap(_entries);

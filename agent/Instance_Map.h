@@ -89,24 +89,26 @@ private:
     };
 
     std::ptrdiff_t findLocked(const Instance* keys, std::optional<Fingerprint> print) const;
+    std::optional<std::uint64_t> hashLocked(const Instance* keys) const;
     std::optional<Fingerprint> fingerprintLocked(const Instance* keys) const;
     Instance* takeLocked(std::size_t index);
     void reserveOneMore();
     void reserveTable();
     void enterLocked(std::size_t index);
     void leaveLocked(std::size_t index);
-    void takeAll(Array<Instance*>& entries);
+    void takeAll(std::vector<Instance*>& entries);
     bool reduceEndsLocked(Role& role) const;
     /// One for each role that may refer to `end`; nothing when fingerprints do not tell.
     std::optional<std::vector<Cursor>> cursorsLocked(const Instance* end) const;
     template <class Use> void eachWithEndLocked(const Instance* end, Use use) const;
 
     mutable Mutex _lock;
-    Array<Instance*> _entries;
+    std::vector<Instance*> _entries;
     std::vector<Fingerprint> _prints;      ///< parallel to _entries while _printed
     std::vector<std::uint32_t> _table;     ///< of a large map: index + 1 by fingerprint, 0 is a free place
     const Meta_Class* _keyClass = nullptr; ///< class of all entries while _printed
     bool _printed = true;
+    bool _keysRefer = false;          ///< there are references among the keys of _keyClass
     mutable std::vector<Role> _roles; ///< while _printed; empty before somebody asks for ends
 };
 

@@ -26,7 +26,8 @@ SharedEnds* SharedEnds::running()
 
 void SharedEnds::remember(const Instance* end, const Meta_Class* as, std::uint64_t hash)
 {
-    _keyHashes[_nextKeyHash++ % _keyHashes.size()] = {Ref<const Instance>(ref(end)), as, hash};
+    if (current)
+        current->placeOf(end) = {Ref<const Instance>(ref(end)), as, hash};
 }
 
 Ref<> SharedEnds::of(const Instance* instance)

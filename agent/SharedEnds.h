@@ -24,21 +24,22 @@ public:
     static Ref<> of(const Instance* instance);
 
     /// What `hash()` gives of the keys that an end has as an instance of the class `as`: a number, or false. The run
-    /// remembers the last few, since an end stands in several associations.
+    /// remembers those of the last ends, since an end stands in several associations.
     template <class Hash>
     static std::optional<std::uint64_t> keyHash(const Instance* end, const Meta_Class* as, Hash hash)
     {
         SharedEnds* run = running();
         if (!run)
             return hash();
-        for (const KeyHash& known : run->_keyHashes)
-            if (known.end.get() == end && known.as == as)
-                return known.hash;
+        if (const KeyHash& known = run->placeOf(end); known.end.get() == end && known.as == as)
+            return known.hash;
         const std::optional<std::uint64_t> made = hash();
         if (made)
-            run->remember(end, as, *made);
+            remember(end, as, *made);
         return made;
     }
+    /// Of an instance that may become an end, and does not change its keys any more.
+    static void remember(const Instance* end, const Meta_Class* as, std::uint64_t hash);
 
 private:
     /// The end is held: another instance at its address would be taken for it.
@@ -50,11 +51,14 @@ private:
     };
 
     static SharedEnds* running();
-    void remember(const Instance* end, const Meta_Class* as, std::uint64_t hash);
+    KeyHash& placeOf(const Instance* end)
+    {
+        const auto address = static_cast<std::uint64_t>(reinterpret_cast<std::uintptr_t>(end));
+        return _keyHashes[address * 0x9E3779B97F4A7C15 >> 58];
+    }
 
     std::unordered_map<const Instance*, Ref<>> _ends; ///< by the instance that each was made of
-    std::array<KeyHash, 8> _keyHashes;
-    std::size_t _nextKeyHash = 0;
+    std::array<KeyHash, 64> _keyHashes;               ///< by the address of the end
     SharedEnds* const _outer;
 };
 
