@@ -6,6 +6,28 @@
 namespace cimple
 {
 
+namespace
+{
+
+// What is empty but has memory gives it back: of the rest bytes are enough.
+
+bool has_zero(Datetime& time)
+{
+    const bool zero = time == Datetime();
+    if (zero)
+        time.clear();
+    return zero;
+}
+
+bool has_nothing(Array_Base& array)
+{
+    if (array.size() == 0)
+        array = Array_Base(array.traits());
+    return array.size() == 0;
+}
+
+} // namespace
+
 Prototype_Base::Prototype_Base(Ref<> model) : _model(std::move(model))
 {
     for (const Meta_Feature* mf : features_of(_model.get()))
@@ -14,13 +36,14 @@ Prototype_Base::Prototype_Base(Ref<> model) : _model(std::move(model))
         switch (slot_kind(mf))
         {
         case Slot_Kind::scalar:
-            if (mp->type == DATETIME)
+            if (mp->type == DATETIME && !has_zero(slot<Datetime>(_model.get(), mp->offset)))
                 _times.push_back(mp);
             else if (mp->type == STRING && !slot<String>(_model.get(), mp->offset).empty())
                 _texts.push_back(mp);
             break;
         case Slot_Kind::array:
-            _arrays.push_back(mp);
+            if (!has_nothing(array_slot(_model.get(), mp->offset)))
+                _arrays.push_back(mp);
             break;
         case Slot_Kind::reference:
         case Slot_Kind::reference_array:
@@ -43,8 +66,7 @@ Instance* Prototype_Base::copy() const
     for (const Meta_Property* mp : _times)
         std::construct_at(&slot<Datetime>(copied.get(), mp->offset), slot<Datetime>(_model.get(), mp->offset));
     for (const Meta_Property* mp : _arrays)
-        if (const Array_Base& elements = array_slot(_model.get(), mp->offset); elements.size() != 0)
-            array_slot(copied.get(), mp->offset) = elements;
+        array_slot(copied.get(), mp->offset) = array_slot(_model.get(), mp->offset);
     return copied.release();
 }
 

@@ -20,8 +20,8 @@ public:
 private:
     Ref<> _model;
     std::vector<const Meta_Property*> _texts;  ///< slots with a text of their own
-    std::vector<const Meta_Property*> _times;  ///< all of them
-    std::vector<const Meta_Property*> _arrays; ///< all of them, since an empty one may have memory
+    std::vector<const Meta_Property*> _times;  ///< that are not zero
+    std::vector<const Meta_Property*> _arrays; ///< with elements
 };
 
 /// The model has no references and no arrays of them, and is not changed any more.
