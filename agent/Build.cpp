@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <cstdarg>
 #include <cstdio>
-#include <memory>
 #include <string>
 
 namespace cimple
@@ -28,13 +27,12 @@ String joinTexts(std::initializer_list<std::string_view> parts)
     std::size_t size = 0;
     for (const std::string_view part : parts)
         size += part.size();
-    char brief[256] = ""; // most texts fit
-    const std::unique_ptr<char[]> more(size > sizeof brief ? new char[size] : nullptr);
-    char* const text = more ? more.get() : brief;
-    char* end = text;
-    for (const std::string_view part : parts)
-        end = std::copy(part.begin(), part.end(), end);
-    return String(text, size);
+    return String(size,
+                  [&parts](char* end)
+                  {
+                      for (const std::string_view part : parts)
+                          end = std::copy(part.begin(), part.end(), end);
+                  });
 }
 
 String formatText(const char* format, ...)

@@ -84,7 +84,9 @@ void bytesRangeToHex(std::span<const std::uint8_t> record, std::size_t first, st
     if (record.size() <= header)
         return;
     const std::span<const std::uint8_t> data = record.subspan(header);
-    for (std::size_t i = first; i < std::min(last, data.size()); ++i)
+    last = std::min(last, data.size());
+    out.reserve(first < last ? out.size() + 2 * (last - first) : 0);
+    for (std::size_t i = first; i < last; ++i)
     {
         const char digits[] = {upperDigits[data[i] >> 4], upperDigits[data[i] & 0xF]};
         out.append(digits, sizeof digits);

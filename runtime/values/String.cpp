@@ -71,6 +71,15 @@ void String::make_room(std::size_t capacity)
         release(std::exchange(_rep, copy_of_text(capacity)));
 }
 
+/// Takes the place of an empty text by one of `size` characters that are not written yet.
+char* String::make_filled(std::size_t size)
+{
+    _rep = make(size);
+    _rep->text()[size] = '\0';
+    _rep->size = size;
+    return _rep->text();
+}
+
 String::String(const char* text) : String(as_view(text)) {}
 
 String::String(const char* text, std::size_t size) : String()

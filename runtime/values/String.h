@@ -3,6 +3,7 @@
 
 #include <atomic>
 #include <compare>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <string>
@@ -26,6 +27,14 @@ public:
     String(const char* text, std::size_t size);
     String(std::string_view text);
     String(const std::string& text);
+    /// Of `size` characters, all of which `fill(characters)` writes.
+    template <class Fill>
+        requires std::invocable<Fill, char*>
+    String(std::size_t size, Fill fill) : String()
+    {
+        if (size != 0)
+            fill(make_filled(size));
+    }
     ~String();
     String& operator=(const String& other) noexcept;
     String& operator=(String&& other) noexcept;
@@ -65,6 +74,7 @@ private:
     bool has_room(std::size_t capacity) const;
     Rep* copy_of_text(std::size_t capacity) const;
     void make_room(std::size_t capacity);
+    char* make_filled(std::size_t size);
 
     Rep* _rep;
 };
