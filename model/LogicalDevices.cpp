@@ -97,7 +97,7 @@ template <class Device> void setCapacity(Device& device, const LogicalUnit& unit
     if (blocks == 0)
         return;
     device.Capacity.set(unit.target.blockLength * blocks);
-    device.CapacityUnit.set("Byte");
+    device.CapacityUnit.set(unit.prototypes.capacityUnit);
 }
 
 template <class Device> void setBlocks(Device& device, const LogicalUnit& unit)

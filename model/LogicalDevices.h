@@ -26,6 +26,7 @@ struct DevicePrototypes
     Prototype<TVRHBA_LogicalDisk> disk;
     Prototype<TVRHBA_SCSIArbitraryLogicalUnit> arbitrary;
     Prototype<TVRHBA_StorageExtent> extent;
+    String capacityUnit = "Byte";
 };
 
 /// A logical unit behind a port, with the texts that its instances share and the ends of its associations. The
