@@ -1,12 +1,13 @@
 // An operation and its floor, measured in turn in one benchmark, and the table that comes of it.
 #pragma once
 
+#include "bench/HeapBytes.h"
+
 #include <benchmark/benchmark.h>
 
 #include <chrono>
 #include <cstddef>
 #include <limits>
-#include <malloc.h>
 #include <string>
 
 namespace bench
@@ -19,13 +20,6 @@ template <class Work> double nanosecondsOf(Work work)
     work();
     const std::chrono::duration<double, std::nano> took = std::chrono::steady_clock::now() - start;
     return took.count();
-}
-
-/// Bytes on the heap that are in use, of all threads.
-inline std::size_t heapBytes()
-{
-    const struct mallinfo2 info = mallinfo2();
-    return info.uordblks + info.hblkhd;
 }
 
 /// What one row of the table says. The figures are those of the best round: other load on the machine makes rounds

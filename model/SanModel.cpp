@@ -39,11 +39,23 @@ Prototype<TVRHBA_SCSIProtocolEndpoint> endpointPrototype(const CIM_ComputerSyste
     return Prototype<TVRHBA_SCSIProtocolEndpoint>(endpoint);
 }
 
+/// What the instances of a unit take, about.
+constexpr std::size_t bytesOfUnit = 2500;
+
+std::size_t unitsOf(const Data& data)
+{
+    std::size_t units = 0;
+    for (const Port* port : data.ports)
+        units += port->getTargetCount();
+    return units;
+}
+
 /// What the units of all ports have in common.
 struct SanContext
 {
     explicit SanContext(HostContext& host)
-        : host(host), system(shared_end(host.system)), endpoint(endpointPrototype(*system)), devices(*system)
+        : host(host), system(shared_end(host.system)), endpoint(endpointPrototype(*system)), devices(*system),
+          bulk(bytesOfUnit * unitsOf(*host.agent.m_pData))
     {}
     HostContext& host;
     Ref<CIM_ComputerSystem> system;

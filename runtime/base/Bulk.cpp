@@ -11,12 +11,11 @@ namespace cimple
 namespace
 {
 
-/// Of a chunk, and what it is aligned to, so that a block tells its chunk: a huge page, which takes the system little
-/// more than a small one does.
+/// Of a chunk, and what it is aligned to, so that a block tells its chunk. That of a huge page.
 constexpr std::size_t chunk_size = std::size_t{2} << 20;
 
-/// Used of the first chunk, in small pages: few instances shall not take a huge one.
-constexpr std::size_t first_size = std::size_t{256} << 10;
+/// From so many bytes on a huge page pays.
+constexpr std::size_t many = std::size_t{512} << 10;
 
 constexpr std::size_t largest_block = 4096;
 
@@ -64,7 +63,7 @@ struct Bulk::Chunk
 
 constinit thread_local Bulk* Bulk::running = nullptr;
 
-Bulk::Bulk() : _outer(std::exchange(running, this)) {}
+Bulk::Bulk(std::size_t expected) : _outer(std::exchange(running, this)), _huge_pages(expected >= many) {}
 
 Bulk::~Bulk()
 {
@@ -86,13 +85,11 @@ void* Bulk::take_from_new_chunk(std::size_t room) noexcept
     char* const memory = is_used && room <= largest_block ? map_chunk() : nullptr;
     if (!memory)
         return nullptr;
-    const std::size_t size = std::exchange(_is_first, false) ? first_size : chunk_size;
-    if (size == chunk_size)
-        madvise(memory, chunk_size, MADV_HUGEPAGE);
+    madvise(memory, chunk_size, _huge_pages ? MADV_HUGEPAGE : MADV_NOHUGEPAGE);
     close_chunk();
     _chunk = new (memory) Chunk{open};
     _next = memory + 2 * slot_alignment + slot_alignment;
-    _end = memory + size;
+    _end = memory + chunk_size;
     return take_block(room);
 }
 

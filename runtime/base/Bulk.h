@@ -15,7 +15,9 @@ namespace cimple
 class Bulk
 {
 public:
-    Bulk();
+    /// `expected` are the bytes of all blocks, about. For many there are huge pages, which take the system little more
+    /// than a small one does, and few shall not take a huge one.
+    explicit Bulk(std::size_t expected);
     ~Bulk();
     Bulk(const Bulk&) = delete;
     Bulk& operator=(const Bulk&) = delete;
@@ -62,7 +64,7 @@ private:
     char* _next = nullptr;
     char* _end = nullptr;
     std::int64_t _taken = 0; ///< blocks of the chunk
-    bool _is_first = true;   ///< no chunk was needed before
+    const bool _huge_pages;
 };
 
 } // namespace cimple
