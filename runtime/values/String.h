@@ -29,8 +29,7 @@ public:
     String(const std::string& text);
     /// Of `size` characters, all of which `fill(characters)` writes.
     template <class Fill>
-        requires std::invocable<Fill, char*>
-    String(std::size_t size, Fill fill) : String()
+    requires std::invocable<Fill, char*> String(std::size_t size, Fill fill) : String()
     {
         if (size != 0)
             fill(make_filled(size));
