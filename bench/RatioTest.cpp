@@ -22,6 +22,7 @@
 #include <fstream>
 #include <limits>
 #include <malloc.h>
+#include <optional>
 #include <set>
 #include <string>
 #include <unistd.h>
@@ -182,7 +183,7 @@ double processorTime()
 struct RefreshTimes
 {
     double total = std::numeric_limits<double>::max(); ///< for each unit
-    double libraries = total;                          ///< of them, inside the simulated libraries
+    double libraries = 0;                              ///< of them, inside the simulated libraries
 };
 
 RefreshTimes refreshOf(std::uint32_t units, int rounds)
@@ -199,26 +200,45 @@ RefreshTimes refreshOf(std::uint32_t units, int rounds)
         const double before = processorTime();
         EXPECT_TRUE(host.enumerate(emptyClass).empty());
         bench::BenchHost::awaitEndOfRefresh();
-        best.total = std::min(best.total, (processorTime() - before) / units);
-        best.libraries = std::min(
-            best.libraries, (static_cast<double>(bench::BenchHost::nanosecondsInLibraries()) - libraries) / units);
+        const double total = (processorTime() - before) / units;
+        if (total < best.total)
+            best = {total, (static_cast<double>(bench::BenchHost::nanosecondsInLibraries()) - libraries) / units};
     }
     return best;
 }
 
+struct RefreshRatios
+{
+    RefreshTimes small = refreshOf(1024, 100);
+    RefreshTimes large = refreshOf(16384, 10);
+
+    double growth() const { return large.total / small.total; }
+    /// The module's own time against that inside the libraries.
+    double own() const { return std::max(ownOf(small), ownOf(large)); }
+
+private:
+    static double ownOf(const RefreshTimes& times) { return times.total / times.libraries - 1; }
+};
+
+/// The bounds hold on an idle machine with room to spare: 0.9 to 1.1 and 1.3 to 1.5. Where the instances came to lie in
+/// memory, and what else runs, moves single measurements by half.
 TEST(Ratio, RefreshOfTheSanIsLinear)
 {
-    const RefreshTimes small = refreshOf(1024, 12);
-    const RefreshTimes large = refreshOf(16384, 3);
-    for (const auto& [name, times] : {std::pair("small", small), std::pair("large", large)})
+    constexpr double mostGrowth = 1.5, mostOwn = 1.5;
+    std::optional<RefreshRatios> ratios;
+    for (int attempt = 0; attempt < 3; attempt++)
+    {
+        ratios.emplace();
+        if (ratios->growth() <= mostGrowth && ratios->own() <= mostOwn)
+            break;
+    }
+    for (const auto& [name, times] : {std::pair("small", ratios->small), std::pair("large", ratios->large)})
     {
         RecordProperty(std::string(name) + "_ns_a_unit", std::to_string(times.total));
         RecordProperty(std::string(name) + "_ns_in_libraries", std::to_string(times.libraries));
     }
-    // 1.3 to 1.9 on the machines that were measured, by what their caches hold; a walk over all units gives 16.
-    EXPECT_LE(large.total, 3 * small.total) << large.total << " ns a unit against " << small.total << " ns";
-    // What this must catch is a walk over all units for each of them, and a copy of each end for each association.
-    EXPECT_LE(small.total - small.libraries, 6 * small.libraries) << "of " << small.total << " ns a unit";
+    EXPECT_LE(ratios->growth(), mostGrowth) << ratios->large.total << " ns a unit against " << ratios->small.total;
+    EXPECT_LE(ratios->own(), mostOwn) << "of " << ratios->small.total << " and " << ratios->large.total << " ns a unit";
 }
 
 struct UnitTimes
