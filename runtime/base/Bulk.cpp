@@ -1,5 +1,6 @@
 #include "runtime/base/Bulk.h"
 
+#include <algorithm>
 #include <atomic>
 #include <new>
 #include <sys/mman.h>
@@ -14,8 +15,8 @@ namespace
 /// Of a chunk, and what it is aligned to, so that a block tells its chunk. That of a huge page.
 constexpr std::size_t chunk_size = std::size_t{2} << 20;
 
-/// From so many bytes on a huge page pays.
-constexpr std::size_t many = std::size_t{512} << 10;
+/// From so many bytes on a huge page pays, although the system clears all of it.
+constexpr std::size_t many = std::size_t{1} << 20;
 
 constexpr std::size_t largest_block = 4096;
 
@@ -43,6 +44,14 @@ char* map_chunk() noexcept
     return area + before;
 }
 
+/// Has the system lay so many bytes of a chunk in memory. Where it does not, they come one page after the other.
+void prepare(char* chunk, std::size_t bytes) noexcept
+{
+    madvise(chunk, chunk_size, bytes >= many ? MADV_HUGEPAGE : MADV_NOHUGEPAGE);
+    if (bytes != 0 && bytes < many)
+        madvise(chunk, bytes, MADV_POPULATE_WRITE);
+}
+
 } // namespace
 
 /// The head of a chunk.
@@ -63,7 +72,7 @@ struct Bulk::Chunk
 
 constinit thread_local Bulk* Bulk::running = nullptr;
 
-Bulk::Bulk(std::size_t expected) : _outer(std::exchange(running, this)), _huge_pages(expected >= many) {}
+Bulk::Bulk(std::size_t expected) : _outer(std::exchange(running, this)), _expected(expected) {}
 
 Bulk::~Bulk()
 {
@@ -85,7 +94,8 @@ void* Bulk::take_from_new_chunk(std::size_t room) noexcept
     char* const memory = is_used && room <= largest_block ? map_chunk() : nullptr;
     if (!memory)
         return nullptr;
-    madvise(memory, chunk_size, _huge_pages ? MADV_HUGEPAGE : MADV_NOHUGEPAGE);
+    prepare(memory, std::min(_expected, chunk_size));
+    _expected -= std::min(_expected, chunk_size);
     close_chunk();
     _chunk = new (memory) Chunk{open};
     _next = memory + 2 * slot_alignment + slot_alignment;

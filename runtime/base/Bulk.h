@@ -15,8 +15,8 @@ namespace cimple
 class Bulk
 {
 public:
-    /// `expected` are the bytes of all blocks, about. For many there are huge pages, which take the system little more
-    /// than a small one does, and few shall not take a huge one.
+    /// `expected` are the bytes of all blocks, about. What fills most of a huge page gets one, for which the system is
+    /// asked once; the rest gets the pages that it needs, for all of which it is asked at once.
     explicit Bulk(std::size_t expected);
     ~Bulk();
     Bulk(const Bulk&) = delete;
@@ -64,7 +64,7 @@ private:
     char* _next = nullptr;
     char* _end = nullptr;
     std::int64_t _taken = 0; ///< blocks of the chunk
-    const bool _huge_pages;
+    std::size_t _expected;   ///< bytes that no chunk was made for
 };
 
 } // namespace cimple
