@@ -9,9 +9,9 @@ namespace cimple
 namespace
 {
 
-// What is empty but has memory gives it back: of the rest bytes are enough.
+// What is empty but has memory gives it back, so that a copy of its bytes is enough. Both tell whether it is empty.
 
-bool has_zero(Datetime& time)
+bool release_if_zero(Datetime& time)
 {
     const bool zero = time == Datetime();
     if (zero)
@@ -19,11 +19,12 @@ bool has_zero(Datetime& time)
     return zero;
 }
 
-bool has_nothing(Array_Base& array)
+bool release_if_empty(Array_Base& array)
 {
-    if (array.size() == 0)
+    const bool empty = array.size() == 0;
+    if (empty)
         array = Array_Base(array.traits());
-    return array.size() == 0;
+    return empty;
 }
 
 } // namespace
@@ -36,13 +37,13 @@ Prototype_Base::Prototype_Base(Ref<> model) : _model(std::move(model))
         switch (slot_kind(mf))
         {
         case Slot_Kind::scalar:
-            if (mp->type == DATETIME && !has_zero(slot<Datetime>(_model.get(), mp->offset)))
+            if (mp->type == DATETIME && !release_if_zero(slot<Datetime>(_model.get(), mp->offset)))
                 _times.push_back(mp);
             else if (mp->type == STRING && !slot<String>(_model.get(), mp->offset).empty())
                 _texts.push_back(mp);
             break;
         case Slot_Kind::array:
-            if (!has_nothing(array_slot(_model.get(), mp->offset)))
+            if (!release_if_empty(array_slot(_model.get(), mp->offset)))
                 _arrays.push_back(mp);
             break;
         case Slot_Kind::reference:
