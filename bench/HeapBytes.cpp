@@ -11,7 +11,8 @@ namespace bench
 namespace
 {
 
-/// Resident bytes of the memory for which somebody has said whether it shall be huge pages: the module alone does.
+/// Resident bytes of the memory for which somebody has said whether it shall be huge pages: the module alone does, as
+/// long as malloc() is not told to.
 std::size_t chunkBytes()
 {
     std::ifstream maps("/proc/self/smaps");

@@ -441,6 +441,7 @@ TEST(Ratio, UnitKeepsAtMostTwiceItsRecordsAndItsText)
     for (const char* className : {volumeClass, "TVRHBA_SCSIProtocolEndpoint"})
         texts += textBytes(host.enumerate(className).back(), counted);
     RecordProperty("kept", std::to_string(kept) + " of " + std::to_string(records) + " and " + std::to_string(texts));
+    EXPECT_GE(kept, records) << "all were counted";
     EXPECT_LE(kept, 2 * records + texts) << kept << " bytes of " << records << " of records and " << texts
                                          << " of text";
 }

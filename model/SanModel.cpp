@@ -64,7 +64,7 @@ struct SanContext
     RepeatedText targetWwpn, targetWwnn, product;
     const Target* lastTarget = nullptr; ///< that an inquiry text was made of
     String inquiry;
-    Bulk bulk; ///< of what the units do not have in common
+    Bulk bulk; ///< of all that is made for the units
 };
 
 /// A port with the initiator endpoint that stands for it.

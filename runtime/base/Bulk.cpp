@@ -18,8 +18,6 @@ constexpr std::size_t chunk_size = std::size_t{2} << 20;
 /// From so many bytes on a huge page pays, although the system clears all of it.
 constexpr std::size_t many = std::size_t{1} << 20;
 
-constexpr std::size_t largest_block = 4096;
-
 /// More than the blocks of a chunk: what it counts while blocks are still taken from it.
 constexpr std::int64_t open = std::int64_t{1} << 32;
 
@@ -91,7 +89,8 @@ void Bulk::close_chunk() noexcept
 
 void* Bulk::take_from_new_chunk(std::size_t room) noexcept
 {
-    char* const memory = is_used && room <= largest_block ? map_chunk() : nullptr;
+    char* const memory = is_used && !_refused ? map_chunk() : nullptr;
+    _refused = !memory;
     if (!memory)
         return nullptr;
     prepare(memory, std::min(_expected, chunk_size));

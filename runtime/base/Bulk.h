@@ -1,6 +1,7 @@
 // Memory for what a thread makes in great numbers.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 
@@ -27,7 +28,7 @@ public:
     static void* take(std::size_t size) noexcept
     {
         Bulk* bulk = running;
-        return bulk ? bulk->take_block(size) : nullptr;
+        return bulk && size <= largest_block ? bulk->take_block(size) : nullptr;
     }
     /// Blocks of chunks lie half way between the addresses that malloc() gives, which are aligned for every plain type.
     static bool has(const void* block)
@@ -35,6 +36,8 @@ public:
         static_assert(alignof(std::max_align_t) == 2 * slot_alignment);
         return (reinterpret_cast<std::uintptr_t>(block) & slot_alignment) != 0;
     }
+    /// What to ask malloc() for: allocators that a server is started with may align less what is smaller.
+    static std::size_t heap_size(std::size_t size) { return std::max(size, alignof(std::max_align_t)); }
     /// Of a block that it has.
     static void give_back(void* block) noexcept;
 
@@ -42,6 +45,7 @@ private:
     struct Chunk;
 
     static constexpr std::size_t slot_alignment = 8;
+    static constexpr std::size_t largest_block = 4096;
 
     void* take_block(std::size_t size) noexcept
     {
@@ -65,6 +69,7 @@ private:
     char* _end = nullptr;
     std::int64_t _taken = 0; ///< blocks of the chunk
     std::size_t _expected;   ///< bytes that no chunk was made for
+    bool _refused = false;   ///< the system gave no chunk: it is asked no more
 };
 
 } // namespace cimple

@@ -7,6 +7,7 @@
 #include <atomic>
 #include <cstddef>
 #include <cstdlib>
+#include <cstring>
 #include <new>
 
 namespace cimple
@@ -26,13 +27,13 @@ inline void* require(void* block)
 inline void* allocate(std::size_t size)
 {
     void* block = Bulk::take(size);
-    return block ? block : detail::require(std::malloc(size));
+    return block ? block : detail::require(std::malloc(Bulk::heap_size(size)));
 }
 
 inline void* allocate_zeroed(std::size_t size)
 {
     void* block = Bulk::take(size);
-    return block ? block : detail::require(std::calloc(1, size));
+    return block ? block : detail::require(std::calloc(1, Bulk::heap_size(size)));
 }
 
 /// Gives back what these have given. Accepts null.
@@ -44,10 +45,15 @@ inline void deallocate(void* block) noexcept
         std::free(block);
 }
 
-/// Of memory that is given back with std::free: at first null. A failure leaves the block as it was.
-inline void* reallocate(void* block, std::size_t size)
+/// Of a block whose first `used` bytes stay; null is none. A failure leaves the block as it was. What comes of null is
+/// given back with std::free.
+inline void* reallocate(void* block, std::size_t used, std::size_t size)
 {
-    return detail::require(std::realloc(block, size));
+    if (!Bulk::has(block))
+        return detail::require(std::realloc(block, size));
+    void* moved = std::memcpy(allocate(size), block, used);
+    deallocate(block);
+    return moved;
 }
 
 /// How often something was left out because memory was missing: what is built of the rest is not all there is.

@@ -131,6 +131,7 @@ public:
     Reference_List(const Reference_List&) = delete;
     Reference_List& operator=(const Reference_List&) = delete;
 
+    void reserve(std::size_t capacity) { _elements.reserve(capacity); }
     void append(Ref<> element)
     {
         _elements.append(element.get());
@@ -138,7 +139,7 @@ public:
     }
     void append_copies(std::span<Instance* const> elements, Copy_Referent copy)
     {
-        _elements.reserve(_elements.size() + elements.size());
+        reserve(_elements.size() + elements.size());
         for (const Instance* element : elements)
             append(Ref<>(copy(element)));
     }

@@ -9,7 +9,7 @@ namespace cimple
 namespace
 {
 
-// What is empty but has memory gives it back, so that a copy of its bytes is enough. Both tell whether it is empty.
+// What is empty but has memory gives it back, so that a copy of its bytes is enough. All tell whether it is empty.
 
 bool release_if_zero(Datetime& time)
 {
@@ -17,6 +17,14 @@ bool release_if_zero(Datetime& time)
     if (zero)
         time.clear();
     return zero;
+}
+
+bool release_if_empty(String& text)
+{
+    const bool empty = text.empty();
+    if (empty)
+        text.clear();
+    return empty;
 }
 
 bool release_if_empty(Array_Base& array)
@@ -37,9 +45,12 @@ Prototype_Base::Prototype_Base(Ref<> model) : _model(std::move(model))
         switch (slot_kind(mf))
         {
         case Slot_Kind::scalar:
-            if (mp->type == DATETIME && !release_if_zero(slot<Datetime>(_model.get(), mp->offset)))
-                _times.push_back(mp);
-            else if (mp->type == STRING && !slot<String>(_model.get(), mp->offset).empty())
+            if (mp->type == DATETIME)
+            {
+                if (!release_if_zero(slot<Datetime>(_model.get(), mp->offset)))
+                    _times.push_back(mp);
+            }
+            else if (mp->type == STRING && !release_if_empty(slot<String>(_model.get(), mp->offset)))
                 _texts.push_back(mp);
             break;
         case Slot_Kind::array:

@@ -246,6 +246,7 @@ Assign_Result store_references(Instance* instance, const Meta_Reference* mr, con
         if (!accepts(mr, target.get()))
             return Assign_Result::wrong_class;
     Reference_List elements;
+    elements.reserve(targets.size());
     for (Ref<>& target : targets)
         elements.append(std::move(target));
     elements.swap(array_slot(instance, mr->offset));

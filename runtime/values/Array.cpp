@@ -233,10 +233,8 @@ void Array_Base::take_memory(std::size_t capacity)
     const Array_Traits* traits = _rep->traits;
     if (owns_memory() && moves_as_bytes(traits))
     {
-        Rep* moved = make_rep(traits, capacity);
-        moved->size = _rep->size;
-        std::memcpy(moved->elements(), _rep->elements(), _rep->size * traits->element_size);
-        deallocate(std::exchange(_rep, moved));
+        _rep = static_cast<Rep*>(reallocate(_rep, block_size(traits, _rep->size), block_size(traits, capacity)));
+        _rep->cap = capacity;
         return;
     }
     Draft moved(traits, capacity);

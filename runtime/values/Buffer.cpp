@@ -46,7 +46,7 @@ bool Buffer::holds(const char* data) const
 
 void Buffer::set_capacity(std::size_t capacity)
 {
-    _data = static_cast<char*>(reallocate(_data, capacity + 1));
+    _data = static_cast<char*>(reallocate(_data, _data ? _size + 1 : 0, capacity + 1));
     _data[_size] = '\0';
     _cap = capacity;
 }

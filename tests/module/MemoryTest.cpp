@@ -116,8 +116,8 @@ std::size_t inProcess(std::size_t (*life)(std::size_t number), std::size_t numbe
     return counted;
 }
 
-/// TVR_REFUSED_ALLOCATION=all refuses each in turn, which takes minutes, and a number that one alone; otherwise some of
-/// each part of the life are.
+/// TVR_REFUSED_ALLOCATION=all refuses each in turn, which takes minutes, and a number that one alone; otherwise the
+/// first few, among which a thread takes what it needs once, and some of each part of the life.
 void refuseInTurn(std::size_t (*life)(std::size_t number))
 {
     const std::string countFile = (std::filesystem::temp_directory_path() / ("tvr-count-" + std::to_string(getpid())));
@@ -125,7 +125,7 @@ void refuseInTurn(std::size_t (*life)(std::size_t number))
     const std::string wanted = std::getenv("TVR_REFUSED_ALLOCATION") ? std::getenv("TVR_REFUSED_ALLOCATION") : "";
     const std::size_t only = std::strtoul(wanted.c_str(), nullptr, 10);
     const std::size_t step = wanted == "all" ? 1 : all / 40 + 1;
-    for (std::size_t number = only ? only : 1; number <= (only ? only : all); number += step)
+    for (std::size_t number = only ? only : 1; number <= (only ? only : all); number += number < 4 ? 1 : step)
         inProcess(life, number, countFile);
     std::filesystem::remove(countFile);
 }

@@ -12,6 +12,9 @@
 #include <malloc.h>
 #include <new>
 #include <stdexcept>
+#include <sys/mman.h>
+#include <sys/syscall.h>
+#include <unistd.h>
 
 #if !TVR_SANITIZED
 extern "C" void* __libc_malloc(std::size_t size);
@@ -40,6 +43,7 @@ struct Image
 Image module;
 Image cppLibrary;
 Image cLibrary;
+Image loader;
 Image self;
 std::atomic<std::size_t> counted{0};
 std::atomic<std::size_t> refused{0};
@@ -73,31 +77,42 @@ Image imageOf(const void* address)
     return search.found;
 }
 
+/// What works for its caller. The loader does so for the memory of a thread.
+bool isLibrary(const void* address)
+{
+    return cppLibrary.has(address) || cLibrary.has(address) || loader.has(address);
+}
+
 /// The first on the stack that is neither an allocator nor a library that works for its caller.
 bool moduleAsks(const void* caller)
 {
     if (module.has(caller))
         return true;
-    if (!cppLibrary.has(caller) && !cLibrary.has(caller))
+    if (!isLibrary(caller))
         return false;
     void* frames[24];
     const int count = backtrace(frames, 24);
     int i = 0;
     while (i < count && self.has(frames[i])) // of this file
         i++;
-    while (i < count && (cppLibrary.has(frames[i]) || cLibrary.has(frames[i])))
+    while (i < count && isLibrary(frames[i]))
         i++;
     return i < count && module.has(frames[i]);
 }
 
-bool isRefused(const void* caller)
+bool isCounted(const void* caller)
 {
     if (!counting.load(std::memory_order_relaxed) || looking)
         return false;
     looking = true; // backtrace may allocate
     const bool asks = moduleAsks(caller);
     looking = false;
-    return asks && ++counted == refused;
+    return asks;
+}
+
+bool isRefused(const void* caller)
+{
+    return isCounted(caller) && ++counted == refused;
 }
 
 } // namespace
@@ -111,6 +126,7 @@ void refuseAllocation(std::size_t number)
     dlclose(library);
     cppLibrary = imageOf(dlsym(RTLD_DEFAULT, "__cxa_throw"));
     cLibrary = imageOf(dlsym(RTLD_DEFAULT, "fopen"));
+    loader = imageOf(dlsym(RTLD_DEFAULT, "__tls_get_addr"));
     self = imageOf(reinterpret_cast<const void*>(&refuseAllocation));
     void* frame;
     backtrace(&frame, 1); // loads what it needs
@@ -194,6 +210,15 @@ extern "C" __attribute__((visibility("default"))) void* realloc(void* block, std
     if (module_test::isRefused(__builtin_return_address(0)))
         return errno = ENOMEM, nullptr;
     return __libc_realloc(block, size);
+}
+
+/// Chunks for many blocks: without them each block is an allocation of its own, and is counted.
+extern "C" __attribute__((visibility("default"))) void* mmap(void* at, std::size_t size, int access, int flags,
+                                                             int file, off_t offset) noexcept
+{
+    if (module_test::isCounted(__builtin_return_address(0)))
+        return errno = ENOMEM, MAP_FAILED;
+    return reinterpret_cast<void*>(syscall(SYS_mmap, at, size, access, flags, file, offset));
 }
 
 #endif

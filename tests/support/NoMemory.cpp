@@ -5,6 +5,7 @@
 #include <atomic>
 #include <cerrno>
 #include <pthread.h>
+#include <sys/mman.h>
 
 namespace
 {
@@ -15,6 +16,13 @@ std::atomic<std::ptrdiff_t> live{0};
 bool isRefused()
 {
     return current && current->refusesNext();
+}
+
+bool isRefused(std::size_t size)
+{
+    if (current)
+        current->noteSize(size);
+    return isRefused();
 }
 
 void* noBlock()
@@ -72,6 +80,7 @@ extern "C"
     void* __libc_realloc(void* block, std::size_t size);
 #endif
     void __real_free(void* block);
+    void* __real_mmap(void* at, std::size_t size, int access, int flags, int file, off_t offset);
     int __real_pthread_setspecific(pthread_key_t key, const void* value);
     int __real_pthread_create(pthread_t* thread, const pthread_attr_t* attributes, void* (*proc)(void*), void* arg);
 }
@@ -91,12 +100,12 @@ constexpr auto ownRealloc = __libc_realloc;
 
 void* takeBlock(std::size_t size)
 {
-    return isRefused() ? noBlock() : ownMalloc(size);
+    return isRefused(size) ? noBlock() : ownMalloc(size);
 }
 
 void* takeZeroes(std::size_t count, std::size_t size)
 {
-    return isRefused() ? noBlock() : ownCalloc(count, size);
+    return isRefused(count * size) ? noBlock() : ownCalloc(count, size);
 }
 
 void* moveBlock(void* block, std::size_t size)
@@ -125,6 +134,10 @@ extern "C"
     {
         live -= block != nullptr;
         __real_free(block);
+    }
+    void* __wrap_mmap(void* at, std::size_t size, int access, int flags, int file, off_t offset)
+    {
+        return isRefused() ? (noBlock(), MAP_FAILED) : __real_mmap(at, size, access, flags, file, offset);
     }
     int __wrap_pthread_setspecific(pthread_key_t key, const void* value)
     {

@@ -1,11 +1,16 @@
 // Blocks of a chunk, and when the chunk goes back to the system.
 #include "runtime/base/Bulk.h"
 #include "runtime/base/Memory.h"
+#include "tests/support/NoMemory.h"
+#include "tests/support/Sanitized.h"
 #include "tests/unit/runtime/Records.h"
 
 #include <gtest/gtest.h>
 
+#include <cstddef>
 #include <cstring>
+#include <limits>
+#include <new>
 #include <string>
 #include <sys/mman.h>
 #include <thread>
@@ -42,7 +47,7 @@ class BulkOf : public testing::TestWithParam<std::size_t>
 
 TEST_P(BulkOf, GivesEachChunkBackWithTheLastOfItsBlocks)
 {
-    constexpr std::size_t count = 40'000, size = 100; // two chunks
+    constexpr std::size_t count = 40'000, size = 100; // three chunks
     std::vector<char*> blocks;
     {
         const Bulk bulk(GetParam());
@@ -92,6 +97,8 @@ TEST_P(BulkOf, HasWhatAnInstanceIsMadeOf)
 TEST_P(BulkOf, LeavesToTheHeapWhatIsLargeOrOfAnotherThread)
 {
     const Bulk bulk(GetParam());
+    void* small = allocate(16);
+    EXPECT_TRUE(Bulk::has(small));
     void* large = allocate(1 << 16);
     EXPECT_FALSE(Bulk::has(large));
     deallocate(large);
@@ -105,15 +112,79 @@ TEST_P(BulkOf, LeavesToTheHeapWhatIsLargeOrOfAnotherThread)
         .join();
     {
         const Bulk inner(0);
-        deallocate(allocate(16));
+        void* inners = allocate(16);
+        EXPECT_TRUE(Bulk::has(inners));
+        deallocate(inners);
     }
     void* again = allocate_zeroed(64);
     EXPECT_TRUE(Bulk::has(again));
     EXPECT_EQ(std::string(static_cast<char*>(again), 64), std::string(64, '\0'));
     deallocate(again);
+    deallocate(small);
+}
+
+TEST_P(BulkOf, LeavesToTheHeapWhatItGetsNoChunkFor)
+{
+    const Bulk bulk(GetParam());
+    void* block;
+    {
+        const test_support::NoMemory memory(0, 1);
+        block = allocate(16);
+        EXPECT_EQ(memory.refused(), 1u) << "the chunk";
+    }
+    EXPECT_FALSE(Bulk::has(block));
+    {
+        const test_support::NoMemory memory;
+        EXPECT_THROW(allocate(16), std::bad_alloc);
+        EXPECT_EQ(memory.refused(), 1u) << "the system is asked for no other chunk";
+    }
+    deallocate(block);
+}
+
+TEST_P(BulkOf, ArraysGrowOutOfIt)
+{
+    constexpr std::uint32_t count = 5'000; // more than a block
+    const Bulk bulk(GetParam());
+    Array<uint32> numbers;
+    Array<String> texts;
+    for (std::uint32_t i = 0; i < count; i++)
+    {
+        numbers.append(i);
+        texts.append(String(std::to_string(i).c_str()));
+    }
+    for (std::uint32_t i = 0; i < count; i++)
+    {
+        ASSERT_EQ(numbers[i], i);
+        ASSERT_EQ(texts[i], std::to_string(i).c_str());
+    }
+}
+
+TEST_P(BulkOf, RefusesWhatNoMemoryIsAsLargeAs)
+{
+    if (TVR_SANITIZED)
+        GTEST_SKIP() << "the sanitizer's allocator ends the process";
+    const Bulk bulk(GetParam());
+    Array<std::uint8_t> bytes;
+    bytes.append(1);
+    constexpr std::size_t head = 3 * sizeof(void*);
+    EXPECT_THROW(bytes.reserve(std::numeric_limits<std::size_t>::max() - head), std::bad_alloc);
+    bytes.append(2);
+    EXPECT_EQ(bytes.size(), 2u);
 }
 
 INSTANTIATE_TEST_SUITE_P(Expecting, BulkOf, testing::Values(0, 10'000'000));
+
+/// jemalloc and its like give any address that eight divides for eight bytes and less.
+TEST(BulkAndHeap, AreNotMistakenForEachOtherWhateverTheAllocator)
+{
+    for (const std::size_t size : {0, 1, 8, 15, 16, 24})
+    {
+        const test_support::NoMemory counting(std::numeric_limits<std::size_t>::max());
+        deallocate(allocate(size));
+        deallocate(allocate_zeroed(size));
+        EXPECT_GE(counting.leastAsked(), alignof(std::max_align_t)) << size;
+    }
+}
 
 } // namespace
 } // namespace cimple

@@ -105,6 +105,7 @@ TEST(InstanceLife, CopiesOfAPrototypeAreClonesOfTheirOwn)
     model->OtherIdentifyingInfo.set({"a", "b"});
     model->IdentifyingDescriptions.set({"c"});
     model->IdentifyingDescriptions.value.clear(); // with memory of its own
+    model->Caption.value.reserve(100);            // the same
     const Prototype<TVRHBA_TapeDrive> prototype(model);
     const Ref<TVRHBA_TapeDrive> first = prototype.copy();
     const Ref<TVRHBA_TapeDrive> second = prototype.copy();
@@ -113,6 +114,7 @@ TEST(InstanceLife, CopiesOfAPrototypeAreClonesOfTheirOwn)
     first->OperationalStatus.value.append(3);
     first->IdentifyingDescriptions.value.append("d");
     first->Name.set("another");
+    first->Caption.value.append("e", 1);
     EXPECT_TRUE(identical(second.get(), model.get()));
     EXPECT_EQ(second->Name.value.shares_count(), 2u) << "the model's and the copy's";
 }
