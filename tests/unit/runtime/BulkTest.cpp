@@ -145,7 +145,7 @@ TEST_P(BulkOf, ArraysGrowOutOfIt)
 {
     constexpr std::uint32_t count = 5'000; // more than a block
     const Bulk bulk(GetParam());
-    Array<uint32> numbers;
+    Array<std::uint32_t> numbers;
     Array<String> texts;
     for (std::uint32_t i = 0; i < count; i++)
     {
