@@ -1,7 +1,8 @@
 // The figures that must hold on any machine: each is a ratio of two measured in the same run, best of several rounds.
 #include "bench/HostAndFloor.h"
 #include "bench/Workloads.h"
-#include "broker/cimxml/Server.h"
+#include "broker/cimxml/Port.h"
+#include "broker/http/Server.h"
 #include "device/Target.h"
 #include "logs/NewestLines.h"
 #include "schema/TVRHBA_Card.h"
@@ -331,7 +332,7 @@ TEST(Ratio, PortCostsAtMostThreeTimesTheBrokerAndKeepsNoResult)
     };
     const double inProcess = cost([&] { keep(host.enumerate(volumeClass).size()); });
 
-    cimxml::Server server(host.broker(), {.port = 0});
+    http::Server server(cimxml::site(host.broker()), {.port = 0});
     std::size_t bytes = 0;
     const auto overThePort = [&]
     {

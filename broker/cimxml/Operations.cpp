@@ -507,15 +507,16 @@ struct Row
     std::string_view name;
     void (*carryOut)(Operation&);
     bool hasResult = true; ///< an IRETURNVALUE, be it empty, around what it writes
+    bool changes = false;
 };
 
 constexpr Row rows[] = {
     {"EnumerateInstances", writeEach<askInstances, writeNamed>},
     {"EnumerateInstanceNames", writeEach<askInstanceNames, writeName>},
     {"GetInstance", getInstance},
-    {"CreateInstance", createInstance},
-    {"ModifyInstance", modifyInstance, false},
-    {"DeleteInstance", deleteInstance, false},
+    {"CreateInstance", createInstance, true, true},
+    {"ModifyInstance", modifyInstance, false, true},
+    {"DeleteInstance", deleteInstance, false, true},
     {"Associators", writeEach<askAssociators, writeWithPath<objectWithPath>>},
     {"AssociatorNames", writeEach<askAssociatorNames, writeObjectPath>},
     {"References", writeEach<askReferences, writeWithPath<objectWithPath>>},
@@ -524,7 +525,7 @@ constexpr Row rows[] = {
     {"EnumerateClasses", enumerateClasses},
     {"EnumerateClassNames", enumerateClassNames},
     {"GetProperty", getProperty},
-    {"SetProperty", setProperty, false},
+    {"SetProperty", setProperty, false, true},
     {"GetQualifier", getQualifier},
     {"EnumerateQualifiers", enumerateQualifiers},
     {"OpenEnumerateInstances", openObjects<askInstances>, false},
@@ -538,13 +539,20 @@ constexpr Row rows[] = {
     {"CloseEnumeration", closeEnumeration, false},
 };
 
-void carryOutIntrinsic(Operation& operation)
+void expectRight(bool mayChange)
+{
+    if (!mayChange)
+        throw CimFailure{CMPI_RC_ERR_ACCESS_DENIED, "who asks may only read"};
+}
+
+void carryOutIntrinsic(Operation& operation, bool mayChange)
 {
     const auto* row =
         std::ranges::find_if(rows, [&](const Row& known) { return sameName(known.name, operation.request().name); });
     if (row == std::end(rows))
         throw CimFailure{CMPI_RC_ERR_NOT_SUPPORTED,
                          "the operation '" + operation.request().name + "' is not supported"};
+    expectRight(mayChange || !row->changes);
     std::optional<XmlElement> result;
     if (row->hasResult)
         result.emplace(operation.xml, "IRETURNVALUE");
@@ -585,8 +593,9 @@ void writeReply(XmlText& xml, const MethodReply& reply)
         }
 }
 
-void carryOutExtrinsic(Operation& operation)
+void carryOutExtrinsic(Operation& operation, bool mayChange)
 {
+    expectRight(mayChange);
     const Request& request = operation.request();
     const Path path = operation.decoder().path(firstElement(request.call));
     expect(operation.broker.findClass(path.nameSpace, path.className));
@@ -601,7 +610,7 @@ void carryOutExtrinsic(Operation& operation)
 
 } // namespace
 
-bool answer(Broker& broker, Pulls& pulls, const Message& message, const Output& output)
+bool answer(Broker& broker, Pulls& pulls, const Message& message, const Output& output, bool mayChange)
 {
     const Request& request = message.request;
     ResponseText response(request, output);
@@ -609,7 +618,7 @@ bool answer(Broker& broker, Pulls& pulls, const Message& message, const Output& 
     {
         Operation operation(broker, pulls, request, response);
         expect(broker.findNameSpace(request.nameSpace));
-        request.extrinsic ? carryOutExtrinsic(operation) : carryOutIntrinsic(operation);
+        request.extrinsic ? carryOutExtrinsic(operation, mayChange) : carryOutIntrinsic(operation, mayChange);
         return response.finish();
     }
     catch (const CimFailure& error)

@@ -83,6 +83,7 @@ struct Session
     std::string nameSpace;
     Format format;
     std::ostream& out;
+    bool simulated = true;            ///< no real adapter is behind it
     bool colour = false;              ///< what is wrong may be in colour
     std::ostream* progress = nullptr; ///< a terminal that shows what is at work
     std::ostream* steps = nullptr;    ///< where there is no terminal: gets long work line by line

@@ -1,7 +1,8 @@
 #include "broker/tvrcim/ServeCommand.h"
 
+#include "broker/cimxml/Port.h"
 #include "broker/cimxml/SelfDescription.h"
-#include "broker/cimxml/Server.h"
+#include "broker/http/Server.h"
 #include "broker/tvrcim/SignalEnd.h"
 
 #include <charconv>
@@ -15,7 +16,7 @@ namespace
 {
 
 /// "address:port", of which either part may be missing; an address of IPv6 stands in brackets.
-void readListen(cimxml::ServerOptions& options, const std::string& text)
+void readListen(http::ServerOptions& options, const std::string& text)
 {
     const std::size_t mark = text.rfind(':');
     const bool hasPort = mark != text.npos && text.find(']', mark) == text.npos;
@@ -33,9 +34,10 @@ void readListen(cimxml::ServerOptions& options, const std::string& text)
         throw UsageError("--listen: '" + text.substr(mark + 1) + "' is no port");
 }
 
-cimxml::ServerOptions optionsOf(const Command& command)
+http::ServerOptions optionsOf(const Session& session, const Command& command)
 {
-    cimxml::ServerOptions options;
+    http::ServerOptions options;
+    options.changesWithoutUsers = session.simulated;
     readListen(options, command.listen);
     options.patience = std::chrono::seconds(command.patience);
     if (command.tls.size() == 2)
@@ -44,10 +46,16 @@ cimxml::ServerOptions optionsOf(const Command& command)
         options.key = command.tls[1];
     }
     if (!command.users.empty())
-        options.users = cimxml::Users(command.users);
+        options.users = http::Users(command.users);
     if (options.users.readByOthers())
         std::cerr << "tvrcim: warning: others may read the users' file '" << command.users << "'\n";
     return options;
+}
+
+/// What is at a path of its own comes before what takes all paths.
+http::Site sitesOf(Session& session)
+{
+    return cimxml::site(session.broker);
 }
 
 } // namespace
@@ -55,10 +63,10 @@ cimxml::ServerOptions optionsOf(const Command& command)
 void serve(Session& session, const Command& command)
 {
     using namespace std::chrono_literals;
-    const cimxml::ServerOptions options = optionsOf(command);
+    const http::ServerOptions options = optionsOf(session, command);
     cimxml::describePort(session.broker);
     const Interruptible interruptible(session.signals);
-    const cimxml::Server server(session.broker, options);
+    const http::Server server(sitesOf(session), options);
     const bool bracketed = options.address.find(':') != std::string::npos;
     session.out << "listening on " << (options.certificate.empty() ? "http" : "https") << "://"
                 << (bracketed ? "[" + options.address + "]" : options.address) << ':' << server.port() << std::endl;

@@ -101,7 +101,7 @@ int run(const Settings& settings)
     const UnloadedBySignal entrusted(signals, broker);
     if (!settings.platform.empty())
         broker::loadPlatformFile(broker.store(), broker.classes(), settings.platform);
-    Session session{broker, settings.nameSpace, settings.format, std::cout, wantsColour()};
+    Session session{broker, settings.nameSpace, settings.format, std::cout, !settings.hardware, wantsColour()};
     session.signals = &signals;
     showWork(session);
     int exitCode = runAndReport(session, settings.command, signals);

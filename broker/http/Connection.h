@@ -3,7 +3,7 @@
 // client: providers work for one client at a time, and the others would wait with them.
 #pragma once
 
-#include "broker/cimxml/Spool.h"
+#include "broker/http/Spool.h"
 
 #include <httplib.h>
 
@@ -12,7 +12,7 @@
 #include <chrono>
 #include <memory>
 
-namespace cimxml
+namespace http
 {
 
 class Connection : public httplib::Stream
@@ -100,4 +100,4 @@ private:
     bool _broken = false; ///< nor written
 };
 
-} // namespace cimxml
+} // namespace http

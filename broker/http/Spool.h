@@ -5,7 +5,7 @@
 #include <memory>
 #include <string_view>
 
-namespace cimxml
+namespace http
 {
 
 /// A queue of bytes. All spools together hold so many at the most; one that nothing goes into has no file.
@@ -32,4 +32,4 @@ private:
     std::size_t _head = 0, _tail = 0;
 };
 
-} // namespace cimxml
+} // namespace http

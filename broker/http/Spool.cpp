@@ -1,11 +1,11 @@
-#include "broker/cimxml/Spool.h"
+#include "broker/http/Spool.h"
 
 #include <algorithm>
 #include <atomic>
 #include <cstdio>
 #include <unistd.h>
 
-namespace cimxml
+namespace http
 {
 
 namespace
@@ -76,4 +76,4 @@ void Spool::drop(std::size_t bytes)
     _file.reset();
 }
 
-} // namespace cimxml
+} // namespace http

@@ -1,9 +1,9 @@
-#include "broker/cimxml/Users.h"
+#include "broker/http/Users.h"
 
 #include "broker/values/PathText.h"
 
+#include <algorithm>
 #include <fstream>
-#include <optional>
 #include <stdexcept>
 
 #include <crypt.h>
@@ -11,7 +11,7 @@
 #include <openssl/evp.h>
 #include <sys/stat.h>
 
-namespace cimxml
+namespace http
 {
 
 namespace
@@ -56,31 +56,37 @@ Users::Users(const std::string& file)
     for (std::string line; std::getline(stream, line);)
     {
         number++;
+        if (line.ends_with('\r'))
+            line.pop_back();
         if (line.empty() || line.front() == '#')
             continue;
-        const std::size_t mark = line.find(':');
-        if (mark == 0 || mark == line.npos || mark + 1 == line.size())
-            throw std::runtime_error(file + ":" + std::to_string(number) + ": a line is written name:hash");
-        _hashes[line.substr(0, mark)] = line.substr(mark + 1);
+        const std::size_t name = line.find(':'), hash = std::min(line.find(':', name + 1), line.size());
+        const std::string_view mark = std::string_view(line).substr(hash);
+        if (name == 0 || name == line.npos || name + 1 == hash || !(mark.empty() || mark == ":reader"))
+            throw std::runtime_error(file + ":" + std::to_string(number) +
+                                     ": a line is written name:hash or name:hash:reader");
+        _entries[line.substr(0, name)] = {line.substr(name + 1, hash - name - 1), mark.empty()};
     }
-    if (_hashes.empty())
+    if (_entries.empty())
         throw std::runtime_error("there is no user in '" + file + "'");
 }
 
-bool Users::admit(std::string_view authorization) const
+std::optional<User> Users::admit(std::string_view authorization) const
 {
     constexpr std::string_view scheme = "Basic ";
     if (authorization.size() < scheme.size() || !broker::sameName(authorization.substr(0, scheme.size()), scheme))
-        return false;
+        return std::nullopt;
     const std::optional<std::string> pair = fromBase64(authorization.substr(scheme.size()));
     const std::size_t mark = pair ? pair->find(':') : std::string::npos;
     if (mark == std::string::npos || pair->find('\0') != pair->npos)
-        return false;
+        return std::nullopt;
     // A name that nobody has takes as long as one that somebody has.
     static const std::string nobody = "$6$nobody$";
-    const auto known = _hashes.find(std::string_view(*pair).substr(0, mark));
-    const bool same = isHashOf(pair->substr(mark + 1), known == _hashes.end() ? nobody : known->second);
-    return same && known != _hashes.end();
+    const auto known = _entries.find(std::string_view(*pair).substr(0, mark));
+    const bool same = isHashOf(pair->substr(mark + 1), known == _entries.end() ? nobody : known->second.hash);
+    if (!same || known == _entries.end())
+        return std::nullopt;
+    return User{known->first, known->second.mayChange};
 }
 
-} // namespace cimxml
+} // namespace http

@@ -1,14 +1,14 @@
-// The CIM-XML port: operations over HTTP (DSP0200).
+// A port over HTTP or HTTPS, for CIM clients, browsers and programs.
 #pragma once
 
-#include "broker/cimxml/Users.h"
-#include "broker/core/Broker.h"
+#include "broker/http/Site.h"
+#include "broker/http/Users.h"
 
 #include <chrono>
 #include <memory>
 #include <string>
 
-namespace cimxml
+namespace http
 {
 
 struct ServerOptions
@@ -18,16 +18,17 @@ struct ServerOptions
     std::string certificate = {}; ///< file in PEM; empty for HTTP
     std::string key = {};
     Users users = {};
+    bool changesWithoutUsers = false;                              ///< of CIM clients, where there are no users
     std::chrono::milliseconds patience = std::chrono::seconds(10); ///< with a client who stands still
     std::chrono::milliseconds silence = std::chrono::seconds(5);   ///< between two requests of a connection
 };
 
-/// Answers from the time it is made, on threads of its own, until it is destroyed. The broker outlives it.
+/// Answers from the time it is made, on threads of its own, until it is destroyed.
 class Server
 {
 public:
     /// Throws std::runtime_error where it cannot listen, or would do so for other hosts without users and TLS.
-    Server(broker::Broker& broker, const ServerOptions& options);
+    Server(Site site, const ServerOptions& options);
     ~Server();
     Server(const Server&) = delete;
     Server& operator=(const Server&) = delete;
@@ -39,4 +40,4 @@ private:
     std::unique_ptr<Listener> _listener;
 };
 
-} // namespace cimxml
+} // namespace http

@@ -1,4 +1,4 @@
-#include "broker/cimxml/Connection.h"
+#include "broker/http/Connection.h"
 
 #include <openssl/err.h>
 #include <openssl/ssl.h>
@@ -12,7 +12,7 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
-namespace cimxml
+namespace http
 {
 
 namespace
@@ -294,4 +294,4 @@ void Connection::get_local_ip_and_port(std::string& address, int& port) const
     readName(getsockname, _socket, address, port);
 }
 
-} // namespace cimxml
+} // namespace http

@@ -1,0 +1,224 @@
+#include "broker/http/Server.h"
+
+#include "broker/http/Admission.h"
+#include "broker/http/Connection.h"
+#include "broker/http/Memory.h"
+#include "broker/values/Json.h"
+
+#include <nlohmann/json.hpp>
+
+#include <atomic>
+#include <semaphore>
+#include <stdexcept>
+#include <sys/socket.h>
+#include <thread>
+#include <type_traits>
+
+namespace http
+{
+
+namespace
+{
+
+constexpr std::ptrdiff_t mostLarge = 4;      ///< larger bodies at once: read, they are many times as large
+constexpr std::size_t mostConnections = 256; ///< each has a thread while it is open
+constexpr int mostRequests = 100;            ///< of one connection
+constexpr int waitingConnections = 512;      ///< that are not accepted yet
+
+void expectSafe(const ServerOptions& options)
+{
+    if (isOfThisHost(options.address))
+        return;
+    if (options.users.empty() || options.certificate.empty())
+        throw std::runtime_error("other hosts are served with users and TLS alone");
+}
+
+/// What was found of the request that this thread serves.
+thread_local Admitted found;
+
+/// The library's server, of HTTP or HTTPS, on connections that are ours.
+template <class Base> class Listening : public Base
+{
+public:
+    template <class... Files>
+    explicit Listening(const Connection::Limits& limits, Files... files) : Base(files...), _limits(limits)
+    {}
+
+    void widenQueue() { ::listen(this->svr_sock_, waitingConnections); }
+
+private:
+    SSL_CTX* tls() const
+    {
+        if constexpr (std::is_same_v<Base, httplib::SSLServer>)
+            return this->ssl_context();
+        else
+            return nullptr;
+    }
+
+    bool process_and_close_socket(socket_t socket) override
+    {
+        Connection connection(socket, tls(), _limits);
+        bool goesOn = connection.shakeHands();
+        for (int left = mostRequests; goesOn && left > 0 && connection.awaitRequest(); left--)
+        {
+            bool closes = false;
+            found = {};
+            goesOn = this->process_request(connection, left == 1, closes, nullptr);
+            goesOn = connection.finishRequest() && goesOn && !closes;
+            giveBackMemory(connection.received());
+        }
+        return goesOn;
+    }
+
+    const Connection::Limits _limits;
+};
+
+using Plain = Listening<httplib::Server>;
+using Secure = Listening<httplib::SSLServer>;
+
+std::unique_ptr<httplib::Server> makeServer(const ServerOptions& options, const Connection::Limits& limits)
+{
+    if (options.certificate.empty())
+        return std::make_unique<Plain>(limits);
+    auto server = std::make_unique<Secure>(limits, options.certificate.c_str(), options.key.c_str());
+    if (!server->is_valid())
+        throw std::runtime_error("cannot use the certificate '" + options.certificate + "' with its key");
+    return server;
+}
+
+/// A port that another process listens on is in use, however it listens; one that a process left can be taken at once.
+void takeNoSharedPort(socket_t socket)
+{
+    const int yes = 1;
+    setsockopt(socket, SOL_SOCKET, SO_REUSEADDR, &yes, sizeof yes);
+}
+
+/// The body of a request that is refused by its head is unread, and would be taken for the next request.
+void closeBehind(httplib::Response& response)
+{
+    response.set_header("Connection", "close");
+    Connection::current().endBehindResponse();
+}
+
+void tell(httplib::Response& response, int status, const std::string& reason)
+{
+    response.status = status;
+    response.set_content(broker::jsonText({{"error", {{"kind", "refused"}, {"text", reason}}}}), "application/json");
+}
+
+/// What the library refuses by itself is not answered by a route.
+void endBehindError(const httplib::Request&, httplib::Response& response)
+{
+    if (!found.route)
+        closeBehind(response);
+}
+
+void endBehindException(const httplib::Request&, httplib::Response& response, std::exception_ptr)
+{
+    tell(response, 500, "the answer could not be made");
+}
+
+void setUp(httplib::Server& server)
+{
+    server.new_task_queue = [] { return new httplib::ThreadPool(mostConnections); };
+    server.set_payload_max_length(largestBody);
+    server.set_keep_alive_max_count(mostRequests); // clients are told
+    server.set_error_handler(httplib::Server::Handler(endBehindError));
+    server.set_exception_handler(endBehindException);
+    server.set_socket_options(takeNoSharedPort);
+}
+
+} // namespace
+
+struct Server::Listener
+{
+    Listener(Site routes, const ServerOptions& options)
+        : site(std::move(routes)), house{.users = options.users,
+                                         .scheme = options.certificate.empty() ? "http" : "https",
+                                         .ofThisHost = isOfThisHost(options.address),
+                                         .changesWithoutUsers = options.changesWithoutUsers,
+                                         .token = makeToken()},
+          server(makeServer(options, {options.patience, options.silence, largestBody + smallBody, ending}))
+    {
+        setUp(*server);
+        server->set_pre_routing_handler([this](const httplib::Request& request, httplib::Response& response)
+                                        { return receive(request, response); });
+        const auto answer = [](const httplib::Request& request, httplib::Response& response)
+        { found.route->answer(request, response, found.caller); };
+        server->Get(".*", answer);
+        server->Post(".*", answer);
+        port = options.port == 0                                     ? server->bind_to_any_port(options.address)
+               : server->bind_to_port(options.address, options.port) ? options.port
+                                                                     : -1;
+        if (port < 0)
+            throw std::runtime_error("cannot listen on " + options.address + ":" + std::to_string(options.port));
+        if (auto* secure = dynamic_cast<Secure*>(server.get()))
+            secure->widenQueue();
+        else
+            dynamic_cast<Plain&>(*server).widenQueue();
+        thread = std::thread(
+            [this]
+            {
+                server->listen_after_bind();
+                ended = true;
+            });
+        while (!server->is_running() && !ended) // before that it cannot be stopped
+            std::this_thread::yield();
+    }
+
+    ~Listener()
+    {
+        ending = true;
+        server->stop();
+        thread.join();
+    }
+
+    /// The head of a request.
+    httplib::Server::HandlerResponse receive(const httplib::Request& request, httplib::Response& response)
+    {
+        found = admit(house, site, request);
+        if (found.status == 200 && (found.bodyBytes <= smallBody || takeSeat()))
+            return httplib::Server::HandlerResponse::Unhandled;
+        if (found.challenges)
+            response.set_header("WWW-Authenticate", "Basic realm=\"tvrcim\"");
+        found.route = nullptr;
+        if (found.status == 200)
+            tell(response, 503, "other large requests are being read");
+        else
+            tell(response, found.status, found.reason);
+        closeBehind(response);
+        return httplib::Server::HandlerResponse::Handled;
+    }
+
+    bool takeSeat()
+    {
+        if (!seats.try_acquire())
+            return false;
+        Connection::current().keep(std::shared_ptr<void>(this, [this](void*) { seats.release(); }));
+        return true;
+    }
+
+    const Site site;
+    const House house;
+    std::counting_semaphore<mostLarge> seats{mostLarge}; ///< for large bodies
+    std::atomic<bool> ending = false;
+    std::unique_ptr<httplib::Server> server;
+    int port = -1;
+    std::atomic<bool> ended = false;
+    std::thread thread;
+};
+
+Server::Server(Site site, const ServerOptions& options)
+{
+    expectSafe(options);
+    _listener = std::make_unique<Listener>(std::move(site), options);
+}
+
+Server::~Server() = default;
+
+int Server::port() const
+{
+    return _listener->port;
+}
+
+} // namespace http
