@@ -3,6 +3,7 @@
 #include "broker/cimxml/Port.h"
 #include "broker/cimxml/SelfDescription.h"
 #include "broker/http/Server.h"
+#include "broker/metrics/Site.h"
 #include "broker/tvrcim/SignalEnd.h"
 
 #include <charconv>
@@ -55,7 +56,10 @@ http::ServerOptions optionsOf(const Session& session, const Command& command)
 /// What is at a path of its own comes before what takes all paths.
 http::Site sitesOf(Session& session)
 {
-    return cimxml::site(session.broker);
+    http::Site routes = metrics::site(session.broker, session.nameSpace);
+    for (http::Route& route : cimxml::site(session.broker))
+        routes.push_back(std::move(route));
+    return routes;
 }
 
 } // namespace
