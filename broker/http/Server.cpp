@@ -96,7 +96,8 @@ void takeNoSharedPort(socket_t socket)
 /// The body of a request that is refused by its head is unread, and would be taken for the next request.
 void closeBehind(httplib::Response& response)
 {
-    response.set_header("Connection", "close");
+    if (!response.has_header("Connection"))
+        response.set_header("Connection", "close");
     Connection::current().endBehindResponse();
 }
 
