@@ -35,7 +35,7 @@ extern "C"
          * first. */
         uint64_t cache_age;
         uint64_t refresh_length;
-        /* Microseconds from which age on an enumeration starts a refresh; 0 while `loaded` is. */
+        /* Microseconds from which age on an enumeration starts a refresh; 0 where no provider is loaded. */
         uint64_t cache_timeout;
     };
 

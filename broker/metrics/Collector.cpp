@@ -3,6 +3,7 @@
 #include "broker/metrics/HostFamilies.h"
 #include "broker/values/ValueText.h"
 
+#include <malloc.h>
 #include <set>
 #include <thread>
 
@@ -65,14 +66,14 @@ constexpr const char* endpointClasses[] = {"TVRHBA_SCSIProtocolEndpoint", "TVRHB
 
 } // namespace
 
-Collector::Collector(Broker& broker, std::string nameSpace)
-    : _broker(broker), _nameSpace(std::move(nameSpace)), _host(hostSources().size())
+Collector::Collector(Broker& broker, std::string nameSpace, std::chrono::milliseconds shares)
+    : _broker(broker), _nameSpace(std::move(nameSpace)), _shares(shares), _host(hostSources().size())
 {}
 
 std::shared_ptr<const Families> Collector::collect()
 {
     const std::lock_guard lock(_mutex);
-    if (!_shared || Clock::now() - _collected > 1s)
+    if (!_shared || Clock::now() - _collected >= _shares)
     {
         _shared = std::make_shared<const Families>(everything());
         _collected = Clock::now();
@@ -159,6 +160,7 @@ void Collector::readFabric()
         if (!answered(_broker.enumerateInstanceNames(_nameSpace, className, {count, true})))
             return;
     _reaches = std::move(reaches);
+    malloc_trim(0); // what thousands of names took
     _fabricRead = before ? std::optional(before->refreshes) : std::nullopt;
 }
 

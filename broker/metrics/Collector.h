@@ -18,11 +18,12 @@ namespace metrics
 class Collector
 {
 public:
-    Collector(broker::Broker& broker, std::string nameSpace);
+    Collector(broker::Broker& broker, std::string nameSpace,
+              std::chrono::milliseconds shares = std::chrono::seconds(1));
 
-    /// Those who ask at once, or within a second, share one collection. It reads the provider's cache, and has it
-    /// refreshed only where it is older than its timeout. While a cache stays incomplete each read would refresh it:
-    /// then the values stand that were read before.
+    /// Those who ask at once, or one that time after the other, share one collection. It reads the provider's cache,
+    /// and has it refreshed only where it is older than its timeout. While a cache stays incomplete each read would
+    /// refresh it: then the values stand that were read before.
     std::shared_ptr<const Families> collect();
 
 private:
@@ -46,6 +47,7 @@ private:
 
     broker::Broker& _broker;
     const std::string _nameSpace;
+    const std::chrono::milliseconds _shares;
 
     std::mutex _mutex; ///< of all below
     Clock::time_point _collected;
