@@ -1,6 +1,7 @@
 // What monitoring is told of the module and of the simulated host, and the alerts that it raises.
 #include "broker/metrics/Collector.h"
 #include "broker/metrics/Exposition.h"
+#include "broker/metrics/HostFamilies.h"
 #include "tests/module/Clock.h"
 #include "tests/module/Host.h"
 #include "tests/module/ModuleMemory.h"
@@ -12,6 +13,8 @@
 
 #include <fstream>
 #include <map>
+#include <regex>
+#include <set>
 #include <sstream>
 
 using namespace module_test;
@@ -112,7 +115,7 @@ TEST(Metrics, AScrapeHasWhatTheHostHas)
         {"tavrin_fc_refreshes_total", "1"},
         {ofPort("up", port), "1"},
         {ofPort("up", "1000027A51160211"), "0"},
-        {ofPort("speed_bytes_per_second", port), "1e+09"},
+        {ofPort("speed_bytes_per_second", port), "1000000000"},
         {ofPort("transmitted_bytes_total", port), "1608754176"},
         {ofPort("invalid_transmission_words_total", port), "12"},
         {ofPort("targets", port), "2"},
@@ -128,6 +131,29 @@ TEST(Metrics, AScrapeHasWhatTheHostHas)
 
     Collector shared(host.broker(), nameSpace, 1h);
     EXPECT_EQ(shared.collect(), shared.collect());
+}
+
+TEST(Metrics, UnitsAreCountedAndNotLabelled)
+{
+    const auto scrapeOf = [](int units)
+    {
+        Host host(R"({"generate": {"adapters": 2, "targetsPerPort": 3, "unitsPerTarget": )" + std::to_string(units) +
+                  "}}");
+        Collector collector(host.broker(), nameSpace, 0s);
+        return scrape(collector);
+    };
+    const Samples few = scrapeOf(1);
+    const Samples many = scrapeOf(100);
+    EXPECT_EQ(few.size(), many.size());
+    std::size_t ports = 0;
+    for (const auto& [name, value] : many)
+        if (name.starts_with("tavrin_fc_port_units"))
+        {
+            ++ports;
+            EXPECT_EQ(value, "300");
+            EXPECT_EQ(few.at(name), "3");
+        }
+    EXPECT_EQ(ports, 2u);
 }
 
 TEST(Metrics, AScrapeRefreshesNoSoonerThanTheTimeout)
@@ -255,7 +281,8 @@ TEST(Metrics, APulledPortAndGrowingErrorsRaiseTheirAlerts)
     const std::string errors =
         std::string("alertname=\"TavrinFcPortErrors\",severity=\"warning\",port=\"") + otherPort + "\"";
     const std::string file = host.root() / "alerts-test.yml";
-    std::ofstream(file) << "rule_files: ['" TVR_ALERTS "']\nevaluation_interval: 1m\ntests:\n  - interval: 1m\n"
+    std::ofstream(file) << "rule_files: ['" TVR_FLEET
+                           "/alerts.yml']\nevaluation_interval: 1m\ntests:\n  - interval: 1m\n"
                         << "    input_series:\n"
                         << inputOf(scrapes) << "    promql_expr_test:\n"
                         << expectationAt(pulled - 1, {}) << expectationAt(pulled + 2, {down})
@@ -263,6 +290,30 @@ TEST(Metrics, APulledPortAndGrowingErrorsRaiseTheirAlerts)
     const Answer tested = runCommand("promtool test rules " + file);
     EXPECT_EQ(tested.exitCode, 0) << tested.out << tested.err;
     EXPECT_THAT(tested.out, HasSubstr("SUCCESS"));
+}
+
+/// The names of families that a text has.
+std::set<std::string> namesIn(const std::string& text)
+{
+    static const std::regex name("tavrin_fc_\\w+");
+    return {std::sregex_token_iterator(text.begin(), text.end(), name), {}};
+}
+
+TEST(Metrics, AlertsAndDashboardNameFamiliesThatThereAre)
+{
+    Host host;
+    Collector collector(host.broker(), nameSpace);
+    std::set<std::string> told = namesIn(metrics::exposition(*collector.collect(), metrics::Format::prometheus));
+    for (const metrics::SourceRow& source : metrics::hostSources())
+        for (const metrics::FamilyRow& row : source.families)
+            told.insert(row.name);
+    for (const char* file : {TVR_FLEET "/alerts.yml", TVR_FLEET "/dashboard.json"})
+    {
+        const std::set<std::string> used = namesIn(textOf(file));
+        EXPECT_GT(used.size(), 10u) << file;
+        for (const std::string& name : used)
+            EXPECT_TRUE(told.count(name)) << file << " has " << name;
+    }
 }
 
 } // namespace

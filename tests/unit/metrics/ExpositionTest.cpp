@@ -34,7 +34,7 @@ TEST(Exposition, OpenMetricsNamesFamiliesWithoutSuffixes)
               "# TYPE fc_sent_bytes counter\n"
               "# UNIT fc_sent_bytes bytes\n"
               "# HELP fc_sent_bytes Bytes.\n"
-              "fc_sent_bytes_total{port=\"a\"} 18446744073709552000\n"
+              "fc_sent_bytes_total{port=\"a\"} 18446744073709551616\n"
               "fc_sent_bytes_total{port=\"b\",kind=\"x\\\"\\\\y\"} 7\n"
               "# TYPE fc_heat_celsius gauge\n"
               "# UNIT fc_heat_celsius celsius\n"
