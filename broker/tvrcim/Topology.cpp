@@ -1,7 +1,7 @@
 #include "broker/tvrcim/Topology.h"
 
+#include "broker/host/ReadableText.h"
 #include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
 
 #include <algorithm>
 #include <iterator>
@@ -11,6 +11,8 @@
 
 namespace tvrcim
 {
+
+using namespace broker;
 
 namespace
 {

@@ -1,7 +1,7 @@
 // The host for people: readable values, what is wrong, the tree and the picture.
-#include "broker/tvrcim/HostReport.h"
+#include "broker/host/HostReport.h"
 #include "broker/tvrcim/Graphviz.h"
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 #include "broker/tvrcim/Topology.h"
 
 #include <gmock/gmock.h>

@@ -1,8 +1,7 @@
-#include "broker/tvrcim/HostReport.h"
+#include "broker/host/HostReport.h"
 
-#include "broker/tvrcim/HostGraph.h"
-#include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/HostGraph.h"
+#include "broker/host/ReadableText.h"
 #include "broker/values/ValueText.h"
 
 #include <nlohmann/json.hpp>
@@ -11,10 +10,8 @@
 #include <map>
 #include <set>
 
-namespace tvrcim
+namespace broker
 {
-
-using namespace broker;
 
 namespace
 {
@@ -282,4 +279,4 @@ std::vector<std::string> factTexts(const HostNode& node, Place place)
     return texts;
 }
 
-} // namespace tvrcim
+} // namespace broker

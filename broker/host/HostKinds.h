@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-namespace tvrcim
+namespace broker
 {
 
 /// Where a fact appears beside the list below its element.
@@ -25,7 +25,7 @@ enum Place : unsigned
 struct FactRow
 {
     /// An empty text leaves the fact out.
-    using Text = std::string (*)(const broker::Object& object, const FactRow& row);
+    using Text = std::string (*)(const Object& object, const FactRow& row);
 
     const char* label;
     const char* property;
@@ -43,7 +43,7 @@ enum class Appears
 };
 
 /// Words for what is wrong with an element; none for one that is well.
-using Problems = std::vector<std::string> (*)(const broker::Object& object);
+using Problems = std::vector<std::string> (*)(const Object& object);
 
 /// How the instances of a class appear.
 struct KindRow
@@ -79,4 +79,4 @@ struct EdgeRow
 /// In the order in which the parts of an element are listed.
 std::span<const EdgeRow> edges();
 
-} // namespace tvrcim
+} // namespace broker

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "broker/core/Broker.h"
-#include "broker/tvrcim/HostKinds.h"
+#include "broker/host/HostKinds.h"
 #include "broker/values/Json.h"
 
 #include <cstdint>
@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-namespace tvrcim
+namespace broker
 {
 
 struct HostFact
@@ -52,11 +52,11 @@ class HostReport
 {
 public:
     /// Asks the broker. Throws CimError when it answers nothing.
-    HostReport(broker::Broker& broker, const std::string& nameSpace);
+    HostReport(Broker& broker, const std::string& nameSpace);
 
     const HostNode& root() const { return _root; }
     void print(std::ostream& out, const TreeStyle& style) const;
-    broker::Json json() const;
+    Json json() const;
 
 private:
     HostNode _root;
@@ -70,4 +70,4 @@ std::string unitsText(const HostNode& node);
 /// The facts at a place, with their labels where these belong to them; not what a problem says already.
 std::vector<std::string> factTexts(const HostNode& node, Place place);
 
-} // namespace tvrcim
+} // namespace broker

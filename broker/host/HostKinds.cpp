@@ -1,7 +1,6 @@
-#include "broker/tvrcim/HostKinds.h"
+#include "broker/host/HostKinds.h"
 
-#include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 #include "broker/values/ValueText.h"
 
 #include <algorithm>
@@ -10,10 +9,8 @@
 #include <optional>
 #include <stdexcept>
 
-namespace tvrcim
+namespace broker
 {
-
-using namespace broker;
 
 namespace
 {
@@ -422,4 +419,4 @@ std::span<const EdgeRow> edges()
     return allEdges;
 }
 
-} // namespace tvrcim
+} // namespace broker

@@ -1,15 +1,12 @@
-#include "broker/tvrcim/HostGraph.h"
+#include "broker/host/HostGraph.h"
 
-#include "broker/tvrcim/Commands.h"
 #include "broker/values/ValueText.h"
 
 #include <algorithm>
 #include <set>
 
-namespace tvrcim
+namespace broker
 {
-
-using namespace broker;
 
 namespace
 {
@@ -186,4 +183,4 @@ void HostGraph::findChassis()
     }
 }
 
-} // namespace tvrcim
+} // namespace broker
