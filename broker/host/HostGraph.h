@@ -7,7 +7,9 @@
 
 #include <deque>
 #include <map>
+#include <span>
 #include <string>
+#include <string_view>
 #include <unordered_map>
 #include <utility>
 #include <vector>
@@ -36,6 +38,8 @@ public:
     /// Asks the broker. A class that cannot be enumerated is left out and told by failures(); throws CimError when that
     /// is true of all.
     HostGraph(Broker& broker, const std::string& nameSpace);
+    /// Of these kinds alone, and what joins them; so the rest costs nothing.
+    HostGraph(Broker& broker, const std::string& nameSpace, std::span<const std::string_view> wanted);
     HostGraph(const HostGraph&) = delete;
     HostGraph& operator=(const HostGraph&) = delete;
 
@@ -56,6 +60,7 @@ private:
     Element& targetOf(Element& initiator, const char* association, const Path& endpoint);
     void nameHost(const Path& path);
     void findChassis();
+    void take(std::span<const std::string_view> wanted);
 
     Broker& _broker;
     std::string _nameSpace;

@@ -42,8 +42,14 @@ enum class Appears
     unit,    ///< one of those units
 };
 
-/// Words for what is wrong with an element; none for one that is well.
-using Problems = std::vector<std::string> (*)(const Object& object);
+/// What is wrong with an element.
+struct Problem
+{
+    std::string text;
+    bool critical = false;
+};
+/// None for an element that is well.
+using Problems = std::vector<Problem> (*)(const Object& object);
 
 /// How the instances of a class appear.
 struct KindRow

@@ -55,6 +55,13 @@ constexpr UnitRow units[] = {
     {"second * 10^-3", "ms", {}},
 };
 
+/// Null for a unit that is not in the table.
+const UnitRow* rowOfUnit(std::string_view unit)
+{
+    const auto* row = std::ranges::find(units, unit, &UnitRow::unit);
+    return row == std::end(units) ? nullptr : row;
+}
+
 /// The largest unit that is not above the number.
 const ScaleRow& scaleOf(std::uint64_t number, std::span<const ScaleRow> rows)
 {
@@ -111,6 +118,12 @@ std::string speedText(std::uint64_t bitsPerSecond)
     return bitsPerSecond == 0 ? std::string() : scaled(bitsPerSecond, speeds);
 }
 
+std::string unitText(std::string_view unit)
+{
+    const UnitRow* row = rowOfUnit(unit);
+    return row ? row->text : std::string(unit);
+}
+
 std::string measureText(std::string_view unit, const Value& value)
 {
     if (value.isNull())
@@ -122,13 +135,11 @@ std::string measureText(std::string_view unit, const Value& value)
             text += (text.empty() ? "" : ", ") + measureText(unit, element);
         return "[" + text + "]";
     }
-    const auto* row =
-        std::find_if(std::begin(units), std::end(units), [&](const UnitRow& r) { return r.unit == unit; });
-    const bool known = row != std::end(units);
-    const bool scalable = known && !row->larger.empty() && isInteger(value.type()) && !isSignedInteger(value.type());
+    const UnitRow* row = rowOfUnit(unit);
+    const bool scalable = row && !row->larger.empty() && isInteger(value.type()) && !isSignedInteger(value.type());
     if (scalable && isRound(value.asUnsigned(), row->larger))
         return scaled(value.asUnsigned(), row->larger);
-    return valueText(value) + " " + (known ? row->text : std::string(unit));
+    return valueText(value) + " " + unitText(unit);
 }
 
 std::string shownText(const ClassInfo* info, const Value& value, std::string_view feature, std::string_view parameter)

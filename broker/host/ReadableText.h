@@ -15,6 +15,8 @@ namespace broker
 std::string sizeText(std::uint64_t bytes);
 /// "8 Gbit/s", "2.5 Gbit/s"; empty for 0, which is no speed.
 std::string speedText(std::uint64_t bitsPerSecond);
+/// A unit of the schema as people write it: "°C" for "degree celsius".
+std::string unitText(std::string_view unit);
 /// A number in a unit of the schema ("bit / second"), or those of an array: "16 Gbit/s", "100 GiB", "38.5 °C". A larger
 /// unit is used where it says the number to the last digit.
 std::string measureText(std::string_view unit, const Value& value);

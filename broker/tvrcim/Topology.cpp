@@ -75,7 +75,8 @@ std::string quoted(const std::vector<std::string>& texts)
 std::vector<std::string> labelOf(const HostNode& node)
 {
     std::vector<std::string> texts = {node.isUnit ? node.name : node.kind + " " + node.name};
-    texts.insert(texts.end(), node.problems.begin(), node.problems.end());
+    for (const Problem& problem : node.problems)
+        texts.push_back(problem.text);
     const std::size_t heading = texts.size();
     for (const std::string& fact : factTexts(node, pictured))
     {
