@@ -174,9 +174,49 @@ Json recordsJson(const State& state, const std::map<std::string, std::string>& p
 
 // --- methods
 
-std::vector<Path> namesOf(const State& state, const std::string& className)
+constexpr const char* anyElement = "CIM_EnabledLogicalElement";
+
+/// Inherited by nearly all classes, and carried out by few.
+bool isOfAnyElement(const MethodInfo& method)
 {
-    return checked(state.broker.enumerateInstanceNames(nameSpaceOf(state, className), className)).paths;
+    return method.origin && sameName(method.origin->name, anyElement);
+}
+
+/// The schema describes what the provider carries out.
+bool isDescribed(const ClassInfo& info, const MethodInfo& method)
+{
+    return !descriptionOf(info, method.name).empty();
+}
+
+bool hasMethods(const ClassInfo& info)
+{
+    return std::ranges::any_of(info.methods, [&](const MethodInfo& method)
+                               { return isDescribed(info, method) && !isOfAnyElement(method); });
+}
+
+/// An element that cannot be asked for a state says so in the state that was asked for last.
+bool takesStates(const Object& object)
+{
+    constexpr std::uint64_t notApplicable = 12;
+    const Json state = numberOrNull(object, "RequestedState");
+    return !state.is_null() && state != notApplicable;
+}
+
+void addMethods(Json& list, const ClassInfo& info, const std::vector<Object>& objects)
+{
+    for (const MethodInfo& method : info.methods)
+    {
+        Json instances = Json::array();
+        if (isDescribed(info, method))
+            for (const Object& object : objects)
+                if (!isOfAnyElement(method) || takesStates(object))
+                    instances.push_back({{"path", fullPathText(object.path)}, {"name", shortName(object.path)}});
+        if (!instances.empty())
+            list.push_back({{"class", info.name},
+                            {"method", method.name},
+                            {"description", descriptionOf(info, method.name)},
+                            {"instances", std::move(instances)}});
+    }
 }
 
 std::string readMethods(const State& state)
@@ -185,18 +225,10 @@ std::string readMethods(const State& state)
     for (const std::string& name : state.broker.servedClasses())
     {
         const ClassInfo& info = classNamed(state, name);
-        if (!state.broker.serves(name, Kind::method) || info.methods.empty())
+        if (!state.broker.serves(name, Kind::method) || !hasMethods(info))
             continue;
-        Json instances = Json::array();
-        for (const Path& path : namesOf(state, name))
-            instances.push_back({{"path", fullPathText(path)}, {"name", shortName(path)}});
-        if (!instances.empty())
-            for (const MethodInfo& method : info.methods)
-                list.push_back({{"class", info.name},
-                                {"method", method.name},
-                                {"description", descriptionOf(info, method.name)},
-                                {"origin", method.origin ? Json(method.origin->name) : Json()},
-                                {"instances", instances}});
+        // A class that fails does not hide the others.
+        addMethods(list, info, state.broker.enumerateInstances(nameSpaceOf(state, name), name).objects);
     }
     return jsonText(list);
 }
