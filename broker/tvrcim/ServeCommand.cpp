@@ -5,9 +5,12 @@
 #include "broker/http/Server.h"
 #include "broker/metrics/Site.h"
 #include "broker/tvrcim/SignalEnd.h"
+#include "broker/web/Api.h"
 
+#include <algorithm>
 #include <charconv>
 #include <iostream>
+#include <iterator>
 #include <ostream>
 
 namespace tvrcim
@@ -56,10 +59,10 @@ http::ServerOptions optionsOf(const Session& session, const Command& command)
 /// What is at a path of its own comes before what takes all paths.
 http::Site sitesOf(Session& session)
 {
-    http::Site routes = metrics::site(session.broker, session.nameSpace);
-    for (http::Route& route : cimxml::site(session.broker))
-        routes.push_back(std::move(route));
-    return routes;
+    http::Site site = web::apiSite(session.broker, session.nameSpace, {TVRCIM_VERSION, session.simulated});
+    std::ranges::move(metrics::site(session.broker, session.nameSpace), std::back_inserter(site));
+    std::ranges::move(cimxml::site(session.broker), std::back_inserter(site));
+    return site;
 }
 
 } // namespace

@@ -1,8 +1,7 @@
-#include "broker/tvrcim/HostKinds.h"
+#include "broker/host/HostKinds.h"
 
 #include "broker/health/Health.h"
-#include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 #include "broker/values/ValueText.h"
 
 #include <algorithm>
@@ -11,10 +10,8 @@
 #include <optional>
 #include <stdexcept>
 
-namespace tvrcim
+namespace broker
 {
-
-using namespace broker;
 
 namespace
 {
@@ -129,10 +126,17 @@ std::string state(const Object& object, const FactRow&)
     return row ? row->text : "state unknown";
 }
 
-std::vector<std::string> portProblems(const Object& port)
+/// A port that is down without anybody's having wanted it.
+bool isLost(const PortState& state)
+{
+    constexpr std::uint64_t wanted[] = {11, 32776, 32790}; // in diagnosis, loopback, disabled
+    return !state.up && std::ranges::find(wanted, state.status) == std::end(wanted);
+}
+
+std::vector<Problem> portProblems(const Object& port)
 {
     const PortState* row = portState(port);
-    return row && *row->problem ? std::vector<std::string>{row->problem} : std::vector<std::string>();
+    return row && *row->problem ? std::vector<Problem>{{row->problem, isLost(*row)}} : std::vector<Problem>();
 }
 
 /// "ABOVE WARNING" and the like; empty for a value within the limits.
@@ -156,16 +160,18 @@ const char* excessText(Excess excess)
 
 std::string inCapitals(std::string text)
 {
-    std::ranges::transform(text, text.begin(), [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; });
+    std::ranges::transform(text, text.begin(),
+                           [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; });
     return text;
 }
 
-template <const auto& Rows> std::vector<std::string> measureProblems(const Object& object)
+template <const auto& Rows> std::vector<Problem> measureProblems(const Object& object)
 {
-    std::vector<std::string> problems;
+    std::vector<Problem> problems;
     for (const Measure& row : Rows)
         if (const auto excess = excessOf(object, row); excess.value_or(Excess::none) != Excess::none)
-            problems.push_back(inCapitals(row.name) + " " + excessText(*excess));
+            problems.push_back({inCapitals(row.name) + " " + excessText(*excess),
+                                *excess == Excess::aboveAlarm || *excess == Excess::belowAlarm});
     return problems;
 }
 
@@ -349,4 +355,4 @@ std::span<const EdgeRow> edges()
     return allEdges;
 }
 
-} // namespace tvrcim
+} // namespace broker
