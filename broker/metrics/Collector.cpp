@@ -72,7 +72,9 @@ Collector::Collector(Broker& broker, std::string nameSpace, std::chrono::millise
 
 std::shared_ptr<const Families> Collector::collect()
 {
-    const std::lock_guard lock(_mutex);
+    const std::unique_lock lock(_mutex, 5s);
+    if (!lock)
+        return nullptr;
     if (!_shared || Clock::now() - _collected >= _shares)
     {
         _shared = std::make_shared<const Families>(everything());
@@ -105,33 +107,31 @@ Families Collector::everything()
 /// One class after the other for as long as that is allowed. The next time goes on where this one ended.
 void Collector::readHost()
 {
-    _failed = false;
-    for (std::size_t i = 0; i < _host.size(); ++i)
+    for (std::size_t read = 0; read < _host.size(); ++read)
     {
-        if (!mayAsk() || !readClass(_next))
+        if (!mayAsk())
             return;
+        _failed = _failed && read > 0;
+        readClass(_next);
         _next = (_next + 1) % _host.size();
     }
     readFabric();
 }
 
-bool Collector::readClass(std::size_t place)
+void Collector::readClass(std::size_t place)
 {
     const SourceRow& source = hostSources()[place];
     const Reply reply = _broker.enumerateInstances(_nameSpace, source.className);
-    if (!answered(reply))
-        return false;
+    _failed = _failed || !reply.ok();
     _host[place] = {};
     read(_host[place], source, reply.objects);
     if (source.className == cardClass)
         _cards = reply.objects.size();
-    if (source.className == portClass)
-    {
-        _ports.clear();
-        for (const Object& port : reply.objects)
-            _ports.push_back(labelText(source.labels(port).front().second));
-    }
-    return true;
+    if (source.className != portClass)
+        return;
+    _ports.clear();
+    for (const Object& port : reply.objects)
+        _ports.push_back(labelText(source.labels(port).front().second));
 }
 
 /// Only after a refresh: there may be thousands of units, and nobody reads them live.
@@ -157,8 +157,7 @@ void Collector::readFabric()
         return true;
     };
     for (const char* className : endpointClasses)
-        if (!answered(_broker.enumerateInstanceNames(_nameSpace, className, {count, true})))
-            return;
+        _failed = !_broker.enumerateInstanceNames(_nameSpace, className, {count, true}).ok() || _failed;
     _reaches = std::move(reaches);
     malloc_trim(0); // what thousands of names took
     _fabricRead = before ? std::optional(before->refreshes) : std::nullopt;
@@ -183,12 +182,6 @@ std::optional<Observation> Collector::settled()
         module = observe(_broker);
     }
     return module;
-}
-
-bool Collector::answered(const Outcome& outcome)
-{
-    _failed = _failed || !outcome.ok();
-    return outcome.ok();
 }
 
 } // namespace metrics

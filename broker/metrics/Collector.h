@@ -24,6 +24,7 @@ public:
     /// Those who ask at once, or one that time after the other, share one collection. It reads the provider's cache,
     /// and has it refreshed only where it is older than its timeout. While a cache stays incomplete each read would
     /// refresh it: then the values stand that were read before.
+    /// Null where another collection takes longer than 5 seconds.
     std::shared_ptr<const Families> collect();
 
 private:
@@ -39,17 +40,16 @@ private:
 
     Families everything();
     void readHost();
-    bool readClass(std::size_t source);
+    void readClass(std::size_t place);
     void readFabric();
     bool mayAsk();
     std::optional<Observation> settled();
-    bool answered(const broker::Outcome& outcome);
 
     broker::Broker& _broker;
     const std::string _nameSpace;
     const std::chrono::milliseconds _shares;
 
-    std::mutex _mutex; ///< of all below
+    std::timed_mutex _mutex; ///< of all below
     Clock::time_point _collected;
     std::shared_ptr<const Families> _shared;
 

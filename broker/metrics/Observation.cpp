@@ -1,5 +1,7 @@
 #include "broker/metrics/Observation.h"
 
+#include <new>
+
 namespace metrics
 {
 
@@ -8,7 +10,14 @@ namespace
 
 void takeFailures(void* client, const char* entryPoint, std::uint64_t failures)
 {
-    static_cast<Observation*>(client)->callFailures.emplace_back(entryPoint, failures);
+    try
+    {
+        static_cast<Observation*>(client)->callFailures.emplace_back(entryPoint, failures);
+    }
+    catch (const std::bad_alloc&)
+    {
+        // The module is no place for an exception: the entry point is left out.
+    }
 }
 
 } // namespace

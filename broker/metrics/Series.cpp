@@ -49,7 +49,10 @@ void Series::add(const FamilyName& family, const Labels& labels, double value)
     prometheus::ClientMetric sample;
     for (const auto& [name, text] : labels)
         sample.label.push_back({name, labelText(text)});
+    constexpr std::size_t mostSamples = 65536; // of a family
     const std::size_t place = placeOf(family);
+    if (_families[place].metric.size() >= mostSamples)
+        return;
     if (!_seen[place].insert(sample.label).second)
         return;
     (family.type == MetricType::Counter ? sample.counter.value : sample.gauge.value) = value;

@@ -31,8 +31,8 @@ std::string labelText(std::string_view text);
 class Series
 {
 public:
-    /// Values that are no finite numbers are left out, and so is a sample whose labels the family has already: devices
-    /// may claim to be one another.
+    /// Values that are no finite numbers are left out, and so are a sample whose labels the family has already, for
+    /// devices may claim to be one another, and the samples of a family beyond a great many.
     void add(const FamilyName& family, const Labels& labels, double value);
     /// Families of their own stand behind those that are there.
     void append(const Series& others);

@@ -12,9 +12,15 @@ http::Site site(broker::Broker& broker, const std::string& nameSpace)
     return {{"GET", "/metrics", http::Entrance::reader,
              [collector](const httplib::Request& request, httplib::Response& response, const http::Caller&)
              {
+                 const auto families = collector->collect();
+                 if (!families)
+                 {
+                     response.status = 503;
+                     return;
+                 }
                  const Format format = formatFor(request.get_header_value("Accept"));
                  response.set_header("Vary", "Accept");
-                 response.set_content(exposition(*collector->collect(), format), contentType(format));
+                 response.set_content(exposition(*families, format), contentType(format));
              }}};
 }
 
