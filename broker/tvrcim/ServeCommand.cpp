@@ -4,9 +4,12 @@
 #include "broker/cimxml/SelfDescription.h"
 #include "broker/http/Server.h"
 #include "broker/tvrcim/SignalEnd.h"
+#include "broker/web/Page.h"
 
+#include <algorithm>
 #include <charconv>
 #include <iostream>
+#include <iterator>
 #include <ostream>
 
 namespace tvrcim
@@ -55,7 +58,9 @@ http::ServerOptions optionsOf(const Session& session, const Command& command)
 /// What is at a path of its own comes before what takes all paths.
 http::Site sitesOf(Session& session)
 {
-    return cimxml::site(session.broker);
+    http::Site sites = web::pageSite();
+    std::ranges::move(cimxml::site(session.broker), std::back_inserter(sites));
+    return sites;
 }
 
 } // namespace
