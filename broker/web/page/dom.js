@@ -75,7 +75,7 @@ export function badge(state, text) {
 }
 
 /** A table with a caption for those who cannot see it; cells are what append() takes. */
-export function table(caption, heads, rows, attributes = {}) {
+export function table(caption, heads, rows, attributes = {class: "list"}) {
   return make("div", {class: "scroll", role: "region", tabindex: "0", "aria-label": caption},
     make("table", attributes,
       make("thead", {}, make("tr", {}, heads.map((head) => make("th", {scope: "col"}, head)))),

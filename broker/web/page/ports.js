@@ -111,7 +111,8 @@ class PortPanel {
     this.node = section("", this.facts,
       make("div", {class: "scroll"}, make("table", {class: "counters"},
         make("caption", {}, "Counters of " + port.name),
-        make("thead", {}, make("tr", {}, ["Counter", "Value", "Rate", "Over time", ""].map((head) => make("th", {scope: "col"}, head)))),
+        make("thead", {}, make("tr", {}, [["Counter"], ["Value", "number"], ["Rate", "number"], ["Over time"], [""]]
+          .map(([head, style]) => make("th", {scope: "col", class: style}, head)))),
         this.body)),
       this.measures);
     this.node.classList.add("panel");

@@ -51,7 +51,8 @@ function boxOf(node, title, lines, kind) {
   const problems = node.problems.map((problem) => problem.text);
   const said = problems.map((text) => text.toLowerCase());
   const rest = lines.filter((line) => line && !said.includes(line.toLowerCase()));
-  return {node, kind, title, lines: rest, problems, state: stateOf(node), path: node.path, links: []};
+  return {node, kind, title, lines: rest, problems, state: stateOf(node), path: node.path,
+    links: [], parts: [], whole: null};
 }
 
 function cardBox(card) {
@@ -84,7 +85,14 @@ class Targets {
     return box;
   }
 
-  reach(port, targets) {
+  seenBy(port) {
+    if (port.node.targets)
+      this._count(port, port.node);
+    else
+      this._reach(port, ownTargets(port.node));
+  }
+
+  _reach(port, targets) {
     for (const target of targets.slice(0, mostTargets)) {
       const name = target.wwpn ?? target.name;
       if (!this._known.has(name)) {
@@ -97,7 +105,7 @@ class Targets {
       this.boxes.push(this._join(port, restBox(targets.slice(mostTargets), port.node)));
   }
 
-  count(port, node) {
+  _count(port, node) {
     this.boxes.push(this._join(port, boxOf({...node, problems: []}, countText(node.targets, "target"), [unitsText(node)], "Targets")));
   }
 }
@@ -114,17 +122,16 @@ function columnsOf(root) {
   for (const card of descendants(root, "Card")) {
     const cardPlace = cardBox(card);
     cards.push(cardPlace);
-    for (const port of descendants(card, "FC port"))
-      for (const [index, node] of [port, ...descendants(port, "Virtual port")].entries()) {
-        const place = portBox(node);
-        place.under = index > 0;
+    for (const port of descendants(card, "FC port")) {
+      const portPlace = portBox(port);
+      cardPlace.links.push(portPlace);
+      portPlace.parts = descendants(port, "Virtual port").map(portBox);
+      for (const place of [portPlace, ...portPlace.parts]) {
+        place.whole = place === portPlace ? null : portPlace;
         ports.push(place);
-        cardPlace.links.push(place);
-        if (node.targets)
-          targets.count(place, node);
-        else
-          targets.reach(place, ownTargets(node));
+        targets.seenBy(place);
       }
+    }
   }
   return [cards, ports, targets.boxes];
 }
@@ -137,7 +144,7 @@ function heightOf(box) {
 function stack(boxes, x, width) {
   let y = 1;
   for (const box of boxes) {
-    const inset = box.under ? 16 : 0;
+    const inset = box.whole ? 16 : 0;
     Object.assign(box, {x: x + inset, y, width: width - inset, height: heightOf(box)});
     y += box.height + gap;
   }
@@ -169,19 +176,28 @@ function layWide(columns, width) {
   return Math.max(...heights, ...grown);
 }
 
-function layNarrow(columns, width) {
-  const step = 14;
+/** A target stands below the first port that reaches it; the others say so in words. */
+function inOrderOf(cards) {
   const inOrder = [];
   const placed = new Set();
-  for (const card of columns[0]) {
+  for (const card of cards) {
     inOrder.push([card, 0]);
-    for (const port of card.links) {
-      inOrder.push([port, port.under ? 2 : 1]);
+    for (const port of card.links.flatMap((each) => [each, ...each.parts])) {
+      inOrder.push([port, port.whole ? 2 : 1]);
+      const above = port.links.filter((target) => placed.has(target));
+      port.lines.push(...above.map((target) => "and " + target.title + " above"));
+      port.links = port.links.filter((target) => !placed.has(target));
       for (const target of port.links)
-        if (!placed.has(target))
-          inOrder.push([placed.add(target) && target, 3]);
+        inOrder.push([target, 3]);
+      port.links.forEach((target) => placed.add(target));
     }
   }
+  return inOrder;
+}
+
+function layNarrow(columns, width) {
+  const step = 14;
+  const inOrder = inOrderOf(columns[0]);
   let y = 1;
   for (const [box, depth] of inOrder) {
     const x = 1 + depth * step;
@@ -235,7 +251,8 @@ export function pictureOf(root, width) {
     return make("p", {class: "notice"}, "There are no adapters.");
   const isWide = width >= wideEnough;
   const height = Math.ceil((isWide ? layWide : layNarrow)(columns, width));
-  const lines = boxes.flatMap((from) => from.links.map((to) => drawLine(from, to, isWide)));
+  const lines = boxes.flatMap((from) => [...from.links.map((to) => drawLine(from, to, isWide)),
+    ...from.parts.map((part) => drawLine(from, part, false))]);
   return draw("svg", {viewBox: `0 0 ${width} ${height}`, width, height, role: "group", "aria-label": "Cards, ports and targets"},
     lines, boxes.map(drawBox));
 }
