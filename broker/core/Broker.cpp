@@ -34,6 +34,11 @@ Core::Core(Options brokerOptions)
       classes(repositoryOf(*image)), graveyard(options.quarantine), store(classes), providers(*this)
 {}
 
+CimError::CimError(const Outcome& outcome)
+    : std::runtime_error(statusName(outcome.status) + (outcome.message.empty() ? "" : ": " + outcome.message)),
+      _status(outcome.status)
+{}
+
 std::string statusName(CMPIrc status)
 {
     static constexpr std::array names{"CIM_ERR_OK",

@@ -5,6 +5,7 @@
 
 #include <functional>
 #include <optional>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -94,5 +95,25 @@ struct AssociationFilter
 
 /// "CIM_ERR_NOT_FOUND" and the like; "CMPI status N" for a number without a name.
 std::string statusName(CMPIrc status);
+
+/// An operation that failed.
+class CimError : public std::runtime_error
+{
+public:
+    explicit CimError(const Outcome& outcome);
+
+    CMPIrc status() const { return _status; }
+
+private:
+    CMPIrc _status;
+};
+
+/// The answer itself; throws CimError where it is a failure.
+template <class Answer> Answer checked(Answer answer)
+{
+    if (!answer.ok())
+        throw CimError(answer);
+    return answer;
+}
 
 } // namespace broker

@@ -1,11 +1,11 @@
 #include "broker/tvrcim/CheckCommand.h"
 
+#include "broker/host/ReadableText.h"
 #include "broker/tvrcim/CheckFiles.h"
 #include "broker/tvrcim/CheckLibraries.h"
 #include "broker/tvrcim/CheckServers.h"
 #include "broker/tvrcim/Environment.h"
 #include "broker/tvrcim/Findings.h"
-#include "broker/tvrcim/ReadableText.h"
 #include "broker/tvrcim/Replies.h"
 
 #include <cstdlib>

@@ -1,6 +1,6 @@
 #include "broker/tvrcim/CheckFiles.h"
 
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 #include "foundation/File.h"
 #include "foundation/FilePaths.h"
 #include "foundation/HostInformation.h"
@@ -25,6 +25,8 @@ namespace tvrcim
 namespace fs = std::filesystem;
 using namespace cimple;
 using broker::Json;
+
+using namespace broker;
 
 namespace
 {

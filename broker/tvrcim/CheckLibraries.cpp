@@ -1,6 +1,6 @@
 #include "broker/tvrcim/CheckLibraries.h"
 
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 #include "device/Bindings.h"
 #include "device/CurlLibrary.h"
 #include "device/ForeignText.h"
@@ -17,6 +17,8 @@ namespace tvrcim
 
 using namespace cimple;
 using broker::Json;
+
+using namespace broker;
 
 namespace
 {

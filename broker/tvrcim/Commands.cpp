@@ -1,9 +1,9 @@
 #include "broker/tvrcim/Commands.h"
 
+#include "broker/host/HostReport.h"
 #include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/DiagCommand.h"
 #include "broker/tvrcim/Graphviz.h"
-#include "broker/tvrcim/HostReport.h"
 #include "broker/tvrcim/LogCommand.h"
 #include "broker/tvrcim/Progress.h"
 #include "broker/tvrcim/Replies.h"
@@ -330,10 +330,6 @@ constexpr std::array<CommandRow, 17> commands{{
 }};
 
 } // namespace
-
-CimError::CimError(const Outcome& outcome)
-    : std::runtime_error(statusName(outcome.status) + (outcome.message.empty() ? "" : ": " + outcome.message))
-{}
 
 void runCommand(Session& session, const Command& command)
 {

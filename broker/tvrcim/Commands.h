@@ -21,12 +21,7 @@ public:
     using std::runtime_error::runtime_error;
 };
 
-/// An operation that the broker refused.
-class CimError : public std::runtime_error
-{
-public:
-    explicit CimError(const broker::Outcome& outcome);
-};
+using broker::CimError;
 
 /// A method that was called and returned another number than 0.
 class MethodRefusal : public std::runtime_error

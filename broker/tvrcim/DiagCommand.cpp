@@ -1,8 +1,8 @@
 #include "broker/tvrcim/DiagCommand.h"
 
+#include "broker/host/ReadableText.h"
 #include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/Progress.h"
-#include "broker/tvrcim/ReadableText.h"
 #include "broker/tvrcim/Replies.h"
 #include "broker/tvrcim/SignalEnd.h"
 #include "broker/values/Json.h"

@@ -1,7 +1,7 @@
 #include "broker/tvrcim/Findings.h"
 
+#include "broker/host/ReadableText.h"
 #include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
 
 #include <algorithm>
 #include <array>
@@ -9,7 +9,7 @@
 namespace tvrcim
 {
 
-using broker::Json;
+using namespace broker;
 
 namespace
 {

@@ -1,9 +1,8 @@
 #include "broker/tvrcim/Printing.h"
 
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 #include "broker/values/PathText.h"
 #include "broker/values/QualifierText.h"
-#include "broker/values/Utf8.h"
 #include "broker/values/ValueMap.h"
 
 #include <nlohmann/json.hpp>
@@ -27,26 +26,6 @@ std::string joined(const std::vector<std::string>& names)
     for (const std::string& name : names)
         text += (text.empty() ? "" : ", ") + name;
     return text;
-}
-
-bool isNumber(CMPIType type)
-{
-    const auto element = static_cast<CMPIType>(type & ~CMPI_ARRAY);
-    return isInteger(element) || element == CMPI_real32 || element == CMPI_real64;
-}
-
-/// A value on one line, with its name or in its unit where the schema has one.
-std::string shownText(const ClassInfo* info, const Value& value, std::string_view feature,
-                      std::string_view parameter = {})
-{
-    if (!info || !isNumber(value.type()))
-        return oneLine(valueText(value));
-    if (const ValueNames names = valueNames(*info, feature, parameter); !names.empty())
-        return namedValueText(names, value);
-    if (const ValueNames bits = bitNames(*info, feature, parameter); !bits.empty())
-        return namedBitsText(bits, value);
-    const std::string_view unit = unitOf(*info, feature, parameter);
-    return unit.empty() ? valueText(value) : measureText(unit, value);
 }
 
 void printBlock(std::ostream& out, const ClassTable& classes, const Object& object)
@@ -73,17 +52,6 @@ void printColumns(std::ostream& out, const ClassTable& classes, const std::vecto
         table.add(std::move(row));
     }
     table.print(out);
-}
-
-/// Length of the character of several bytes at the head; 0 if there is none, or one that controls terminals.
-std::size_t printableCharacter(std::string_view text)
-{
-    constexpr unsigned char controlLead = 0xC2;
-    constexpr unsigned char firstPrintable = 0xA0;
-    const std::size_t length = longCharacter(text);
-    const bool isControl = length == 2 && static_cast<unsigned char>(text[0]) == controlLead &&
-                           static_cast<unsigned char>(text[1]) < firstPrintable;
-    return isControl ? 0 : length;
 }
 
 std::string typeOf(const FeatureInfo& feature)
@@ -228,39 +196,6 @@ void printClassTable(std::ostream& out, const ClassInfo& info)
 }
 
 } // namespace
-
-std::size_t displayWidth(const std::string& text)
-{
-    constexpr unsigned continuationMask = 0xC0;
-    constexpr unsigned continuation = 0x80;
-    return static_cast<std::size_t>(std::count_if(
-        text.begin(), text.end(), [](unsigned char c) { return (c & continuationMask) != continuation; }));
-}
-
-std::string padded(const std::string& text, std::size_t width)
-{
-    const std::size_t shown = displayWidth(text);
-    return shown < width ? text + std::string(width - shown, ' ') : text;
-}
-
-std::string oneLine(const std::string& text)
-{
-    std::string result;
-    for (std::string_view rest = text; !rest.empty();)
-    {
-        const auto c = static_cast<unsigned char>(rest.front());
-        const std::size_t length = c >= ' ' && c < 0x7f ? 1 : printableCharacter(rest);
-        if (length == 0)
-        {
-            std::array<char, 8> escape{};
-            std::snprintf(escape.data(), escape.size(), "\\x%02x", static_cast<unsigned>(c));
-            result += c == '\n' ? "\\n" : c == '\t' ? "\\t" : escape.data();
-        }
-        result += rest.substr(0, length);
-        rest.remove_prefix(std::max<std::size_t>(length, 1));
-    }
-    return result;
-}
 
 void Table::print(std::ostream& out) const
 {

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "broker/core/Reply.h"
+#include "broker/host/ReadableText.h"
 #include "broker/values/Json.h"
 
 #include <ostream>
@@ -29,14 +30,6 @@ public:
 private:
     std::vector<std::vector<std::string>> _rows; ///< the heading first
 };
-
-/// Characters that a UTF-8 text shows.
-std::size_t displayWidth(const std::string& text);
-/// The text filled up with blanks on the right.
-std::string padded(const std::string& text, std::size_t width);
-/// Line breaks and other control characters as escapes, so that a value stays on its line and does nothing to the
-/// terminal; bytes that are no UTF-8 too.
-std::string oneLine(const std::string& text);
 
 /// Instances: with `columns` a table of these properties, otherwise a block for each. People read the names of values
 /// and numbers in their units.

@@ -12,14 +12,6 @@
 namespace tvrcim
 {
 
-/// The answer itself; throws CimError where it is a failure.
-template <class Answer> Answer checked(Answer answer)
-{
-    if (!answer.ok())
-        throw CimError(answer);
-    return answer;
-}
-
 /// A text property; empty for a null.
 inline std::string textOf(const broker::Object& object, const char* property)
 {

@@ -4,6 +4,7 @@
 #include "broker/cimxml/SelfDescription.h"
 #include "broker/http/Server.h"
 #include "broker/tvrcim/SignalEnd.h"
+#include "broker/web/Api.h"
 #include "broker/web/Page.h"
 
 #include <algorithm>
@@ -58,9 +59,11 @@ http::ServerOptions optionsOf(const Session& session, const Command& command)
 /// What is at a path of its own comes before what takes all paths.
 http::Site sitesOf(Session& session)
 {
-    http::Site sites = web::pageSite();
-    std::ranges::move(cimxml::site(session.broker), std::back_inserter(sites));
-    return sites;
+    http::Site site = web::pageSite();
+    std::ranges::move(web::apiSite(session.broker, session.nameSpace, {TVRCIM_VERSION, session.simulated}),
+                      std::back_inserter(site));
+    std::ranges::move(cimxml::site(session.broker), std::back_inserter(site));
+    return site;
 }
 
 } // namespace

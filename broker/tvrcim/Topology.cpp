@@ -1,7 +1,7 @@
 #include "broker/tvrcim/Topology.h"
 
+#include "broker/host/ReadableText.h"
 #include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
 
 #include <algorithm>
 #include <iterator>
@@ -11,6 +11,8 @@
 
 namespace tvrcim
 {
+
+using namespace broker;
 
 namespace
 {
@@ -73,7 +75,8 @@ std::string quoted(const std::vector<std::string>& texts)
 std::vector<std::string> labelOf(const HostNode& node)
 {
     std::vector<std::string> texts = {node.isUnit ? node.name : node.kind + " " + node.name};
-    texts.insert(texts.end(), node.problems.begin(), node.problems.end());
+    for (const Problem& problem : node.problems)
+        texts.push_back(problem.text);
     const std::size_t heading = texts.size();
     for (const std::string& fact : factTexts(node, pictured))
     {

@@ -1,7 +1,7 @@
 // The host for people: readable values, what is wrong, the tree and the picture.
-#include "broker/tvrcim/HostReport.h"
+#include "broker/host/HostReport.h"
 #include "broker/tvrcim/Graphviz.h"
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 #include "broker/tvrcim/Topology.h"
 
 #include <gmock/gmock.h>
@@ -85,7 +85,9 @@ TEST(HostKinds, WhatIsWrongHasAWord)
     };
     for (const auto& row : rows)
     {
-        const std::vector<std::string> problems = kindNamed(row.kind).problems(row.object);
+        std::vector<std::string> problems;
+        for (const Problem& problem : kindNamed(row.kind).problems(row.object))
+            problems.push_back(problem.text);
         EXPECT_EQ(problems, row.problem ? std::vector<std::string>{row.problem} : std::vector<std::string>())
             << row.kind << " " << (&row - rows);
     }
@@ -108,7 +110,7 @@ TEST(HostTree, ShowsFactsUnderTheirNodesAndProblemsInTheirLine)
     root.children = {{"Card", "c"}, {"Card", "d"}};
     root.children[0].children = {{"Chip", "x"}};
     root.children[0].children[0].facts = {{"tag", "t"}};
-    root.children[1].problems = {"LINK DOWN"};
+    root.children[1].problems = {{"LINK DOWN"}};
     root.children[1].facts = {{"state", "link down", inLine}, {"speed", "5", inLine}};
     std::ostringstream plain, coloured;
     printTree(plain, root);
@@ -196,7 +198,7 @@ TEST(Topology, ManyAreOneBoxWithTheirNumber)
 TEST(Topology, WhatIsDownIsMarkedAndForeignTextsAreText)
 {
     HostNode down = nodeOf("FC port", "a\\\"]; x [&amp;", {});
-    down.problems = {"LINK DOWN"};
+    down.problems = {{"LINK DOWN"}};
     down.facts = {{"fabric", std::string(50, 'f'), inLine | labelled | pictured}};
     const std::string dot = topologyDot(hostWith({down}));
     EXPECT_THAT(dot,

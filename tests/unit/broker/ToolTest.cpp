@@ -4,7 +4,7 @@
 #include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/CommandLine.h"
 #include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 #include "broker/values/ValueMap.h"
 
 #include <gmock/gmock.h>

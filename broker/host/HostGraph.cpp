@@ -1,15 +1,12 @@
-#include "broker/tvrcim/HostGraph.h"
+#include "broker/host/HostGraph.h"
 
-#include "broker/tvrcim/Commands.h"
 #include "broker/values/ValueText.h"
 
 #include <algorithm>
 #include <set>
 
-namespace tvrcim
+namespace broker
 {
-
-using namespace broker;
 
 namespace
 {
@@ -66,15 +63,29 @@ const Path* pathOf(const Value& value)
 
 HostGraph::HostGraph(Broker& broker, const std::string& nameSpace) : _broker(broker), _nameSpace(nameSpace)
 {
+    take({});
+    findChassis();
+}
+
+HostGraph::HostGraph(Broker& broker, const std::string& nameSpace, std::span<const std::string_view> wanted)
+    : _broker(broker), _nameSpace(nameSpace)
+{
+    take(wanted);
+}
+
+/// All kinds where none are named.
+void HostGraph::take(std::span<const std::string_view> wanted)
+{
+    const auto isWanted = [&](const char* kind)
+    { return wanted.empty() || std::ranges::find(wanted, std::string_view(kind)) != wanted.end(); };
     _elements.push_back({&kindNamed(hostKind), {}});
     std::set<std::string> asked;
     for (const KindRow& kind : kinds())
-        if (kind.className && asked.insert(kind.className).second)
+        if (kind.className && isWanted(kind.name) && asked.insert(kind.className).second)
             takeElements(kind.className);
     for (const EdgeRow& row : edges())
-        if (asked.insert(row.association).second)
+        if (isWanted(row.whole) && isWanted(row.part) && asked.insert(row.association).second)
             takeParts(row.association);
-    findChassis();
 }
 
 /// What the broker answers, or an empty answer and a note of the failure.
@@ -186,4 +197,4 @@ void HostGraph::findChassis()
     }
 }
 
-} // namespace tvrcim
+} // namespace broker

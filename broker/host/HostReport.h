@@ -2,7 +2,7 @@
 #pragma once
 
 #include "broker/core/Broker.h"
-#include "broker/tvrcim/HostKinds.h"
+#include "broker/host/HostKinds.h"
 #include "broker/values/Json.h"
 
 #include <cstdint>
@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-namespace tvrcim
+namespace broker
 {
 
 struct HostFact
@@ -27,10 +27,11 @@ struct HostNode
     std::string name;
     std::string association = {}; ///< class of the association that leads here from the parent
     std::vector<HostFact> facts = {};
-    std::vector<std::string> problems = {};
+    std::vector<Problem> problems = {};
     std::vector<HostNode> children = {};
     std::string identity = {}; ///< of a unit: what it has in common with itself behind another port
     bool isUnit = false;
+    Path path = {};          ///< without a class for what no instance stands for
     std::uint64_t units = 0; ///< at it and below
     std::uint64_t bytes = 0; ///< what these hold
 
@@ -52,22 +53,29 @@ class HostReport
 {
 public:
     /// Asks the broker. Throws CimError when it answers nothing.
-    HostReport(broker::Broker& broker, const std::string& nameSpace);
+    HostReport(Broker& broker, const std::string& nameSpace);
 
     const HostNode& root() const { return _root; }
+    /// Classes that could not be enumerated, with a CIM status each.
+    const std::vector<std::string>& failures() const { return _failures; }
     void print(std::ostream& out, const TreeStyle& style) const;
-    broker::Json json() const;
+    Json json() const;
 
 private:
     HostNode _root;
+    std::vector<std::string> _failures;
 };
 
 /// A node with its facts in aligned columns and its children as branches.
 void printTree(std::ostream& out, const HostNode& root, bool colour = false);
+
+/// Targets of a port, and units of a target, that are listed; more than that are counted.
+inline constexpr std::size_t listedTargets = 64;
+inline constexpr std::size_t listedUnits = 8;
 
 /// "2 units, 600 GiB"
 std::string unitsText(const HostNode& node);
 /// The facts at a place, with their labels where these belong to them; not what a problem says already.
 std::vector<std::string> factTexts(const HostNode& node, Place place);
 
-} // namespace tvrcim
+} // namespace broker

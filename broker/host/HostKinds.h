@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-namespace tvrcim
+namespace broker
 {
 
 /// Where a fact appears beside the list below its element.
@@ -25,7 +25,7 @@ enum Place : unsigned
 struct FactRow
 {
     /// An empty text leaves the fact out.
-    using Text = std::string (*)(const broker::Object& object, const FactRow& row);
+    using Text = std::string (*)(const Object& object, const FactRow& row);
 
     const char* label;
     const char* property;
@@ -42,8 +42,14 @@ enum class Appears
     unit,    ///< one of those units
 };
 
-/// Words for what is wrong with an element; none for one that is well.
-using Problems = std::vector<std::string> (*)(const broker::Object& object);
+/// What is wrong with an element.
+struct Problem
+{
+    std::string text;
+    bool critical = false;
+};
+/// None for an element that is well.
+using Problems = std::vector<Problem> (*)(const Object& object);
 
 /// How the instances of a class appear.
 struct KindRow
@@ -79,4 +85,4 @@ struct EdgeRow
 /// In the order in which the parts of an element are listed.
 std::span<const EdgeRow> edges();
 
-} // namespace tvrcim
+} // namespace broker

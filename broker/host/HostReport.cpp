@@ -1,8 +1,7 @@
-#include "broker/tvrcim/HostReport.h"
+#include "broker/host/HostReport.h"
 
-#include "broker/tvrcim/HostGraph.h"
-#include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/HostGraph.h"
+#include "broker/host/ReadableText.h"
 #include "broker/values/ValueText.h"
 
 #include <nlohmann/json.hpp>
@@ -11,10 +10,8 @@
 #include <map>
 #include <set>
 
-namespace tvrcim
+namespace broker
 {
-
-using namespace broker;
 
 namespace
 {
@@ -31,7 +28,8 @@ std::string identityOfUnit(const Object& unit)
     return target == std::string::npos ? text : text.substr(target + 1);
 }
 
-HostNode describe(const Element& element, const char* association)
+/// Takes the element's path along.
+HostNode describe(Element& element, const char* association)
 {
     const KindRow& kind = *element.kind;
     const Value& name = element.object.get(kind.nameProperty);
@@ -49,6 +47,7 @@ HostNode describe(const Element& element, const char* association)
         node.units = 1;
         node.bytes = capacity.isNull() || integerBits(capacity.type()) == 0 ? 0 : capacity.asUnsigned();
     }
+    node.path = std::move(element.object.path);
     return node;
 }
 
@@ -66,7 +65,7 @@ public:
         addParts(root, _graph.host());
         // What nothing leads to stands directly under the host; containers come first and take their contents along.
         for (const KindRow& kind : kinds())
-            for (const Element& element : _graph.elements())
+            for (Element& element : _graph.elements())
                 if (element.kind == &kind && &element != &_graph.host())
                     add(root, element, "");
         std::ranges::stable_sort(root.children, {}, [](const HostNode& node) { return &kindNamed(node.kind); });
@@ -74,7 +73,7 @@ public:
     }
 
 private:
-    void add(HostNode& parent, const Element& element, const char* association)
+    void add(HostNode& parent, Element& element, const char* association)
     {
         if (!_shown.insert(&element).second)
             return;
@@ -116,17 +115,13 @@ std::string contentsText(const std::deque<Element>& elements)
 
 void collectProblems(const HostNode& node, std::vector<HostFact>& facts)
 {
-    for (const std::string& problem : node.problems)
-        facts.push_back({"attention", node.kind + " " + node.name + ": " + problem, isProblem});
+    for (const Problem& problem : node.problems)
+        facts.push_back({"attention", node.kind + " " + node.name + ": " + problem.text, isProblem});
     for (const HostNode& child : node.children)
         collectProblems(child, facts);
 }
 
 // --- many of one sort ---------------------------------------------------------------------------------------------
-
-/// Targets of a port, and units of a target, that are listed; more than that are counted.
-constexpr std::size_t listedTargets = 64;
-constexpr std::size_t listedUnits = 8;
 
 bool isTarget(const HostNode& node)
 {
@@ -180,8 +175,8 @@ public:
     void print(const HostNode& node, const std::string& first, const std::string& rest)
     {
         _out << first << node.kind << "  " << node.name;
-        for (const std::string& problem : node.problems)
-            _out << "  " << warning(problem);
+        for (const Problem& problem : node.problems)
+            _out << "  " << warning(problem.text);
         std::string line;
         for (const std::string& text : factTexts(node, inLine))
             line += (line.empty() ? "  " : ", ") + text;
@@ -225,8 +220,8 @@ Json toJson(const HostNode& node)
         else
             json["facts"][fact.label] = fact.text;
     }
-    for (const std::string& problem : node.problems)
-        json["problems"].push_back(problem);
+    for (const Problem& problem : node.problems)
+        json["problems"].push_back(problem.text);
     for (const HostNode& child : node.children)
         json["parts"].push_back(toJson(child));
     return json;
@@ -239,7 +234,8 @@ HostReport::HostReport(Broker& broker, const std::string& nameSpace)
     HostGraph graph(broker, nameSpace);
     _root = TreeMaker(graph).tree();
     _root.facts.push_back({"contents", contentsText(graph.elements())});
-    for (const std::string& failure : graph.failures())
+    _failures = graph.failures();
+    for (const std::string& failure : _failures)
         _root.facts.push_back({"attention", failure, isProblem});
     for (const HostNode& child : _root.children)
         collectProblems(child, _root.facts);
@@ -274,12 +270,13 @@ std::string unitsText(const HostNode& node)
 std::vector<std::string> factTexts(const HostNode& node, Place place)
 {
     std::vector<std::string> texts;
-    const auto isSaid = [&](const std::string& text)
-    { return std::ranges::any_of(node.problems, [&](const std::string& problem) { return sameName(problem, text); }); };
+    const auto isSaid = [&](const std::string& text) {
+        return std::ranges::any_of(node.problems, [&](const Problem& problem) { return sameName(problem.text, text); });
+    };
     for (const HostFact& fact : node.facts)
         if (fact.place & place && !isSaid(fact.text))
             texts.push_back((fact.place & labelled ? fact.label + " " : "") + fact.text);
     return texts;
 }
 
-} // namespace tvrcim
+} // namespace broker

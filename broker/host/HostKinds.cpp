@@ -1,7 +1,7 @@
-#include "broker/tvrcim/HostKinds.h"
+#include "broker/host/HostKinds.h"
 
-#include "broker/tvrcim/Printing.h"
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/health/Health.h"
+#include "broker/host/ReadableText.h"
 #include "broker/values/ValueText.h"
 
 #include <algorithm>
@@ -10,40 +10,13 @@
 #include <optional>
 #include <stdexcept>
 
-namespace tvrcim
+namespace broker
 {
-
-using namespace broker;
 
 namespace
 {
 
 // --- values ---------------------------------------------------------------------------------------------------
-
-std::optional<std::uint64_t> unsignedOf(const Object& object, const std::string& property)
-{
-    const Value& value = object.get(property);
-    if (value.isNull() || value.isArray() || integerBits(value.type()) == 0)
-        return std::nullopt;
-    return value.asUnsigned();
-}
-
-std::optional<double> numberOf(const Object& object, const std::string& property)
-{
-    const Value& value = object.get(property);
-    if (!value.isNull() && (value.type() == CMPI_real32 || value.type() == CMPI_real64))
-        return value.asReal();
-    const auto whole = unsignedOf(object, property);
-    return whole ? std::optional<double>(static_cast<double>(*whole)) : std::nullopt;
-}
-
-/// The elements of an array; none of what is no array.
-const Value::List& listOf(const Object& object, const std::string& property)
-{
-    static const Value::List none;
-    const Value& value = object.get(property);
-    return value.isNull() || !value.isArray() ? none : value.asList();
-}
 
 std::string textOf(const Value& value)
 {
@@ -147,98 +120,58 @@ std::string type(const Object& object, const FactRow& row)
 
 // --- states and problems ----------------------------------------------------------------------------------------
 
-struct StateRow
-{
-    std::uint64_t status;
-    const char* text;
-    const char* problem; ///< empty where all is well
-};
-
-/// OperationalStatus of a port.
-constexpr StateRow portStates[] = {
-    {2, "up", ""},
-    {1, "link down", "LINK DOWN"}, // or bypassed, which is none either
-    {10, "offline", "OFFLINE"},
-    {11, "in diagnosis", "IN DIAGNOSIS"},
-    {6, "error", "ERROR"},
-    {32776, "loopback", "LOOPBACK"},
-    {32788, "up, needs a reset", "NEEDS RESET"},
-    {32789, "link down, needs a reset", "LINK DOWN"},
-    {32790, "disabled", "DISABLED"},
-};
-
-const StateRow* portState(const Object& port)
-{
-    const Value::List& list = listOf(port, "OperationalStatus");
-    if (list.empty() || list.front().isNull())
-        return nullptr;
-    const auto* row = std::ranges::find(portStates, list.front().asUnsigned(), &StateRow::status);
-    return row == std::end(portStates) ? nullptr : row;
-}
-
 std::string state(const Object& object, const FactRow&)
 {
-    const StateRow* row = portState(object);
+    const PortState* row = portState(object);
     return row ? row->text : "state unknown";
 }
 
-std::vector<std::string> portProblems(const Object& port)
+/// A port that is down without anybody's having wanted it.
+bool isLost(const PortState& state)
 {
-    const StateRow* row = portState(port);
-    return row && *row->problem ? std::vector<std::string>{row->problem} : std::vector<std::string>();
+    constexpr std::uint64_t wanted[] = {11, 32776, 32790}; // in diagnosis, loopback, disabled
+    return !state.up && std::ranges::find(wanted, state.status) == std::end(wanted);
 }
 
-/// A measured value, and limits that it should stay within. Limits that are all 0 are none.
-struct MeasureRow
+std::vector<Problem> portProblems(const Object& port)
 {
-    const char* word;
-    const char* value;
-    const char* highAlarm;
-    const char* highWarning;
-    const char* lowWarning; ///< null if there is no low limit
-    const char* lowAlarm;
-};
-
-constexpr MeasureRow chipMeasures[] = {
-    {"TEMPERATURE", "BoardTemperature", "ThresholdCriticalTemp", "ThresholdWarningTemp", nullptr, nullptr},
-};
-
-constexpr MeasureRow transceiverMeasures[] = {
-    {"TEMPERATURE", "Temperature", "TemperatureHighAlarm", "TemperatureHighWarning", "TemperatureLowWarning",
-     "TemperatureLowAlarm"},
-    {"VOLTAGE", "Vcc", "VoltageHighAlarm", "VoltageHighWarning", "VoltageLowWarning", "VoltageLowAlarm"},
-    {"BIAS CURRENT", "TxBiasCurrent", "CurrentHighAlarm", "CurrentHighWarning", "CurrentLowWarning", "CurrentLowAlarm"},
-    {"TRANSMIT POWER", "TxPower", "TxPowerHighAlarm", "TxPowerHighWarning", "TxPowerLowWarning", "TxPowerLowAlarm"},
-    {"RECEIVE POWER", "RxPower", "RxPowerHighAlarm", "RxPowerHighWarning", "RxPowerLowWarning", "RxPowerLowAlarm"},
-};
+    const PortState* row = portState(port);
+    return row && *row->problem ? std::vector<Problem>{{row->problem, isLost(*row)}} : std::vector<Problem>();
+}
 
 /// "ABOVE WARNING" and the like; empty for a value within the limits.
-std::string excess(const Object& object, const MeasureRow& row)
+const char* excessText(Excess excess)
 {
-    const auto value = numberOf(object, row.value);
-    const auto limit = [&](const char* property) { return property ? numberOf(object, property).value_or(0) : 0; };
-    const double highAlarm = limit(row.highAlarm);
-    const double highWarning = limit(row.highWarning);
-    const double lowWarning = limit(row.lowWarning);
-    const double lowAlarm = limit(row.lowAlarm);
-    const bool none = highAlarm == 0 && highWarning == 0 && lowWarning == 0 && lowAlarm == 0;
-    if (!value || none)
-        return {};
-    if (highAlarm != 0 && *value >= highAlarm)
+    switch (excess)
+    {
+    case Excess::aboveAlarm:
         return "ABOVE CRITICAL";
-    if (highWarning != 0 && *value >= highWarning)
+    case Excess::aboveWarning:
         return "ABOVE WARNING";
-    if (row.lowAlarm && *value <= lowAlarm)
+    case Excess::belowAlarm:
         return "BELOW CRITICAL";
-    return row.lowWarning && *value <= lowWarning ? "BELOW WARNING" : "";
+    case Excess::belowWarning:
+        return "BELOW WARNING";
+    case Excess::none:
+        break;
+    }
+    return "";
 }
 
-template <const auto& Rows> std::vector<std::string> measureProblems(const Object& object)
+std::string inCapitals(std::string text)
 {
-    std::vector<std::string> problems;
-    for (const MeasureRow& row : Rows)
-        if (const std::string text = excess(object, row); !text.empty())
-            problems.push_back(std::string(row.word) + " " + text);
+    std::ranges::transform(text, text.begin(),
+                           [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; });
+    return text;
+}
+
+template <const auto& Rows> std::vector<Problem> measureProblems(const Object& object)
+{
+    std::vector<Problem> problems;
+    for (const Measure& row : Rows)
+        if (const auto excess = excessOf(object, row); excess.value_or(Excess::none) != Excess::none)
+            problems.push_back({inCapitals(row.name) + " " + excessText(*excess),
+                                *excess == Excess::aboveAlarm || *excess == Excess::belowAlarm});
     return problems;
 }
 
@@ -422,4 +355,4 @@ std::span<const EdgeRow> edges()
     return allEdges;
 }
 
-} // namespace tvrcim
+} // namespace broker

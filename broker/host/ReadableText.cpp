@@ -1,6 +1,7 @@
-#include "broker/tvrcim/ReadableText.h"
+#include "broker/host/ReadableText.h"
 
-#include "broker/tvrcim/Printing.h"
+#include "broker/values/Utf8.h"
+#include "broker/values/ValueMap.h"
 #include "broker/values/ValueText.h"
 
 #include <algorithm>
@@ -9,7 +10,7 @@
 #include <span>
 #include <sstream>
 
-namespace tvrcim
+namespace broker
 {
 
 namespace
@@ -54,6 +55,13 @@ constexpr UnitRow units[] = {
     {"second * 10^-3", "ms", {}},
 };
 
+/// Null for a unit that is not in the table.
+const UnitRow* rowOfUnit(std::string_view unit)
+{
+    const auto* row = std::ranges::find(units, unit, &UnitRow::unit);
+    return row == std::end(units) ? nullptr : row;
+}
+
 /// The largest unit that is not above the number.
 const ScaleRow& scaleOf(std::uint64_t number, std::span<const ScaleRow> rows)
 {
@@ -81,6 +89,23 @@ std::string scaled(std::uint64_t number, std::span<const ScaleRow> rows)
     return result + " " + row->unit;
 }
 
+bool isNumber(CMPIType type)
+{
+    const auto element = static_cast<CMPIType>(type & ~CMPI_ARRAY);
+    return isInteger(element) || element == CMPI_real32 || element == CMPI_real64;
+}
+
+/// Length of the character of several bytes at the head; 0 if there is none, or one that controls terminals.
+std::size_t printableCharacter(std::string_view text)
+{
+    constexpr unsigned char controlLead = 0xC2;
+    constexpr unsigned char firstPrintable = 0xA0;
+    const std::size_t length = longCharacter(text);
+    const bool isControl = length == 2 && static_cast<unsigned char>(text[0]) == controlLead &&
+                           static_cast<unsigned char>(text[1]) < firstPrintable;
+    return isControl ? 0 : length;
+}
+
 } // namespace
 
 std::string sizeText(std::uint64_t bytes)
@@ -93,25 +118,40 @@ std::string speedText(std::uint64_t bitsPerSecond)
     return bitsPerSecond == 0 ? std::string() : scaled(bitsPerSecond, speeds);
 }
 
-std::string measureText(std::string_view unit, const broker::Value& value)
+std::string unitText(std::string_view unit)
+{
+    const UnitRow* row = rowOfUnit(unit);
+    return row ? row->text : std::string(unit);
+}
+
+std::string measureText(std::string_view unit, const Value& value)
 {
     if (value.isNull())
-        return broker::valueText(value);
+        return valueText(value);
     if (value.isArray())
     {
         std::string text;
-        for (const broker::Value& element : value.asList())
+        for (const Value& element : value.asList())
             text += (text.empty() ? "" : ", ") + measureText(unit, element);
         return "[" + text + "]";
     }
-    const auto* row =
-        std::find_if(std::begin(units), std::end(units), [&](const UnitRow& r) { return r.unit == unit; });
-    const bool known = row != std::end(units);
-    const bool scalable =
-        known && !row->larger.empty() && broker::isInteger(value.type()) && !broker::isSignedInteger(value.type());
+    const UnitRow* row = rowOfUnit(unit);
+    const bool scalable = row && !row->larger.empty() && isInteger(value.type()) && !isSignedInteger(value.type());
     if (scalable && isRound(value.asUnsigned(), row->larger))
         return scaled(value.asUnsigned(), row->larger);
-    return broker::valueText(value) + " " + (known ? row->text : std::string(unit));
+    return valueText(value) + " " + unitText(unit);
+}
+
+std::string shownText(const ClassInfo* info, const Value& value, std::string_view feature, std::string_view parameter)
+{
+    if (!info || !isNumber(value.type()))
+        return oneLine(valueText(value));
+    if (const ValueNames names = valueNames(*info, feature, parameter); !names.empty())
+        return namedValueText(names, value);
+    if (const ValueNames bits = bitNames(*info, feature, parameter); !bits.empty())
+        return namedBitsText(bits, value);
+    const std::string_view unit = unitOf(*info, feature, parameter);
+    return unit.empty() ? valueText(value) : measureText(unit, value);
 }
 
 std::string countText(std::uint64_t count, const char* singular, const char* plural)
@@ -121,8 +161,8 @@ std::string countText(std::uint64_t count, const char* singular, const char* plu
 
 std::string inSentence(std::string name)
 {
-    if (name.size() > 1 && broker::lowerLetter(name[1]) == name[1])
-        name[0] = broker::lowerLetter(name[0]);
+    if (name.size() > 1 && lowerLetter(name[1]) == name[1])
+        name[0] = lowerLetter(name[0]);
     return name;
 }
 
@@ -134,6 +174,39 @@ std::string withSingleBlanks(const std::string& text)
             result += c;
     if (result.ends_with(' '))
         result.pop_back();
+    return result;
+}
+
+std::size_t displayWidth(const std::string& text)
+{
+    constexpr unsigned continuationMask = 0xC0;
+    constexpr unsigned continuation = 0x80;
+    return static_cast<std::size_t>(std::count_if(
+        text.begin(), text.end(), [](unsigned char c) { return (c & continuationMask) != continuation; }));
+}
+
+std::string padded(const std::string& text, std::size_t width)
+{
+    const std::size_t shown = displayWidth(text);
+    return shown < width ? text + std::string(width - shown, ' ') : text;
+}
+
+std::string oneLine(const std::string& text)
+{
+    std::string result;
+    for (std::string_view rest = text; !rest.empty();)
+    {
+        const auto c = static_cast<unsigned char>(rest.front());
+        const std::size_t length = c >= ' ' && c < 0x7f ? 1 : printableCharacter(rest);
+        if (length == 0)
+        {
+            std::array<char, 8> escape{};
+            std::snprintf(escape.data(), escape.size(), "\\x%02x", static_cast<unsigned>(c));
+            result += c == '\n' ? "\\n" : c == '\t' ? "\\t" : escape.data();
+        }
+        result += rest.substr(0, length);
+        rest.remove_prefix(std::max<std::size_t>(length, 1));
+    }
     return result;
 }
 
@@ -167,4 +240,4 @@ std::vector<std::string> lines(const std::string& text, std::size_t characters)
     return result;
 }
 
-} // namespace tvrcim
+} // namespace broker

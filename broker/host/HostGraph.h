@@ -3,16 +3,18 @@
 #pragma once
 
 #include "broker/core/Broker.h"
-#include "broker/tvrcim/HostKinds.h"
+#include "broker/host/HostKinds.h"
 
 #include <deque>
 #include <map>
+#include <span>
 #include <string>
+#include <string_view>
 #include <unordered_map>
 #include <utility>
 #include <vector>
 
-namespace tvrcim
+namespace broker
 {
 
 struct Element;
@@ -26,7 +28,7 @@ struct Part
 struct Element
 {
     const KindRow* kind;
-    broker::Object object;
+    Object object;
     std::vector<Part> parts = {};
 };
 
@@ -35,7 +37,9 @@ class HostGraph
 public:
     /// Asks the broker. A class that cannot be enumerated is left out and told by failures(); throws CimError when that
     /// is true of all.
-    HostGraph(broker::Broker& broker, const std::string& nameSpace);
+    HostGraph(Broker& broker, const std::string& nameSpace);
+    /// Of these kinds alone, and what joins them; so the rest costs nothing.
+    HostGraph(Broker& broker, const std::string& nameSpace, std::span<const std::string_view> wanted);
     HostGraph(const HostGraph&) = delete;
     HostGraph& operator=(const HostGraph&) = delete;
 
@@ -50,14 +54,15 @@ private:
     template <class Answer> Answer noted(const std::string& className, Answer answer);
     void takeElements(const std::string& className);
     void takeParts(const std::string& association);
-    void join(const EdgeRow& row, const broker::Path& association);
-    Element* find(const broker::Path& path) const;
+    void join(const EdgeRow& row, const Path& association);
+    Element* find(const Path& path) const;
     /// The target behind an initiator that an endpoint is of, new or existing.
-    Element& targetOf(Element& initiator, const char* association, const broker::Path& endpoint);
-    void nameHost(const broker::Path& path);
+    Element& targetOf(Element& initiator, const char* association, const Path& endpoint);
+    void nameHost(const Path& path);
     void findChassis();
+    void take(std::span<const std::string_view> wanted);
 
-    broker::Broker& _broker;
+    Broker& _broker;
     std::string _nameSpace;
     std::deque<Element> _elements;
     std::unordered_map<std::string, Element*> _byPath;
@@ -66,4 +71,4 @@ private:
     bool _anyAnswered = false;
 };
 
-} // namespace tvrcim
+} // namespace broker

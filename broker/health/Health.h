@@ -1,0 +1,75 @@
+// What the state and the measured values of a host's elements say: the judgement that all who show a host share.
+#pragma once
+
+#include "broker/values/Value.h"
+
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <string>
+
+namespace broker
+{
+
+/// An integer that is no array; nothing for what is null or of another type.
+std::optional<std::uint64_t> unsignedOf(const Object& object, const std::string& property);
+/// An unsigned integer or a real.
+std::optional<double> numberOf(const Object& object, const std::string& property);
+/// The elements of an array; none of what is no array.
+const Value::List& listOf(const Object& object, const std::string& property);
+
+/// A value of a port's OperationalStatus.
+struct PortState
+{
+    std::uint64_t status;
+    const char* text;
+    const char* problem; ///< empty where all is well
+    bool up = false;
+    bool needsReset = false;
+};
+std::span<const PortState> portStates();
+/// Null for a state that is none of the table's.
+const PortState* portState(const Object& port);
+
+/// A measured value, and limits that it should stay within.
+struct Measure
+{
+    const char* name;
+    const char* value;
+    const char* highAlarm;
+    const char* highWarning;
+    const char* lowWarning = nullptr; ///< null if there is no low limit
+    const char* lowAlarm = nullptr;
+};
+inline constexpr Measure boardTemperature{"temperature", "BoardTemperature", "ThresholdCriticalTemp",
+                                          "ThresholdWarningTemp"};
+inline constexpr Measure chipMeasures[] = {boardTemperature};
+inline constexpr Measure transceiverMeasures[] = {
+    {"temperature", "Temperature", "TemperatureHighAlarm", "TemperatureHighWarning", "TemperatureLowWarning",
+     "TemperatureLowAlarm"},
+    {"voltage", "Vcc", "VoltageHighAlarm", "VoltageHighWarning", "VoltageLowWarning", "VoltageLowAlarm"},
+    {"bias current", "TxBiasCurrent", "CurrentHighAlarm", "CurrentHighWarning", "CurrentLowWarning", "CurrentLowAlarm"},
+    {"transmit power", "TxPower", "TxPowerHighAlarm", "TxPowerHighWarning", "TxPowerLowWarning", "TxPowerLowAlarm"},
+    {"receive power", "RxPower", "RxPowerHighAlarm", "RxPowerHighWarning", "RxPowerLowWarning", "RxPowerLowAlarm"},
+};
+
+/// 0 where there is none.
+struct Limits
+{
+    double highAlarm, highWarning, lowWarning, lowAlarm;
+};
+/// Nothing where all of them are 0, as those of an element that has none.
+std::optional<Limits> limitsOf(const Object& object, const Measure& measure);
+
+enum class Excess
+{
+    none,
+    aboveAlarm,
+    aboveWarning,
+    belowAlarm,
+    belowWarning,
+};
+/// Nothing where there is no value or no limits.
+std::optional<Excess> excessOf(const Object& object, const Measure& measure);
+
+} // namespace broker
