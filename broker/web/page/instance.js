@@ -1,26 +1,22 @@
 // One instance: what it says of itself, and where it leads.
 
 import {append, badge, button, link, make, replace, table} from "./dom.js";
-import {ask} from "./api.js";
+import {ask, jsonText} from "./api.js";
 import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken} from "./paths.js";
 import {section} from "./visit.js";
 
 const pageSize = 100;
 
-function rawText(value) {
-  if (typeof value === "string")
-    return value;
-  return JSON.stringify(value, (key, member) => typeof member === "bigint" ? member.toString() : member);
-}
-
 /** What people read, and the number beside it where that says more. */
 function valueCell(property) {
-  if (property.reference)
-    return link(hrefOfObject(property.reference), shortName(property.reference) + " (" + spoken(classOf(property.reference)) + ")");
-  const raw = property.value === null ? "" : rawText(property.value);
-  const text = property.text ?? raw;
-  return text === raw || typeof property.value === "string" || text.includes("(" + raw + ")")
-    ? text : [text, " ", make("span", {class: "quiet"}, raw)];
+  const {value, text, reference} = property;
+  if (reference)
+    return link(hrefOfObject(reference), shortName(reference) + " (" + spoken(classOf(reference)) + ")");
+  if (value === null)
+    return "";
+  const raw = typeof value === "number" || typeof value === "bigint" ? String(value) : null;
+  const shown = text ?? raw ?? jsonText(value);
+  return raw === null || shown === raw || shown.includes("(" + raw + ")") ? shown : [shown, " ", make("span", {class: "quiet"}, raw)];
 }
 
 function propertyRow(property) {

@@ -3,7 +3,7 @@
 import {draw} from "./dom.js";
 
 const width = 160;
-const height = 36;
+const height = 26;
 
 /** A line through `values`, the newest at the right end of room for `most`; the highest is the top. */
 export function plotOf(values, most, label) {

@@ -45,6 +45,11 @@ function historyOf(port, counter) {
   return histories.get(key);
 }
 
+/** An error counter that grew while this page looked, or since the port of the page first saw it. */
+function hasGrown(counter, history) {
+  return counter.isError && (counter.grows || history.grown > 0);
+}
+
 function numberText(value) {
   return Number(value).toLocaleString("en", {maximumFractionDigits: value < 10 ? 2 : 0});
 }
@@ -67,10 +72,6 @@ function speedText(speed) {
   return speed ? Number(speed) / 1e9 + " Gbit/s" : "";
 }
 
-function portState(port) {
-  return /^(up|ok|online)\b/i.test(port.state) ? "ok" : /unknown/i.test(port.state) ? "quiet" : "critical";
-}
-
 /** A row of a counter, changed in place while it is looked at. */
 class CounterRow {
   constructor(port, counter) {
@@ -86,9 +87,9 @@ class CounterRow {
     replace(this.value, numberText(counter.value));
     replace(this.rate, rateText(history, counter.unit));
     replace(this.plot, plotOf(history.rates, mostSamples - 1, (counter.label || counter.name) + " per second"));
-    const grows = counter.isError && history.grown > 0;
+    const grows = hasGrown(counter, history);
     this.node.classList.toggle("grows", grows);
-    replace(this.mark, grows ? badge("critical", "grows, +" + numberText(history.grown)) : null);
+    replace(this.mark, grows ? badge("critical", "grows" + (history.grown > 0 ? ", +" + numberText(history.grown) : "")) : null);
   }
 }
 
@@ -120,7 +121,7 @@ class PortPanel {
   }
 
   show(port) {
-    replace(this.facts, badge(portState(port), port.state), " ",
+    replace(this.facts, badge(port.up ? "ok" : "critical", port.state), " ",
       [speedText(port.speed), port.card].filter(Boolean).join(", "));
     for (const counter of port.counters) {
       if (!this.rows.has(counter.name)) {
@@ -142,7 +143,7 @@ function remember(ports, time) {
 
 function growingErrors(ports) {
   return ports.flatMap((port) => port.counters
-    .filter((counter) => counter.isError && historyOf(port, counter).grown > 0)
+    .filter((counter) => hasGrown(counter, historyOf(port, counter)))
     .map((counter) => make("li", {}, badge("critical", "grows"), " ", counter.label || counter.name, " of ",
       link(hrefOfObject(port.path), port.name))));
 }

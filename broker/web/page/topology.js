@@ -86,10 +86,11 @@ class Targets {
   }
 
   seenBy(port) {
-    if (port.node.targets)
+    const listed = ownTargets(port.node);
+    if (listed.length > 0)
+      this._reach(port, listed);
+    else if (port.node.targets)
       this._count(port, port.node);
-    else
-      this._reach(port, ownTargets(port.node));
   }
 
   _reach(port, targets) {
