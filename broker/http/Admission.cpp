@@ -40,7 +40,7 @@ const Route& routeOf(const Site& site, const httplib::Request& request)
         {
             if (route.method == method)
                 return route;
-            known = true;
+            known = known || !route.path.ends_with('*');
         }
     if (known || (method != "GET" && method != "POST"))
         throw Refusal{405, request.method + " is not for " + request.path};

@@ -3,16 +3,20 @@
 #include "broker/http/Admission.h"
 #include "broker/http/Connection.h"
 #include "broker/http/Memory.h"
+#include "broker/http/Workers.h"
 #include "broker/values/Json.h"
 
 #include <nlohmann/json.hpp>
 
 #include <atomic>
+#include <cerrno>
+#include <poll.h>
 #include <semaphore>
 #include <stdexcept>
 #include <sys/socket.h>
 #include <thread>
 #include <type_traits>
+#include <unistd.h>
 
 namespace http
 {
@@ -44,9 +48,46 @@ public:
     explicit Listening(const Connection::Limits& limits, Files... files) : Base(files...), _limits(limits)
     {}
 
-    void widenQueue() { ::listen(this->svr_sock_, waitingConnections); }
+    /// Serves what comes until the end is set.
+    void serve(Workers& workers)
+    {
+        ::listen(this->svr_sock_, waitingConnections);
+        while (!_limits.ending)
+            if (const socket_t socket = workers.full() ? (pause(), -1) : accept(); socket >= 0)
+                serve(workers, socket);
+        close(this->svr_sock_.exchange(INVALID_SOCKET));
+    }
 
 private:
+    static constexpr int longestSleep = 100; ///< milliseconds, behind which the end is looked for
+
+    /// A client whom no thread or memory is left for is sent away.
+    void serve(Workers& workers, socket_t socket)
+    {
+        try
+        {
+            if (workers.give([this, socket] { process_and_close_socket(socket); }))
+                return;
+        }
+        catch (const std::bad_alloc&)
+        {}
+        close(socket);
+    }
+
+    static void pause() { poll(nullptr, 0, longestSleep); }
+
+    /// -1 for none. Neither a client who has gone nor a host that has run out of descriptors or memory ends the port.
+    socket_t accept() const
+    {
+        pollfd entry{this->svr_sock_, POLLIN, 0};
+        if (poll(&entry, 1, longestSleep) <= 0)
+            return -1;
+        const socket_t socket = accept4(this->svr_sock_, nullptr, nullptr, SOCK_CLOEXEC);
+        if (socket < 0 && errno != ECONNABORTED && errno != EINTR)
+            pause();
+        return socket;
+    }
+
     SSL_CTX* tls() const
     {
         if constexpr (std::is_same_v<Base, httplib::SSLServer>)
@@ -96,7 +137,8 @@ void takeNoSharedPort(socket_t socket)
 /// The body of a request that is refused by its head is unread, and would be taken for the next request.
 void closeBehind(httplib::Response& response)
 {
-    response.set_header("Connection", "close");
+    if (!response.has_header("Connection"))
+        response.set_header("Connection", "close");
     Connection::current().endBehindResponse();
 }
 
@@ -134,7 +176,6 @@ httplib::Headers answersOfThisPort()
 void setUp(httplib::Server& server)
 {
     server.set_default_headers(answersOfThisPort());
-    server.new_task_queue = [] { return new httplib::ThreadPool(mostConnections); };
     server.set_payload_max_length(largestBody);
     server.set_keep_alive_max_count(mostRequests); // clients are told
     server.set_error_handler(httplib::Server::Handler(endBehindError));
@@ -166,24 +207,19 @@ struct Server::Listener
                                                                      : -1;
         if (port < 0)
             throw std::runtime_error("cannot listen on " + options.address + ":" + std::to_string(options.port));
-        if (auto* secure = dynamic_cast<Secure*>(server.get()))
-            secure->widenQueue();
-        else
-            dynamic_cast<Plain&>(*server).widenQueue();
         thread = std::thread(
             [this]
             {
-                server->listen_after_bind();
-                ended = true;
+                if (auto* secure = dynamic_cast<Secure*>(server.get()))
+                    secure->serve(workers);
+                else
+                    dynamic_cast<Plain&>(*server).serve(workers);
             });
-        while (!server->is_running() && !ended) // before that it cannot be stopped
-            std::this_thread::yield();
     }
 
     ~Listener()
     {
         ending = true;
-        server->stop();
         thread.join();
     }
 
@@ -218,7 +254,7 @@ struct Server::Listener
     std::atomic<bool> ending = false;
     std::unique_ptr<httplib::Server> server;
     int port = -1;
-    std::atomic<bool> ended = false;
+    Workers workers{mostConnections};
     std::thread thread;
 };
 

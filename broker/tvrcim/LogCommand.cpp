@@ -1,5 +1,6 @@
 #include "broker/tvrcim/LogCommand.h"
 
+#include "broker/host/LogEntries.h"
 #include "broker/tvrcim/Progress.h"
 #include "broker/tvrcim/Replies.h"
 #include "broker/values/Json.h"
@@ -7,7 +8,6 @@
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
-#include <array>
 #include <csignal>
 
 #include <poll.h>
@@ -26,13 +26,9 @@ constexpr int followInterval = 1000; // milliseconds
 /// One of the two logs.
 struct LogRow
 {
-    const char* idPrefix;
-    const char* absence;
-    const char* entryClass;
+    const LogKind& kind;
     /// Has it show what there is.
     void (*switchOn)(Session& session, const Object& log);
-    std::string (*line)(const Object& entry);
-    bool newestFirst;     ///< in the order of its instances
     bool readWhenEnabled; ///< what comes later is seen when it is enabled again
 };
 
@@ -53,9 +49,9 @@ Object recordLog(Session& session, const LogRow& row)
     const Progress progress(session.progress, "log");
     const Reply logs = checked(session.broker.enumerateInstances(session.nameSpace, "TVRHBA_RecordLog"));
     for (const Object& log : logs.objects)
-        if (textOf(log, "InstanceID").starts_with(row.idPrefix))
+        if (isLogOf(row.kind, log))
             return log;
-    throw CimError({CMPI_RC_ERR_NOT_FOUND, row.absence});
+    throw CimError({CMPI_RC_ERR_NOT_FOUND, row.kind.absence});
 }
 
 // --- the two logs
@@ -82,39 +78,10 @@ void switchProviderLogOn(Session& session, const Object& log)
     session.broker.enumerateInstances(session.nameSpace, "TVRHBA_StorageVolume"); // reads the fabric
 }
 
-/// "2026-11-22 18:30:00.123456  error     text"
-std::string providerLine(const Object& entry)
-{
-    static constexpr std::array<const char*, 4> levels = {"", "critical", "warning", "error"};
-    const std::string time = textOf(entry, "CreationTimeStamp"); // "20261122183000.123456+000"
-    std::string shown = time;
-    if (time.size() >= 21)
-        shown = time.substr(0, 4) + "-" + time.substr(4, 2) + "-" + time.substr(6, 2) + " " + time.substr(8, 2) + ":" +
-                time.substr(10, 2) + ":" + time.substr(12, 9);
-    const std::string level = textOf(entry, "LogLevel");
-    const bool isKnown = level == "1" || level == "2" || level == "3";
-    std::string text = textOf(entry, "RecordData");
-    if (text.starts_with('[')) // its end may have been cut
-        text = text.substr(1, text.size() - 1 - text.ends_with(']'));
-    if (text.ends_with('\n'))
-        text.pop_back();
-    return shown + "  " + padded(isKnown ? levels[level[0] - '0'] : level, 8) + "  " + oneLine(text);
-}
+const LogRow providerLog = {.kind = providerLogKind, .switchOn = switchProviderLogOn, .readWhenEnabled = false};
 
-const LogRow providerLog = {.idPrefix = "TVRHBA:ProviderLog:",
-                            .absence = "the provider shows no log",
-                            .entryClass = "TVRHBA_LogEntry",
-                            .switchOn = switchProviderLogOn,
-                            .line = providerLine,
-                            .newestFirst = false,
-                            .readWhenEnabled = false};
-
-const LogRow driverLog = {.idPrefix = "TVR: FC Driver Record Log:",
-                          .absence = "there is no driver log, as there is no FC adapter",
-                          .entryClass = "TVRHBA_FCDriverLogEntry",
+const LogRow driverLog = {.kind = driverLogKind,
                           .switchOn = [](Session& session, const Object& log) { enable(session, log.path); },
-                          .line = [](const Object& entry) { return oneLine(textOf(entry, "RecordData")); },
-                          .newestFirst = true,
                           .readWhenEnabled = true};
 
 // --- entries
@@ -128,11 +95,9 @@ std::string keyOf(const Object& entry)
 /// The oldest first.
 std::vector<Object> entriesOf(Session& session, const LogRow& row, unsigned level)
 {
-    std::vector<Object> entries = checked(session.broker.enumerateInstances(session.nameSpace, row.entryClass)).objects;
-    if (row.newestFirst)
-        std::ranges::reverse(entries);
-    else // a ring: the oldest stands behind the newest
-        std::ranges::stable_sort(entries, {}, [](const Object& entry) { return textOf(entry, "CreationTimeStamp"); });
+    std::vector<Object> entries =
+        checked(session.broker.enumerateInstances(session.nameSpace, row.kind.entryClass)).objects;
+    sortEntries(row.kind, entries);
     if (level != 0)
         std::erase_if(entries, [&](const Object& entry) { return textOf(entry, "LogLevel") > std::to_string(level); });
     return entries;
@@ -145,6 +110,12 @@ std::size_t knownOf(const std::vector<std::string>& before, const std::vector<st
     while (!std::equal(before.end() - static_cast<std::ptrdiff_t>(known), before.end(), now.begin()))
         known--;
     return known;
+}
+
+/// "2026-11-22 18:30:00.123456  error     text", or the text alone where it tells no time.
+std::string lineText(const LogLine& line)
+{
+    return line.time.empty() ? line.text : line.time + "  " + padded(line.severity, 8) + "  " + line.text;
 }
 
 /// False when nobody reads the output any more.
@@ -160,7 +131,8 @@ void print(Session& session, const LogRow& row, const std::vector<Object>& entri
         printObjects(session.out, session.format, session.broker.classes(), entries, std::nullopt);
     else
         for (const Object& entry : entries)
-            session.out << (session.format == Format::json ? jsonText(toJson(entry)) : row.line(entry)) << '\n';
+            session.out << (session.format == Format::json ? jsonText(toJson(entry)) : lineText(row.kind.line(entry)))
+                        << '\n';
     session.out.flush();
 }
 

@@ -36,6 +36,7 @@ std::vector<std::string> expectedFiles(const std::string& moduleFolder)
 {
     std::vector<std::string> files{
         "usr/bin/tvrcim",
+        "usr/lib/systemd/system/tavrin-fc-serve.service",
         "usr/lib/tavrin-fc-simulator/libHBAAPI.so.2",
         "usr/lib/tavrin-fc-simulator/liblrmapi.so",
         "usr/lib/tavrin-fc-simulator/librmapi.so",
@@ -109,6 +110,24 @@ TEST(Installation, HasAllFilesAndRuns)
     const Answer pages = runCommand("cd " + root / "usr/share/man" +
                                     " && for page in man*/*; do groff -man -ww -Tascii $page 2>&1 >/dev/null; done");
     EXPECT_EQ(pages.out, "");
+}
+
+/// Of a service that is exposed less than most (systemd-analyze(1) calls 5 medium), in words that systemd knows.
+TEST(Installation, ServiceIsKnownAndHardened)
+{
+    const Folder root;
+    ASSERT_EQ(
+        runCommand("(DESTDIR=" + root.path() + " " TVR_CMAKE " --install " TVR_BUILD " --prefix /usr 2>&1)").exitCode,
+        0);
+    const std::string unit = root / "usr/lib/systemd/system/tavrin-fc-serve.service";
+    // The program is looked for on the machine.
+    ASSERT_EQ(runCommand("sed -i 's#=/usr/bin/tvrcim#=" + root / "usr/bin/tvrcim" + "#' " + unit).exitCode, 0);
+    const Answer verified = runCommand("systemd-analyze verify --man=no --recursive-errors=no " + unit + " 2>&1");
+    EXPECT_EQ(verified.exitCode, 0) << verified.out;
+    EXPECT_EQ(verified.out, "");
+    const Answer judged =
+        runCommand("systemd-analyze security --offline=yes --no-pager --threshold=40 " + unit + " 2>&1");
+    EXPECT_EQ(judged.exitCode, 0) << judged.out;
 }
 
 TEST(Package, DebHasAllFilesAndRuns)

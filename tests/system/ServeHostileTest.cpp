@@ -122,7 +122,7 @@ TEST(ServeHostile, WhatIsNoRequestIsAnsweredOrClosed)
         {with("TVRHBA_Card", "&b;&c;"), {"<ERROR CODE=\"5\""}},
         {with("TVRHBA_Card", "\xFF\xC0\x80\xED\xA0\x80"), {"<ERROR CODE=\"5\"", "'??"}},
         {with("TVRHBA_Card", std::string(1 << 20, 'x')), {"<ERROR CODE=\"5\""}},
-        {httpHead("", "GET / HTTP/1.1"), {"HTTP/1.1 404"}},
+        {httpHead("", "GET /nothing HTTP/1.1"), {"HTTP/1.1 404"}},
         {httpHead("Content-Length: 17000000\r\n"), {"HTTP/1.1 413"}},
         {httpHead("Content-Length: 99999999999999999999\r\n"), {"HTTP/1.1 413"}},
         {httpHead("Content-Length: 20\r\nContent-Encoding: gzip\r\n") + std::string(20, 'x'), {"HTTP/1.1 415"}},

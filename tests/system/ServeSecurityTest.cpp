@@ -6,6 +6,7 @@
 
 #include <filesystem>
 #include <fstream>
+#include <tuple>
 
 using namespace system_test;
 using testing::EndsWith;
@@ -38,6 +39,31 @@ TEST(ServeSecurity, UsersGiveTheirPasswords)
     const std::string headers = runCommand("curl --noproxy '*' -si -d x " + server.url() + "/cimom").out;
     EXPECT_THAT(headers, StartsWith("HTTP/1.1 401"));
     EXPECT_THAT(headers, HasSubstr("WWW-Authenticate: Basic realm="));
+}
+
+TEST(ServeSecurity, WhoMayOnlyReadChangesNothing)
+{
+    const Folder folder;
+    const std::string setting =
+        "/root/tavrin:TVRHBA_ProviderConfigSetting.InstanceID=\"Tavrin HBA Provider:sanrefresh\"";
+    const std::string log = "/root/tavrin:TVRHBA_RecordLog.InstanceID=\"TVRHBA:ProviderLog\"";
+    const auto expectReader = [&](const Serving& server, const std::string& user)
+    {
+        EXPECT_EQ(server.wbemcliAs(user, "ein", cards).exitCode, 0);
+        for (const auto& [operation, path, arguments] : {std::tuple{"mi", setting, "current=1"},
+                                                         {"sp", setting, "current=1"},
+                                                         {"di", setting, ""},
+                                                         {"ci", setting, "current=1,InstanceID=new"},
+                                                         {"cm", log, "ClearLog"}})
+            EXPECT_THAT(server.wbemcliAs(user, operation, path, arguments).err, HasSubstr("CIM_ERR_ACCESS_DENIED"))
+                << operation;
+    };
+    expectReader(Serving({"--users", folder.makeUsers("joe", "secret")}), "reader:secret@");
+    // Anybody on the host reaches a port without users.
+    setenv("LD_LIBRARY_PATH", TVR_SIMULATOR_FOLDER, 1);
+    const Serving hardware({}, {"--hardware"});
+    unsetenv("LD_LIBRARY_PATH");
+    expectReader(hardware, "");
 }
 
 TEST(ServeSecurity, TheWholeTalkIsEncrypted)
@@ -91,7 +117,8 @@ TEST(ServeSecurity, WhatIsNotSafeOrCannotBeUsedIsNotServed)
         {"--tls " + users + " " + folder.file("own.key"), "cannot use the certificate '" + users + "' with its key"},
         {"--users " + file("open", "joe:$6$x$y\n", fs::perms::owner_read | fs::perms::others_write),
          "others may write the users' file '" + folder.file("open") + "'"},
-        {"--users " + file("broken", "joe:$6$x$y\njim\n"), folder.file("broken") + ":2: a line is written name:hash"},
+        {"--users " + file("broken", "joe:$6$x$y\njim\n"),
+         folder.file("broken") + ":2: a line is written name:hash or name:hash:reader"},
         {"--users " + file("empty", "# nobody\n"), "there is no user in '" + folder.file("empty") + "'"},
     };
     for (const auto& row : rows)

@@ -15,9 +15,12 @@ namespace fs = std::filesystem;
 namespace
 {
 
-std::vector<const char*> wordsOf(const std::vector<std::string>& options)
+std::vector<const char*> wordsOf(const std::vector<std::string>& toolOptions, const std::vector<std::string>& options)
 {
-    std::vector<const char*> words{"serve", "--listen", "127.0.0.1:0"};
+    std::vector<const char*> words;
+    for (const std::string& option : toolOptions)
+        words.push_back(option.c_str());
+    words.insert(words.end(), {"serve", "--listen", "127.0.0.1:0"});
     for (const std::string& option : options)
         words.push_back(option.c_str());
     return words;
@@ -46,12 +49,15 @@ void Folder::makeCertificate(const std::string& name) const
 std::string Folder::makeUsers(const std::string& user, const std::string& password) const
 {
     const std::string users = file("users");
-    std::ofstream(users) << "# people\n" << user << ':' << runCommand("openssl passwd -6 " + password).out;
+    std::string hash = runCommand("openssl passwd -6 " + password).out;
+    hash.resize(hash.find_last_not_of('\n') + 1);
+    std::ofstream(users) << "# people\n" << user << ':' << hash << "\r\nreader:" << hash << ":reader\n";
     fs::permissions(users, fs::perms::owner_read | fs::perms::owner_write);
     return users;
 }
 
-Serving::Serving(const std::vector<std::string>& options) : _tool(wordsOf(options))
+Serving::Serving(const std::vector<std::string>& options, const std::vector<std::string>& toolOptions)
+    : _tool(wordsOf(toolOptions, options))
 {
     const std::string line = _tool.readLine();
     EXPECT_THAT(line, testing::StartsWith("listening on http"));

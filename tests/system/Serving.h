@@ -22,7 +22,8 @@ public:
     std::string file(const std::string& name) const { return _path / name; }
     /// Makes a certificate for 127.0.0.1, signed by itself, with its key: `name`.pem and `name`.key.
     void makeCertificate(const std::string& name) const;
-    /// Makes a file that only its owner reads, as `openssl passwd` writes the hash.
+    /// Makes a file that only its owner reads, as `openssl passwd` writes the hash: of a user, and of "reader" with the
+    /// same password, who may only read.
     std::string makeUsers(const std::string& user, const std::string& password) const;
 
 private:
@@ -32,7 +33,7 @@ private:
 class Serving
 {
 public:
-    explicit Serving(const std::vector<std::string>& options = {});
+    explicit Serving(const std::vector<std::string>& options = {}, const std::vector<std::string>& toolOptions = {});
 
     /// What wbemcli says in all calls that name no user: who it is, as "name:password@", and options.
     void introduce(const std::string& user, const std::string& options);
