@@ -217,7 +217,8 @@ void Browser::awaitText(const std::string& selector, const std::string& text)
 
 std::string Browser::textOf(const std::string& selector)
 {
-    return run("return document.querySelector(" + quoted(selector) + ")?.innerText ?? ''");
+    return run("const found = document.querySelector(" + quoted(selector) +
+               "); return found?.innerText ?? found?.textContent ?? ''");
 }
 
 /// The first that is seen, with exactly that text where one is given.

@@ -47,27 +47,26 @@ export async function showClasses(visit, name = "") {
   return visit.fill(place, async () => listOf(await ask("classes", {}, visit.signal)));
 }
 
-function namespaceChoice(classes, name, changed) {
-  const namespaces = classes.find((each) => each.name === name)?.namespaces ?? [];
+function namespaceChoice(namespaces, changed) {
   if (namespaces.length < 2)
     return null;
   return make("label", {}, "Namespace ", make("select", {change: (event) => changed(event.target.value)},
     namespaces.map((each) => make("option", {value: each}, each))));
 }
 
-function methodLinks(info) {
-  if (!info.methods.length)
+function methodLinks(methods) {
+  if (!methods.length)
     return null;
-  return make("p", {}, "Methods: ", info.methods.map((method, at) =>
-    [at ? ", " : "", link(hrefOfMethod(info.name, method.name), method.name)]));
+  return make("p", {}, "Methods: ", methods.map((method, at) =>
+    [at ? ", " : "", link(hrefOfMethod(method.class, method.method), method.method)]));
 }
 
 /** What the class is, beside its instances, which do not wait for it. */
 async function describe(visit, name, place, choice, changed) {
-  const [info, classes] = await Promise.all([ask("classes/" + encodeURIComponent(name), {}, visit.signal),
-    ask("classes", {}, visit.signal)]);
-  replace(place, make("p", {}, info.description), methodLinks(info));
-  replace(choice, namespaceChoice(classes, name, changed));
+  const [info, methods] = await Promise.all([ask("classes/" + encodeURIComponent(name), {}, visit.signal),
+    ask("methods", {}, visit.signal)]);
+  replace(place, make("p", {}, info.description), methodLinks(methods.filter((method) => method.class === info.name)));
+  replace(choice, namespaceChoice(info.namespaces, changed));
 }
 
 async function showInstances(visit, name) {

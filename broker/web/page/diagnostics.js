@@ -23,23 +23,26 @@ function portsOf(tests) {
   return [...ports.values()];
 }
 
-function recordState(text) {
-  return /fail|error|abort/i.test(text) ? "critical" : /complet|pass|success|ok\b/i.test(text) ? "ok" : "quiet";
+/** How bad the name of a state of a job or record is. */
+function stateOf(name) {
+  return /fail|exception|abort|kill|terminat/i.test(name) ? "critical" : /warning|incomplete|stopped/i.test(name) ? "warning"
+    : /complet|ok/i.test(name) ? "ok" : "quiet";
 }
 
 function jobItem(job) {
   const percent = Number(job.percent);
   const known = Number.isFinite(percent) && job.percent !== null;
-  return make("tr", {}, make("th", {scope: "row"}, job.path ? link(hrefOfObject(job.path), job.name) : job.name),
-    make("td", {}, job.port ?? ""), make("td", {}, badge(recordState(job.state ?? ""), job.state ?? "")),
+  return make("tr", {}, make("th", {scope: "row"}, link(hrefOfObject(job.path), job.name || job.id)),
+    make("td", {}, job.port ?? ""), make("td", {}, badge(stateOf(job.state), job.state)),
     make("td", {}, make("progress", {max: 100, value: known ? percent : null, "aria-label": "Progress of " + job.name}),
       known ? " " + percent + " %" : ""));
 }
 
 function recordItem(record) {
   return make("tr", {}, make("td", {class: "time"}, record.time ?? ""),
-    make("td", {}, record.path ? link(hrefOfObject(record.path), spokenTest(record.test ?? "Record")) : record.test),
-    make("td", {}, record.port ?? ""), make("td", {class: "text"}, record.text));
+    make("td", {}, link(hrefOfObject(record.path), spokenTest(record.test || record.id))),
+    make("td", {}, record.port ?? ""), make("td", {}, badge(stateOf(record.state), record.state)),
+    make("td", {class: "text"}, record.text));
 }
 
 function tableOf(heads, rows) {
@@ -66,7 +69,7 @@ class Diagnostics {
       replace(this.now, answer.jobs.length ? tableOf(["Job", "Port", "State", "Progress"], answer.jobs.map(jobItem))
         : make("p", {class: "quiet"}, "No job is known."));
       replace(this.records, answer.records.length
-        ? tableOf(["Time", "Test", "Port", "What it came to"], answer.records.map(recordItem))
+        ? tableOf(["Time", "Test", "Port", "Result", "What it came to"], answer.records.map(recordItem))
         : make("p", {class: "quiet"}, "No test has left a record."));
     } catch (error) {
       if (!this._visit.over)
@@ -97,7 +100,8 @@ class Diagnostics {
     if (!await mayChange())
       return;
     const name = spokenTest(test.name);
-    const details = [make("p", {}, "The test runs with its own settings. Some tests take the port from its traffic, and other readers wait meanwhile."),
+    const details = [test.help ? make("p", {}, test.help + ".") : null,
+      make("p", {}, "The test runs with its own settings. Some tests take the port from its traffic, and other readers wait meanwhile."),
       make("p", {}, link(hrefOfMethod("TVRHBA_FCHBADiagnosticTest", "RunDiagnosticService", test.path), "Other settings"))];
     if (!await confirmed("Run the " + name + " on port " + port.port + "?", details, "Run"))
       return;

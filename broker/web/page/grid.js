@@ -1,6 +1,7 @@
 // A table of any number of rows of which the port gives pages: what is on the screen is there, and little more.
 
 import {append, link, make, replace} from "./dom.js";
+import {givenByClass} from "./paths.js";
 import {failure} from "./visit.js";
 
 const rowHeight = 30; // pixels, as in the style
@@ -55,7 +56,7 @@ export class Grid {
 
   _take(page, answer) {
     if (!this._columns)
-      this._showHeads(answer.columns);
+      this._showHeads(answer);
     this._matching = answer.matching;
     this._pages.set(page, answer.rows);
     if (this._pages.size > mostPages)
@@ -64,10 +65,14 @@ export class Grid {
     this._paint();
   }
 
-  _showHeads(columns) {
-    this._columns = columns;
+  /** Columns without a value on the first page, and those that say the same of all, come last. */
+  _showHeads({columns, rows}) {
+    const isTelling = (at) => rows.some((row) => row.values[at] !== null) && !givenByClass.has(columns[at].toLowerCase());
+    const all = [...columns.keys()];
+    this._order = [...all.filter(isTelling), ...all.filter((at) => !isTelling(at))];
+    this._columns = this._order.map((at) => columns[at]);
     const focused = this._head.contains(document.activeElement) ? document.activeElement.textContent : null;
-    replace(this._head, make("th", {scope: "col", class: "opens"}, "Instance"), columns.map((column) => {
+    replace(this._head, make("th", {scope: "col", class: "opens"}, "Instance"), this._columns.map((column) => {
       const isSorted = column === this._sort;
       const order = isSorted ? (this._descending ? "descending" : "ascending") : "none";
       return make("th", {scope: "col", "aria-sort": order},
@@ -127,6 +132,6 @@ export class Grid {
     const anchor = link(href, text);
     anchor.dataset.row = index;
     return append(node, make("th", {scope: "row", class: "opens", title: text}, anchor),
-      row.values.map((value) => make("td", {title: value}, value)));
+      this._order.map((at) => make("td", {title: row.values[at]}, row.values[at])));
   }
 }

@@ -75,11 +75,12 @@ class Associations {
 }
 
 async function methodsOf(visit, path) {
-  const info = await ask("classes/" + encodeURIComponent(classOf(path)), {}, visit.signal);
-  if (info.methods.length === 0)
+  const methods = await ask("methods", {}, visit.signal);
+  const own = methods.filter((method) => method.instances.some((instance) => instance.path === path));
+  if (own.length === 0)
     return make("p", {class: "quiet"}, "None.");
   return table("Methods", ["Method", "What it does"],
-    info.methods.map((method) => [link(hrefOfMethod(info.name, method.name, path), method.name), method.description ?? ""]));
+    own.map((method) => [link(hrefOfMethod(method.class, method.method, path), method.method), method.description ?? ""]));
 }
 
 export async function showInstance(visit, path = "") {
@@ -92,6 +93,5 @@ export async function showInstance(visit, path = "") {
     section("Associations", joined), section("Methods", methods));
   const associations = new Associations(visit, path);
   await visit.fill(facts, async () => propertiesOf((await ask("instance", {path}, visit.signal)).properties));
-  await visit.fill(joined, () => associations.next());
-  await visit.fill(methods, () => methodsOf(visit, path));
+  await Promise.all([visit.fill(joined, () => associations.next()), visit.fill(methods, () => methodsOf(visit, path))]);
 }

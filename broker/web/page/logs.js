@@ -3,6 +3,7 @@
 import {badge, button, link, make, replace, tell} from "./dom.js";
 import {ask, call} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
+import {hrefOfMethod} from "./paths.js";
 import {failure} from "./visit.js";
 
 const pageSize = 200;
@@ -43,7 +44,7 @@ class Entries {
       this._body.append(...answer.entries.map(entryRow));
       const shown = this._body.children.length;
       replace(this._problem);
-      replace(this._count, answer.total === 0 ? "The log is empty." : shown + " of " + answer.total + " entries, newest first");
+      replace(this._count, answer.total === 0 ? "The log has no entries." : shown + " of " + answer.total + " entries, newest first");
       this._older.hidden = shown >= answer.total || answer.entries.length === 0;
     } catch (error) {
       if (!this._visit.over)
@@ -63,7 +64,7 @@ async function clear(log, entries, place) {
   if (!answer)
     return;
   if (Number(answer.returnValue) === 0)
-    tell("The log of the " + log.id + " is empty now");
+    tell("The log of the " + log.id + " was cleared");
   else
     replace(place, make("p", {class: "notice critical", role: "alert"},
       "The log was not cleared: " + (answer.returnText ?? answer.returnValue)));
@@ -91,8 +92,9 @@ export async function showLogs(visit, id = "provider") {
     const entries = new Entries(visit, log.id);
     const problem = make("div", {});
     const clearButton = log.path ? button("Clear …", () => clear(log, entries, problem), {class: "danger"}) : null;
+    const settings = log.id === "provider" && log.path ? link(hrefOfMethod("TVRHBA_RecordLog", "SetLogParams", log.path), "What is logged …") : null;
     entries.read();
-    return [tabs(logs, log), make("div", {class: "toolbar"}, button("Read again", () => entries.read()), clearButton),
+    return [tabs(logs, log), make("div", {class: "toolbar"}, button("Read again", () => entries.read()), clearButton, settings),
       problem, entries.node];
   });
 }

@@ -1,7 +1,8 @@
 // The texts of object paths: Class.key="value",key=5, perhaps behind a namespace and a colon.
 
 const keyPattern = /([A-Za-z_]\w*)=("(?:[^"\\]|\\.)*"|[^,]*)(?:,|$)/y;
-const givenByClass = new Set(["creationclassname", "systemcreationclassname", "systemname", "cscreationclassname", "csname"]);
+/** Keys that are the same for all instances of a class on a host. */
+export const givenByClass = new Set(["creationclassname", "systemcreationclassname", "systemname", "cscreationclassname", "csname"]);
 
 function unquoted(text) {
   if (!text.startsWith('"'))
