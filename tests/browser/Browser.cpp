@@ -248,6 +248,11 @@ void Browser::type(const std::string& selector, const std::string& text)
     command("POST", "/element/" + element + "/value", {{"text", text}});
 }
 
+void Browser::choose(const std::string& selector, const std::string& file)
+{
+    command("POST", "/element/" + find(selector) + "/value", {{"text", file}});
+}
+
 void Browser::press(const std::string& key)
 {
     const Json actions{{{"type", "keyDown"}, {"value", key}}, {{"type", "keyUp"}, {"value", key}}};

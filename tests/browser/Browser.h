@@ -52,6 +52,8 @@ public:
     /// The link or button with that text.
     void clickText(const std::string& text, const std::string& within = "body");
     void type(const std::string& selector, const std::string& text);
+    /// A file in a field for files.
+    void choose(const std::string& selector, const std::string& file);
     void press(const std::string& key);
     /// Presses it until an expression is true; false when it is not after `most` times.
     bool pressUntil(const std::string& key, const std::string& expression, int most = 60);

@@ -151,6 +151,190 @@ TEST_F(Page, RefusesAWrongPasswordAndTellsWhoMayNot)
     browser.awaitText("#session", "Not logged in");
 }
 
+TEST_F(Page, PlotsCountersAndMarksErrorsThatGrow)
+{
+    serve({"--scenario", TVR_SCENARIOS "/growing.json"});
+    visit("ports");
+    browser.await("document.querySelector('#interval')");
+    browser.run("const choice = document.querySelector('#interval'); choice.value = 1; "
+                "choice.dispatchEvent(new Event('change'))");
+    browser.clickText("Read now");
+    browser.clickText("Read now");
+    browser.await("document.querySelector('#panels').dataset.reads >= 4");
+    const std::string row = "[...document.querySelectorAll('.panel')].map((panel) => panel.querySelector("
+                            "'[data-counter=CRCErrors]').innerText)";
+    const Json errors = browser.run("return " + row);
+    ASSERT_EQ(errors.size(), 2U);
+    EXPECT_THAT(errors[0].get<std::string>(), Not(HasSubstr("grows")));
+    EXPECT_THAT(errors[1].get<std::string>(), HasSubstr("grows, +"));
+    EXPECT_THAT(browser.textOf("#growing"), HasSubstr("CRC errors of 1000027A51320D01"));
+    EXPECT_GE(browser.run("return document.querySelector('[data-counter=BytesReceived] polyline').points.length"), 3);
+    EXPECT_THAT(browser.textOf("[data-counter=BytesReceived]"), HasSubstr("B/s"));
+    EXPECT_THAT(browser.textOf(".measures"), AllOf(HasSubstr("92 °C"), HasSubstr("warning")));
+    browser.keepPicture("counters");
+
+    // A second look at the host tells it as well.
+    visit();
+    browser.awaitText("#problems", "CRC ERRORS GROW");
+    browser.keepPicture("problems");
+    expectPeace();
+}
+
+TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
+{
+    serve();
+    visit("methods/TVRHBA_FCHBAWWNService/ChangeWWN");
+    const std::string target = browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
+                                             "each.textContent === '1000027A51160210')?.value");
+    const auto ask = [&](const std::string& wwpn)
+    {
+        browser.type("[name=NewWWPN]", wwpn);
+        browser.clickText("Call …");
+    };
+    browser.type("[name=Target]", target);
+    browser.type("[name=NewWWNN]", "2000027A51160299");
+    browser.run("document.querySelector('[name=Type]').value = 1");
+
+    // Nobody yet, then one who may only read.
+    ask("1000027A51160299");
+    browser.type("dialog input[name=user]", "reader");
+    browser.type("dialog input[name=password]", "secret");
+    browser.press(key::enter);
+    browser.awaitText("dialog", "reader may only read");
+    browser.clickText("Close", "dialog");
+    EXPECT_EQ(browser.textOf("#result"), "");
+
+    browser.clickText("Log out");
+    browser.await("document.querySelector('#session').innerText.includes('Not logged in')");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    struct Case
+    {
+        const char* wwpn;
+        const char* result;
+    };
+    for (const Case& each : {Case{"0000000000000000", "(40005)"}, Case{downPort, "A name is in use (91)"},
+                             Case{"seven", "("}, Case{"1000027A51160299", "Completed (0)"}})
+    {
+        ask(each.wwpn);
+        browser.awaitText("dialog h2", "Change the WWN of FC port 1000027A51160210?");
+        EXPECT_THAT(browser.textOf("dialog"), AllOf(HasSubstr(each.wwpn), HasSubstr("Non-volatile (1)")));
+        browser.keepPicture("question");
+        browser.clickText("Call ChangeWWN", "dialog");
+        browser.await("!document.querySelector('dialog')");
+        browser.awaitText("#returned", each.result);
+        EXPECT_EQ(browser.run("return document.querySelector('#returned').classList.contains('ok')"),
+                  each.result == std::string("Completed (0)"))
+            << each.wwpn;
+    }
+    // Left without an answer, a question does nothing.
+    ask("1000027A51160277");
+    browser.awaitText("dialog", "1000027A51160277");
+    browser.press(key::escape);
+    browser.await("!document.querySelector('dialog')");
+    EXPECT_EQ(browser.textOf(":focus"), "Call …");
+    EXPECT_THAT(browser.textOf("#returned"), HasSubstr("Completed (0)"));
+}
+
+TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
+{
+    serve();
+    visit("methods/TVRHBA_SoftwareInstallationService/InstallFromByteStream");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    struct Mistake
+    {
+        const char* field;
+        const char* value;
+        const char* reason;
+    };
+    for (const Mistake& each :
+         {Mistake{"[name=InstallOptions]", "1, 65536", "not within 0 and 65535"},
+          Mistake{"[name=InstallOptions]", "-1", "not within 0 and 65535"},
+          Mistake{"[name=InstallOptions]", "1.5", "is no integer"}, Mistake{"[name=InstallOptions]", "3", ""},
+          Mistake{"[aria-label='Image as numbers']", "1 0x100", "not within 0 and 255"},
+          Mistake{"[aria-label='Image as numbers']", "x", "is no integer"}})
+    {
+        browser.type(each.field, each.value);
+        browser.clickText("Call …");
+        if (*each.reason)
+            browser.awaitText(".mistake:not(:empty)", each.reason);
+        else
+            browser.awaitText("dialog", "InstallOptions");
+        EXPECT_EQ(browser.run("return Boolean(document.querySelector('dialog'))"), !*each.reason) << each.value;
+        browser.press(key::escape);
+        browser.await("!document.querySelector('dialog')");
+    }
+
+    // What is no firmware is refused by who knows: the bytes arrive.
+    std::ofstream(_folder.file("image.grp"), std::ios::binary) << std::string("\0\xFF no firmware", 14);
+    browser.choose("input[type=file]", _folder.file("image.grp"));
+    browser.type("[name=Target]", browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
+                                                "each.textContent === '1000027A51160210')?.value"));
+    browser.type("[name=InstallOptions]", "");
+    browser.clickText("Call …");
+    browser.awaitText("dialog", "image.grp, 14 bytes");
+    browser.clickText("Call InstallFromByteStream", "dialog");
+    browser.awaitText("#returned", "InstallFromByteStream returned");
+    EXPECT_TRUE(browser.run("return document.querySelector('#returned').classList.contains('critical')").get<bool>());
+}
+
+TEST_F(Page, ClearsALogWhenAsked)
+{
+    serve();
+    visit("logs");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    browser.clickText("What is logged …");
+    awaitHeading("Set the log params");
+    browser.await("document.querySelector('[name=LogMode]')");
+    browser.run(
+        "document.querySelector('[name=LogLevel]').value = 5; document.querySelector('[name=LogMode]').value = 1");
+    browser.clickText("Call …");
+    browser.clickText("Call SetLogParams", "dialog");
+    browser.awaitText("#returned", "Completed");
+    browser.run("location.hash = '#/methods/TVRHBA_RecordLog/RequestStateChange/' + location.hash.split('/')[4]");
+    awaitHeading("Request the state change");
+    browser.await("document.querySelector('[name=RequestedState]')");
+    browser.run("document.querySelector('[name=RequestedState]').value = 2");
+    browser.clickText("Call …");
+    browser.clickText("Call RequestStateChange", "dialog");
+    browser.awaitText("#returned", "Completed");
+
+    browser.clickText("Logs");
+    browser.awaitText("#entries", "FC Record Logs enabled");
+    browser.clickText("Clear …");
+    browser.awaitText("dialog", "Clear the log of the provider?");
+    browser.clickText("Cancel", "dialog");
+    browser.await("!document.querySelector('dialog')");
+    EXPECT_THAT(browser.textOf("#entries"), HasSubstr("FC Record Logs enabled"));
+    browser.clickText("Clear …");
+    browser.clickText("Clear", "dialog");
+    browser.awaitText("#entries", "Cleared all the logs");
+    EXPECT_THAT(browser.textOf("#entries"), Not(HasSubstr("FC Record Logs enabled")));
+    expectPeace();
+}
+
+TEST_F(Page, RunsADiagnosticTestToItsEnd)
+{
+    serve();
+    visit("diagnostics");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    browser.click("button[aria-label='Run Host Loopback Test on 1000027A51160210']");
+    browser.awaitText("dialog h2", "Run the Host Loopback Test on port 1000027A51160210?");
+    browser.clickText("Run", "dialog");
+    browser.await("document.querySelector('[data-port] progress, [data-port] .notice')");
+    browser.awaitText("[data-port='1000027A51160210']", "Host Loopback Test has ended");
+    browser.awaitText("#jobs", "Completed");
+    browser.awaitText("#records", "Resulted with Success");
+    browser.run("document.querySelector('#records').scrollIntoView({block: 'end'})");
+    browser.keepPicture("records");
+    browser.click("#records a");
+    browser.awaitText("main", "LoopsPassed");
+    expectPeace();
+}
+
 // Markup, quotes, what closes an attribute, characters that turn the text around, and bytes that are no UTF-8.
 constexpr const char* hostileHost = R"json({
   "targets": [{"name": "t", "wwpn": "50:06:3D:20:01:10:00:0A",

@@ -76,19 +76,27 @@ export async function askToLogIn(reason = "") {
   return answer === true;
 }
 
+/** Says why the person may only read; true where he wants to be somebody else. */
+function tellReader() {
+  return show("Only reading is allowed", (close) => [
+    make("p", {}, session.whyNot || "This port lets nobody change anything."),
+    make("div", {class: "buttons"}, session.user ? button("Log in as somebody else", () => close(true)) : null,
+      button("Close", () => close(false), {class: "main", "data-first": true})),
+  ]);
+}
+
 /** Sees to it that the person may change something. */
 export async function mayChange() {
   if (session.mayChange)
     return true;
   if (session.hasUsers === false || session.user) {
-    await show("Only reading is allowed", (close) => [
-      make("p", {}, session.whyNot || "This port lets nobody change anything."),
-      make("div", {class: "buttons"}, session.user ? button("Log in as somebody else", () => close(true)) : null,
-        button("Close", () => close(false), {class: "main", "data-first": true})),
-    ]).then((other) => other ? askToLogIn() : false);
-  } else {
-    await askToLogIn(session.whyNot || "A user must log in before anything is changed.");
+    if (!await tellReader() || !await askToLogIn())
+      return false;
+  } else if (!await askToLogIn(session.whyNot)) {
+    return false;
   }
+  if (!session.mayChange)
+    await tellReader();
   return session.mayChange;
 }
 
