@@ -266,17 +266,18 @@ TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
         browser.await("!document.querySelector('dialog')");
     }
 
-    // What is no firmware is refused by who knows: the bytes arrive.
-    std::ofstream(_folder.file("image.grp"), std::ios::binary) << std::string("\0\xFF no firmware", 14);
+    // Only bytes as they are in the file have that sum.
+    std::ofstream(_folder.file("image.grp"), std::ios::binary)
+        << "TVRSIM-FIRMWARE 1\nfamily: TV3202\nversion: 12.8.1.0\nchecksum: CBF43926\n\n123456789";
     browser.choose("input[type=file]", _folder.file("image.grp"));
     browser.type("[name=Target]", browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
-                                                "each.textContent === '1000027A51160210')?.value"));
-    browser.type("[name=InstallOptions]", "");
+                                                "each.textContent === '1000027A51320240')?.value"));
+    browser.type("[name=InstallOptions]", "32768");
+    browser.type("[name=InstallOptionsValues]", "new.grp");
     browser.clickText("Call …");
-    browser.awaitText("dialog", "image.grp, 14 bytes");
+    browser.awaitText("dialog", "image.grp, 80 bytes");
     browser.clickText("Call InstallFromByteStream", "dialog");
-    browser.awaitText("#returned", "InstallFromByteStream returned");
-    EXPECT_TRUE(browser.run("return document.querySelector('#returned').classList.contains('critical')").get<bool>());
+    browser.awaitText("#returned", "Job Completed with No Error (0)");
 }
 
 TEST_F(Page, ClearsALogWhenAsked)
@@ -494,18 +495,38 @@ TEST_F(Page, FitsNarrowAndDarkScreens)
     expectPeace();
 }
 
-TEST_F(Page, PaintsItsFrameAtOnce)
+/// Milliseconds from the address to the first text; the best of three, since other work may be going on.
+double firstPaint(Browser& browser, const std::string& url)
 {
-    serve();
     double best = 1e9;
     for (int tries = 0; tries < 3; tries++)
     {
-        visit("?" + std::to_string(tries));
-        browser.run("location.reload()");
-        best = std::min(
-            best, browser.await("performance.getEntriesByName('first-contentful-paint')[0]?.startTime").get<double>());
+        browser.open("about:blank");
+        browser.open(url);
+        const char* painted = "performance.getEntriesByName('first-contentful-paint')[0]?.startTime";
+        best = std::min(best, browser.await(painted).get<double>());
     }
-    EXPECT_LT(best, 200) << "milliseconds";
+    return best;
+}
+
+TEST_F(Page, PaintsAtOnceAndFillsItselfAsAnswersCome)
+{
+    serve();
+    EXPECT_LT(firstPaint(browser, _serving->url()), 200);
+    browser.awaitText("#problems", "LINK DOWN");
+}
+
+TEST_F(Page, PaintsAtOnceWithSixteenThousandUnits)
+{
+    serveScenario(R"({"generate": {"seed": 3, "adapters": 4, "portsPerAdapter": 2, "targetsPerPort": 16,
+                                   "unitsPerTarget": 64}})");
+    EXPECT_LT(firstPaint(browser, _serving->url()), 1000);
+    browser.await("document.querySelectorAll('.picture .targets').length === 4");
+    EXPECT_THAT(browser.textOf("main"), HasSubstr("27 more targets\n1728 units"));
+    browser.keepPicture("large");
+    visit("classes/TVRHBA_StorageVolume");
+    browser.awaitText("#count", "16384 instances");
+    expectPeace();
 }
 
 } // namespace

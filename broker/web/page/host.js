@@ -1,6 +1,6 @@
 // The start: what is wrong with the host, and a picture of it.
 
-import {append, badge, button, link, make, replace} from "./dom.js";
+import {badge, button, link, make, replace} from "./dom.js";
 import {ask} from "./api.js";
 import {hrefOfObject} from "./paths.js";
 import {failure, section} from "./visit.js";
@@ -37,9 +37,10 @@ function partsOf(root) {
   const parts = root.children.filter((child) => child.kind !== "Card" && !hasCards(child));
   if (parts.length === 0)
     return null;
-  return make("ul", {class: "plain"}, parts.map((part) => make("li", {}, part.kind, " ",
-    part.path ? link(hrefOfObject(part.path), part.name) : part.name,
-    make("span", {class: "quiet"}, " " + part.facts.map((fact) => fact.text).join(", ")))));
+  return make("details", {}, make("summary", {}, "Other parts (" + parts.length + ")"),
+    make("ul", {class: "plain"}, parts.map((part) => make("li", {}, part.kind, " ",
+      part.path ? link(hrefOfObject(part.path), part.name) : part.name,
+      make("span", {class: "quiet"}, " " + part.facts.map((fact) => fact.text).join(", "))))));
 }
 
 function hasCards(node) {

@@ -1,6 +1,6 @@
 // The methods that can be called, and a form for each.
 
-import {badge, button, link, make, replace, table, tell} from "./dom.js";
+import {button, link, make, replace, table, tell} from "./dom.js";
 import {ask, call, session} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
 import {Field, Mistake} from "./form.js";
@@ -79,10 +79,11 @@ function detailsOf(method, path, given) {
 }
 
 class MethodForm {
-  constructor(method, instances, chosen) {
+  constructor(visit, method, instances, chosen) {
     this._method = method;
     this._fields = method.parameters.filter(isInput).map((parameter) => new Field(parameter));
     this._result = make("div", {id: "result"});
+    this._why = make("span", {class: "quiet"});
     this._target = this._targetField(instances, chosen);
     this._send = button("Call …", null, {type: "submit", class: "main"});
     const submit = (event) => {
@@ -91,8 +92,12 @@ class MethodForm {
     };
     this.node = make("form", {submit, class: "method"}, this._target.node, this._fields.map((field) => field.node),
       make("div", {class: "buttons start"}, this._send,
-        session.mayChange ? null : make("span", {class: "quiet"}, session.whyNot)), this._result);
+        this._why), this._result);
+    this._tellWhy();
+    document.addEventListener("session", () => this._tellWhy(), {signal: visit.signal});
   }
+
+  _tellWhy() { replace(this._why, session.mayChange ? "" : session.whyNot); }
 
   /** The instance whose method is called: one of those that are known, or a path. */
   _targetField(instances, chosen) {
@@ -137,7 +142,7 @@ async function formOf(visit, className, name, path) {
     return make("p", {class: "notice critical"}, className + " has no method " + name + ".");
   const instances = methods.find((each) => each.class === className && each.method === name)?.instances ?? [];
   return [make("p", {}, method.description ?? "", " ", link(hrefOfClass(className), className)),
-    new MethodForm(method, instances, path).node];
+    new MethodForm(visit, method, instances, path).node];
 }
 
 export async function showMethods(visit, className = "", name = "", path = "") {

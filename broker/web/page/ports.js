@@ -8,6 +8,7 @@ import {barOf, plotOf} from "./plot.js";
 
 const intervals = [1, 5, 15, 60]; // seconds
 const mostSamples = 60;
+const fewestPlotted = 20; // a plot has room for so many rates from its beginning
 let seconds = 5;
 
 // What was read of each counter, by port and name: it outlives a visit, so that nothing is lost by looking elsewhere.
@@ -86,7 +87,8 @@ class CounterRow {
   show(counter, history) {
     replace(this.value, numberText(counter.value));
     replace(this.rate, rateText(history, counter.unit));
-    replace(this.plot, plotOf(history.rates, mostSamples - 1, (counter.label || counter.name) + " per second"));
+    const {rates} = history;
+    replace(this.plot, plotOf(rates, Math.max(fewestPlotted, rates.length), (counter.label || counter.name) + " per second"));
     const grows = hasGrown(counter, history);
     this.node.classList.toggle("grows", grows);
     replace(this.mark, grows ? badge("critical", "grows" + (history.grown > 0 ? ", +" + numberText(history.grown) : "")) : null);

@@ -9,7 +9,8 @@ const padding = 8;
 const gap = 12;
 const characterWidth = 7.4; // of the font of the picture, at the most
 const wideEnough = 760;
-const mostTargets = 12; // of a port; what is more is one box
+const mostTargets = 40; // of all ports together; what a port has beyond its part of them is one box
+const fewestTargets = 3; // of a port
 
 function descendants(node, kind, found = []) {
   for (const child of node.children)
@@ -65,8 +66,12 @@ function portBox(port) {
   return boxOf(port, port.name, [pair, fabric && "fabric " + fabric], port.kind);
 }
 
+function nameOf(target) {
+  return target.wwpn ?? target.name;
+}
+
 function targetBox(target) {
-  return boxOf(target, target.wwpn ?? target.name, [unitsText(target)], "Target");
+  return boxOf(target, nameOf(target), [unitsText(target)], "Target");
 }
 
 function restBox(targets, port) {
@@ -80,9 +85,17 @@ class Targets {
   boxes = [];
   _known = new Map();
 
-  _join(port, box) {
-    port.links.push(box);
-    return box;
+  constructor(ports) {
+    this._most = Math.max(fewestTargets, Math.floor(mostTargets / ports));
+  }
+
+  /** Joins the port with the box of that name, which is made where there is none yet. */
+  _join(port, name, make) {
+    if (!this._known.has(name)) {
+      this._known.set(name, make());
+      this.boxes.push(this._known.get(name));
+    }
+    port.links.push(this._known.get(name));
   }
 
   seenBy(port) {
@@ -94,20 +107,15 @@ class Targets {
   }
 
   _reach(port, targets) {
-    for (const target of targets.slice(0, mostTargets)) {
-      const name = target.wwpn ?? target.name;
-      if (!this._known.has(name)) {
-        this._known.set(name, targetBox(target));
-        this.boxes.push(this._known.get(name));
-      }
-      this._join(port, this._known.get(name));
-    }
-    if (targets.length > mostTargets)
-      this.boxes.push(this._join(port, restBox(targets.slice(mostTargets), port.node)));
+    for (const target of targets.slice(0, this._most))
+      this._join(port, nameOf(target), () => targetBox(target));
+    const rest = targets.slice(this._most);
+    if (rest.length > 0)
+      this._join(port, rest.map(nameOf).join(), () => restBox(rest, port.node));
   }
 
-  _count(port, node) {
-    this.boxes.push(this._join(port, boxOf({...node, problems: []}, countText(node.targets, "target"), [unitsText(node)], "Targets")));
+  _count(port, {targets, ...node}) {
+    this._join(port, node.name, () => boxOf({...node, problems: []}, countText(targets, "target"), [unitsText(node)], "Targets"));
   }
 }
 
@@ -119,7 +127,7 @@ function ownTargets(port) {
 function columnsOf(root) {
   const cards = [];
   const ports = [];
-  const targets = new Targets();
+  const targets = new Targets(descendants(root, "FC port").length);
   for (const card of descendants(root, "Card")) {
     const cardPlace = cardBox(card);
     cards.push(cardPlace);
