@@ -164,6 +164,7 @@ Port readPort(JsonNode& node, const std::vector<Target>& targets)
     node.read("scsiBus", port.scsiBus);
     readAttributes(node, "attributes", portAttributeRows, port.attributes);
     readAttributes(node, "statistics", statisticsRows, port.statistics);
+    readAttributes(node, "growth", statisticsRows, port.growth);
     if (node.has("pci"))
         port.pci = readPci(node.at("pci"));
     if (node.has("vpd"))

@@ -33,6 +33,13 @@ template <class Value> std::string bytesOf(const Value& value)
     return std::string(reinterpret_cast<const char*>(&value), sizeof value);
 }
 
+std::uint64_t counterOf(const Attribute& attribute)
+{
+    std::uint64_t value = 0;
+    attribute.value.copy(reinterpret_cast<char*>(&value), sizeof value);
+    return value;
+}
+
 constexpr std::size_t padded(std::size_t length)
 {
     return (length + 3) & ~std::size_t{3};
@@ -147,6 +154,19 @@ void setAttribute(AttributeList& list, Attribute attribute)
         *place = std::move(attribute);
     else
         list.push_back(std::move(attribute));
+}
+
+void growCounters(AttributeList& list, const AttributeList& growth)
+{
+    constexpr std::uint64_t notCounted = ~0ULL;
+    for (const Attribute& more : growth)
+    {
+        const auto place = std::ranges::find(list, more.id, &Attribute::id);
+        if (place == list.end() || place->form != counter || more.form != counter)
+            continue;
+        if (const std::uint64_t value = counterOf(*place); value != notCounted)
+            *place = counterAttribute(more.id, value + counterOf(more));
+    }
 }
 
 std::vector<std::byte> encodeAttributes(const AttributeList& list, bool terminated)

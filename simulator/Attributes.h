@@ -39,6 +39,9 @@ Attribute textAttribute(std::uint32_t id, std::string_view value);
 /// Adds `attribute`, in the place of one with the same number if there is one.
 void setAttribute(AttributeList& list, Attribute attribute);
 
+/// Adds to each counter what `growth` has of its number. One that is not in the list, or not counted, stays so.
+void growCounters(AttributeList& list, const AttributeList& growth);
+
 /// How a scenario names an attribute.
 struct AttributeRow
 {

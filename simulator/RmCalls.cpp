@@ -259,14 +259,16 @@ RM_STATUS SimulatedHost::portAttributes(Wwn wwpn, AttributeList& out) const
                   });
 }
 
-RM_STATUS SimulatedHost::portStatistics(Wwn wwpn, AttributeList& out) const
+RM_STATUS SimulatedHost::portStatistics(Wwn wwpn, AttributeList& out)
 {
-    return onPort(wwpn,
-                  [&](const Port& port)
-                  {
-                      out = port.statistics;
-                      return RM_OK;
-                  });
+    std::lock_guard lock(_mutex);
+    const auto place = _portByName.find(wwpn);
+    if (place == _portByName.end())
+        return RM_ERROR_INVALID_WWN;
+    Port& port = _scenario.adapters[place->second.adapter].ports[place->second.port];
+    out = port.statistics;
+    growCounters(port.statistics, port.growth);
+    return RM_OK;
 }
 
 RM_STATUS SimulatedHost::serverAttributes(Wwn wwpn, AttributeList& out) const

@@ -228,6 +228,7 @@ struct Port
     std::uint32_t scsiBus = 0;
     AttributeList attributes; ///< stand above those that follow from the members
     AttributeList statistics;
+    AttributeList growth; ///< of the statistics, by each reading
     std::optional<RM_PciRegisters> pci;
     std::optional<RM_VpdArea> vpd;
     std::optional<RM_SffData> transceiver;

@@ -63,7 +63,7 @@ public:
     RM_STATUS setBeacon(Wwn wwpn, std::uint32_t state);
     RM_STATUS hbaAttributes(Wwn wwpn, AttributeList& out) const;
     RM_STATUS portAttributes(Wwn wwpn, AttributeList& out) const;
-    RM_STATUS portStatistics(Wwn wwpn, AttributeList& out) const;
+    RM_STATUS portStatistics(Wwn wwpn, AttributeList& out);
     RM_STATUS serverAttributes(Wwn wwpn, AttributeList& out) const;
     RM_STATUS luns(Wwn wwpn, Wwn target, std::vector<RM_Lun>& out) const;
     RM_STATUS scsi(Wwn wwpn, Wwn target, HBA_UINT64 lun, const ScsiCommand& command, ScsiReply& out);

@@ -53,6 +53,17 @@ bool sameKind(const Element& element, const char* name)
     return std::string_view(element.kind->name) == name;
 }
 
+/// Of units, which may be many, what their kind shows; of others all, since what is wrong with them is read of more.
+PropertyList shownProperties(const KindRow& kind)
+{
+    if (kind.appears != Appears::unit)
+        return std::nullopt;
+    std::vector<std::string> names{kind.nameProperty, "DeviceID", "Capacity"};
+    for (const FactRow& row : kind.facts)
+        names.emplace_back(row.property);
+    return names;
+}
+
 /// Null for what is no reference.
 const Path* pathOf(const Value& value)
 {
@@ -82,46 +93,54 @@ void HostGraph::take(std::span<const std::string_view> wanted)
     std::set<std::string> asked;
     for (const KindRow& kind : kinds())
         if (kind.className && isWanted(kind.name) && asked.insert(kind.className).second)
-            takeElements(kind.className);
+            takeElements(kind);
     for (const EdgeRow& row : edges())
         if (isWanted(row.whole) && isWanted(row.part) && asked.insert(row.association).second)
             takeParts(row.association);
 }
 
-/// What the broker answers, or an empty answer and a note of the failure.
-template <class Answer> Answer HostGraph::noted(const std::string& className, Answer answer)
+/// Whether the broker answered; notes the failure where it did not.
+bool HostGraph::answered(const std::string& className, const Outcome& outcome)
 {
-    if (answer.ok())
-    {
-        _anyAnswered = true;
-        return answer;
-    }
-    const CimError error(answer);
+    if (outcome.ok())
+        return _anyAnswered = true;
+    const CimError error(outcome);
     if (!_anyAnswered)
         throw error;
     _failures.push_back(className + ": " + error.what());
-    return {};
+    return false;
 }
 
-void HostGraph::takeElements(const std::string& className)
+void HostGraph::takeElements(const KindRow& first)
 {
-    for (Object& object : noted(className, _broker.enumerateInstances(_nameSpace, className)).objects)
+    const std::size_t known = _elements.size();
+    const auto take = [&](Object&& object)
     {
         const auto kind = std::ranges::find_if(kinds(), [&](const KindRow& row) { return isOf(row, object); });
-        if (kind == kinds().end())
-            continue;
-        Element& element = _elements.emplace_back(Element{&*kind, std::move(object)});
-        _byPath.emplace(pathId(element.object.path), &element);
-    }
+        if (kind != kinds().end())
+            _elements.emplace_back(Element{&*kind, std::move(object)});
+        return true;
+    };
+    if (!answered(first.className,
+                  _broker.enumerateInstances(_nameSpace, first.className, shownProperties(first), {take, true})))
+        _elements.resize(known, _elements.front());
+    for (std::size_t i = known; i < _elements.size(); i++)
+        _byPath.emplace(pathId(_elements[i].object.path), &_elements[i]);
 }
 
 void HostGraph::takeParts(const std::string& association)
 {
-    const NamesReply reply = noted(association, _broker.enumerateInstanceNames(_nameSpace, association));
+    std::vector<const EdgeRow*> rows;
     for (const EdgeRow& row : edges())
         if (association == row.association)
-            for (const Path& path : reply.paths)
-                join(row, path);
+            rows.push_back(&row);
+    const auto take = [&](Path&& path)
+    {
+        for (const EdgeRow* row : rows)
+            join(*row, path);
+        return true;
+    };
+    answered(association, _broker.enumerateInstanceNames(_nameSpace, association, {take, true}));
 }
 
 /// Ends are told apart by their kinds. What is no element is the host, where a host is expected.
@@ -187,7 +206,9 @@ void HostGraph::nameHost(const Path& path)
 void HostGraph::findChassis()
 {
     const char* containment = "TVRHBA_ChassisContainsCard";
-    for (const Path& association : noted(containment, _broker.enumerateInstanceNames(_nameSpace, containment)).paths)
+    const NamesReply reply = _broker.enumerateInstanceNames(_nameSpace, containment);
+    answered(containment, reply);
+    for (const Path& association : reply.paths)
     {
         const Value* end = association.key("GroupComponent");
         const Path* chassis = end ? pathOf(*end) : nullptr;

@@ -51,8 +51,9 @@ public:
     const std::vector<std::string>& failures() const { return _failures; }
 
 private:
-    template <class Answer> Answer noted(const std::string& className, Answer answer);
-    void takeElements(const std::string& className);
+    bool answered(const std::string& className, const Outcome& outcome);
+    /// Of the class of a kind, with those of all kinds of that class.
+    void takeElements(const KindRow& first);
     void takeParts(const std::string& association);
     void join(const EdgeRow& row, const Path& association);
     Element* find(const Path& path) const;

@@ -41,7 +41,14 @@ std::uint64_t rank(const Value& value)
 std::string cellText(const ClassInfo* info, const Property& property)
 {
     std::string text = shownText(info, property.value, property.name);
-    return text.size() <= longestText ? text : shortened(text.substr(0, longestText), longestText - 1) + "…";
+    if (text.size() <= longestText)
+        return text;
+    constexpr unsigned continuationMask = 0xC0;
+    constexpr unsigned continuation = 0x80;
+    std::size_t end = longestText;
+    while (end > 0 && (static_cast<unsigned char>(text[end]) & continuationMask) == continuation)
+        end--;
+    return text.substr(0, end) + "…";
 }
 
 } // namespace
@@ -92,8 +99,8 @@ std::vector<std::size_t> InstanceTable::select(const Selection& selection) const
     std::vector<std::size_t> rows(_rows.size());
     std::iota(rows.begin(), rows.end(), 0);
     if (!selection.find.empty())
-        std::erase_if(rows,
-                      [&, wanted = lowerCase(selection.find)](std::size_t row) { return !has(_rows[row], wanted); });
+        std::erase_if(rows, [&, wanted = lowerCase(oneLine(selection.find))](std::size_t row)
+                      { return !has(_rows[row], wanted); });
     if (selection.sort.empty())
         return rows;
     const std::size_t column = columnOf(selection.sort);

@@ -160,6 +160,19 @@ TEST_F(Host, AttributesFollowTheMembersUnlessListed)
     EXPECT_FALSE(host.setAttributeOf(portA, readAttribute(R"({"operatingSystem": "x"})", "test")));
 }
 
+TEST(SimulatedCounters, GrowByEachReadingWhereTheyAreCounted)
+{
+    AttributeList counters = {counterAttribute(RM_PS_RX_FRAMES, 5), counterAttribute(RM_PS_TX_FRAMES, ~0ULL),
+                              counterAttribute(RM_PS_LIP_COUNT, ~0ULL - 1)};
+    const AttributeList growth = {counterAttribute(RM_PS_RX_FRAMES, 300), counterAttribute(RM_PS_TX_FRAMES, 1),
+                                  counterAttribute(RM_PS_LIP_COUNT, 3), counterAttribute(RM_PS_NOS_COUNT, 1)};
+    growCounters(counters, growth);
+    growCounters(counters, growth);
+    const AttributeList expected = {counterAttribute(RM_PS_RX_FRAMES, 605), counterAttribute(RM_PS_TX_FRAMES, ~0ULL),
+                                    counterAttribute(RM_PS_LIP_COUNT, 4)};
+    EXPECT_EQ(counters, expected);
+}
+
 TEST_F(Host, RmQueriesAnswerForThePortTheyName)
 {
     std::uint32_t value = 0;
