@@ -194,13 +194,16 @@ TEST(ServeJson, PagesSortsAndFindsAmongThousands)
 
     std::vector<std::string> paths, ids;
     for (std::size_t from = 0; from < total; from += 500)
-        for (const Json& row :
-             script.ask(volumes + "?count=500&sort=DeviceID&descending=1&from=" + std::to_string(from)).json["rows"])
+    {
+        const std::string part = "?count=500&sort=DeviceID&descending=1&from=" + std::to_string(from);
+        const Json rows = script.ask(volumes + part).json["rows"];
+        for (const Json& row : rows)
         {
             paths.push_back(row["path"]);
             ids.push_back(row["values"][columnOf(table, "DeviceID")]);
         }
-    EXPECT_EQ(ids.size(), total);
+    }
+    ASSERT_EQ(ids.size(), total);
     EXPECT_TRUE(std::ranges::is_sorted(ids, std::greater()));
     EXPECT_EQ(std::ranges::adjacent_find(ids), ids.end()) << "no row stands on two pages";
     EXPECT_EQ(script.ask(volumes + "?from=" + std::to_string(total)).json["rows"].size(), 0U);
@@ -211,7 +214,7 @@ TEST(ServeJson, PagesSortsAndFindsAmongThousands)
     EXPECT_EQ(found["rows"][0]["path"], paths[total / 2]);
 
     const Json host = script.ask("host").json;
-    EXPECT_EQ(host["root"]["units"], 4096);
+    EXPECT_GE(host["root"]["units"], total);
     EXPECT_EQ(host.dump().find("\"kind\":\"Volume\""), std::string::npos) << "units beyond eight are counted";
 }
 
