@@ -160,8 +160,22 @@ void endBehindException(const httplib::Request&, httplib::Response& response, st
     tell(response, 500, "the answer could not be made");
 }
 
+/// What a browser may make of an answer: a page has scripts, styles and pictures of this port alone, asks it alone, and
+/// stands in no page of another.
+httplib::Headers answersOfThisPort()
+{
+    return {{"Content-Security-Policy",
+             "default-src 'none'; script-src 'self'; style-src 'self'; img-src 'self'; connect-src 'self'; "
+             "base-uri 'none'; form-action 'none'; frame-ancestors 'none'"},
+            {"X-Content-Type-Options", "nosniff"},
+            {"Referrer-Policy", "no-referrer"},
+            {"Cross-Origin-Resource-Policy", "same-origin"},
+            {"Cross-Origin-Opener-Policy", "same-origin"}};
+}
+
 void setUp(httplib::Server& server)
 {
+    server.set_default_headers(answersOfThisPort());
     server.set_payload_max_length(largestBody);
     server.set_keep_alive_max_count(mostRequests); // clients are told
     server.set_error_handler(httplib::Server::Handler(endBehindError));

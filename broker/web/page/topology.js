@@ -1,0 +1,267 @@
+// A picture of the host: cards, their ports, and the targets that these reach. Side by side where there is room, below
+// one another where there is not.
+
+import {draw, make} from "./dom.js";
+import {hrefOfObject} from "./paths.js";
+
+const lineHeight = 18;
+const padding = 8;
+const gap = 12;
+const characterWidth = 7.4; // of the font of the picture, at the most
+const wideEnough = 760;
+const mostTargets = 40; // of all ports together; what a port has beyond its part of them is one box
+const fewestTargets = 3; // of a port
+
+function descendants(node, kind, found = []) {
+  for (const child of node.children)
+    if (child.kind === kind)
+      found.push(child);
+    else
+      descendants(child, kind, found);
+  return found;
+}
+
+function factText(node, label) {
+  return node.facts.find((fact) => fact.label === label)?.text ?? "";
+}
+
+function sizeText(bytes) {
+  const units = ["bytes", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"];
+  let amount = Number(bytes);
+  let unit = 0;
+  for (; amount >= 1024 && unit < units.length - 1; unit++)
+    amount /= 1024;
+  return (Number.isInteger(amount) ? amount : amount.toFixed(1)) + " " + units[unit];
+}
+
+function countText(count, word) {
+  return count + " " + word + (Number(count) === 1 ? "" : "s");
+}
+
+export function unitsText(node) {
+  return countText(node.units, "unit") + (Number(node.bytes) > 0 ? ", " + sizeText(node.bytes) : "");
+}
+
+/** "critical", "warning", or "" for what is well. */
+function stateOf(node) {
+  const severities = node.problems.map((problem) => problem.severity);
+  return severities.includes("critical") ? "critical" : severities.length ? "warning" : "";
+}
+
+function boxOf(node, title, lines, kind) {
+  const problems = node.problems.map((problem) => problem.text);
+  const said = problems.map((text) => text.toLowerCase());
+  const rest = lines.filter((line) => line && !said.includes(line.toLowerCase()));
+  return {node, kind, title, lines: rest, problems, state: stateOf(node), path: node.path,
+    links: [], parts: [], whole: null};
+}
+
+function cardBox(card) {
+  return boxOf(card, factText(card, "model") || card.name, ["serial number " + factText(card, "serial number")], "Card");
+}
+
+function portBox(port) {
+  const fabric = factText(port, "fabric");
+  const pair = [factText(port, "state"), factText(port, "speed")].filter(Boolean).join(", ");
+  return boxOf(port, port.name, [pair, fabric && "fabric " + fabric], port.kind);
+}
+
+function nameOf(target) {
+  return target.wwpn ?? target.name;
+}
+
+function targetBox(target) {
+  return boxOf(target, nameOf(target), [unitsText(target)], "Target");
+}
+
+function restBox(targets, port) {
+  const sum = targets.reduce((all, target) => ({units: all.units + Number(target.units), bytes: all.bytes + Number(target.bytes)}),
+    {units: 0, bytes: 0});
+  return boxOf({...port, problems: []}, countText(targets.length, "more target"), [unitsText(sum)], "Targets");
+}
+
+/** The boxes of targets, one for each WWPN, with the ports that reach them. */
+class Targets {
+  boxes = [];
+  _known = new Map();
+
+  constructor(ports) {
+    this._most = Math.max(fewestTargets, Math.floor(mostTargets / ports));
+  }
+
+  /** Joins the port with the box of that name, which is made where there is none yet. */
+  _join(port, name, make) {
+    if (!this._known.has(name)) {
+      this._known.set(name, make());
+      this.boxes.push(this._known.get(name));
+    }
+    port.links.push(this._known.get(name));
+  }
+
+  seenBy(port) {
+    const listed = ownTargets(port.node);
+    if (listed.length > 0)
+      this._reach(port, listed);
+    else if (port.node.targets)
+      this._count(port, port.node);
+  }
+
+  _reach(port, targets) {
+    for (const target of targets.slice(0, this._most))
+      this._join(port, nameOf(target), () => targetBox(target));
+    const rest = targets.slice(this._most);
+    if (rest.length > 0)
+      this._join(port, rest.map(nameOf).join(), () => restBox(rest, port.node));
+  }
+
+  _count(port, {targets, ...node}) {
+    this._join(port, node.name, () => boxOf({...node, problems: []}, countText(targets, "target"), [unitsText(node)], "Targets"));
+  }
+}
+
+/** Targets of the port itself, not of the virtual ports on it. */
+function ownTargets(port) {
+  return descendants({children: port.children.filter((child) => child.kind !== "Virtual port")}, "Target");
+}
+
+function columnsOf(root) {
+  const cards = [];
+  const ports = [];
+  const targets = new Targets(descendants(root, "FC port").length);
+  for (const card of descendants(root, "Card")) {
+    const cardPlace = cardBox(card);
+    cards.push(cardPlace);
+    for (const port of descendants(card, "FC port")) {
+      const portPlace = portBox(port);
+      cardPlace.links.push(portPlace);
+      portPlace.parts = descendants(port, "Virtual port").map(portBox);
+      for (const place of [portPlace, ...portPlace.parts]) {
+        place.whole = place === portPlace ? null : portPlace;
+        ports.push(place);
+        targets.seenBy(place);
+      }
+    }
+  }
+  return [cards, ports, targets.boxes];
+}
+
+function heightOf(box) {
+  return 2 * padding + lineHeight * (1 + box.lines.length + box.problems.length);
+}
+
+/** Sets x, y, width and height of boxes one below the other; gives the height of all. */
+function stack(boxes, x, width) {
+  let y = 1;
+  for (const box of boxes) {
+    const inset = box.whole ? 16 : 0;
+    Object.assign(box, {x: x + inset, y, width: width - inset, height: heightOf(box)});
+    y += box.height + gap;
+  }
+  return y - gap + 1;
+}
+
+function middle(boxes) {
+  const tops = boxes.map((box) => box.y);
+  const feet = boxes.map((box) => box.y + box.height);
+  return (Math.min(...tops) + Math.max(...feet)) / 2;
+}
+
+/** Moves boxes down to the middle of what they lead to, where the one above leaves room. */
+function align(boxes) {
+  let free = 1;
+  for (const box of boxes) {
+    const wanted = box.links.length ? middle(box.links) - box.height / 2 : box.y;
+    box.y = Math.max(free, wanted);
+    free = box.y + box.height + gap;
+  }
+  return free;
+}
+
+function layWide(columns, width) {
+  const between = 56;
+  const columnWidth = (width - 2 * between - 2) / 3;
+  const heights = columns.map((boxes, at) => stack(boxes, 1 + at * (columnWidth + between), columnWidth));
+  const grown = [columns[1], columns[0]].map(align);
+  return Math.max(...heights, ...grown);
+}
+
+/** A target stands below the first port that reaches it; the others say so in words. */
+function inOrderOf(cards) {
+  const inOrder = [];
+  const placed = new Set();
+  for (const card of cards) {
+    inOrder.push([card, 0]);
+    for (const port of card.links.flatMap((each) => [each, ...each.parts])) {
+      inOrder.push([port, port.whole ? 2 : 1]);
+      const above = port.links.filter((target) => placed.has(target));
+      port.lines.push(...above.map((target) => "and " + target.title + " above"));
+      port.links = port.links.filter((target) => !placed.has(target));
+      for (const target of port.links)
+        inOrder.push([target, 3]);
+      port.links.forEach((target) => placed.add(target));
+    }
+  }
+  return inOrder;
+}
+
+function layNarrow(columns, width) {
+  const step = 14;
+  const inOrder = inOrderOf(columns[0]);
+  let y = 1;
+  for (const [box, depth] of inOrder) {
+    const x = 1 + depth * step;
+    Object.assign(box, {x, y, width: width - x - 1, height: heightOf(box)});
+    y += box.height + gap;
+  }
+  return y - gap + 1;
+}
+
+function cut(text, width) {
+  const room = Math.floor((width - 2 * padding) / characterWidth);
+  return text.length > room ? text.slice(0, Math.max(1, room - 1)) + "…" : text;
+}
+
+function drawBox(box) {
+  const text = (content, row, style) => draw("text",
+    {x: box.x + padding + 4, y: box.y + padding + lineHeight * (row + 0.5), class: style, "dominant-baseline": "middle"},
+    cut(content, box.width - 4));
+  const rows = [[box.title, "title"], ...box.problems.map((problem) => [problem, "problem"]),
+    ...box.lines.map((line) => [line, "line"])];
+  const label = [box.kind, box.title, ...box.problems, ...box.lines].join(", ");
+  const shapes = [
+    draw("title", {}, label),
+    draw("rect", {class: "box", x: box.x, y: box.y, width: box.width, height: box.height, rx: 5}),
+    draw("rect", {class: "edge", x: box.x, y: box.y, width: 4, height: box.height, rx: 2}),
+    rows.map(([content, style], row) => text(content, row, style)),
+  ];
+  const style = "node " + box.kind.toLowerCase().replace(" ", "-") + " " + box.state;
+  return box.path
+    ? draw("a", {class: style, href: hrefOfObject(box.path), "aria-label": label}, shapes)
+    : draw("g", {class: style}, shapes);
+}
+
+function drawLine(from, to, isWide) {
+  const y1 = from.y + from.height / 2;
+  const y2 = to.y + to.height / 2;
+  if (isWide) {
+    const x1 = from.x + from.width;
+    const bend = (to.x - x1) / 2;
+    return draw("path", {class: "line " + from.state, d: `M${x1} ${y1}C${x1 + bend} ${y1} ${to.x - bend} ${y2} ${to.x} ${y2}`});
+  }
+  const x = from.x + 7;
+  return draw("path", {class: "line " + from.state, d: `M${x} ${from.y + from.height}V${y2}H${to.x}`});
+}
+
+/** The picture in so many pixels of width. */
+export function pictureOf(root, width) {
+  const columns = columnsOf(root);
+  const boxes = columns.flat();
+  if (boxes.length === 0)
+    return make("p", {class: "notice"}, "There are no adapters.");
+  const isWide = width >= wideEnough;
+  const height = Math.ceil((isWide ? layWide : layNarrow)(columns, width));
+  const lines = boxes.flatMap((from) => [...from.links.map((to) => drawLine(from, to, isWide)),
+    ...from.parts.map((part) => drawLine(from, part, false))]);
+  return draw("svg", {viewBox: `0 0 ${width} ${height}`, width, height, role: "group", "aria-label": "Cards, ports and targets"},
+    lines, boxes.map(drawBox));
+}

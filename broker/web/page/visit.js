@@ -1,0 +1,65 @@
+// A view while it is looked at: what it started ends with it.
+
+import {make, replace, append, button} from "./dom.js";
+import {Refused} from "./api.js";
+
+export class Visit {
+  constructor(main) {
+    this.main = main;
+    this._ending = new AbortController();
+  }
+
+  get signal() { return this._ending.signal; }
+  get over() { return this.signal.aborted; }
+  end() { this._ending.abort(); }
+
+  /** Empties the place and writes the heading, which is where keys go on from. */
+  begin(title, ...children) {
+    document.title = title + " – Fibre Channel adapters";
+    replace(this.main, make("h1", {tabindex: "-1"}, title), children);
+  }
+
+  /** Does `work` now and again when `delay()` milliseconds have passed since it ended; nothing while nobody looks. */
+  async repeat(work, delay) {
+    while (!this.over) {
+      if (!document.hidden)
+        await work();
+      await this._pause(delay());
+    }
+  }
+
+  _pause(milliseconds) {
+    return new Promise((resolve) => {
+      const timer = setTimeout(resolve, milliseconds);
+      this.signal.addEventListener("abort", () => { clearTimeout(timer); resolve(); }, {once: true});
+    });
+  }
+
+  /** Fills `place` with what `work` makes, or with why there is none and a way to try again. */
+  async fill(place, work, waiting = "Reading …") {
+    replace(place, make("p", {class: "quiet", "aria-busy": "true"}, waiting));
+    try {
+      const made = await work();
+      if (!this.over)
+        replace(place, made);
+    } catch (error) {
+      if (this.over)
+        return;
+      const again = button("Try again", () => this.fill(place, work, waiting));
+      replace(place, failure(error), make("p", {}, again));
+    }
+  }
+}
+
+/** What went wrong, for people. */
+export function failure(error) {
+  if (!(error instanceof Refused))
+    console.error(error);
+  const status = error.status ? error.status + ": " : "";
+  return make("p", {class: "notice critical", role: "alert"}, status + error.message);
+}
+
+/** A section with a heading. */
+export function section(title, ...children) {
+  return append(make("section", {}, make("h2", {}, title)), children);
+}

@@ -1,0 +1,532 @@
+// The page as a person uses it, over the simulated hosts.
+#include "tests/browser/Browser.h"
+#include "tests/system/Serving.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <fstream>
+#include <optional>
+
+using namespace browser_test;
+using system_test::Folder;
+using system_test::Serving;
+using testing::AllOf;
+using testing::Each;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+using testing::StartsWith;
+
+namespace
+{
+
+constexpr const char* upPort = "1000027A51160210";
+constexpr const char* downPort = "1000027A51160211";
+
+class Page : public testing::Test
+{
+protected:
+    /// joe may change things, "reader" may only read; both have the password "secret".
+    void serve(std::vector<std::string> options = {})
+    {
+        options.insert(options.end(), {"--users", _folder.makeUsers("joe", "secret")});
+        _serving.emplace(options);
+        browser.runBeforePages("window.violations = []; document.addEventListener('securitypolicyviolation', "
+                               "(event) => violations.push(event.violatedDirective + ' ' + event.blockedURI));");
+    }
+
+    void serveScenario(const std::string& json)
+    {
+        std::ofstream(_folder.file("scenario.json")) << json;
+        serve({"--scenario", _folder.file("scenario.json")});
+    }
+
+    void visit(const std::string& view = "") { browser.open(_serving->url() + "/#/" + view); }
+
+    void logIn(const std::string& user = "joe", const std::string& password = "secret")
+    {
+        browser.click("#session button");
+        browser.type("dialog input[name=user]", user);
+        browser.type("dialog input[name=password]", password);
+        browser.press(key::enter);
+    }
+
+    void awaitHeading(const std::string& text) { browser.awaitText("h1", text); }
+
+    /// Nothing was refused or failed, and nobody else was asked for anything.
+    void expectPeace()
+    {
+        EXPECT_THAT(browser.complaints(), IsEmpty());
+        EXPECT_EQ(browser.run("return violations"), Json::array());
+        for (const Json& url : browser.run("return performance.getEntriesByType('resource').map((each) => each.name)"))
+            EXPECT_THAT(url.get<std::string>(), StartsWith(_serving->url() + "/"));
+    }
+
+    Browser browser;
+    Folder _folder;
+    std::optional<Serving> _serving;
+};
+
+TEST_F(Page, LeadsFromAProblemToItsPortAndFromThePictureToACard)
+{
+    serve();
+    visit();
+    browser.awaitText("#problems", "LINK DOWN");
+    browser.clickText("FC port " + std::string(downPort), "#problems");
+    awaitHeading(downPort);
+    EXPECT_EQ(browser.run("return document.activeElement.tagName"), "H1") << "where the keys go on";
+    browser.awaitText("main", "TVRHBA_FCPort");
+
+    browser.run("history.back()");
+    browser.click(".picture a.card");
+    awaitHeading("Card");
+    browser.awaitText("main", "TV1602");
+    expectPeace();
+}
+
+TEST_F(Page, PictureHasEachTargetOnceAndSaysWhatPortsAre)
+{
+    serve();
+    visit();
+    browser.await("document.querySelectorAll('.picture a.card').length === 2");
+    const std::string titles =
+        "return [...document.querySelectorAll('.picture .target .title')].map((each) => each.textContent)";
+    const Json targets = browser.run(titles);
+    EXPECT_EQ(targets, Json({"50063D200110000A", "50063D3002200001", "50063D200110000B", "50063D4003300001"}));
+    const auto labelOf = [&](const std::string& wwpn)
+    {
+        return browser.run("return [...document.querySelectorAll('.picture .node')].map((each) => "
+                           "each.getAttribute('aria-label') ?? '').find((each) => each.includes('" +
+                           wwpn + "'))");
+    };
+    EXPECT_THAT(labelOf(upPort), AllOf(HasSubstr("up, 8 Gbit/s"), HasSubstr("fabric 1000063D2000A001")));
+    EXPECT_THAT(labelOf(downPort), HasSubstr("LINK DOWN"));
+}
+
+TEST_F(Page, FollowsAssociationsToAUnitAndBack)
+{
+    serve();
+    visit();
+    browser.click(".picture a.fc-port");
+    awaitHeading("FC port " + std::string(upPort));
+    const auto follow = [&](const std::string& what)
+    {
+        browser.await("[...document.querySelectorAll('#associations li')].find((each) => each.textContent.endsWith(' " +
+                      what + "'))");
+        browser.run("[...document.querySelectorAll('#associations li')].find((each) => each.textContent.endsWith(' " +
+                    what + "')).querySelector('a').click()");
+        awaitHeading(what);
+    };
+    follow("SCSI protocol initiator endpoint");
+    follow("Storage volume");
+    browser.awaitText("main", "100 GiB");
+    follow("SCSI protocol initiator endpoint");
+    browser.run("history.go(-3)");
+    awaitHeading("FC port " + std::string(upPort));
+    expectPeace();
+}
+
+TEST_F(Page, RefusesAWrongPasswordAndTellsWhoMayNot)
+{
+    serve();
+    visit();
+    browser.awaitText("#session", "Read only");
+    logIn("joe", "wrong");
+    browser.awaitText("dialog", "name or password is wrong");
+    EXPECT_EQ(browser.run("return document.querySelector('dialog input[name=password]').value"), "");
+    browser.press(key::escape);
+    browser.await("!document.querySelector('dialog')");
+    browser.awaitText("#session", "Not logged in");
+
+    logIn("reader");
+    browser.awaitText("#session", "reader may only read");
+    browser.clickText("Log out");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    EXPECT_THAT(browser.textOf("#session"), Not(HasSubstr("Read only")));
+    // A new page knows nothing of it.
+    browser.run("location.reload()");
+    browser.awaitText("#session", "Not logged in");
+}
+
+TEST_F(Page, PlotsCountersAndMarksErrorsThatGrow)
+{
+    serve({"--scenario", TVR_SCENARIOS "/growing.json"});
+    visit("ports");
+    browser.await("document.querySelector('#interval')");
+    browser.run("const choice = document.querySelector('#interval'); choice.value = 1; "
+                "choice.dispatchEvent(new Event('change'))");
+    browser.clickText("Read now");
+    browser.clickText("Read now");
+    browser.await("document.querySelector('#panels').dataset.reads >= 4");
+    const std::string row = "[...document.querySelectorAll('.panel')].map((panel) => panel.querySelector("
+                            "'[data-counter=CRCErrors]').innerText)";
+    const Json errors = browser.run("return " + row);
+    ASSERT_EQ(errors.size(), 2U);
+    EXPECT_THAT(errors[0].get<std::string>(), Not(HasSubstr("grows")));
+    EXPECT_THAT(errors[1].get<std::string>(), HasSubstr("grows, +"));
+    EXPECT_THAT(browser.textOf("#growing"), HasSubstr("CRC errors of 1000027A51320D01"));
+    EXPECT_GE(browser.run("return document.querySelector('[data-counter=BytesReceived] polyline').points.length"), 3);
+    EXPECT_THAT(browser.textOf("[data-counter=BytesReceived]"), HasSubstr("B/s"));
+    EXPECT_THAT(browser.textOf(".measures"), AllOf(HasSubstr("92 °C"), HasSubstr("warning")));
+    browser.keepPicture("counters");
+
+    // A second look at the host tells it as well.
+    visit();
+    browser.awaitText("#problems", "CRC ERRORS GROW");
+    browser.keepPicture("problems");
+    expectPeace();
+}
+
+TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
+{
+    serve();
+    visit("methods/TVRHBA_FCHBAWWNService/ChangeWWN");
+    const std::string target = browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
+                                             "each.textContent === '1000027A51160210')?.value");
+    const auto ask = [&](const std::string& wwpn)
+    {
+        browser.type("[name=NewWWPN]", wwpn);
+        browser.clickText("Call …");
+    };
+    browser.type("[name=Target]", target);
+    browser.type("[name=NewWWNN]", "2000027A51160299");
+    browser.run("document.querySelector('[name=Type]').value = 1");
+
+    // Nobody yet, then one who may only read.
+    ask("1000027A51160299");
+    browser.type("dialog input[name=user]", "reader");
+    browser.type("dialog input[name=password]", "secret");
+    browser.press(key::enter);
+    browser.awaitText("dialog", "reader may only read");
+    browser.clickText("Close", "dialog");
+    EXPECT_EQ(browser.textOf("#result"), "");
+
+    browser.clickText("Log out");
+    browser.await("document.querySelector('#session').innerText.includes('Not logged in')");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    struct Case
+    {
+        const char* wwpn;
+        const char* result;
+    };
+    for (const Case& each : {Case{"0000000000000000", "(40005)"}, Case{downPort, "A name is in use (91)"},
+                             Case{"seven", "("}, Case{"1000027A51160299", "Completed (0)"}})
+    {
+        ask(each.wwpn);
+        browser.awaitText("dialog h2", "Change the WWN of FC port 1000027A51160210?");
+        EXPECT_THAT(browser.textOf("dialog"), AllOf(HasSubstr(each.wwpn), HasSubstr("Non-volatile (1)")));
+        browser.keepPicture("question");
+        browser.clickText("Call ChangeWWN", "dialog");
+        browser.await("!document.querySelector('dialog')");
+        browser.awaitText("#returned", each.result);
+        EXPECT_EQ(browser.run("return document.querySelector('#returned').classList.contains('ok')"),
+                  each.result == std::string("Completed (0)"))
+            << each.wwpn;
+    }
+    // Left without an answer, a question does nothing.
+    ask("1000027A51160277");
+    browser.awaitText("dialog", "1000027A51160277");
+    browser.press(key::escape);
+    browser.await("!document.querySelector('dialog')");
+    EXPECT_EQ(browser.textOf(":focus"), "Call …");
+    EXPECT_THAT(browser.textOf("#returned"), HasSubstr("Completed (0)"));
+}
+
+TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
+{
+    serve();
+    visit("methods/TVRHBA_SoftwareInstallationService/InstallFromByteStream");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    struct Mistake
+    {
+        const char* field;
+        const char* value;
+        const char* reason;
+    };
+    for (const Mistake& each :
+         {Mistake{"[name=InstallOptions]", "1, 65536", "not within 0 and 65535"},
+          Mistake{"[name=InstallOptions]", "-1", "not within 0 and 65535"},
+          Mistake{"[name=InstallOptions]", "1.5", "is no integer"}, Mistake{"[name=InstallOptions]", "3", ""},
+          Mistake{"[aria-label='Image as numbers']", "1 0x100", "not within 0 and 255"},
+          Mistake{"[aria-label='Image as numbers']", "x", "is no integer"}})
+    {
+        browser.type(each.field, each.value);
+        browser.clickText("Call …");
+        if (*each.reason)
+            browser.awaitText(".mistake:not(:empty)", each.reason);
+        else
+            browser.awaitText("dialog", "InstallOptions");
+        EXPECT_EQ(browser.run("return Boolean(document.querySelector('dialog'))"), !*each.reason) << each.value;
+        browser.press(key::escape);
+        browser.await("!document.querySelector('dialog')");
+    }
+
+    // Only bytes as they are in the file have that sum.
+    std::ofstream(_folder.file("image.grp"), std::ios::binary)
+        << "TVRSIM-FIRMWARE 1\nfamily: TV3202\nversion: 12.8.1.0\nchecksum: CBF43926\n\n123456789";
+    browser.choose("input[type=file]", _folder.file("image.grp"));
+    browser.type("[name=Target]", browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
+                                                "each.textContent === '1000027A51320240')?.value"));
+    browser.type("[name=InstallOptions]", "32768");
+    browser.type("[name=InstallOptionsValues]", "new.grp");
+    browser.clickText("Call …");
+    browser.awaitText("dialog", "image.grp, 80 bytes");
+    browser.clickText("Call InstallFromByteStream", "dialog");
+    browser.awaitText("#returned", "Job Completed with No Error (0)");
+}
+
+TEST_F(Page, ClearsALogWhenAsked)
+{
+    serve();
+    visit("logs");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    browser.clickText("What is logged …");
+    awaitHeading("Set the log params");
+    browser.await("document.querySelector('[name=LogMode]')");
+    browser.run(
+        "document.querySelector('[name=LogLevel]').value = 5; document.querySelector('[name=LogMode]').value = 1");
+    browser.clickText("Call …");
+    browser.clickText("Call SetLogParams", "dialog");
+    browser.awaitText("#returned", "Completed");
+    browser.run("location.hash = '#/methods/TVRHBA_RecordLog/RequestStateChange/' + location.hash.split('/')[4]");
+    awaitHeading("Request the state change");
+    browser.await("document.querySelector('[name=RequestedState]')");
+    browser.run("document.querySelector('[name=RequestedState]').value = 2");
+    browser.clickText("Call …");
+    browser.clickText("Call RequestStateChange", "dialog");
+    browser.awaitText("#returned", "Completed");
+
+    browser.clickText("Logs");
+    browser.awaitText("#entries", "FC Record Logs enabled");
+    browser.clickText("Clear …");
+    browser.awaitText("dialog", "Clear the log of the provider?");
+    browser.clickText("Cancel", "dialog");
+    browser.await("!document.querySelector('dialog')");
+    EXPECT_THAT(browser.textOf("#entries"), HasSubstr("FC Record Logs enabled"));
+    browser.clickText("Clear …");
+    browser.clickText("Clear", "dialog");
+    browser.awaitText("#entries", "Cleared all the logs");
+    EXPECT_THAT(browser.textOf("#entries"), Not(HasSubstr("FC Record Logs enabled")));
+    expectPeace();
+}
+
+TEST_F(Page, RunsADiagnosticTestToItsEnd)
+{
+    serve();
+    visit("diagnostics");
+    logIn();
+    browser.awaitText("#session", "Logged in as joe");
+    browser.click("button[aria-label='Run Host Loopback Test on 1000027A51160210']");
+    browser.awaitText("dialog h2", "Run the Host Loopback Test on port 1000027A51160210?");
+    browser.clickText("Run", "dialog");
+    browser.await("document.querySelector('[data-port] progress, [data-port] .notice')");
+    browser.awaitText("[data-port='1000027A51160210']", "Host Loopback Test has ended");
+    browser.awaitText("#jobs", "Completed");
+    browser.awaitText("#records", "Resulted with Success");
+    browser.run("document.querySelector('#records').scrollIntoView({block: 'end'})");
+    browser.keepPicture("records");
+    browser.click("#records a");
+    browser.awaitText("main", "LoopsPassed");
+    expectPeace();
+}
+
+// Markup, quotes, what closes an attribute, characters that turn the text around, and bytes that are no UTF-8.
+constexpr const char* hostileHost = R"json({
+  "targets": [{"name": "t", "wwpn": "50:06:3D:20:01:10:00:0A",
+    "units": [{"lun": 0, "blocks": 2097152, "serialNumber": "<svg onload=x>", "vendor": "<b>\"'"}]}],
+  "adapters": [{"name": "Tavrin-<img src=x onerror=hit()>", "serialNumber": "\"><script>hit()</script>",
+    "model": "<img src=http://192.0.2.1/x onerror=hit()>", "manufacturer": "'\"><iframe src=javascript:hit()>",
+    "modelDescription": "\u202Edeppilf \u0007bell", "nodeSymbolicName": "<style>*{display:none}</style>",
+    "driverName": "</script><script>hit()</script>", "firmwareVersion": "javascript:hit()",
+    "attributes": {"functionType": 0, "portNumber": 0, "raw": {"0x209": "3CFFFE80623E"}},
+    "ports": [{"wwpn": "10:00:02:7A:51:32:02:40", "targets": ["t"], "symbolicName": "<a href=javascript:hit()>x</a>",
+      "osDeviceName": "/dev/\"><img src=x onerror=hit()>"}]}]})json";
+
+TEST_F(Page, ShowsHostileNamesAsTexts)
+{
+    serveScenario(hostileHost);
+    browser.runBeforePages("window.hits = 0; window.hit = () => { hits++; };");
+    visit();
+    browser.await("document.querySelector('.picture a.card')");
+    EXPECT_THAT(browser.textOf(".picture a.card"), HasSubstr("<img src=http://192.0.2.1/x"));
+    browser.click(".picture a.card");
+    awaitHeading("<script>hit()</script>");
+    browser.awaitText("main", "<iframe src=javascript:hit()>");
+    browser.await("document.querySelectorAll('#associations a').length > 0");
+    for (const char* view : {"ports", "classes/TVRHBA_Product", "classes/TVRHBA_SoftwareIdentity",
+                             "classes/TVRHBA_StorageVolume", "object/TVRHBA_Card.Tag=%3Cimg%20src=x%20onerror=hit()%3E",
+                             "classes/%3Cimg%20src=x%20onerror=hit()%3E", "methods/%22%3E%3Cb%3E/x", "%3Cb%3E"})
+    {
+        visit(view);
+        browser.await("document.querySelector('h1') && !document.querySelector('[aria-busy]')");
+        const char* foreign = "return document.querySelectorAll('img, iframe, script:not([src=\"main.js\"]), style, b, "
+                              "[onerror], [onload], a[href^=javascript]').length";
+        EXPECT_EQ(browser.run(foreign), 0) << view;
+        EXPECT_EQ(browser.run("return hits"), 0) << view;
+        EXPECT_EQ(browser.run("return violations"), Json::array()) << view;
+    }
+    visit("classes/TVRHBA_Product");
+    browser.awaitText(".grid", "\\u202edeppilf");
+    browser.awaitText(".grid", "\\x07bell");
+}
+
+TEST_F(Page, WorksWithKeysAlone)
+{
+    serve();
+    visit();
+    browser.awaitText("#problems", "LINK DOWN");
+    browser.press(key::tab);
+    EXPECT_EQ(browser.run("return document.activeElement.id"), "skip");
+    browser.press(key::enter);
+    EXPECT_EQ(browser.run("return document.activeElement.id"), "main");
+    ASSERT_TRUE(browser.pressUntil(key::tab, "document.activeElement.classList.contains('fc-port')"));
+    EXPECT_NE(browser.run("return getComputedStyle(document.activeElement.querySelector('.box')).strokeWidth"), "1px");
+    browser.press(key::enter);
+    awaitHeading("FC port " + std::string(upPort));
+
+    // A dialog keeps the focus, closes with Escape and gives the focus back.
+    browser.run("document.querySelector('#session button').focus()");
+    browser.press(key::enter);
+    browser.await("document.activeElement.name === 'user'");
+    for (int tab = 0; tab < 8; tab++)
+    {
+        browser.press(key::tab);
+        EXPECT_FALSE(browser.run("return Boolean(document.activeElement.closest('main, header'))").get<bool>());
+    }
+    browser.press(key::escape);
+    browser.await("!document.querySelector('dialog')");
+    EXPECT_EQ(browser.textOf(":focus"), "Log in");
+
+    visit("classes/TVRHBA_StorageVolume");
+    browser.awaitText("#count", "6 instances");
+    ASSERT_TRUE(browser.pressUntil(key::tab, "document.activeElement.textContent === 'ElementName'"));
+    browser.press(key::enter);
+    browser.await("document.querySelector('[aria-sort=ascending]')?.textContent === 'ElementName'");
+    browser.await("document.activeElement.textContent === 'ElementName'");
+    browser.press(key::space);
+    browser.await("document.querySelector('[aria-sort=descending]')?.textContent === 'ElementName'");
+}
+
+TEST_F(Page, ScrollsSortsAndSearchesThousandsOfUnits)
+{
+    serve({"--scenario", TVR_SCENARIOS "/large.json"});
+    visit("classes/TVRHBA_StorageVolume");
+    browser.await("/^\\d{4} instances/.test(document.querySelector('#count')?.innerText)");
+    const Json before = browser.run("return performance.now()");
+    browser.run("document.querySelector('.tall').scrollTop = 1e9");
+    const int last = std::stoi(browser.textOf("#count")) - 1;
+    browser.await("[...document.querySelectorAll('[data-row]')].at(-1)?.dataset.row === '" + std::to_string(last) +
+                  "'");
+    EXPECT_LT(browser.run("return performance.now()").get<double>() - before.get<double>(), 1000) << "milliseconds";
+    EXPECT_LT(browser.run("return document.querySelectorAll('.grid tr').length"), 80) << "rows that nobody sees";
+
+    browser.clickText("ElementName", ".grid");
+    browser.await("document.querySelector('[aria-sort=ascending]') && document.querySelector('[data-row=\"0\"]')");
+    const std::string column =
+        "[...document.querySelectorAll('.grid tbody tr')].map((row) => row.children[[...document."
+        "querySelectorAll('.grid thead th')].findIndex((head) => head.textContent === "
+        "'ElementName')]?.textContent).filter(Boolean)";
+    const std::string first = browser.run("return " + column + "[0]");
+    browser.clickText("ElementName", ".grid");
+    browser.await("document.querySelector('[aria-sort=descending]') && " + column + ".length > 5");
+    EXPECT_NE(browser.run("return " + column + "[0]"), first);
+
+    browser.type("#find", "Storage Volume: 31");
+    browser.await("/^\\d+ of \\d{4} instances/.test(document.querySelector('#count').innerText)");
+    browser.await(column + ".every((name) => name.includes('31'))");
+    browser.type("#find", "nothing is called so");
+    browser.awaitText("#count", "0 of ");
+    expectPeace();
+}
+
+// Each view in the forms in which people look at it: no width that must be scrolled, and a text that can be read.
+constexpr const char* views[][2] = {
+    {"host", ""},
+    {"ports", "ports"},
+    {"classes", "classes"},
+    {"units", "classes/TVRHBA_StorageVolume"},
+    {"card", "object/TVRHBA_Card.CreationClassName%3D%22TVRHBA_Card%22%2CTag%3D%22TV16A02417%22"},
+    {"logs", "logs"},
+    {"diagnostics", "diagnostics"},
+    {"methods", "methods"},
+    {"method", "methods/TVRHBA_FCHBAWWNService/ChangeWWN"}};
+
+// How much lighter the one is than the other, as WCAG reckons it.
+constexpr const char* contrast = R"js(
+    const light = (colour) => colour.match(/[\d.]+/g).slice(0, 3).map((c) => c / 255)
+      .map((c) => c <= 0.03928 ? c / 12.92 : ((c + 0.055) / 1.055) ** 2.4)
+      .reduce((sum, c, at) => sum + c * [0.2126, 0.7152, 0.0722][at], 0);
+    const style = getComputedStyle(document.body);
+    const [a, b] = [light(style.color), light(style.backgroundColor)];
+    return {ratio: (Math.max(a, b) + 0.05) / (Math.min(a, b) + 0.05), dark: b < 0.2};)js";
+
+TEST_F(Page, FitsNarrowAndDarkScreens)
+{
+    struct Form
+    {
+        const char* name;
+        const char* scheme;
+        int width;
+    };
+    serve();
+    for (const Form& form : {Form{"light", "light", 1280}, Form{"dark", "dark", 1280}, Form{"narrow", "light", 360}})
+    {
+        browser.resize(form.width, 800);
+        browser.prefer(form.scheme);
+        for (const auto& [name, view] : views)
+        {
+            SCOPED_TRACE(std::string(name) + ", " + form.name);
+            visit(view);
+            browser.await("document.querySelector('h1') && document.querySelector('main').innerText.length > 60 && "
+                          "!document.querySelector('[aria-busy]')");
+            EXPECT_LE(browser.run("return document.documentElement.scrollWidth").get<int>(), form.width);
+            const Json colours = browser.run(contrast);
+            EXPECT_GT(colours["ratio"].get<double>(), 7);
+            EXPECT_EQ(colours["dark"], form.scheme == std::string("dark"));
+            browser.keepPicture(std::string(name) + "-" + form.name);
+        }
+    }
+    expectPeace();
+}
+
+/// Milliseconds from the address to the first text; the best of three, since other work may be going on.
+double firstPaint(Browser& browser, const std::string& url)
+{
+    double best = 1e9;
+    for (int tries = 0; tries < 3; tries++)
+    {
+        browser.open("about:blank");
+        browser.open(url);
+        const char* painted = "performance.getEntriesByName('first-contentful-paint')[0]?.startTime";
+        best = std::min(best, browser.await(painted).get<double>());
+    }
+    return best;
+}
+
+TEST_F(Page, PaintsAtOnceAndFillsItselfAsAnswersCome)
+{
+    serve();
+    EXPECT_LT(firstPaint(browser, _serving->url()), 200);
+    browser.awaitText("#problems", "LINK DOWN");
+}
+
+TEST_F(Page, PaintsAtOnceWithSixteenThousandUnits)
+{
+    serveScenario(R"({"generate": {"seed": 3, "adapters": 4, "portsPerAdapter": 2, "targetsPerPort": 16,
+                                   "unitsPerTarget": 64}})");
+    EXPECT_LT(firstPaint(browser, _serving->url()), 1000);
+    browser.await("document.querySelectorAll('.picture .targets').length === 4");
+    EXPECT_THAT(browser.textOf("main"), HasSubstr("27 more targets\n1728 units"));
+    browser.keepPicture("large");
+    visit("classes/TVRHBA_StorageVolume");
+    browser.awaitText("#count", "16384 instances");
+    expectPeace();
+}
+
+} // namespace
