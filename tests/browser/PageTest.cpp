@@ -185,7 +185,7 @@ TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
     serve();
     visit("methods/TVRHBA_FCHBAWWNService/ChangeWWN");
     const std::string target = browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
-                                             "each.textContent === '1000027A51160210')?.value");
+                                             "each.textContent === 'FC port 1000027A51160210')?.value");
     const auto ask = [&](const std::string& wwpn)
     {
         browser.type("[name=NewWWPN]", wwpn);
@@ -271,7 +271,7 @@ TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
         << "TVRSIM-FIRMWARE 1\nfamily: TV3202\nversion: 12.8.1.0\nchecksum: CBF43926\n\n123456789";
     browser.choose("input[type=file]", _folder.file("image.grp"));
     browser.type("[name=Target]", browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
-                                                "each.textContent === '1000027A51320240')?.value"));
+                                                "each.textContent === 'FC port 1000027A51320240')?.value"));
     browser.type("[name=InstallOptions]", "32768");
     browser.type("[name=InstallOptionsValues]", "new.grp");
     browser.clickText("Call …");
@@ -316,23 +316,36 @@ TEST_F(Page, ClearsALogWhenAsked)
     expectPeace();
 }
 
-TEST_F(Page, RunsADiagnosticTestToItsEnd)
+TEST_F(Page, RunsDiagnosticTestsToTheirEnds)
 {
-    serve();
+    serve({"--scenario", TVR_SCENARIOS "/diagnostics.json"});
     visit("diagnostics");
     logIn();
     browser.awaitText("#session", "Logged in as joe");
-    browser.click("button[aria-label='Run Host Loopback Test on 1000027A51160210']");
-    browser.awaitText("dialog h2", "Run the Host Loopback Test on port 1000027A51160210?");
-    browser.clickText("Run", "dialog");
-    browser.await("document.querySelector('[data-port] progress, [data-port] .notice')");
-    browser.awaitText("[data-port='1000027A51160210']", "Host Loopback Test has ended");
+    struct Run
+    {
+        const char* test;
+        const char* port;
+        const char* end;
+    };
+    for (const Run& run : {Run{"Host Loopback Test", "1000027A51320601", "has ended: OK"},
+                           Run{"Self Test", "1000027A51320603", "has ended: Failed"},
+                           Run{"Internal Loopback Test", "1000027A51320605", "it cannot run on the port"}})
+    {
+        const std::string named = std::string(run.test) + " on " + run.port;
+        browser.click("button[aria-label='Run " + named + "']");
+        browser.awaitText("dialog h2", "Run the " + std::string(run.test) + " on port " + run.port + "?");
+        browser.clickText("Run", "dialog");
+        const std::string place = "[data-port='" + std::string(run.port) + "']";
+        browser.await("document.querySelector(\"" + place + "\").querySelector('progress, .notice')");
+        browser.awaitText(place, run.end);
+    }
     browser.awaitText("#jobs", "Completed");
     browser.awaitText("#records", "Resulted with Success");
     browser.run("document.querySelector('#records').scrollIntoView({block: 'end'})");
     browser.keepPicture("records");
     browser.click("#records a");
-    browser.awaitText("main", "LoopsPassed");
+    browser.awaitText("main", "CompletionState");
     expectPeace();
 }
 
