@@ -151,6 +151,21 @@ TEST_F(Page, RefusesAWrongPasswordAndTellsWhoMayNot)
     browser.awaitText("#session", "Not logged in");
 }
 
+TEST_F(Page, AsksWhoReadsWhereOtherHostsAreServed)
+{
+    _folder.makeCertificate("own");
+    serve({"--listen", "0.0.0.0:0", "--tls", _folder.file("own.pem"), _folder.file("own.key")});
+    browser.open("https://127.0.0.1:" + _serving->port() + "/");
+    browser.awaitText("dialog h2", "Log in");
+    browser.type("dialog input[name=user]", "reader");
+    browser.type("dialog input[name=password]", "secret");
+    browser.press(key::enter);
+    browser.awaitText("#problems", "LINK DOWN");
+    browser.clickText("Log out");
+    browser.awaitText("main", "a user is needed");
+    EXPECT_FALSE(browser.run("return Boolean(document.querySelector('.picture a'))").get<bool>());
+}
+
 TEST_F(Page, PlotsCountersAndMarksErrorsThatGrow)
 {
     serve({"--scenario", TVR_SCENARIOS "/growing.json"});
