@@ -117,6 +117,19 @@ void ProviderAgent::releaseRefLocked()
     failedLoads = 0;
 }
 
+ProviderAgent::Readiness ProviderAgent::readiness()
+{
+    if (singletonMutex->try_lock() != 0)
+        return {};
+    const ProviderAgent* agent = singleton.load();
+    const Readiness found =
+        agent ? Readiness{agent->m_bLoaded, agent->m_bAdapterRefreshPending || agent->m_bSANRefreshPending,
+                          agent->m_cacheTimeout}
+              : Readiness{};
+    singletonMutex->unlock();
+    return found;
+}
+
 // --- start ---------------------------------------------------------------------------------------------
 
 ProviderAgent::ProviderAgent() : m_process(getpid())

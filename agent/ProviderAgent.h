@@ -68,6 +68,15 @@ public:
     /// The process ends, or has ended, what the agent stands on: data, maps and libraries.
     bool hasEnded() const { return m_bFinished; }
 
+    /// Of the agent as it is; nothing while there is none, or while it is being made or deleted. Never waits.
+    struct Readiness
+    {
+        bool loaded = false;
+        bool refreshPending = false;    ///< the next request starts a refresh, however young the cache is
+        std::uint32_t cacheTimeout = 0; ///< minutes
+    };
+    static Readiness readiness();
+
     /// Starts a refresh if one is due; returns 0 at once.
     int BuildCimpleInfo();
     /// Whether a reader waits for SAN maps that nobody builds yet.

@@ -1,5 +1,6 @@
 // The refresh: who starts it, and the thread that rebuilds device data and maps.
 #include "agent/ProviderAgent.h"
+#include "agent/RefreshRecord.h"
 #include "agent/RefreshSteps.h"
 #include "foundation/Log.h"
 #include "runtime/base/Memory.h"
@@ -63,6 +64,7 @@ int ProviderAgent::BuildCimpleInfo()
     if (m_bFinished)
         return 0;
     m_bThreadRunning = true;
+    refreshRecord.begin();
     if (m_bThreadJoinable)
     {
         TVR_LOG(TVR_DBG, "PERF: Clearing the previous thread...with join");
@@ -110,6 +112,7 @@ void ProviderAgent::giveUpRefresh(int error)
 {
     TVR_LOG(TVR_ERR, "Could not create the DataFetch_Handler thread, error %d", error);
     m_bThreadRunning = false;
+    refreshRecord.giveUp();
     for (const RefreshStage& stage : {adapterData(), adapterMaps(), sanMaps()})
     {
         Auto_Mutex lock(stage.mutex);
@@ -193,6 +196,7 @@ void ProviderAgent::refresh()
     }
     m_bThreadRunning = false;
     StageRun().contain("the time of the load", [&] { m_lastLoadTime = Datetime::now(); });
+    refreshRecord.end();
     m_ThreadMutex.unlock();
 }
 

@@ -6,6 +6,7 @@
 // point is absent returns the value that device/EntryPoints.h gives it.
 #pragma once
 
+#include "device/CallFailures.h"
 #include "device/EntryPoints.h"
 #include "device/Loader.h"
 #include "device/RmApi.h"
@@ -22,12 +23,13 @@ template <std::size_t Row, class Result, class... Args> class Binding<Row, Resul
     static constexpr Absent absent = entryPoints[Row].absent;
     static_assert(std::is_void_v<Result> == (absent == absentNothing));
     static_assert(!std::is_pointer_v<Result> || absent == absentZero);
+    static_assert(std::is_integral_v<Result> || entryPoints[Row].answer == Answer::value);
 
 public:
     Result operator()(Args... args) const
     {
         if (void* entry = resolveEntry(Row))
-            return reinterpret_cast<Result (*)(Args...)>(entry)(args...);
+            return counted<Row>([&] { return reinterpret_cast<Result (*)(Args...)>(entry)(args...); });
         if constexpr (std::is_pointer_v<Result>)
             return nullptr;
         else if constexpr (!std::is_void_v<Result>)

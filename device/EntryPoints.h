@@ -36,12 +36,21 @@ enum Use : bool
     called = true,
 };
 
+/// What a call answers, by which a failure is told.
+enum class Answer : std::uint8_t
+{
+    status, ///< 0 is success
+    handle, ///< 0 is none
+    value,  ///< a count, a pointer or nothing: it tells no failure
+};
+
 struct EntryPoint
 {
     const char* name;
     Family family;
     Absent absent = absentError;
     Use use = notCalled;
+    Answer answer = Answer::status;
 };
 
 inline constexpr auto entryPoints = std::to_array<EntryPoint>({
@@ -196,12 +205,12 @@ inline constexpr auto entryPoints = std::to_array<EntryPoint>({
     {"LRM_Ini_GetRouteTable", Family::lrmOnly},
     {"RM_GetAdapterType", Family::rmOnly},
     {"RM_GetAllLocalHBAInstances", Family::rmOnly},
-    {"RM_GetAttributeValue", Family::rmOnly, absentZero, called},
+    {"RM_GetAttributeValue", Family::rmOnly, absentZero, called, Answer::value},
     {"RM_GetLocalHBAInfo", Family::rmOnly, absentError, called},
     {"RM_GetLocalHBAInfoV3", Family::rmOnly},
     {"RM_GetLocalHBAInfoV4", Family::rmOnly},
     {"RM_GetNextVpdEntry", Family::rmOnly, absentZero},
-    {"RM_GetNumberOfLocalAdapters", Family::rmOnly, absentZero, called},
+    {"RM_GetNumberOfLocalAdapters", Family::rmOnly, absentZero, called, Answer::value},
     {"RM_GetVersion", Family::rmOnly, absentError, called},
     {"RM_ImportHBAFileA", Family::rmOnly, absentError, called},
     {"RM_IsLocalHBA", Family::rmOnly, absentError, called},
@@ -211,25 +220,25 @@ inline constexpr auto entryPoints = std::to_array<EntryPoint>({
     {"RM_ValidateWwn", Family::rmOnly, absentError, called},
     {"RM_VerifyFirmwareA", Family::rmOnly, absentError, called},
     {"TvrGetBoardNumber", Family::rmOnly, absentMinusOne},
-    {"HBA_CloseAdapter", Family::hbaApi, absentNothing, called},
+    {"HBA_CloseAdapter", Family::hbaApi, absentNothing, called, Answer::value},
     {"HBA_FreeLibrary", Family::hbaApi, absentError, called},
     {"HBA_GetAdapterAttributes", Family::hbaApi, absentError, called},
     {"HBA_GetAdapterName", Family::hbaApi, absentError, called},
     {"HBA_GetAdapterPortAttributes", Family::hbaApi, absentError, called},
     {"HBA_GetFcpTargetMapping", Family::hbaApi, absentError, called},
-    {"HBA_GetNumberOfAdapters", Family::hbaApi, absentZero, called},
+    {"HBA_GetNumberOfAdapters", Family::hbaApi, absentZero, called, Answer::value},
     {"HBA_LoadLibrary", Family::hbaApi, absentError, called},
-    {"HBA_OpenAdapter", Family::hbaApi, absentError, called},
-    {"HBA_RefreshInformation", Family::hbaApi, absentNothing, called},
+    {"HBA_OpenAdapter", Family::hbaApi, absentError, called, Answer::handle},
+    {"HBA_RefreshInformation", Family::hbaApi, absentNothing, called, Answer::value},
     {"HBA_RegisterForAdapterPortEvents", Family::hbaApi},
     {"HBA_RemoveCallback", Family::hbaApi},
     {"HBA_SendReadCapacity", Family::hbaApi, absentError, called},
     {"HBA_SendScsiInquiry", Family::hbaApi, absentError, called},
-    {"CPQFC_CloseAdapter", Family::vendorClose, absentNothing, called},
+    {"CPQFC_CloseAdapter", Family::vendorClose, absentNothing, called, Answer::value},
     {"CPQFC_FreeLibrary", Family::vendorQos},
-    {"CPQFC_GetNumberOfAdapters", Family::vendorQos, absentError, called},
+    {"CPQFC_GetNumberOfAdapters", Family::vendorQos, absentError, called, Answer::value},
     {"CPQFC_LoadLibrary", Family::vendorQos},
-    {"CPQFC_OpenAdapter", Family::vendorQos, absentError, called},
+    {"CPQFC_OpenAdapter", Family::vendorQos, absentError, called, Answer::handle},
     {"CPQFC_QoSGetConfig", Family::vendorQos, absentError, called},
     {"CPQFC_QoSGetGlobalFlag", Family::vendorQos, absentError, called},
     {"CPQFC_QoSSetConfig", Family::vendorQos, absentError, called},

@@ -229,6 +229,13 @@ std::vector<std::string> Broker::nameSpacesOf(std::string_view className) const
     return provider ? provider->nameSpaces : std::vector<std::string>();
 }
 
+void Broker::withFunction(const std::string& name, const std::function<void(void*)>& use)
+{
+    const std::shared_lock lock(_gate);
+    if (void* function = _core->image ? _core->image->symbol(name) : nullptr)
+        use(function);
+}
+
 bool Broker::serves(std::string_view className, Kind kind) const
 {
     const std::shared_lock lock(_gate);

@@ -11,6 +11,7 @@
 #include "broker/core/Violations.h"
 #include "broker/values/ClassInfo.h"
 
+#include <functional>
 #include <memory>
 #include <shared_mutex>
 #include <string>
@@ -74,6 +75,9 @@ public:
     const std::vector<std::string>& servedClasses() const;
     /// Namespaces that the class is registered for, in lower case; none for a class that the module does not serve.
     std::vector<std::string> nameSpacesOf(std::string_view className) const;
+    /// Calls `use` with the address of a function that the module exports, which stays loaded meanwhile; not where it
+    /// has none of that name or is unloaded.
+    void withFunction(const std::string& name, const std::function<void(void*)>& use);
     /// Whether the module has a factory of that kind for the class.
     bool serves(std::string_view className, Kind kind) const;
 

@@ -3,6 +3,7 @@
 #include "broker/cimxml/Port.h"
 #include "broker/cimxml/SelfDescription.h"
 #include "broker/http/Server.h"
+#include "broker/metrics/Site.h"
 #include "broker/tvrcim/SignalEnd.h"
 #include "broker/web/Api.h"
 #include "broker/web/Page.h"
@@ -62,6 +63,7 @@ http::Site sitesOf(Session& session)
     http::Site site = web::pageSite();
     std::ranges::move(web::apiSite(session.broker, session.nameSpace, {TVRCIM_VERSION, session.simulated}),
                       std::back_inserter(site));
+    std::ranges::move(metrics::site(session.broker, session.nameSpace), std::back_inserter(site));
     std::ranges::move(cimxml::site(session.broker), std::back_inserter(site));
     return site;
 }

@@ -1,0 +1,23 @@
+// What the module tells of its cache and its libraries.
+#pragma once
+
+#include "broker/core/Broker.h"
+#include "module/Observe.h"
+
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace metrics
+{
+
+struct Observation : tavrin_fc_observation
+{
+    std::vector<std::pair<std::string, std::uint64_t>> callFailures = {}; ///< by entry point
+};
+
+/// Nothing of a module that tells nothing, or that is unloaded.
+std::optional<Observation> observe(broker::Broker& broker);
+
+} // namespace metrics
