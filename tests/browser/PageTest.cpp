@@ -191,6 +191,8 @@ TEST_F(Page, PlotsCountersAndMarksErrorsThatGrow)
     // A second look at the host tells it as well.
     visit();
     browser.awaitText("#problems", "CRC ERRORS GROW");
+    EXPECT_THAT(browser.textOf(".picture .card"), HasSubstr("TEMPERATURE ABOVE WARNING"));
+    EXPECT_THAT(browser.textOf(".picture .fc-port.warning"), HasSubstr("CRC ERRORS GROW"));
     browser.keepPicture("problems");
     expectPeace();
 }
