@@ -374,7 +374,7 @@ constexpr const char* hostileHost = R"json({
     "model": "<img src=http://192.0.2.1/x onerror=hit()>", "manufacturer": "'\"><iframe src=javascript:hit()>",
     "modelDescription": "\u202Edeppilf \u0007bell", "nodeSymbolicName": "<style>*{display:none}</style>",
     "driverName": "</script><script>hit()</script>", "firmwareVersion": "javascript:hit()",
-    "attributes": {"functionType": 0, "portNumber": 0, "raw": {"0x209": "3CFFFE80623E"}},
+    "attributes": {"functionType": 0, "portNumber": 0, "raw": {"0x24b": "3C62FFFE3E00"}},
     "ports": [{"wwpn": "10:00:02:7A:51:32:02:40", "targets": ["t"], "symbolicName": "<a href=javascript:hit()>x</a>",
       "osDeviceName": "/dev/\"><img src=x onerror=hit()>"}]}]})json";
 
@@ -404,6 +404,12 @@ TEST_F(Page, ShowsHostileNamesAsTexts)
     visit("classes/TVRHBA_Product");
     browser.awaitText(".grid", "\\u202edeppilf");
     browser.awaitText(".grid", "\\x07bell");
+    visit("classes/TVRHBA_SoftwareIdentity");
+    browser.awaitText(".grid", "<b\\xff\\xfe>");
+    browser.run("[...document.querySelectorAll('.grid a')].find((each) => each.textContent.includes('<b')).click()");
+    awaitHeading("Software identity");
+    browser.awaitText("main", "VersionString");
+    browser.await("!document.querySelector('[aria-busy], .notice')");
 }
 
 TEST_F(Page, WorksWithKeysAlone)
