@@ -133,6 +133,7 @@ Browser::Browser() : _driver(std::make_unique<Driver>())
                          "--window-size=1280,900",
                          "--user-data-dir=" + (_driver->folder / "profile").string()};
     const Json wanted{{"browserName", "chrome"},
+                      {"acceptInsecureCerts", true},
                       {"goog:chromeOptions", {{"args", arguments}}},
                       {"goog:loggingPrefs", {{"browser", "ALL"}}}};
     const Json session = command("POST", "", {{"capabilities", {{"alwaysMatch", wanted}}}});
