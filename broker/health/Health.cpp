@@ -39,6 +39,40 @@ const Value* besideText(const Object& object, const char* values, const char* te
     return nullptr;
 }
 
+bool isClassified(const Object& software, Software classification)
+{
+    const auto number = static_cast<std::uint64_t>(classification);
+    return std::ranges::any_of(listOf(software, "Classifications"),
+                               [&](const Value& value) { return !value.isNull() && value.asUnsigned() == number; });
+}
+
+namespace
+{
+
+/// Empty for what has no such text.
+std::string textOf(const Object& object, const char* property)
+{
+    const Value& value = object.get(property);
+    return value.isNull() || value.type() != CMPI_string ? std::string() : value.asString();
+}
+
+std::string versionOf(std::span<const Object* const> software, std::string_view name)
+{
+    const auto found =
+        std::ranges::find_if(software, [&](const Object* object)
+                             { return isClassified(*object, Software::firmware) && textOf(*object, "Name") == name; });
+    return found == software.end() ? std::string() : textOf(**found, "VersionString");
+}
+
+} // namespace
+
+std::string waitingFirmware(std::span<const Object* const> software)
+{
+    const std::string running = versionOf(software, "Operational Firmware");
+    const std::string onFlash = versionOf(software, "Firmware On Flash");
+    return running.empty() || running == onFlash ? std::string() : onFlash;
+}
+
 namespace
 {
 
@@ -49,7 +83,7 @@ constexpr PortState allPortStates[] = {
     {11, "in diagnosis", "IN DIAGNOSIS"},
     {6, "error", "ERROR"},
     {32776, "loopback", "LOOPBACK"},
-    {32788, "up, needs a reset", "NEEDS RESET", true, true},
+    {32788, "up, needs a reset", "", true, true},
     {32789, "link down, needs a reset", "LINK DOWN", false, true},
     {32790, "disabled", "DISABLED"},
 };

@@ -22,12 +22,25 @@ const Value::List& listOf(const Object& object, const std::string& property);
 /// Of two arrays side by side, what one has where the other has that text; null if there is none.
 const Value* besideText(const Object& object, const char* values, const char* texts, std::string_view text);
 
+/// CIM_SoftwareIdentity.Classifications
+enum class Software : std::uint16_t
+{
+    driver = 2,
+    application = 5,
+    firmware = 10,
+    bootCode = 11,
+};
+bool isClassified(const Object& software, Software classification);
+/// The version that a port starts with after a reset of its adapter, of what firmware it has; empty where that one runs
+/// already, or where the adapter does not tell both.
+std::string waitingFirmware(std::span<const Object* const> software);
+
 /// A value of a port's OperationalStatus.
 struct PortState
 {
     std::uint64_t status;
     const char* text;
-    const char* problem; ///< empty where all is well
+    const char* problem; ///< of the link; empty where that is well
     bool up = false;
     bool needsReset = false;
 };

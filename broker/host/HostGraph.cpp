@@ -30,12 +30,7 @@ bool isOf(const KindRow& kind, const Object& object)
 {
     if (!kind.className || !sameName(kind.className, object.path.className))
         return false;
-    if (kind.classification == 0)
-        return true;
-    const Value& list = object.get("Classifications");
-    return !list.isNull() && list.isArray() &&
-           std::ranges::any_of(list.asList(), [&](const Value& value)
-                               { return !value.isNull() && value.asUnsigned() == kind.classification; });
+    return !kind.classification || isClassified(object, *kind.classification);
 }
 
 /// The middle of "initiator:target port:unit".

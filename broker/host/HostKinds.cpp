@@ -1,6 +1,5 @@
 #include "broker/host/HostKinds.h"
 
-#include "broker/health/Health.h"
 #include "broker/host/ReadableText.h"
 #include "broker/values/ValueText.h"
 
@@ -132,7 +131,12 @@ bool isLost(const PortState& state)
 std::vector<Problem> portProblems(const Object& port)
 {
     const PortState* row = portState(port);
-    return row && *row->problem ? std::vector<Problem>{{row->problem, isLost(*row)}} : std::vector<Problem>();
+    std::vector<Problem> problems;
+    if (row && *row->problem)
+        problems.push_back({row->problem, isLost(*row)});
+    if (row && row->needsReset)
+        problems.push_back({"NEEDS RESET"});
+    return problems;
 }
 
 /// "ABOVE WARNING" and the like; empty for a value within the limits.
@@ -154,13 +158,6 @@ const char* excessText(Excess excess)
     return "";
 }
 
-std::string inCapitals(std::string text)
-{
-    std::ranges::transform(text, text.begin(),
-                           [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; });
-    return text;
-}
-
 template <const auto& Rows> std::vector<Problem> measureProblems(const Object& object)
 {
     std::vector<Problem> problems;
@@ -172,12 +169,6 @@ template <const auto& Rows> std::vector<Problem> measureProblems(const Object& o
 }
 
 // --- the tables ---------------------------------------------------------------------------------------------------
-
-// CIM_SoftwareIdentity.Classifications
-constexpr unsigned driver = 2;
-constexpr unsigned application = 5;
-constexpr unsigned firmware = 10;
-constexpr unsigned bootCode = 11;
 
 const std::vector<FactRow> softwareFacts = {{"version", "VersionString", plain, inLine}};
 
@@ -193,8 +184,9 @@ const KindRow allKinds[] = {
      nullptr,
      "Name",
      {{"class", "Class", plain}, {"namespace", "NameSpace", plain}, {"chassis", "Chassis", plain}}},
-    {"Driver", "drivers", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr, driver},
-    {"Provider", "providers", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr, application},
+    {"Driver", "drivers", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr, Software::driver},
+    {"Provider", "providers", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr,
+     Software::application},
     {"Product",
      "products",
      "TVRHBA_Product",
@@ -259,8 +251,9 @@ const KindRow allKinds[] = {
      Appears::itself,
      measureProblems<transceiverMeasures>},
     {"Firmware", "firmware identities", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr,
-     firmware},
-    {"Boot image", "boot images", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr, bootCode},
+     Software::firmware},
+    {"Boot image", "boot images", "TVRHBA_SoftwareIdentity", "Name", softwareFacts, Appears::itself, nullptr,
+     Software::bootCode},
     {"Flash image",
      "flash images",
      "TVRHBA_FlashImageSoftwareIdentity",

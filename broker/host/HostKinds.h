@@ -2,8 +2,10 @@
 // that is to be shown is a row, and so is what leads to it.
 #pragma once
 
+#include "broker/health/Health.h"
 #include "broker/values/Value.h"
 
+#include <optional>
 #include <span>
 #include <string>
 #include <vector>
@@ -61,7 +63,7 @@ struct KindRow
     std::vector<FactRow> facts = {};
     Appears appears = Appears::itself;
     Problems problems = nullptr;
-    unsigned classification = 0; ///< those with this value among their Classifications; 0 for all
+    std::optional<Software> classification = {}; ///< of the software that is of this kind; nothing for all
 };
 
 /// Containers before what they contain: this is also the order in which kinds are listed.
@@ -70,6 +72,7 @@ std::span<const KindRow> kinds();
 const KindRow& kindNamed(const std::string& name);
 
 inline constexpr const char* hostKind = "Computer system";
+inline constexpr const char* portKind = "FC port";
 inline constexpr const char* targetKind = "Target";
 
 /// An association that leads to the parts of an element.

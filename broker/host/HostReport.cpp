@@ -51,6 +51,17 @@ HostNode describe(Element& element, const char* association)
     return node;
 }
 
+/// Firmware of a port is its controller's.
+void addWaitingFirmware(HostNode& node, const Element& port)
+{
+    std::vector<const Object*> software;
+    for (const Part& controller : port.parts)
+        for (const Part& part : controller.element->parts)
+            software.push_back(&part.element->object);
+    if (const std::string version = waitingFirmware(software); !version.empty())
+        node.problems.push_back({"FIRMWARE " + oneLine(version) + " WAITS FOR A RESET"});
+}
+
 /// Makes the nodes of elements, each once: the first way that leads to an element is that on which it is shown.
 class TreeMaker
 {
@@ -80,6 +91,8 @@ private:
         if (element.kind->appears == Appears::through)
             return addParts(parent, element);
         HostNode node = describe(element, association);
+        if (node.kind == portKind)
+            addWaitingFirmware(node, element);
         addParts(node, element);
         if (element.kind->appears == Appears::summed)
             node.facts.push_back({"contents", unitsText(node), inLine | pictured});

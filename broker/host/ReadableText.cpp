@@ -166,6 +166,13 @@ std::string inSentence(std::string name)
     return name;
 }
 
+std::string inCapitals(std::string text)
+{
+    std::ranges::transform(text, text.begin(),
+                           [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; });
+    return text;
+}
+
 std::string withSingleBlanks(const std::string& text)
 {
     std::string result;

@@ -28,6 +28,8 @@ std::string shownText(const ClassInfo* info, const Value& value, std::string_vie
 std::string countText(std::uint64_t count, const char* singular, const char* plural);
 /// The name of a kind inside a sentence: "card" and "FC port".
 std::string inSentence(std::string name);
+/// Its letters of ASCII as capitals.
+std::string inCapitals(std::string text);
 /// Blanks at the ends and more than one between words are left out, as fixed fields of devices have them.
 std::string withSingleBlanks(const std::string& text);
 /// Characters that a UTF-8 text shows.

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <map>
 
 namespace metrics
 {
@@ -183,27 +184,36 @@ void beyond(Series& series, const FamilyRow& row, const Object& object, const La
 
 // --- software -----------------------------------------------------------------------------------------------------
 
-// CIM_SoftwareIdentity.Classifications
-constexpr std::uint64_t driver = 2;
-constexpr std::uint64_t application = 5;
-constexpr std::uint64_t firmware = 10;
-
-bool isClassified(const Object& object, std::uint64_t classification)
+/// Empty for software of the host.
+std::string portOfSoftware(const Object& object)
 {
-    return std::ranges::any_of(listOf(object, "Classifications"), [&](const Value& value)
-                               { return !value.isNull() && value.asUnsigned() == classification; });
+    const Value* wwpn = besideText(object, "IdentityInfoValue", "IdentityInfoType", "TAVRIN:PORT_WWPN");
+    return wwpn ? textOf(*wwpn) : std::string();
 }
 
 /// Software of a kind by its name and version; firmware by its port too.
-template <std::uint64_t Classification>
+template <Software Classification>
 void version(Series& series, const FamilyRow& row, const Object& object, const Labels&)
 {
     Labels labels{{"name", textOf(object, "Name")}, {"version", textOf(object, "VersionString")}};
     if (!isClassified(object, Classification) || labels.back().second.empty())
         return;
-    if (const Value* wwpn = besideText(object, "IdentityInfoValue", "IdentityInfoType", "TAVRIN:PORT_WWPN"))
-        labels.emplace(labels.begin(), port, textOf(*wwpn));
+    if (const std::string wwpn = portOfSoftware(object); !wwpn.empty())
+        labels.emplace(labels.begin(), port, wwpn);
     series.add(row, labels, 1);
+}
+
+constexpr FamilyName firmwareWaiting{"tavrin_fc_port_firmware_waiting", gauge,
+                                     "Whether the port starts with other firmware after a reset of its adapter."};
+
+void waiting(Series& series, const std::vector<Object>& objects)
+{
+    std::map<std::string, std::vector<const Object*>> ports;
+    for (const Object& object : objects)
+        if (const std::string wwpn = portOfSoftware(object); !wwpn.empty())
+            ports[wwpn].push_back(&object);
+    for (const auto& [wwpn, software] : ports)
+        series.add(firmwareWaiting, {{port, wwpn}}, !waitingFirmware(software).empty());
 }
 
 // --- the tables ---------------------------------------------------------------------------------------------------
@@ -346,9 +356,9 @@ constexpr FamilyRow transceiverFamilies[] = {
 
 constexpr FamilyRow softwareFamilies[] = {
     {{"tavrin_fc_firmware_info", gauge, "Firmware of a port: what runs and what it starts with next."},
-     version<firmware>},
-    {{"tavrin_fc_driver_info", gauge, "The driver of the adapters."}, version<driver>},
-    {{"tavrin_fc_provider_info", gauge, "The provider module."}, version<application>},
+     version<Software::firmware>},
+    {{"tavrin_fc_driver_info", gauge, "The driver of the adapters."}, version<Software::driver>},
+    {{"tavrin_fc_provider_info", gauge, "The provider module."}, version<Software::application>},
 };
 
 constexpr SourceRow sources[] = {
@@ -357,7 +367,7 @@ constexpr SourceRow sources[] = {
     {"TVRHBA_Card", keyed<card, tag>, cardFamilies},
     {"TVRHBA_Chip", keyed<chip, tag>, chipFamilies},
     {"TVRHBA_Transceiver", portOfTransceiver, transceiverFamilies},
-    {"TVRHBA_SoftwareIdentity", nothing, softwareFamilies},
+    {"TVRHBA_SoftwareIdentity", nothing, softwareFamilies, waiting},
 };
 
 } // namespace
@@ -372,6 +382,8 @@ void read(Series& series, const SourceRow& source, const std::vector<Object>& ob
     for (const FamilyRow& row : source.families)
         for (const Object& object : objects)
             row.read(series, row, object, source.labels(object));
+    if (source.together)
+        source.together(series, objects);
 }
 
 } // namespace metrics

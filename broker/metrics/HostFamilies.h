@@ -27,6 +27,8 @@ struct SourceRow
     const char* className;
     Labels (*labels)(const broker::Object& object);
     std::span<const FamilyRow> families;
+    /// Adds what is told of several instances together; null for nothing.
+    void (*together)(Series& series, const std::vector<broker::Object>& objects) = nullptr;
 };
 
 /// In the order in which they are told.

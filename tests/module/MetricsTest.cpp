@@ -273,7 +273,7 @@ TEST(Metrics, WhatHappensToAHostRaisesItsAlertsAndNoOthers)
     stopClock();
     Host host;
     Collector collector(host.broker(), nameSpace, 0s);
-    constexpr int minutes = 70;
+    constexpr int minutes = 80;
     constexpr int pulled = 5;
     std::vector<Samples> scrapes;
     for (int minute = 0; minute < minutes; ++minute)
@@ -284,6 +284,7 @@ TEST(Metrics, WhatHappensToAHostRaisesItsAlertsAndNoOthers)
             host.setPortState(port, linkDown);
             host.setAttribute(otherPort,
                               R"({"boardTemperature": 6904426})"); // 106, 90 and 105 degrees, from the next refresh on
+            host.setAttribute(otherPort, R"({"firmwareOnFlash": "12.8.1.0"})");
             host.addFault(R"({"function": "LRM_GetVPD", "status": 97})"); // counted by each refresh
         }
         host.setAttribute(otherPort, (R"({"invalidCrcs": )" + std::to_string(minute) + "}").c_str());
@@ -293,6 +294,9 @@ TEST(Metrics, WhatHappensToAHostRaisesItsAlertsAndNoOthers)
     const std::string errors = firing("TavrinFcPortErrors", "warning", std::string("port=\"") + otherPort + "\"");
     const std::string hot =
         firing("TavrinFcBoardCritical", "critical", R"(chip="TV32B71155",measure="temperature",level="alarm")");
+    const std::string waiting =
+        firing("TavrinFcFirmwareWaiting", "info",
+               std::string("port=\"") + otherPort + R"(",name="Firmware On Flash",version="12.8.1.0")");
     const std::string failing = firing("TavrinFcLibraryCallsFail", "warning", R"(function="LRM_GetVPD")");
     const std::string file = host.root() / "alerts-test.yml";
     std::ofstream(file) << "rule_files: ['" TVR_FLEET
@@ -300,7 +304,7 @@ TEST(Metrics, WhatHappensToAHostRaisesItsAlertsAndNoOthers)
                         << "    input_series:\n"
                         << inputOf(scrapes) << "    promql_expr_test:\n"
                         << expectationAt(pulled - 1, {}) << expectationAt(pulled + 2, {down})
-                        << expectationAt(minutes - 1, {down, errors, hot, failing});
+                        << expectationAt(minutes - 1, {down, errors, hot, waiting, failing});
     const Answer tested = runCommand("promtool test rules " + file);
     EXPECT_EQ(tested.exitCode, 0) << tested.out << tested.err;
     EXPECT_THAT(tested.out, HasSubstr("SUCCESS"));

@@ -1,7 +1,7 @@
 // The host for people: readable values, what is wrong, the tree and the picture.
 #include "broker/host/HostReport.h"
-#include "broker/tvrcim/Graphviz.h"
 #include "broker/host/ReadableText.h"
+#include "broker/tvrcim/Graphviz.h"
 #include "broker/tvrcim/Topology.h"
 
 #include <gmock/gmock.h>
@@ -65,32 +65,60 @@ TEST(HostKinds, WhatIsWrongHasAWord)
     {
         const char* kind;
         Object object;
-        const char* problem; ///< null for none
+        std::vector<std::string> problems;
     } rows[] = {
-        {"FC port", status(2), nullptr},
-        {"FC port", status(1), "LINK DOWN"},
-        {"FC port", status(10), "OFFLINE"},
-        {"Virtual port", status(32789), "LINK DOWN"},
-        {"FC port", objectWith({}), nullptr},
-        {"FC port", objectWith({{"OperationalStatus", Value::array(CMPI_uint16, {})}}), nullptr},
-        {"Chip", chip(84, 85, 95), nullptr},
-        {"Chip", chip(85, 85, 95), "TEMPERATURE ABOVE WARNING"},
-        {"Chip", chip(95, 85, 95), "TEMPERATURE ABOVE CRITICAL"},
-        {"Chip", chip(95, 0, 0), nullptr},
-        {"Chip", objectWith({{"BoardTemperature", Value::null(CMPI_uint32)}}), nullptr},
-        {"Transceiver", power(0.5F), nullptr},
-        {"Transceiver", power(1.2F), "RECEIVE POWER ABOVE WARNING"},
-        {"Transceiver", power(0.025F), "RECEIVE POWER BELOW WARNING"},
-        {"Transceiver", power(0), "RECEIVE POWER BELOW CRITICAL"},
+        {"FC port", status(2), {}},
+        {"FC port", status(1), {"LINK DOWN"}},
+        {"FC port", status(10), {"OFFLINE"}},
+        {"FC port", status(32788), {"NEEDS RESET"}},
+        {"Virtual port", status(32789), {"LINK DOWN", "NEEDS RESET"}},
+        {"FC port", objectWith({}), {}},
+        {"FC port", objectWith({{"OperationalStatus", Value::array(CMPI_uint16, {})}}), {}},
+        {"Chip", chip(84, 85, 95), {}},
+        {"Chip", chip(85, 85, 95), {"TEMPERATURE ABOVE WARNING"}},
+        {"Chip", chip(95, 85, 95), {"TEMPERATURE ABOVE CRITICAL"}},
+        {"Chip", chip(95, 0, 0), {}},
+        {"Chip", objectWith({{"BoardTemperature", Value::null(CMPI_uint32)}}), {}},
+        {"Transceiver", power(0.5F), {}},
+        {"Transceiver", power(1.2F), {"RECEIVE POWER ABOVE WARNING"}},
+        {"Transceiver", power(0.025F), {"RECEIVE POWER BELOW WARNING"}},
+        {"Transceiver", power(0), {"RECEIVE POWER BELOW CRITICAL"}},
     };
     for (const auto& row : rows)
     {
         std::vector<std::string> problems;
         for (const Problem& problem : kindNamed(row.kind).problems(row.object))
             problems.push_back(problem.text);
-        EXPECT_EQ(problems, row.problem ? std::vector<std::string>{row.problem} : std::vector<std::string>())
-            << row.kind << " " << (&row - rows);
+        EXPECT_EQ(problems, row.problems) << row.kind << " " << (&row - rows);
     }
+}
+
+TEST(Health, FirmwareWaitsWhereAnotherVersionRuns)
+{
+    const auto software = [](const char* name, const char* version, Software classification)
+    {
+        const auto number = static_cast<std::uint16_t>(classification);
+        return objectWith({{"Name", Value::string(name)},
+                           {"VersionString", Value::string(version)},
+                           {"Classifications", Value::array(CMPI_uint16, {Value::uint16(number)})}});
+    };
+    const Object running = software("Operational Firmware", "1.0", Software::firmware);
+    const Object same = software("Firmware On Flash", "1.0", Software::firmware);
+    const Object newer = software("Firmware On Flash", "1.1", Software::firmware);
+    const Object image = software("Firmware On Flash", "1.1", Software::bootCode);
+    const Object nothing = objectWith({{"Name", Value::null(CMPI_string)}});
+    const struct
+    {
+        std::vector<const Object*> software;
+        const char* waiting;
+    } rows[] = {{{&newer, &nothing, &running}, "1.1"},
+                {{&running, &same}, ""},
+                {{&running, &image}, ""},
+                {{&running}, ""},
+                {{&newer}, ""},
+                {{}, ""}};
+    for (const auto& row : rows)
+        EXPECT_EQ(waitingFirmware(row.software), row.waiting) << (&row - rows);
 }
 
 TEST(HostKinds, ValuesOfOtherTypesAreNoMisfortune)
