@@ -6,12 +6,13 @@ namespace web
 bool ErrorGrowth::hasGrown(const std::string& port, const std::string& counter, std::uint64_t value)
 {
     const std::scoped_lock lock(_mutex);
-    if (_first.size() >= mostPorts && !_first.contains(port))
+    if (_last.size() >= mostPorts && !_last.contains(port))
         return false;
-    std::uint64_t& first = _first[port].try_emplace(counter, value).first->second;
-    if (value < first)
-        first = value;
-    return value > first;
+    const Time now = _clock();
+    Reading& last = _last[port].try_emplace(counter, Reading{value, now}).first->second;
+    if (value != last.value)
+        last = {value, value > last.value ? now + toldFor : now};
+    return now < last.told;
 }
 
 } // namespace web

@@ -21,8 +21,6 @@ using namespace broker;
 namespace
 {
 
-constexpr const char* portKind = "FC port";
-
 Json pathJson(const Path& path)
 {
     return path.className.empty() ? Json() : Json(fullPathText(path));
@@ -80,7 +78,7 @@ struct Counter
     std::string name;
     const CounterRow* row; ///< null for one that nothing is known of
     std::uint64_t value;
-    bool hasGrown; ///< an error counter, since it was first seen
+    bool hasGrown; ///< an error counter that does, or did not long ago
 };
 
 /// By WWPN, in which the key of a port's statistics ends.
@@ -104,13 +102,6 @@ CountersByPort readCounters(State& state)
         }
     }
     return ports;
-}
-
-std::string inCapitals(std::string text)
-{
-    std::ranges::transform(text, text.begin(),
-                           [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; });
-    return text;
 }
 
 // --- problems -----------------------------------------------------------------------------------------------------

@@ -46,11 +46,6 @@ function historyOf(port, counter) {
   return histories.get(key);
 }
 
-/** An error counter that grew while this page looked, or since the port of the page first saw it. */
-function hasGrown(counter, history) {
-  return counter.isError && (counter.grows || history.grown > 0);
-}
-
 function numberText(value) {
   return Number(value).toLocaleString("en", {maximumFractionDigits: value < 10 ? 2 : 0});
 }
@@ -89,9 +84,8 @@ class CounterRow {
     replace(this.rate, rateText(history, counter.unit));
     const {rates} = history;
     replace(this.plot, plotOf(rates, Math.max(fewestPlotted, rates.length), (counter.label || counter.name) + " per second"));
-    const grows = hasGrown(counter, history);
-    this.node.classList.toggle("grows", grows);
-    replace(this.mark, grows ? badge("critical", "grows" + (history.grown > 0 ? ", +" + numberText(history.grown) : "")) : null);
+    this.node.classList.toggle("grows", counter.grows);
+    replace(this.mark, counter.grows ? badge("critical", "grows" + (history.grown > 0 ? ", +" + numberText(history.grown) : "")) : null);
   }
 }
 
@@ -145,7 +139,7 @@ function remember(ports, time) {
 
 function growingErrors(ports) {
   return ports.flatMap((port) => port.counters
-    .filter((counter) => hasGrown(counter, historyOf(port, counter)))
+    .filter((counter) => counter.grows)
     .map((counter) => make("li", {}, badge("critical", "grows"), " ", counter.label || counter.name, " of ",
       link(hrefOfObject(port.path), port.name))));
 }

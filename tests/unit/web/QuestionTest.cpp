@@ -129,15 +129,20 @@ TEST(Failures, AreToldByKindAndStatus)
     EXPECT_THAT(rows[2].told.json, HasSubstr(R"("status":"CIM_ERR_NOT_FOUND","text":"CIM_ERR_NOT_FOUND: gone")"));
 }
 
-TEST(ErrorGrowth, IsSeenUntilACounterIsReset)
+TEST(ErrorGrowth, IsToldForAWhileUnlessTheCounterIsReset)
 {
-    ErrorGrowth growth;
+    ErrorGrowth::Time now = {};
+    ErrorGrowth growth([&] { return now; });
     EXPECT_FALSE(growth.hasGrown("a", "CRCErrors", 5)) << "what was there before is not growth";
     EXPECT_FALSE(growth.hasGrown("b", "CRCErrors", 7));
     EXPECT_FALSE(growth.hasGrown("a", "LinkFailures", 9));
     EXPECT_FALSE(growth.hasGrown("a", "CRCErrors", 5));
     EXPECT_TRUE(growth.hasGrown("a", "CRCErrors", 6));
+    now += ErrorGrowth::toldFor - std::chrono::seconds(1);
     EXPECT_TRUE(growth.hasGrown("a", "CRCErrors", 6)) << "it stays told";
+    now += std::chrono::seconds(1);
+    EXPECT_FALSE(growth.hasGrown("a", "CRCErrors", 6)) << "for a while";
+    EXPECT_TRUE(growth.hasGrown("a", "CRCErrors", 7));
     EXPECT_FALSE(growth.hasGrown("b", "CRCErrors", 7));
     EXPECT_FALSE(growth.hasGrown("a", "CRCErrors", 0));
     EXPECT_TRUE(growth.hasGrown("a", "CRCErrors", 1));
