@@ -182,7 +182,10 @@ void addCommands(CommandOptions& options)
         .test();
     options.add("check", "tell what of libraries, module, settings, logs and CIM servers is there, what is missing and "
                          "what to do about it; exits with 7 where something is missing or wrong");
-    options.add("serve", "answer CIM clients over HTTP until SIGINT or SIGTERM; other hosts need --tls and --users")
+    options
+        .add("serve",
+             "answer CIM clients, browsers and monitoring over HTTP until SIGINT or SIGTERM; other hosts need --tls "
+             "and --users")
         .port();
 }
 
