@@ -19,7 +19,7 @@ namespace browser_test
 namespace
 {
 
-constexpr int longestWait = 20000; // milliseconds
+constexpr int longestWait = 60000; // milliseconds
 
 /// How the protocol writes a reference to an element.
 constexpr const char* elementKey = "element-6066-11e4-a52e-4f735466cecf";
@@ -83,7 +83,7 @@ struct Browser::Driver
         }
         close(ends[1]);
         client = std::make_unique<httplib::Client>("127.0.0.1", awaitPort());
-        client->set_read_timeout(60);
+        client->set_read_timeout(std::chrono::milliseconds(longestWait) + std::chrono::seconds(30));
         client->set_keep_alive(true);
     }
 
@@ -134,6 +134,7 @@ Browser::Browser() : _driver(std::make_unique<Driver>())
                          "--user-data-dir=" + (_driver->folder / "profile").string()};
     const Json wanted{{"browserName", "chrome"},
                       {"acceptInsecureCerts", true},
+                      {"timeouts", {{"script", longestWait + 10000}}},
                       {"goog:chromeOptions", {{"args", arguments}}},
                       {"goog:loggingPrefs", {{"browser", "ALL"}}}};
     const Json session = command("POST", "", {{"capabilities", {{"alwaysMatch", wanted}}}});

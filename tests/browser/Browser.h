@@ -40,7 +40,7 @@ public:
 
     /// What the body of a function returns.
     Json run(const std::string& body);
-    /// Waits until an expression is true; fails the test with what is seen of the page where it is not in 20 seconds.
+    /// Waits until an expression is true; fails the test with what is seen of the page where it is not in a minute.
     /// Gives the value.
     Json await(const std::string& expression);
     /// Waits until the text of an element contains `text`.

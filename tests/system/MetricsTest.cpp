@@ -1,6 +1,5 @@
 // Prometheus itself as the client of the port, by the configuration of docs/fleet.
 #include "tests/support/Eventually.h"
-#include "tests/support/Sanitized.h"
 #include "tests/system/Serving.h"
 
 #include <gmock/gmock.h>
@@ -114,15 +113,14 @@ TEST(Metrics, PrometheusScrapesALargeHostInUnderASecond)
                    {"--scenario", scenario});
     const Prometheus prometheus(folder, configurationOf(folder, server));
 
-    ASSERT_TRUE(eventually([&] { return prometheus.value("count_over_time(up[1m])").value_or(0) >= 3; }));
-    EXPECT_EQ(prometheus.value("min_over_time(up[1m])"), 1);
-    EXPECT_EQ(prometheus.value("count(tavrin_fc_port_up == 1)"), 32);
-    EXPECT_EQ(prometheus.value("sum(tavrin_fc_port_units)"), 16384);
-    EXPECT_EQ(prometheus.value("sum(tavrin_fc_port_targets)"), 128);
-    EXPECT_EQ(prometheus.value("tavrin_fc_refreshes_total"), 1);
-#if !TVR_SANITIZED
-    EXPECT_LT(prometheus.value("scrape_duration_seconds").value_or(1), 1);
-#endif
+    // A scrape that takes longer than the interval of a second is none; the first has the cache filled.
+    ASSERT_TRUE(eventually([&] { return prometheus.value("sum_over_time(up[5m])").value_or(0) >= 3; }));
+    const auto last = [](const std::string& name) { return "last_over_time(tavrin_fc_" + name + "[5m])"; };
+    EXPECT_EQ(prometheus.value("count(" + last("port_up") + " == 1)"), 32);
+    EXPECT_EQ(prometheus.value("sum(" + last("port_units") + ")"), 16384);
+    EXPECT_EQ(prometheus.value("sum(" + last("port_targets") + ")"), 128);
+    EXPECT_EQ(prometheus.value(last("refreshes_total")), 1);
+    EXPECT_LT(prometheus.value("min_over_time(scrape_duration_seconds[5m])").value_or(1), 1);
     EXPECT_EQ(server.end(), 0);
 }
 
@@ -160,12 +158,33 @@ TEST(Metrics, OfAnotherHostOnlyUsersReadThem)
     EXPECT_EQ(server.endBy(SIGINT), 0);
 }
 
+/// The dashboard's expressions as rules, which are checked where expressions by themselves are not.
+std::string rulesOfDashboard()
+{
+    std::string text = "groups:\n  - name: dashboard\n    rules:\n";
+    for (const Json& panel : Json::parse(textOf(TVR_FLEET "/dashboard.json"))["panels"])
+        for (const Json& target : panel.value("targets", Json::array()))
+        {
+            std::string expression = target.at("expr");
+            for (const auto& [variable, value] :
+                 {std::pair("$host", ".*"), std::pair("$port", ".*"), std::pair("$__rate_interval", "5m")})
+                for (std::size_t place; (place = expression.find(variable)) != std::string::npos;)
+                    expression.replace(place, std::string(variable).size(), value);
+            text += "      - {record: a, expr: " + Json(expression).dump() + "}\n";
+        }
+    return text;
+}
+
 TEST(Metrics, TheFilesForAFleetAreValid)
 {
-    for (const char* check :
-         {"check rules " TVR_FLEET "/alerts.yml", "check config --syntax-only " TVR_FLEET "/prometheus.yml"})
+    const Folder folder;
+    const std::string dashboard = folder.file("dashboard.yml");
+    std::ofstream(dashboard) << rulesOfDashboard();
+    for (const std::string& check :
+         {std::string("check rules " TVR_FLEET "/alerts.yml"), "check rules --lint=none " + dashboard,
+          std::string("check config --syntax-only " TVR_FLEET "/prometheus.yml")})
     {
-        const Answer checked = runCommand(std::string("promtool ") + check);
+        const Answer checked = runCommand("promtool " + check);
         EXPECT_EQ(checked.exitCode, 0) << checked.out << checked.err;
     }
 }

@@ -56,7 +56,7 @@ Running::~Running()
 bool Running::awaitOutput() const
 {
     pollfd ready{_output, POLLIN, 0};
-    return poll(&ready, 1, 20000) == 1;
+    return poll(&ready, 1, 60000) == 1;
 }
 
 std::string Running::readLine() const
