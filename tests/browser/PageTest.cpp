@@ -151,6 +151,21 @@ TEST_F(Page, RefusesAWrongPasswordAndTellsWhoMayNot)
     browser.awaitText("#session", "Not logged in");
 }
 
+TEST_F(Page, AsksWhoReadsWhereOtherHostsAreServed)
+{
+    _folder.makeCertificate("own");
+    serve({"--listen", "0.0.0.0:0", "--tls", _folder.file("own.pem"), _folder.file("own.key")});
+    browser.open("https://127.0.0.1:" + _serving->port() + "/");
+    browser.awaitText("dialog h2", "Log in");
+    browser.type("dialog input[name=user]", "reader");
+    browser.type("dialog input[name=password]", "secret");
+    browser.press(key::enter);
+    browser.awaitText("#problems", "LINK DOWN");
+    browser.clickText("Log out");
+    browser.awaitText("main", "a user is needed");
+    EXPECT_FALSE(browser.run("return Boolean(document.querySelector('.picture a'))").get<bool>());
+}
+
 TEST_F(Page, PlotsCountersAndMarksErrorsThatGrow)
 {
     serve({"--scenario", TVR_SCENARIOS "/growing.json"});
@@ -176,6 +191,8 @@ TEST_F(Page, PlotsCountersAndMarksErrorsThatGrow)
     // A second look at the host tells it as well.
     visit();
     browser.awaitText("#problems", "CRC ERRORS GROW");
+    EXPECT_THAT(browser.textOf(".picture .card"), HasSubstr("TEMPERATURE ABOVE WARNING"));
+    EXPECT_THAT(browser.textOf(".picture .fc-port.warning"), HasSubstr("CRC ERRORS GROW"));
     browser.keepPicture("problems");
     expectPeace();
 }
@@ -185,7 +202,7 @@ TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
     serve();
     visit("methods/TVRHBA_FCHBAWWNService/ChangeWWN");
     const std::string target = browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
-                                             "each.textContent === '1000027A51160210')?.value");
+                                             "each.textContent === 'FC port 1000027A51160210')?.value");
     const auto ask = [&](const std::string& wwpn)
     {
         browser.type("[name=NewWWPN]", wwpn);
@@ -271,7 +288,7 @@ TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
         << "TVRSIM-FIRMWARE 1\nfamily: TV3202\nversion: 12.8.1.0\nchecksum: CBF43926\n\n123456789";
     browser.choose("input[type=file]", _folder.file("image.grp"));
     browser.type("[name=Target]", browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
-                                                "each.textContent === '1000027A51320240')?.value"));
+                                                "each.textContent === 'FC port 1000027A51320240')?.value"));
     browser.type("[name=InstallOptions]", "32768");
     browser.type("[name=InstallOptionsValues]", "new.grp");
     browser.clickText("Call …");
@@ -316,23 +333,36 @@ TEST_F(Page, ClearsALogWhenAsked)
     expectPeace();
 }
 
-TEST_F(Page, RunsADiagnosticTestToItsEnd)
+TEST_F(Page, RunsDiagnosticTestsToTheirEnds)
 {
-    serve();
+    serve({"--scenario", TVR_SCENARIOS "/diagnostics.json"});
     visit("diagnostics");
     logIn();
     browser.awaitText("#session", "Logged in as joe");
-    browser.click("button[aria-label='Run Host Loopback Test on 1000027A51160210']");
-    browser.awaitText("dialog h2", "Run the Host Loopback Test on port 1000027A51160210?");
-    browser.clickText("Run", "dialog");
-    browser.await("document.querySelector('[data-port] progress, [data-port] .notice')");
-    browser.awaitText("[data-port='1000027A51160210']", "Host Loopback Test has ended");
+    struct Run
+    {
+        const char* test;
+        const char* port;
+        const char* end;
+    };
+    for (const Run& run : {Run{"Host Loopback Test", "1000027A51320601", "has ended: OK"},
+                           Run{"Self Test", "1000027A51320603", "has ended: Failed"},
+                           Run{"Internal Loopback Test", "1000027A51320605", "it cannot run on the port"}})
+    {
+        const std::string named = std::string(run.test) + " on " + run.port;
+        browser.click("button[aria-label='Run " + named + "']");
+        browser.awaitText("dialog h2", "Run the " + std::string(run.test) + " on port " + run.port + "?");
+        browser.clickText("Run", "dialog");
+        const std::string place = "[data-port='" + std::string(run.port) + "']";
+        browser.await("document.querySelector(\"" + place + "\").querySelector('progress, .notice')");
+        browser.awaitText(place, run.end);
+    }
     browser.awaitText("#jobs", "Completed");
     browser.awaitText("#records", "Resulted with Success");
     browser.run("document.querySelector('#records').scrollIntoView({block: 'end'})");
     browser.keepPicture("records");
     browser.click("#records a");
-    browser.awaitText("main", "LoopsPassed");
+    browser.awaitText("main", "CompletionState");
     expectPeace();
 }
 
@@ -344,7 +374,7 @@ constexpr const char* hostileHost = R"json({
     "model": "<img src=http://192.0.2.1/x onerror=hit()>", "manufacturer": "'\"><iframe src=javascript:hit()>",
     "modelDescription": "\u202Edeppilf \u0007bell", "nodeSymbolicName": "<style>*{display:none}</style>",
     "driverName": "</script><script>hit()</script>", "firmwareVersion": "javascript:hit()",
-    "attributes": {"functionType": 0, "portNumber": 0, "raw": {"0x209": "3CFFFE80623E"}},
+    "attributes": {"functionType": 0, "portNumber": 0, "raw": {"0x24b": "3C62FFFE3E00"}},
     "ports": [{"wwpn": "10:00:02:7A:51:32:02:40", "targets": ["t"], "symbolicName": "<a href=javascript:hit()>x</a>",
       "osDeviceName": "/dev/\"><img src=x onerror=hit()>"}]}]})json";
 
@@ -374,6 +404,12 @@ TEST_F(Page, ShowsHostileNamesAsTexts)
     visit("classes/TVRHBA_Product");
     browser.awaitText(".grid", "\\u202edeppilf");
     browser.awaitText(".grid", "\\x07bell");
+    visit("classes/TVRHBA_SoftwareIdentity");
+    browser.awaitText(".grid", "<b\\xff\\xfe>");
+    browser.run("[...document.querySelectorAll('.grid a')].find((each) => each.textContent.includes('<b')).click()");
+    awaitHeading("Software identity");
+    browser.awaitText("main", "VersionString");
+    browser.await("!document.querySelector('[aria-busy], .notice')");
 }
 
 TEST_F(Page, WorksWithKeysAlone)

@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <csignal>
 #include <fstream>
 #include <unistd.h>
@@ -20,7 +21,9 @@ std::vector<const char*> wordsOf(const std::vector<std::string>& toolOptions, co
     std::vector<const char*> words;
     for (const std::string& option : toolOptions)
         words.push_back(option.c_str());
-    words.insert(words.end(), {"serve", "--listen", "127.0.0.1:0"});
+    words.push_back("serve");
+    if (std::ranges::find(options, "--listen") == options.end())
+        words.insert(words.end(), {"--listen", "127.0.0.1:0"});
     for (const std::string& option : options)
         words.push_back(option.c_str());
     return words;

@@ -33,6 +33,7 @@ private:
 class Serving
 {
 public:
+    /// On a free port of this host, unless the options say where.
     explicit Serving(const std::vector<std::string>& options = {}, const std::vector<std::string>& toolOptions = {});
 
     /// What wbemcli says in all calls that name no user: who it is, as "name:password@", and options.

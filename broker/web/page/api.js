@@ -11,7 +11,8 @@ export class Refused extends Error {
 }
 
 let authorization = null;
-export const session = {user: null, mayChange: false, token: null, whyNot: "", hasUsers: true, version: "", simulated: false};
+const stranger = {user: null, mayChange: false, token: null, whyNot: "", version: "", simulated: false};
+export const session = {...stranger};
 
 function headersOf(body) {
   const headers = {};
@@ -90,8 +91,14 @@ export async function call(path, method, parameters) {
 
 /** Asks who this page is to the port; `session` is changed in place and an event told to the document. */
 export async function renewSession() {
-  Object.assign(session, await ask("session"));
-  document.dispatchEvent(new Event("session"));
+  try {
+    Object.assign(session, await ask("session"));
+  } catch (error) {
+    Object.assign(session, stranger, {whyNot: error.message});
+    throw error;
+  } finally {
+    document.dispatchEvent(new Event("session"));
+  }
 }
 
 export async function logIn(user, password) {
@@ -100,6 +107,8 @@ export async function logIn(user, password) {
   authorization = "Basic " + btoa(String.fromCharCode(...bytes));
   try {
     await renewSession();
+    if (!session.user)
+      throw new Refused(0, {kind: "refused", text: session.whyNot});
   } catch (error) {
     authorization = before;
     throw error;

@@ -80,8 +80,7 @@ async function showInstances(visit, name) {
     {from, count: rows, sort, descending: descending ? 1 : "", find: find.value, namespace}, visit.signal);
   const told = (answer, problem) => {
     replace(trouble, problem);
-    if (answer)
-      replace(count, (answer.matching === answer.total ? "" : answer.matching + " of ") + answer.total +
+    replace(count, !answer ? "" : (answer.matching === answer.total ? "" : answer.matching + " of ") + answer.total +
         (answer.total === 1 ? " instance" : " instances"));
   };
   const grid = new Grid("Instances of " + name, read, (row) => ({href: hrefOfObject(row.path), text: shortName(row.path)}), told);
@@ -90,5 +89,5 @@ async function showInstances(visit, name) {
   await describe(visit, name, about, choice, (chosen) => {
     namespace = chosen;
     grid.restart();
-  });
+  }).catch(() => {}); // what fails here fails in the table as well, which tells it
 }

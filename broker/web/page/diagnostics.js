@@ -3,7 +3,7 @@
 import {badge, button, link, make, replace, tell} from "./dom.js";
 import {ask, call} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
-import {hrefOfMethod, hrefOfObject} from "./paths.js";
+import {hrefOfMethod, hrefOfObject, parsePath} from "./paths.js";
 import {failure, section} from "./visit.js";
 
 const interval = 2000; // milliseconds
@@ -38,8 +38,13 @@ function jobItem(job) {
       known ? " " + percent + " %" : ""));
 }
 
+/** A datetime of CIM as people write it. */
+function timeText(time) {
+  return (time ?? "").replace(/^(\d{4})(\d\d)(\d\d)(\d\d)(\d\d)(\d\d)\.\d{6}[+-]\d{3}$/, "$1-$2-$3 $4:$5:$6");
+}
+
 function recordItem(record) {
-  return make("tr", {}, make("td", {class: "time"}, record.time ?? ""),
+  return make("tr", {}, make("td", {class: "time"}, timeText(record.time)),
     make("td", {}, link(hrefOfObject(record.path), spokenTest(record.test || record.id))),
     make("td", {}, record.port ?? ""), make("td", {}, badge(stateOf(record.state), record.state)),
     make("td", {class: "text"}, record.text));
@@ -61,6 +66,7 @@ class Diagnostics {
     this._offered = "";
   }
 
+  /** The records, or none where they cannot be read. */
   async read() {
     try {
       const answer = await ask("diagnostics", {}, this._visit.signal);
@@ -71,9 +77,11 @@ class Diagnostics {
       replace(this.records, answer.records.length
         ? tableOf(["Time", "Test", "Port", "Result", "What it came to"], answer.records.map(recordItem))
         : make("p", {class: "quiet"}, "No test has left a record."));
+      return answer.records;
     } catch (error) {
       if (!this._visit.over)
         replace(this.trouble, failure(error));
+      return [];
     }
   }
 
@@ -109,13 +117,22 @@ class Diagnostics {
     const answer = await attempted(place, () => call(test.path, "RunDiagnosticService", {ManagedElement: port.path}));
     if (!answer)
       return;
-    const ended = Number(answer.returnValue) === 0 && answer.out.Job;
-    const text = name + (ended ? " has ended" : Number(answer.returnValue) === 0 ? " made no job: it cannot run on the port as it is"
-      : " did not run: " + (answer.returnText ?? answer.returnValue));
-    replace(place, make("p", {class: "notice " + (ended ? "ok" : "critical"), role: "alert"}, text, ". ",
+    const [state, text] = await this._outcome(answer);
+    replace(place, make("p", {class: "notice " + state, role: "alert"}, name + " " + text + ". ",
       answer.out.Job ? link(hrefOfObject(answer.out.Job), "Its job") : null));
-    tell(text);
-    await this.read();
+    tell(name + " " + text);
+  }
+
+  /** How bad it is and what there is to say; a test of a link goes on after the call. */
+  async _outcome(answer) {
+    const records = await this.read();
+    if (Number(answer.returnValue) !== 0)
+      return ["critical", "did not run: " + (answer.returnText ?? answer.returnValue)];
+    if (!answer.out.Job)
+      return ["critical", "made no job: it cannot run on the port as it is"];
+    const id = new Map(parsePath(answer.out.Job).keys).get("InstanceID");
+    const record = records.find((each) => each.id === id);
+    return record ? [stateOf(record.state), "has ended: " + record.state] : ["quiet", "goes on"];
   }
 }
 

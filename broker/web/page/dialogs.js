@@ -89,7 +89,7 @@ function tellReader() {
 export async function mayChange() {
   if (session.mayChange)
     return true;
-  if (session.hasUsers === false || session.user) {
+  if (session.user) {
     if (!await tellReader() || !await askToLogIn())
       return false;
   } else if (!await askToLogIn(session.whyNot)) {

@@ -2,7 +2,7 @@
 
 import {make, replace} from "./dom.js";
 import {ask} from "./api.js";
-import {shortName, spoken} from "./paths.js";
+import {classOf, shortName, spoken} from "./paths.js";
 
 const mostBytes = 4 << 20; // as numbers in JSON they are four times as many, and a request has an end
 const mostOffered = 200; // instances for a reference
@@ -86,14 +86,22 @@ function bitsField(parameter) {
   };
 }
 
-/** Paths of instances are offered where the class is served; any other can be written. */
+/** What methods mean by a reference to anything. */
+const meant = new Map([["CIM_ManagedElement", ["TVRHBA_FCPort", "TVRHBA_PortController"]]]);
+
+async function offer(place, className) {
+  const answers = await Promise.allSettled((meant.get(className) ?? [className]).map((name) =>
+    ask("classes/" + encodeURIComponent(name) + "/instances", {count: mostOffered})));
+  const rows = answers.flatMap((answer) => answer.value?.rows ?? []); // classes that nobody serves have none
+  replace(place, rows.map((row) => make("option", {value: row.path}, spoken(classOf(row.path)) + " " + shortName(row.path))));
+}
+
+/** Paths of instances are offered; any other can be written. */
 function referenceField(parameter) {
   const id = "offered-" + ++fields;
   const offered = make("datalist", {id});
   const field = plainField(parameter, {list: id, placeholder: "path of " + spoken(parameter.class ?? "an instance")});
-  ask("classes/" + encodeURIComponent(parameter.class ?? "") + "/instances", {count: mostOffered}).then(
-    (answer) => replace(offered, answer.rows.map((row) => make("option", {value: row.path}, shortName(row.path)))),
-    () => {}); // classes that nobody serves have no instances to offer
+  offer(offered, parameter.class ?? "");
   return {...field, node: make("span", {class: "pair"}, field.node, offered), labelled: field.node,
     text: () => shortName(field.node.value)};
 }

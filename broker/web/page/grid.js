@@ -103,7 +103,7 @@ export class Grid {
   /** Shows the rows of the screen between two rows as high as all that are not shown. */
   _paint() {
     const from = Math.max(0, Math.floor(this.node.scrollTop / rowHeight) - margin);
-    const to = Math.min(this._matching, from + Math.ceil(this.node.clientHeight / rowHeight) + 2 * margin);
+    const to = Math.min(this._matching, from + Math.ceil(innerHeight / rowHeight) + 2 * margin);
     const focused = this._body.contains(document.activeElement) ? document.activeElement.dataset.row : null;
     const rows = [];
     for (let index = from; index < to; index++)

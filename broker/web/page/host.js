@@ -53,7 +53,7 @@ function paint(places, host) {
   replace(places.failures, failuresOf(host));
   const name = host.root.name || "This host";
   replace(places.facts, section(name, factsOf(host.root.facts), partsOf(host.root)));
-  replace(places.picture, pictureOf(host.root, places.picture.clientWidth));
+  replace(places.picture, pictureOf(host, places.picture.clientWidth));
 }
 
 export async function showHost(visit) {
@@ -82,7 +82,7 @@ export async function showHost(visit) {
   let width = places.picture.clientWidth;
   const resized = new ResizeObserver(() => {
     if (host && places.picture.clientWidth !== width)
-      replace(places.picture, pictureOf(host.root, width = places.picture.clientWidth));
+      replace(places.picture, pictureOf(host, width = places.picture.clientWidth));
   });
   resized.observe(places.picture);
   visit.signal.addEventListener("abort", () => resized.disconnect());

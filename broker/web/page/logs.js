@@ -84,7 +84,7 @@ export async function showLogs(visit, id = "provider") {
   const place = make("div", {});
   visit.begin("Logs", place);
   await visit.fill(place, async () => {
-    const logs = await ask("logs", {}, visit.signal);
+    const logs = (await ask("logs", {}, visit.signal)).sort((a, b) => b.id.localeCompare(a.id)); // the provider's first
     const log = logs.find((each) => each.id === id);
     if (!log)
       return [make("p", {class: "notice"}, "There is no such log."),

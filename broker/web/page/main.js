@@ -65,17 +65,38 @@ async function showCurrent() {
   }
 }
 
+/** What could not be read before is read now; a form keeps what stands in it. */
+async function enter() {
+  if (await askToLogIn() && main.querySelector(".notice.critical"))
+    await showCurrent();
+}
+
+async function leave() {
+  try {
+    await logOut();
+    tell("Logged out");
+  } catch (error) {
+    tell(error.message); // nobody may read here without a name
+    await showCurrent();
+  }
+}
+
+/** Where others than the host's own people come to, nobody reads without a name. */
+async function begin() {
+  try {
+    await renewSession();
+  } catch (error) {
+    if (error.http === 401)
+      await enter();
+  }
+}
+
 function showSession() {
   const place = document.getElementById("session");
   const version = document.getElementById("version");
   replace(version, session.version, session.simulated ? make("span", {class: "badge quiet"}, "simulated") : null);
   const who = session.user ? "Logged in as " + session.user : "Not logged in";
-  const leave = async () => {
-    await logOut();
-    tell("Logged out");
-  };
-  const act = session.user ? button("Log out", leave)
-    : session.hasUsers === false ? null : button("Log in", () => askToLogIn());
+  const act = session.user ? button("Log out", leave) : button("Log in", enter);
   replace(place, make("span", {}, who), act,
     session.mayChange ? null : make("span", {class: "why"}, "Read only" + (session.whyNot ? ": " + session.whyNot : "")));
 }
@@ -87,4 +108,4 @@ document.getElementById("skip").addEventListener("click", (event) => {
 });
 addEventListener("hashchange", showCurrent);
 showCurrent();
-renewSession().catch((error) => replace(document.getElementById("session"), failure(error)));
+begin();

@@ -42,28 +42,37 @@ export function unitsText(node) {
   return countText(node.units, "unit") + (Number(node.bytes) > 0 ? ", " + sizeText(node.bytes) : "");
 }
 
+const boxed = new Set(["Card", "FC port", "Virtual port", "Target"]);
+
+/** What is wrong with it and with those of its parts that have no boxes of their own. */
+function problemsOf(node) {
+  return [...node.problems, ...node.children.filter((child) => !boxed.has(child.kind)).flatMap(problemsOf)];
+}
+
 /** "critical", "warning", or "" for what is well. */
-function stateOf(node) {
-  const severities = node.problems.map((problem) => problem.severity);
+function stateOf(problems) {
+  const severities = problems.map((problem) => problem.severity);
   return severities.includes("critical") ? "critical" : severities.length ? "warning" : "";
 }
 
-function boxOf(node, title, lines, kind) {
-  const problems = node.problems.map((problem) => problem.text);
+function boxOf(node, title, lines, kind, found = []) {
+  const problems = [...new Set(found.map((problem) => problem.text))];
   const said = problems.map((text) => text.toLowerCase());
   const rest = lines.filter((line) => line && !said.includes(line.toLowerCase()));
-  return {node, kind, title, lines: rest, problems, state: stateOf(node), path: node.path,
+  return {node, kind, title, lines: rest, problems, state: stateOf(found), path: node.path,
     links: [], parts: [], whole: null};
 }
 
 function cardBox(card) {
-  return boxOf(card, factText(card, "model") || card.name, ["serial number " + factText(card, "serial number")], "Card");
+  return boxOf(card, factText(card, "model") || card.name, ["serial number " + factText(card, "serial number")], "Card", problemsOf(card));
 }
 
-function portBox(port) {
+/** With what was found of it beside the tree, such as errors that grow. */
+function portBox(port, problems) {
   const fabric = factText(port, "fabric");
   const pair = [factText(port, "state"), factText(port, "speed")].filter(Boolean).join(", ");
-  return boxOf(port, port.name, [pair, fabric && "fabric " + fabric], port.kind);
+  return boxOf(port, port.name, [pair, fabric && "fabric " + fabric], port.kind,
+    [...problemsOf(port), ...problems.filter((problem) => problem.path && problem.path === port.path)]);
 }
 
 function nameOf(target) {
@@ -71,13 +80,13 @@ function nameOf(target) {
 }
 
 function targetBox(target) {
-  return boxOf(target, nameOf(target), [unitsText(target)], "Target");
+  return boxOf(target, nameOf(target), [unitsText(target)], "Target", problemsOf(target));
 }
 
 function restBox(targets, port) {
   const sum = targets.reduce((all, target) => ({units: all.units + Number(target.units), bytes: all.bytes + Number(target.bytes)}),
     {units: 0, bytes: 0});
-  return boxOf({...port, problems: []}, countText(targets.length, "more target"), [unitsText(sum)], "Targets");
+  return boxOf(port, countText(targets.length, "more target"), [unitsText(sum)], "Targets");
 }
 
 /** The boxes of targets, one for each WWPN, with the ports that reach them. */
@@ -115,7 +124,7 @@ class Targets {
   }
 
   _count(port, {targets, ...node}) {
-    this._join(port, node.name, () => boxOf({...node, problems: []}, countText(targets, "target"), [unitsText(node)], "Targets"));
+    this._join(port, node.name, () => boxOf(node, countText(targets, "target"), [unitsText(node)], "Targets"));
   }
 }
 
@@ -124,7 +133,7 @@ function ownTargets(port) {
   return descendants({children: port.children.filter((child) => child.kind !== "Virtual port")}, "Target");
 }
 
-function columnsOf(root) {
+function columnsOf({root, problems}) {
   const cards = [];
   const ports = [];
   const targets = new Targets(descendants(root, "FC port").length);
@@ -132,9 +141,9 @@ function columnsOf(root) {
     const cardPlace = cardBox(card);
     cards.push(cardPlace);
     for (const port of descendants(card, "FC port")) {
-      const portPlace = portBox(port);
+      const portPlace = portBox(port, problems);
       cardPlace.links.push(portPlace);
-      portPlace.parts = descendants(port, "Virtual port").map(portBox);
+      portPlace.parts = descendants(port, "Virtual port").map((each) => portBox(each, problems));
       for (const place of [portPlace, ...portPlace.parts]) {
         place.whole = place === portPlace ? null : portPlace;
         ports.push(place);
@@ -252,9 +261,9 @@ function drawLine(from, to, isWide) {
   return draw("path", {class: "line " + from.state, d: `M${x} ${from.y + from.height}V${y2}H${to.x}`});
 }
 
-/** The picture in so many pixels of width. */
-export function pictureOf(root, width) {
-  const columns = columnsOf(root);
+/** The picture of a host in so many pixels of width. */
+export function pictureOf(host, width) {
+  const columns = columnsOf(host);
   const boxes = columns.flat();
   if (boxes.length === 0)
     return make("p", {class: "notice"}, "There are no adapters.");
