@@ -56,15 +56,7 @@ public:
     {
         EXPECT_THAT(ask("EnumerateInstanceNames", "TVRHBA_Card"), HasSubstr("<INSTANCENAME"));
     }
-    /// Megabytes in memory.
-    long memory() const
-    {
-        std::ifstream status("/proc/" + std::to_string(_tool.process()) + "/status");
-        for (std::string line; std::getline(status, line);)
-            if (line.starts_with("VmRSS:"))
-                return std::atol(line.c_str() + 6) / 1024;
-        return 0;
-    }
+    long megabytes() const { return _tool.memory() / 1024; }
 
     /// Sockets that it has open.
     std::size_t sockets() const
@@ -148,7 +140,7 @@ TEST(ServeHostile, WhatIsNoRequestIsAnsweredOrClosed)
         EXPECT_THAT(answer, Not(HasSubstr("root:"))) << shown;
     }
     port.expectService();
-    EXPECT_LT(port.memory(), 300 * memoryFactor);
+    EXPECT_LT(port.megabytes(), 300 * memoryFactor);
 }
 
 /// What is refused by its head leaves its body unread, which is no request of its own.
@@ -241,7 +233,7 @@ TEST(ServeHostile, WhoDoesNotReadHoldsNobodyUp)
     const Port port;
     constexpr int clients = TVR_SANITIZED ? 1 : 4; // of each kind
     EXPECT_TRUE(port.ask("EnumerateInstances", volumes).ends_with(lastChunk));
-    const long before = port.memory();
+    const long before = port.megabytes();
     EXPECT_TRUE(test_support::eventually([&] { return port.sockets() <= 1; }));
     const std::size_t listening = port.sockets();
     const std::string request = httpRequest(cimMessage("EnumerateInstances", volumes));
@@ -259,7 +251,7 @@ TEST(ServeHostile, WhoDoesNotReadHoldsNobodyUp)
     const Clock::time_point start = Clock::now();
     EXPECT_TRUE(port.ask("EnumerateInstances", volumes).ends_with(lastChunk));
     EXPECT_LT(Clock::now() - start, TVR_SANITIZED ? 60s : 15s);
-    EXPECT_LT(port.memory() - before, 100 * memoryFactor);
+    EXPECT_LT(port.megabytes() - before, 100 * memoryFactor);
     EXPECT_TRUE(test_support::eventually([&] { return port.sockets() == listening; }));
     for (const RawClient& client : idle)
         EXPECT_FALSE(client.readAll().ends_with(lastChunk)); // given up, and he can tell

@@ -46,6 +46,7 @@ public:
     std::string port() const { return _url.substr(_url.rfind(':') + 1); }
     /// A path that the server gave, without its host.
     static std::string withoutHost(const std::string& line) { return line.substr(line.find('/')); }
+    long memory() const { return _tool.memory(); } ///< KiB
     int end();
 
 private:

@@ -5,6 +5,7 @@
 
 #include <csignal>
 #include <fcntl.h>
+#include <fstream>
 #include <poll.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -51,6 +52,16 @@ Running::~Running()
         kill(_process, SIGKILL);
         waitpid(_process, nullptr, 0);
     }
+}
+
+long Running::memory() const
+{
+    std::ifstream status("/proc/" + std::to_string(_process) + "/status");
+    constexpr std::string_view row = "VmRSS:";
+    for (std::string line; std::getline(status, line);)
+        if (line.starts_with(row))
+            return std::atol(line.c_str() + row.size());
+    return 0;
 }
 
 bool Running::awaitOutput() const

@@ -23,6 +23,8 @@ public:
     Running& operator=(const Running&) = delete;
 
     pid_t process() const { return _process; }
+    /// KiB of memory that it has now.
+    long memory() const;
     bool awaitOutput() const;
     std::string readLine() const;
     /// Its exit code after the signal; -1 when that killed it.
