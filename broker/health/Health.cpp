@@ -29,6 +29,16 @@ const Value::List& listOf(const Object& object, const std::string& property)
     return value.isNull() || !value.isArray() ? none : value.asList();
 }
 
+const Value* besideText(const Object& object, const char* values, const char* texts, std::string_view text)
+{
+    const Value::List& names = listOf(object, texts);
+    const Value::List& all = listOf(object, values);
+    for (std::size_t i = 0; i < std::min(names.size(), all.size()); ++i)
+        if (!names[i].isNull() && names[i].type() == CMPI_string && names[i].asString() == text)
+            return &all[i];
+    return nullptr;
+}
+
 namespace
 {
 

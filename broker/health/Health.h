@@ -7,6 +7,7 @@
 #include <optional>
 #include <span>
 #include <string>
+#include <string_view>
 
 namespace broker
 {
@@ -17,6 +18,9 @@ std::optional<std::uint64_t> unsignedOf(const Object& object, const std::string&
 std::optional<double> numberOf(const Object& object, const std::string& property);
 /// The elements of an array; none of what is no array.
 const Value::List& listOf(const Object& object, const std::string& property);
+
+/// Of two arrays side by side, what one has where the other has that text; null if there is none.
+const Value* besideText(const Object& object, const char* values, const char* texts, std::string_view text);
 
 /// A value of a port's OperationalStatus.
 struct PortState

@@ -91,12 +91,8 @@ std::string first(const Object& object, const FactRow& row)
 /// The one of OtherIdentifyingInfo that the row's detail describes.
 std::string identified(const Object& object, const FactRow& row)
 {
-    const Value::List& descriptions = listOf(object, "IdentifyingDescriptions");
-    const Value::List& values = listOf(object, row.property);
-    for (std::size_t i = 0; i < std::min(descriptions.size(), values.size()); ++i)
-        if (textOf(descriptions[i]) == row.detail)
-            return textOf(values[i]);
-    return {};
+    const Value* value = besideText(object, row.property, "IdentifyingDescriptions", row.detail);
+    return value ? textOf(*value) : std::string();
 }
 
 std::string yes(const Object& object, const FactRow& row)

@@ -80,7 +80,7 @@ Caller callerOf(const House& house, const httplib::Request& request)
     if (house.users.empty())
         return {.whyNot = "this port has no users, and lets nobody change anything"};
     if (!request.has_header("Authorization"))
-        return {.whyNot = "a user must log in before he changes anything"};
+        return {.whyNot = "log in to change anything"};
     const std::optional<User> user = house.users.admit(request.get_header_value("Authorization"));
     if (!user)
         throw Refusal{401, "name or password is wrong", true};

@@ -53,12 +53,8 @@ std::optional<double> quantity(const Object& object, const FamilyRow& row, const
 /// The one of OtherIdentifyingInfo that a description stands for.
 std::string identified(const Object& object, std::string_view description)
 {
-    const Value::List& descriptions = listOf(object, "IdentifyingDescriptions");
-    const Value::List& values = listOf(object, "OtherIdentifyingInfo");
-    for (std::size_t i = 0; i < std::min(descriptions.size(), values.size()); ++i)
-        if (textOf(descriptions[i]) == description)
-            return textOf(values[i]);
-    return {};
+    const Value* value = besideText(object, "OtherIdentifyingInfo", "IdentifyingDescriptions", description);
+    return value ? textOf(*value) : std::string();
 }
 
 Labels with(Labels labels, const Labels& further)
@@ -192,17 +188,6 @@ constexpr std::uint64_t driver = 2;
 constexpr std::uint64_t application = 5;
 constexpr std::uint64_t firmware = 10;
 
-/// The one of IdentityInfoValue that a type stands for.
-std::string identityInfo(const Object& object, std::string_view type)
-{
-    const Value::List& types = listOf(object, "IdentityInfoType");
-    const Value::List& values = listOf(object, "IdentityInfoValue");
-    for (std::size_t i = 0; i < std::min(types.size(), values.size()); ++i)
-        if (textOf(types[i]) == type)
-            return textOf(values[i]);
-    return {};
-}
-
 bool isClassified(const Object& object, std::uint64_t classification)
 {
     return std::ranges::any_of(listOf(object, "Classifications"), [&](const Value& value)
@@ -216,8 +201,8 @@ void version(Series& series, const FamilyRow& row, const Object& object, const L
     Labels labels{{"name", textOf(object, "Name")}, {"version", textOf(object, "VersionString")}};
     if (!isClassified(object, Classification) || labels.back().second.empty())
         return;
-    if (const std::string wwpn = identityInfo(object, "TAVRIN:PORT_WWPN"); !wwpn.empty())
-        labels.emplace(labels.begin(), port, wwpn);
+    if (const Value* wwpn = besideText(object, "IdentityInfoValue", "IdentityInfoType", "TAVRIN:PORT_WWPN"))
+        labels.emplace(labels.begin(), port, textOf(*wwpn));
     series.add(row, labels, 1);
 }
 
@@ -226,119 +211,90 @@ void version(Series& series, const FamilyRow& row, const Object& object, const L
 constexpr double bitsPerByte = 8;
 constexpr double thousandths = 1000;
 
+constexpr FamilyRow counts(const char* name, const char* property, const char* help)
+{
+    return {{name, counter, help}, number, property};
+}
+
+constexpr FamilyRow numbers(const char* name, const char* property, double divisor, const char* help)
+{
+    return {{name, gauge, help}, number, property, divisor};
+}
+
+constexpr FamilyRow measures(const char* name, FamilyRow::Read read, const Measure& measure, const char* help,
+                             double divisor = 1)
+{
+    return {{name, gauge, help}, read, "", divisor, &measure};
+}
+
 constexpr FamilyRow portFamilies[] = {
     {{"tavrin_fc_port_up", gauge, "Whether the port has a link."}, isUp},
     {{"tavrin_fc_port_state", gauge, "1 for the state that the port is in, 0 for all others."}, states},
     {{"tavrin_fc_port_reset_needed", gauge, "Whether the adapter waits for a reset."}, needsReset},
-    {{"tavrin_fc_port_speed_bytes_per_second", gauge, "Speed of the link; 0 without one."},
-     number,
-     "Speed",
-     bitsPerByte},
-    {{"tavrin_fc_port_max_speed_bytes_per_second", gauge, "The fastest speed of the port."},
-     number,
-     "MaxSpeed",
-     bitsPerByte},
-    {{"tavrin_fc_port_discovered_ports", gauge, "Other ports that the port has found in the fabric."},
-     number,
-     "NumberOfDiscoveredPorts"},
+    numbers("tavrin_fc_port_speed_bytes_per_second", "Speed", bitsPerByte, "Speed of the link; 0 without one."),
+    numbers("tavrin_fc_port_max_speed_bytes_per_second", "MaxSpeed", bitsPerByte, "The fastest speed of the port."),
+    numbers("tavrin_fc_port_discovered_ports", "NumberOfDiscoveredPorts", 1,
+            "Other ports that the port has found in the fabric."),
     {{"tavrin_fc_port_info", gauge, "What a port is and where it is."}, portInfo},
 };
 
 constexpr FamilyRow statisticsFamilies[] = {
-    {{"tavrin_fc_port_transmitted_bytes_total", counter, "Bytes that the port sent."}, number, "BytesTransmitted"},
-    {{"tavrin_fc_port_received_bytes_total", counter, "Bytes that the port received."}, number, "BytesReceived"},
-    {{"tavrin_fc_port_transmitted_frames_total", counter, "Frames that the port sent."}, number, "PacketsTransmitted"},
-    {{"tavrin_fc_port_received_frames_total", counter, "Frames that the port received."}, number, "PacketsReceived"},
-    {{"tavrin_fc_port_loop_initializations_total", counter, "Loop initialization primitives (LIP) on the link."},
-     number,
-     "LIPCount"},
-    {{"tavrin_fc_port_not_operational_sequences_total", counter, "Not operational sequences (NOS) on the link."},
-     number,
-     "NOSCount"},
-    {{"tavrin_fc_port_error_frames_total", counter, "Frames received with an error."}, number, "ErrorFrames"},
-    {{"tavrin_fc_port_dumped_frames_total", counter, "Frames dropped for want of buffers of the host."},
-     number,
-     "DumpedFrames"},
-    {{"tavrin_fc_port_link_failures_total", counter, "Failures of the link."}, number, "LinkFailures"},
-    {{"tavrin_fc_port_signal_losses_total", counter, "Losses of the signal."}, number, "LossOfSignalCounter"},
-    {{"tavrin_fc_port_synchronization_losses_total", counter, "Losses of synchronization."},
-     number,
-     "LossOfSyncCounter"},
-    {{"tavrin_fc_port_primitive_sequence_errors_total", counter, "Errors of the primitive sequence protocol."},
-     number,
-     "PrimitiveSeqProtocolErrCount"},
-    {{"tavrin_fc_port_crc_errors_total", counter, "Frames with a wrong checksum."}, number, "CRCErrors"},
-    {{"tavrin_fc_port_invalid_transmission_words_total", counter, "Invalid transmission words received."},
-     number,
-     "InvalidTransmissionWords"},
-    {{"tavrin_fc_port_short_frames_total", counter, "Frames below the smallest size."}, number, "FramesTooShort"},
-    {{"tavrin_fc_port_long_frames_total", counter, "Frames above the largest size."}, number, "FramesTooLong"},
-    {{"tavrin_fc_port_address_errors_total", counter, "Frames with an address that is unknown here."},
-     number,
-     "AddressErrors"},
-    {{"tavrin_fc_port_credits_not_provided_total", counter,
-      "Times at which the other end had no buffer credit left to send with."},
-     number,
-     "BufferCreditNotProvided"},
-    {{"tavrin_fc_port_credits_not_received_total", counter,
-      "Times at which the port had no buffer credit left to send with."},
-     number,
-     "BufferCreditNotReceived"},
-    {{"tavrin_fc_port_delimiter_errors_total", counter, "Frames with a wrong delimiter."}, number, "DelimiterErrors"},
-    {{"tavrin_fc_port_disparity_errors_total", counter, "Errors of the running disparity."},
-     number,
-     "EncodingDisparityErrors"},
-    {{"tavrin_fc_port_link_resets_received_total", counter, "Link resets received."}, number, "LinkResetsReceived"},
-    {{"tavrin_fc_port_link_resets_transmitted_total", counter, "Link resets sent."}, number, "LinkResetsTransmitted"},
-    {{"tavrin_fc_port_multicast_frames_received_total", counter, "Multicast frames received."},
-     number,
-     "MulticastFramesReceived"},
-    {{"tavrin_fc_port_multicast_frames_transmitted_total", counter, "Multicast frames sent."},
-     number,
-     "MulticastFramesTransmitted"},
-    {{"tavrin_fc_port_fabric_busy_frames_total", counter, "Frames answered by a busy fabric."}, number, "FBSYFrames"},
-    {{"tavrin_fc_port_port_busy_frames_total", counter, "Frames answered by a busy port."}, number, "PBSYFrames"},
-    {{"tavrin_fc_port_fabric_reject_frames_total", counter, "Frames rejected by the fabric."}, number, "FRJTFrames"},
-    {{"tavrin_fc_port_port_reject_frames_total", counter, "Frames rejected by a port."}, number, "PRJTFrames"},
-    {{"tavrin_fc_port_class1_frames_received_total", counter, "Frames of class 1 received."}, number, "RXClass1Frames"},
-    {{"tavrin_fc_port_class1_frames_transmitted_total", counter, "Frames of class 1 sent."}, number, "TXClass1Frames"},
-    {{"tavrin_fc_port_class1_fabric_busy_frames_total", counter, "Frames of class 1 answered by a busy fabric."},
-     number,
-     "Class1FBSY"},
-    {{"tavrin_fc_port_class1_port_busy_frames_total", counter, "Frames of class 1 answered by a busy port."},
-     number,
-     "Class1PBSY"},
-    {{"tavrin_fc_port_class1_fabric_reject_frames_total", counter, "Frames of class 1 rejected by the fabric."},
-     number,
-     "Class1FRJT"},
-    {{"tavrin_fc_port_class1_port_reject_frames_total", counter, "Frames of class 1 rejected by a port."},
-     number,
-     "Class1PRJT"},
-    {{"tavrin_fc_port_class2_frames_received_total", counter, "Frames of class 2 received."}, number, "RXClass2Frames"},
-    {{"tavrin_fc_port_class2_frames_transmitted_total", counter, "Frames of class 2 sent."}, number, "TXClass2Frames"},
-    {{"tavrin_fc_port_class2_fabric_busy_frames_total", counter, "Frames of class 2 answered by a busy fabric."},
-     number,
-     "Class2FBSY"},
-    {{"tavrin_fc_port_class2_port_busy_frames_total", counter, "Frames of class 2 answered by a busy port."},
-     number,
-     "Class2PBSY"},
-    {{"tavrin_fc_port_class2_fabric_reject_frames_total", counter, "Frames of class 2 rejected by the fabric."},
-     number,
-     "Class2FRJT"},
-    {{"tavrin_fc_port_class2_port_reject_frames_total", counter, "Frames of class 2 rejected by a port."},
-     number,
-     "Class2PRJT"},
-    {{"tavrin_fc_port_class3_frames_received_total", counter, "Frames of class 3 received."}, number, "RXClass3Frames"},
-    {{"tavrin_fc_port_class3_frames_transmitted_total", counter, "Frames of class 3 sent."}, number, "TXClass3Frames"},
-    {{"tavrin_fc_port_class3_discarded_frames_total", counter, "Frames of class 3 dropped."},
-     number,
-     "Class3FramesDiscarded"},
-    {{"tavrin_fc_port_broadcast_frames_received_total", counter, "Broadcast frames received."},
-     number,
-     "RXBroadcastFrames"},
-    {{"tavrin_fc_port_broadcast_frames_transmitted_total", counter, "Broadcast frames sent."},
-     number,
-     "TXBroadcastFrames"},
+    counts("tavrin_fc_port_transmitted_bytes_total", "BytesTransmitted", "Bytes that the port sent."),
+    counts("tavrin_fc_port_received_bytes_total", "BytesReceived", "Bytes that the port received."),
+    counts("tavrin_fc_port_transmitted_frames_total", "PacketsTransmitted", "Frames that the port sent."),
+    counts("tavrin_fc_port_received_frames_total", "PacketsReceived", "Frames that the port received."),
+    counts("tavrin_fc_port_loop_initializations_total", "LIPCount",
+           "Loop initialization primitives (LIP) on the link."),
+    counts("tavrin_fc_port_not_operational_sequences_total", "NOSCount",
+           "Not operational sequences (NOS) on the link."),
+    counts("tavrin_fc_port_error_frames_total", "ErrorFrames", "Frames received with an error."),
+    counts("tavrin_fc_port_dumped_frames_total", "DumpedFrames", "Frames dropped for want of buffers of the host."),
+    counts("tavrin_fc_port_link_failures_total", "LinkFailures", "Failures of the link."),
+    counts("tavrin_fc_port_signal_losses_total", "LossOfSignalCounter", "Losses of the signal."),
+    counts("tavrin_fc_port_synchronization_losses_total", "LossOfSyncCounter", "Losses of synchronization."),
+    counts("tavrin_fc_port_primitive_sequence_errors_total", "PrimitiveSeqProtocolErrCount",
+           "Errors of the primitive sequence protocol."),
+    counts("tavrin_fc_port_crc_errors_total", "CRCErrors", "Frames with a wrong checksum."),
+    counts("tavrin_fc_port_invalid_transmission_words_total", "InvalidTransmissionWords",
+           "Invalid transmission words received."),
+    counts("tavrin_fc_port_short_frames_total", "FramesTooShort", "Frames below the smallest size."),
+    counts("tavrin_fc_port_long_frames_total", "FramesTooLong", "Frames above the largest size."),
+    counts("tavrin_fc_port_address_errors_total", "AddressErrors", "Frames with an address that is unknown here."),
+    counts("tavrin_fc_port_credits_not_provided_total", "BufferCreditNotProvided",
+           "Times at which the port provided no buffer credit."),
+    counts("tavrin_fc_port_credits_not_received_total", "BufferCreditNotReceived",
+           "Times at which the port received no buffer credit."),
+    counts("tavrin_fc_port_delimiter_errors_total", "DelimiterErrors", "Frames with a wrong delimiter."),
+    counts("tavrin_fc_port_disparity_errors_total", "EncodingDisparityErrors", "Errors of the running disparity."),
+    counts("tavrin_fc_port_link_resets_received_total", "LinkResetsReceived", "Link resets received."),
+    counts("tavrin_fc_port_link_resets_transmitted_total", "LinkResetsTransmitted", "Link resets sent."),
+    counts("tavrin_fc_port_multicast_frames_received_total", "MulticastFramesReceived", "Multicast frames received."),
+    counts("tavrin_fc_port_multicast_frames_transmitted_total", "MulticastFramesTransmitted", "Multicast frames sent."),
+    counts("tavrin_fc_port_fabric_busy_frames_total", "FBSYFrames", "Frames answered by a busy fabric."),
+    counts("tavrin_fc_port_port_busy_frames_total", "PBSYFrames", "Frames answered by a busy port."),
+    counts("tavrin_fc_port_fabric_reject_frames_total", "FRJTFrames", "Frames rejected by the fabric."),
+    counts("tavrin_fc_port_port_reject_frames_total", "PRJTFrames", "Frames rejected by a port."),
+    counts("tavrin_fc_port_class1_frames_received_total", "RXClass1Frames", "Frames of class 1 received."),
+    counts("tavrin_fc_port_class1_frames_transmitted_total", "TXClass1Frames", "Frames of class 1 sent."),
+    counts("tavrin_fc_port_class1_fabric_busy_frames_total", "Class1FBSY",
+           "Frames of class 1 answered by a busy fabric."),
+    counts("tavrin_fc_port_class1_port_busy_frames_total", "Class1PBSY", "Frames of class 1 answered by a busy port."),
+    counts("tavrin_fc_port_class1_fabric_reject_frames_total", "Class1FRJT",
+           "Frames of class 1 rejected by the fabric."),
+    counts("tavrin_fc_port_class1_port_reject_frames_total", "Class1PRJT", "Frames of class 1 rejected by a port."),
+    counts("tavrin_fc_port_class2_frames_received_total", "RXClass2Frames", "Frames of class 2 received."),
+    counts("tavrin_fc_port_class2_frames_transmitted_total", "TXClass2Frames", "Frames of class 2 sent."),
+    counts("tavrin_fc_port_class2_fabric_busy_frames_total", "Class2FBSY",
+           "Frames of class 2 answered by a busy fabric."),
+    counts("tavrin_fc_port_class2_port_busy_frames_total", "Class2PBSY", "Frames of class 2 answered by a busy port."),
+    counts("tavrin_fc_port_class2_fabric_reject_frames_total", "Class2FRJT",
+           "Frames of class 2 rejected by the fabric."),
+    counts("tavrin_fc_port_class2_port_reject_frames_total", "Class2PRJT", "Frames of class 2 rejected by a port."),
+    counts("tavrin_fc_port_class3_frames_received_total", "RXClass3Frames", "Frames of class 3 received."),
+    counts("tavrin_fc_port_class3_frames_transmitted_total", "TXClass3Frames", "Frames of class 3 sent."),
+    counts("tavrin_fc_port_class3_discarded_frames_total", "Class3FramesDiscarded", "Frames of class 3 dropped."),
+    counts("tavrin_fc_port_broadcast_frames_received_total", "RXBroadcastFrames", "Broadcast frames received."),
+    counts("tavrin_fc_port_broadcast_frames_transmitted_total", "TXBroadcastFrames", "Broadcast frames sent."),
 };
 
 constexpr FamilyRow cardFamilies[] = {
@@ -346,81 +302,46 @@ constexpr FamilyRow cardFamilies[] = {
 };
 
 constexpr FamilyRow chipFamilies[] = {
-    {{"tavrin_fc_board_temperature_celsius", gauge, "Temperature of the board."}, measured, "", 1, &boardTemperature},
-    {{"tavrin_fc_board_temperature_threshold_celsius", gauge, "Limits of the board's temperature."},
-     thresholds,
-     "",
-     1,
-     &boardTemperature},
-    {{"tavrin_fc_board_beyond_threshold", gauge, "Whether a value of the board is beyond its limit."},
-     beyond,
-     "",
-     1,
-     &boardTemperature},
+    measures("tavrin_fc_board_temperature_celsius", measured, boardTemperature, "Temperature of the board."),
+    measures("tavrin_fc_board_temperature_threshold_celsius", thresholds, boardTemperature,
+             "Limits of the board's temperature."),
+    measures("tavrin_fc_board_beyond_threshold", beyond, boardTemperature,
+             "Whether a value of the board is beyond its limit."),
 };
 
-constexpr const Measure* temperature = &transceiverMeasures[0];
-constexpr const Measure* voltage = &transceiverMeasures[1];
-constexpr const Measure* biasCurrent = &transceiverMeasures[2];
-constexpr const Measure* transmitPower = &transceiverMeasures[3];
-constexpr const Measure* receivePower = &transceiverMeasures[4];
+constexpr const Measure& temperature = transceiverMeasures[0];
+constexpr const Measure& voltage = transceiverMeasures[1];
+constexpr const Measure& biasCurrent = transceiverMeasures[2];
+constexpr const Measure& transmitPower = transceiverMeasures[3];
+constexpr const Measure& receivePower = transceiverMeasures[4];
 
-constexpr FamilyName beyondLimit = {"tavrin_fc_transceiver_beyond_threshold", gauge,
-                                    "Whether a value of the transceiver is beyond its limit."};
+constexpr const char* beyondLimit = "tavrin_fc_transceiver_beyond_threshold";
+constexpr const char* beyondHelp = "Whether a value of the transceiver is beyond its limit.";
 
 constexpr FamilyRow transceiverFamilies[] = {
     {{"tavrin_fc_transceiver_info", gauge, "What a transceiver is."}, transceiverInfo},
-    {{"tavrin_fc_transceiver_temperature_celsius", gauge, "Temperature of the transceiver."},
-     measured,
-     "",
-     1,
-     temperature},
-    {{"tavrin_fc_transceiver_temperature_threshold_celsius", gauge, "Limits of the transceiver's temperature."},
-     thresholds,
-     "",
-     1,
-     temperature},
-    {{"tavrin_fc_transceiver_voltage_volts", gauge, "Supply voltage of the transceiver."}, measured, "", 1, voltage},
-    {{"tavrin_fc_transceiver_voltage_threshold_volts", gauge, "Limits of the supply voltage."},
-     thresholds,
-     "",
-     1,
-     voltage},
-    {{"tavrin_fc_transceiver_bias_current_amperes", gauge, "Bias current of the laser."},
-     measured,
-     "",
-     thousandths,
-     biasCurrent},
-    {{"tavrin_fc_transceiver_bias_current_threshold_amperes", gauge, "Limits of the bias current."},
-     thresholds,
-     "",
-     thousandths,
-     biasCurrent},
-    {{"tavrin_fc_transceiver_transmit_power_watts", gauge, "Optical power that is sent."},
-     measured,
-     "",
-     thousandths,
-     transmitPower},
-    {{"tavrin_fc_transceiver_transmit_power_threshold_watts", gauge, "Limits of the power that is sent."},
-     thresholds,
-     "",
-     thousandths,
-     transmitPower},
-    {{"tavrin_fc_transceiver_receive_power_watts", gauge, "Optical power that is received."},
-     measured,
-     "",
-     thousandths,
-     receivePower},
-    {{"tavrin_fc_transceiver_receive_power_threshold_watts", gauge, "Limits of the power that is received."},
-     thresholds,
-     "",
-     thousandths,
-     receivePower},
-    {beyondLimit, beyond, "", 1, temperature},
-    {beyondLimit, beyond, "", 1, voltage},
-    {beyondLimit, beyond, "", 1, biasCurrent},
-    {beyondLimit, beyond, "", 1, transmitPower},
-    {beyondLimit, beyond, "", 1, receivePower},
+    measures("tavrin_fc_transceiver_temperature_celsius", measured, temperature, "Temperature of the transceiver."),
+    measures("tavrin_fc_transceiver_temperature_threshold_celsius", thresholds, temperature,
+             "Limits of the transceiver's temperature."),
+    measures("tavrin_fc_transceiver_voltage_volts", measured, voltage, "Supply voltage of the transceiver."),
+    measures("tavrin_fc_transceiver_voltage_threshold_volts", thresholds, voltage, "Limits of the supply voltage."),
+    measures("tavrin_fc_transceiver_bias_current_amperes", measured, biasCurrent, "Bias current of the laser.",
+             thousandths),
+    measures("tavrin_fc_transceiver_bias_current_threshold_amperes", thresholds, biasCurrent,
+             "Limits of the bias current.", thousandths),
+    measures("tavrin_fc_transceiver_transmit_power_watts", measured, transmitPower, "Optical power that is sent.",
+             thousandths),
+    measures("tavrin_fc_transceiver_transmit_power_threshold_watts", thresholds, transmitPower,
+             "Limits of the power that is sent.", thousandths),
+    measures("tavrin_fc_transceiver_receive_power_watts", measured, receivePower, "Optical power that is received.",
+             thousandths),
+    measures("tavrin_fc_transceiver_receive_power_threshold_watts", thresholds, receivePower,
+             "Limits of the power that is received.", thousandths),
+    measures(beyondLimit, beyond, temperature, beyondHelp),
+    measures(beyondLimit, beyond, voltage, beyondHelp),
+    measures(beyondLimit, beyond, biasCurrent, beyondHelp),
+    measures(beyondLimit, beyond, transmitPower, beyondHelp),
+    measures(beyondLimit, beyond, receivePower, beyondHelp),
 };
 
 constexpr FamilyRow softwareFamilies[] = {

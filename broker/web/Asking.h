@@ -44,10 +44,14 @@ struct Ends
 /// One for all requests of a port.
 struct State
 {
+    State(broker::Broker& served, std::string ownNameSpace, Facts ownFacts)
+        : broker(served), nameSpace(std::move(ownNameSpace)), facts(std::move(ownFacts))
+    {}
+
     broker::Broker& broker;
     std::string nameSpace;
     Facts facts;
-    ErrorGrowth growth = {};
+    ErrorGrowth growth;
     Kept<Text> texts{{.number = 16, .bytes = 32 << 20}};
     Kept<InstanceTable> tables{{.number = 16, .bytes = 96 << 20}};
     Kept<Ends> ends{{.number = 16, .bytes = 32 << 20}};

@@ -41,12 +41,13 @@ int httpStatus(CMPIrc cim)
     return row == statuses.end() ? behind : row->http;
 }
 
-ToldFailure told(int status, const char* kind, const char* text, const std::string& cim = {})
+ToldFailure told(int status, const char* kind, std::string_view text, const std::string& cim = {})
 {
+    constexpr std::size_t longestText = 1000; // of which a client may have given a part
     Json error{{"kind", kind}};
     if (!cim.empty())
         error["status"] = cim;
-    error["text"] = text;
+    error["text"] = text.substr(0, longestText);
     return {status, jsonText({{"error", std::move(error)}})};
 }
 

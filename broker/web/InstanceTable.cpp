@@ -104,8 +104,9 @@ std::vector<std::size_t> InstanceTable::select(const Selection& selection) const
     if (selection.sort.empty())
         return rows;
     const std::size_t column = columnOf(selection.sort);
-    const auto nulls = std::ranges::stable_partition(rows, [&](std::size_t row) { return !isNull(row, column); });
-    const std::span<std::size_t> valued(rows.begin(), nulls.begin());
+    const auto nulls =
+        std::stable_partition(rows.begin(), rows.end(), [&](std::size_t row) { return !isNull(row, column); });
+    const std::span<std::size_t> valued(rows.begin(), nulls);
     const auto sortBy = [&](auto key)
     {
         std::ranges::stable_sort(valued, [&](std::size_t a, std::size_t b)

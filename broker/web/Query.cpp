@@ -12,7 +12,7 @@ Query::Query(const httplib::Params& params, std::initializer_list<const char*> k
 {
     for (const auto& [name, value] : params)
     {
-        if (std::ranges::none_of(known, [&](const char* wanted) { return name == wanted; }))
+        if (std::ranges::none_of(known, [&, &own = name](const char* wanted) { return own == wanted; }))
             throw ArgumentFailure("there is no parameter '" + name + "'");
         if (params.count(name) > 1)
             throw ArgumentFailure(name + ": it stands twice");

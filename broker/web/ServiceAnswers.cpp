@@ -295,8 +295,9 @@ Call callOf(const State& state, const Json& body)
 /// A line for the journal.
 void tell(const http::Caller& caller, const Call& call, const std::string& result)
 {
+    constexpr std::size_t longestPath = 500;
     std::cerr << oneLine(caller.user + " called " + call.info.name + "." + call.method.name + " on " +
-                         fullPathText(call.path) + ": " + result) +
+                         fullPathText(call.path).substr(0, longestPath) + ": " + result) +
                      "\n";
 }
 

@@ -78,6 +78,7 @@ struct Browser::Driver
         {
             setpgid(0, 0);
             dup2(ends[1], STDOUT_FILENO);
+            setenv("TMPDIR", folder.c_str(), 1); // what the programs leave behind goes with it
             execlp("chromedriver", "chromedriver", "--port=0", nullptr);
             _exit(127);
         }
@@ -231,27 +232,47 @@ std::string Browser::find(const std::string& selector, const std::string& text)
     return await(seen).at(elementKey);
 }
 
+/// What is found may be drawn anew before it is used, and is found again then.
+void Browser::use(const std::string& selector, const std::string& text, const std::function<void(std::string)>& with)
+{
+    for (int attempt = 1;; attempt++)
+        try
+        {
+            return with("/element/" + find(selector, text));
+        }
+        catch (const std::runtime_error& error)
+        {
+            constexpr int mostAttempts = 20;
+            if (attempt == mostAttempts ||
+                std::string(error.what()).find("stale element reference") == std::string::npos)
+                throw;
+        }
+}
+
 void Browser::click(const std::string& selector)
 {
-    command("POST", "/element/" + find(selector) + "/click");
+    use(selector, {}, [this](const std::string& element) { command("POST", element + "/click"); });
 }
 
 void Browser::clickText(const std::string& text, const std::string& within)
 {
-    const std::string selector = within + " a, " + within + " button";
-    command("POST", "/element/" + find(selector, text) + "/click");
+    use(within + " a, " + within + " button", text,
+        [this](const std::string& element) { command("POST", element + "/click"); });
 }
 
 void Browser::type(const std::string& selector, const std::string& text)
 {
-    const std::string element = find(selector);
-    command("POST", "/element/" + element + "/clear");
-    command("POST", "/element/" + element + "/value", {{"text", text}});
+    use(selector, {},
+        [&](const std::string& element)
+        {
+            command("POST", element + "/clear");
+            command("POST", element + "/value", {{"text", text}});
+        });
 }
 
 void Browser::choose(const std::string& selector, const std::string& file)
 {
-    command("POST", "/element/" + find(selector) + "/value", {{"text", file}});
+    use(selector, {}, [&](const std::string& element) { command("POST", element + "/value", {{"text", file}}); });
 }
 
 void Browser::press(const std::string& key)

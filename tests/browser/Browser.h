@@ -3,6 +3,7 @@
 
 #include <nlohmann/json.hpp>
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -68,6 +69,7 @@ private:
     Json command(const std::string& method, const std::string& path, const Json& body = Json::object());
     Json devtools(const std::string& name, const Json& parameters);
     std::string find(const std::string& selector, const std::string& text = {});
+    void use(const std::string& selector, const std::string& text, const std::function<void(std::string)>& with);
 
     std::unique_ptr<Driver> _driver;
     std::string _session;

@@ -263,30 +263,44 @@ std::string expectationAt(int minute, const std::vector<std::string>& alerts)
     return text;
 }
 
-TEST(Metrics, APulledPortAndGrowingErrorsRaiseTheirAlerts)
+std::string firing(const std::string& alert, const std::string& severity, const std::string& labels)
 {
+    return "alertname=\"" + alert + "\",severity=\"" + severity + "\"," + labels;
+}
+
+TEST(Metrics, WhatHappensToAHostRaisesItsAlertsAndNoOthers)
+{
+    stopClock();
     Host host;
     Collector collector(host.broker(), nameSpace, 0s);
-    constexpr int minutes = 45;
+    constexpr int minutes = 70;
     constexpr int pulled = 5;
     std::vector<Samples> scrapes;
     for (int minute = 0; minute < minutes; ++minute)
     {
+        advanceClock(1min);
         if (minute == pulled)
+        {
             host.setPortState(port, linkDown);
+            host.setAttribute(otherPort,
+                              R"({"boardTemperature": 6904426})"); // 106, 90 and 105 degrees, from the next refresh on
+            host.addFault(R"({"function": "LRM_GetVPD", "status": 97})"); // counted by each refresh
+        }
         host.setAttribute(otherPort, (R"({"invalidCrcs": )" + std::to_string(minute) + "}").c_str());
         scrapes.push_back(scrape(collector));
     }
-    const std::string down = std::string("alertname=\"TavrinFcPortDown\",severity=\"critical\",port=\"") + port + "\"";
-    const std::string errors =
-        std::string("alertname=\"TavrinFcPortErrors\",severity=\"warning\",port=\"") + otherPort + "\"";
+    const std::string down = firing("TavrinFcPortDown", "critical", std::string("port=\"") + port + "\"");
+    const std::string errors = firing("TavrinFcPortErrors", "warning", std::string("port=\"") + otherPort + "\"");
+    const std::string hot =
+        firing("TavrinFcBoardCritical", "critical", R"(chip="TV32B71155",measure="temperature",level="alarm")");
+    const std::string failing = firing("TavrinFcLibraryCallsFail", "warning", R"(function="LRM_GetVPD")");
     const std::string file = host.root() / "alerts-test.yml";
     std::ofstream(file) << "rule_files: ['" TVR_FLEET
                            "/alerts.yml']\nevaluation_interval: 1m\ntests:\n  - interval: 1m\n"
                         << "    input_series:\n"
                         << inputOf(scrapes) << "    promql_expr_test:\n"
                         << expectationAt(pulled - 1, {}) << expectationAt(pulled + 2, {down})
-                        << expectationAt(minutes - 1, {down, errors});
+                        << expectationAt(minutes - 1, {down, errors, hot, failing});
     const Answer tested = runCommand("promtool test rules " + file);
     EXPECT_EQ(tested.exitCode, 0) << tested.out << tested.err;
     EXPECT_THAT(tested.out, HasSubstr("SUCCESS"));
