@@ -78,6 +78,7 @@ struct Browser::Driver
         {
             setpgid(0, 0);
             dup2(ends[1], STDOUT_FILENO);
+            setenv("TMPDIR", folder.c_str(), 1); // what the programs leave behind goes with it
             execlp("chromedriver", "chromedriver", "--port=0", nullptr);
             _exit(127);
         }

@@ -174,7 +174,6 @@ TEST_F(Page, PlotsCountersAndMarksErrorsThatGrow)
     browser.run("const choice = document.querySelector('#interval'); choice.value = 1; "
                 "choice.dispatchEvent(new Event('change'))");
     browser.clickText("Read now");
-    browser.clickText("Read now");
     browser.await("document.querySelector('#panels').dataset.reads >= 4");
     const std::string row = "[...document.querySelectorAll('.panel')].map((panel) => panel.querySelector("
                             "'[data-counter=CRCErrors]').innerText)";

@@ -77,7 +77,7 @@ export async function showHost(visit) {
   };
   visit.begin("Host", trouble, places.problems,
     section("Topology", places.picture), places.failures, places.facts,
-    make("p", {}, button("Read again", read)));
+    make("p", {}, button("Read again", () => visit.hurry())));
   replace(places.problems, section("Looking for problems", make("p", {class: "quiet", "aria-busy": "true"}, "Reading the host …")));
   let width = places.picture.clientWidth;
   const resized = new ResizeObserver(() => {

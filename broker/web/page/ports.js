@@ -177,10 +177,14 @@ export async function showPorts(visit) {
         replace(trouble, failure(error));
     }
   };
-  const choice = make("select", {id: "interval", change: (event) => { seconds = Number(event.target.value); }},
+  const choose = (event) => {
+    seconds = Number(event.target.value);
+    visit.hurry();
+  };
+  const choice = make("select", {id: "interval", change: choose},
     intervals.map((each) => make("option", {value: each, selected: each === seconds}, each + " s")));
   place.id = "panels";
-  visit.begin("Ports", make("div", {class: "toolbar"}, make("label", {}, "Read every ", choice), button("Read now", read)),
+  visit.begin("Ports", make("div", {class: "toolbar"}, make("label", {}, "Read every ", choice), button("Read now", () => visit.hurry())),
     trouble, errors, place);
   await visit.repeat(read, () => seconds * 1000);
 }

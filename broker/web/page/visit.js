@@ -11,7 +11,11 @@ export class Visit {
 
   get signal() { return this._ending.signal; }
   get over() { return this.signal.aborted; }
-  end() { this._ending.abort(); }
+
+  end() {
+    this._ending.abort();
+    this.hurry();
+  }
 
   /** Empties the place and writes the heading, which is where keys go on from. */
   begin(title, ...children) {
@@ -24,14 +28,18 @@ export class Visit {
     while (!this.over) {
       if (!document.hidden)
         await work();
-      await this._pause(delay());
+      if (!this.over)
+        await this._pause(delay());
     }
   }
+
+  /** Ends the pause before the next repetition. */
+  hurry() { this._wake?.(); }
 
   _pause(milliseconds) {
     return new Promise((resolve) => {
       const timer = setTimeout(resolve, milliseconds);
-      this.signal.addEventListener("abort", () => { clearTimeout(timer); resolve(); }, {once: true});
+      this._wake = () => { clearTimeout(timer); resolve(); };
     });
   }
 
