@@ -166,10 +166,10 @@ private:
         const StyleRow* style = styleOf(node);
         if (!style)
             return drawBelow(node, parent, isWrong);
-        const bool hasProblem = !node.problems.empty();
-        const std::string id = _columns[node.kind].emplace_back(box(labelOf(node), *style, hasProblem));
-        line(parent, id, edgeOf(hasProblem));
-        drawBelow(node, id, hasProblem);
+        const bool isCritical = std::ranges::any_of(node.problems, &Problem::critical);
+        const std::string id = _columns[node.kind].emplace_back(box(labelOf(node), *style, !node.problems.empty()));
+        line(parent, id, edgeOf(isCritical));
+        drawBelow(node, id, isCritical);
     }
 
     void drawTargets(const Nodes& targets, const std::string& port, bool isWrong)

@@ -144,6 +144,7 @@ TEST_F(Page, FollowsAssociationsToAUnitAndBack)
     follow("SCSI protocol initiator endpoint");
     follow("Storage volume");
     browser.awaitText("main", "100 GiB");
+    browser.keepPicture("unit");
     follow("SCSI protocol initiator endpoint");
     browser.run("history.go(-3)");
     awaitHeading("FC port " + std::string(upPort));
@@ -157,6 +158,7 @@ TEST_F(Page, RefusesAWrongPasswordAndTellsWhoMayNot)
     browser.awaitText("#session", "Read only");
     logIn("joe", "wrong");
     browser.awaitText("dialog", "name or password is wrong");
+    browser.keepPicture("wrong-password");
     EXPECT_EQ(browser.run("return document.querySelector('dialog input[name=password]').value"), "");
     browser.press(key::escape);
     browser.await("!document.querySelector('dialog')");
@@ -250,9 +252,11 @@ TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
     {
         const char* wwpn;
         const char* result;
+        const char* picture = "name-refused";
     };
-    for (const Case& each : {Case{"0000000000000000", "(40005)"}, Case{downPort, "A name is in use (91)"},
-                             Case{"seven", "("}, Case{"1000027A51160299", "Completed (0)"}})
+    for (const Case& each :
+         {Case{"0000000000000000", "(40005)"}, Case{"seven", "("}, Case{downPort, "A name is in use (91)"},
+          Case{"1000027A51160299", "Completed (0)", "name-changed"}})
     {
         ask(each.wwpn);
         browser.awaitText("dialog h2", "Change the WWN of FC port 1000027A51160210?");
@@ -264,6 +268,7 @@ TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
         EXPECT_EQ(browser.run("return document.querySelector('#returned').classList.contains('ok')"),
                   each.result == std::string("Completed (0)"))
             << each.wwpn;
+        browser.keepPicture(each.picture);
     }
     // Left without an answer, a question does nothing.
     ask("1000027A51160277");
@@ -359,6 +364,7 @@ TEST_F(Page, ClearsALogWhenAsked)
     browser.clickText("Clear …");
     browser.clickText("Clear", "dialog");
     browser.awaitText("#entries", "Cleared all the logs");
+    browser.keepPicture("log-cleared");
     EXPECT_THAT(browser.textOf("#entries"), Not(HasSubstr("FC Record Logs enabled")));
     expectPeace();
 }

@@ -24,7 +24,7 @@ void load(const Serving& server, int times)
 TEST(ServeMemory, StaysFlatOverPageLoadsAndScrapes)
 {
     const Serving server;
-    load(server, 400);
+    load(server, 2000);
     const long before = server.memory();
     load(server, 10000);
     constexpr long most = 4 << 10; // KiB: less than half a KiB of each load

@@ -2,17 +2,16 @@
 // become markup.
 
 const svgSpace = "http://www.w3.org/2000/svg";
-const attributeNames = new Set(["accept", "autocomplete", "checked", "class", "colspan", "cx", "cy", "d", "disabled",
-  "dominant-baseline", "for", "height", "hidden", "id", "inputmode", "list", "max", "min", "multiple", "name", "open",
-  "pattern", "placeholder", "points", "preserveAspectRatio", "r", "readonly", "required", "role", "rows", "rx", "scope",
-  "selected", "spellcheck", "step", "tabindex", "text-anchor", "title", "type", "value", "viewBox", "width", "x", "x1",
-  "x2", "y", "y1", "y2"]);
+const attributeNames = new Set(["autocomplete", "class", "colspan", "d", "dominant-baseline", "for", "height",
+  "hidden", "id", "inputmode", "list", "max", "name", "open", "placeholder", "points", "preserveAspectRatio",
+  "required", "role", "rows", "rx", "scope", "selected", "spellcheck", "tabindex", "title", "type", "value",
+  "viewBox", "width", "x", "x1", "x2", "y", "y1", "y2"]);
 
 // What is not seen, or has the text around it shown in another order.
 const unseen = /[\u0000-\u001f\u007f-\u009f\u00ad\u061c\u200b-\u200f\u2028-\u202e\u2060-\u2069\ufeff\ufff9-\ufffb]/g;
 
 /** A text as people can see it: what has no shape is written as its number. */
-export function visible(text) {
+function visible(text) {
   return String(text).replace(unseen, (c) => "\\u" + c.charCodeAt(0).toString(16).padStart(4, "0"));
 }
 

@@ -29,7 +29,7 @@ function failuresOf(host) {
     host.failures.map((text) => make("li", {}, badge("warning", "warning"), " ", text))));
 }
 
-export function factsOf(facts) {
+function factsOf(facts) {
   return make("dl", {class: "facts"}, facts.map(({label, text}) => [make("dt", {}, label), make("dd", {}, text)]));
 }
 

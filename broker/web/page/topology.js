@@ -38,7 +38,7 @@ function countText(count, word) {
   return count + " " + word + (Number(count) === 1 ? "" : "s");
 }
 
-export function unitsText(node) {
+function unitsText(node) {
   return countText(node.units, "unit") + (Number(node.bytes) > 0 ? ", " + sizeText(node.bytes) : "");
 }
 

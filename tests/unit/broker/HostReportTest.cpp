@@ -226,13 +226,15 @@ TEST(Topology, ManyAreOneBoxWithTheirNumber)
 TEST(Topology, WhatIsDownIsMarkedAndForeignTextsAreText)
 {
     HostNode down = nodeOf("FC port", "a\\\"]; x [&amp;", {});
-    down.problems = {{"LINK DOWN"}};
+    down.problems = {{"LINK DOWN", true}};
     down.facts = {{"fabric", std::string(50, 'f'), inLine | labelled | pictured}};
     const std::string dot = topologyDot(hostWith({down}));
     EXPECT_THAT(dot,
                 HasSubstr("fillcolor=\"#f4b6b6\", label=\"FC port a\\\\\\\"]; x [&amp;amp;\\nLINK DOWN\\nfabric\\n" +
                           std::string(35, 'f') + "…\"]"));
     EXPECT_THAT(dot, HasSubstr("n1 -> n2 [style=dashed, color=\"#cc0000\"]"));
+    down.problems = {{"NEEDS RESET"}};
+    EXPECT_THAT(topologyDot(hostWith({down})), HasSubstr("n1 -> n2\n")) << "it has its link";
 }
 
 /// A folder with a program dot of a test's making, in front of PATH or in its place.
