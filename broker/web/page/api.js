@@ -101,16 +101,19 @@ export async function renewSession() {
   }
 }
 
+/** Who cannot log in stays who he was. */
 export async function logIn(user, password) {
   const bytes = new TextEncoder().encode(user + ":" + password);
-  const before = authorization;
+  const before = {authorization, session: {...session}};
   authorization = "Basic " + btoa(String.fromCharCode(...bytes));
   try {
     await renewSession();
     if (!session.user)
       throw new Refused(0, {kind: "refused", text: session.whyNot});
   } catch (error) {
-    authorization = before;
+    authorization = before.authorization;
+    Object.assign(session, before.session);
+    document.dispatchEvent(new Event("session"));
     throw error;
   }
 }
