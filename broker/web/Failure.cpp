@@ -41,12 +41,19 @@ int httpStatus(CMPIrc cim)
     return row == statuses.end() ? behind : row->http;
 }
 
+/// Texts may name what a client has sent, however much that is.
+std::string cut(std::string_view text)
+{
+    constexpr std::size_t longest = 1000;
+    return text.size() <= longest ? std::string(text) : std::string(text.substr(0, longest)) + "...";
+}
+
 ToldFailure told(int status, const char* kind, const char* text, const std::string& cim = {})
 {
     Json error{{"kind", kind}};
     if (!cim.empty())
         error["status"] = cim;
-    error["text"] = text;
+    error["text"] = cut(text);
     return {status, jsonText({{"error", std::move(error)}})};
 }
 

@@ -126,6 +126,7 @@ TEST(Failures, AreToldByKindAndStatus)
         EXPECT_EQ(row.told.status, row.status);
         EXPECT_EQ(Json::parse(row.told.json)["error"]["kind"], row.kind) << row.told.json;
     }
+    EXPECT_LT(told(ArgumentFailure(std::string(1 << 20, 'x'))).json.size(), 2000U);
     EXPECT_THAT(rows[2].told.json, HasSubstr(R"("status":"CIM_ERR_NOT_FOUND","text":"CIM_ERR_NOT_FOUND: gone")"));
 }
 
