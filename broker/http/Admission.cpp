@@ -1,5 +1,7 @@
 #include "broker/http/Admission.h"
 
+#include "broker/values/PathText.h"
+
 #include <arpa/inet.h>
 
 #include <algorithm>
@@ -64,6 +66,8 @@ bool isOfScript(const httplib::Request& request)
 void expectNoForeignPage(const House& house, const httplib::Request& request)
 {
     const std::string host = request.get_header_value("Host");
+    if (request.get_header_value_count("Host") > 1)
+        throw Refusal{400, "this port has one name"};
     // A foreign name that leads to this host's own address makes this port one with a site of that name.
     if (house.ofThisHost && !host.empty() && !isOfThisHost(nameOf(host)))
         throw Refusal{403, "this port is not called " + host};
@@ -126,10 +130,16 @@ std::uint64_t expectBody(const Route& route, const httplib::Request& request)
 {
     if (request.has_header("Content-Encoding"))
         throw Refusal{415, "compressed bodies are not read"};
-    const bool chunked = request.has_header("Transfer-Encoding"); // then it may become as large as any
+    const std::string coding = request.get_header_value("Transfer-Encoding");
+    const bool chunked = !coding.empty(); // then it may become as large as any
     const bool measured = request.has_header("Content-Length");
     if (request.get_header_value_count("Content-Length") > 1 || (chunked && measured))
         throw Refusal{400, "the length is told twice"};
+    if (chunked && !broker::sameName(coding, "chunked"))
+        throw Refusal{400, "bodies come whole or in chunks"};
+    const std::string digits = request.get_header_value("Content-Length");
+    if (measured && (digits.empty() || digits.find_first_not_of("0123456789") != digits.npos))
+        throw Refusal{400, "the length is no number"};
     const auto length = chunked ? largestBody : request.get_header_value<std::uint64_t>("Content-Length");
     if (route.method == "GET")
         return length == 0 ? 0 : throw Refusal{400, "a question has no body"};
@@ -168,7 +178,7 @@ bool isOfThisHost(const std::string& address)
 {
     in_addr number{};
     constexpr std::uint32_t loopback = 127; // the first of four bytes
-    return address == "localhost" || address == "::1" ||
+    return broker::sameName(address, "localhost") || address == "::1" ||
            (inet_pton(AF_INET, address.c_str(), &number) == 1 && ntohl(number.s_addr) >> 24 == loopback);
 }
 

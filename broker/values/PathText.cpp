@@ -116,7 +116,7 @@ Value guessed(const std::string& text, bool wasQuoted, const ClassTable& classes
     return Value::string(text);
 }
 
-void readKey(Reader& reader, Path& path, const ClassTable& classes)
+void readKey(Reader& reader, Path& path, const ClassTable& classes, std::size_t depth)
 {
     const std::string name(reader.until("=,"));
     if (name.empty() || !reader.take('='))
@@ -134,8 +134,9 @@ void readKey(Reader& reader, Path& path, const ClassTable& classes)
         throw std::invalid_argument(info->name + " has no key '" + name + "'");
     if (path.key(name))
         throw std::invalid_argument("the key '" + name + "' stands twice");
-    Value value = feature->type == CMPI_string ? Value::string(text)
-                                               : parseValue(Target(classes, path.nameSpace, *feature), text);
+    Target target(classes, path.nameSpace, *feature);
+    target.depth = depth + 1;
+    Value value = feature->type == CMPI_string ? Value::string(text) : parseValue(target, text);
     path.keys.push_back({feature->name, std::move(value)});
 }
 
@@ -166,8 +167,10 @@ std::string fullPathText(const Path& path)
     return host + (path.nameSpace.empty() ? "" : path.nameSpace + ":") + pathText(path);
 }
 
-Path parsePath(std::string_view text, const ClassTable& classes, std::string_view defaultNameSpace)
+Path parsePath(std::string_view text, const ClassTable& classes, std::string_view defaultNameSpace, std::size_t depth)
 {
+    if (depth > deepestPath)
+        throw std::invalid_argument("paths are nested too deeply");
     Path path;
     Reader reader(text);
     if (text.starts_with("//"))
@@ -191,7 +194,7 @@ Path parsePath(std::string_view text, const ClassTable& classes, std::string_vie
     if (reader.take('.'))
         do
         {
-            readKey(reader, path, classes);
+            readKey(reader, path, classes, depth);
         } while (reader.take(','));
     if (!reader.atEnd())
         throw std::invalid_argument("a comma stands between keys: '" + std::string(text) + "'");

@@ -19,9 +19,14 @@ std::string pathText(const Path& path);
 /// With what it has of host and namespace.
 std::string fullPathText(const Path& path);
 
+/// References in references, where nobody needs more than two.
+inline constexpr std::size_t deepestPath = 16;
+
 /// Reads a path. Keys get the types that the class says; those of an unknown class the types that they look like. A
 /// text without quotes is accepted for a string up to the next comma. Throws std::invalid_argument with the reason.
-Path parsePath(std::string_view text, const ClassTable& classes, std::string_view defaultNameSpace);
+/// `depth` is how many references it is within; beyond `deepestPath` it is refused.
+Path parsePath(std::string_view text, const ClassTable& classes, std::string_view defaultNameSpace,
+               std::size_t depth = 0);
 
 /// The first key of the class that the path lacks; empty if it is complete or the class unknown.
 std::string missingKey(const Path& path, const ClassTable& classes);

@@ -182,7 +182,7 @@ Value parseScalar(const Target& target, std::string_view text)
     case CMPI_dateTime:
         return Value::dateTime(parseDateTime(text));
     case CMPI_ref:
-        return Value::reference(parsePath(text, target.classes, target.nameSpace));
+        return Value::reference(parsePath(text, target.classes, target.nameSpace, target.depth));
     case CMPI_string:
         return Value::string(std::string(text));
     default:

@@ -28,6 +28,7 @@ struct Target
     std::string_view nameSpace; ///< of references that name none
     CMPIType type;
     std::string_view referenceClass; ///< of references and embedded instances
+    std::size_t depth = 0;           ///< how many references it is within
 
     Target(const ClassTable& table, std::string_view space, const FeatureInfo& feature)
         : classes(table), nameSpace(space), type(feature.type), referenceClass(feature.referenceClass)

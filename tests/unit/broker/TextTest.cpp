@@ -111,6 +111,10 @@ TEST(PathText, RefusalsNameTheReason)
     EXPECT_THAT(refusalOf("TST_Base.Idx=1"), HasSubstr("no key 'Idx'"));
     EXPECT_THAT(refusalOf("TST_Base.Level=1"), HasSubstr("no key 'Level'"));
     EXPECT_THAT(refusalOf("TST_Base.Id"), HasSubstr("name=value"));
+    std::string nested;
+    for (int i = 0; i < 10000; i++)
+        nested += "TST_Link.Left=";
+    EXPECT_THAT(refusalOf(nested), HasSubstr("too deeply"));
     EXPECT_THAT(refusalOf("TST_Base.Id=\"open"), HasSubstr("not closed"));
     EXPECT_THAT(refusalOf("TST_Base.Id=\"a\"x"), HasSubstr("comma"));
     EXPECT_THAT(refusalOf("TST_Base.Id=a,Id=b"), HasSubstr("twice"));

@@ -99,9 +99,13 @@ TEST(Admission, OfAPortWithUsersOnThisHost)
             {"GET", "/api/host", {own, {"Authorization", "Basic \xff"}}, 401, "wrong", true},
             {"GET", "/api/host", {own, {"Authorization", "Bearer x"}}, 401, "wrong", true},
             {"GET", "/api/host", {own, length}, 400, "no body"},
+            {"GET", "/api/host", {own, {"Content-Length", "0x0"}}, 400, "no number"},
+            {"GET", "/api/host", {own, {"Content-Length", ""}}, 400, "no number"},
             // names that lead here
             {"GET", "/api/host", {{"Host", "127.0.0.1:1"}}, 200},
             {"GET", "/api/host", {{"Host", "[::1]:5988"}}, 200},
+            {"GET", "/api/host", {{"Host", "LocalHost:5988"}}, 200},
+            {"GET", "/api/host", {own, {"Host", "evil.example"}}, 400, "one name"},
             {"GET", "/api/host", {{"Host", "evil.example"}}, 403, "not called evil.example"},
             {"GET", "/api/host", {{"Host", "127.0.0.1.evil.example"}}, 403},
             {"GET", "/api/host", {{"Host", "localhost.evil.example:5988"}}, 403},
@@ -135,6 +139,9 @@ TEST(Admission, OfAPortWithUsersOnThisHost)
             {"POST", "/api/call", {own, joe, withToken, json, {"Content-Length", "16777217"}}, 413},
             {"POST", "/api/call", {own, joe, withToken, json, length, {"Transfer-Encoding", "chunked"}}, 400, "twice"},
             {"POST", "/api/call", {own, joe, withToken, json, length, {"Content-Length", "3"}}, 400, "twice"},
+            {"POST", "/api/call", {own, joe, withToken, json, {"Content-Length", "2, 2"}}, 400, "no number"},
+            {"POST", "/api/call", {own, joe, withToken, json, {"Transfer-Encoding", "chunked"}}, 200},
+            {"POST", "/api/call", {own, joe, withToken, json, {"Transfer-Encoding", "gzip, chunked"}}, 400, "chunks"},
             {"POST", "/api/call", {own, joe, withToken, json, length, {"Content-Encoding", "gzip"}}, 415, "compressed"},
             {"POST", "/api/call", {own, joe, withToken, json, length, {"Origin", "http://evil.example"}}, 403},
             // programs
