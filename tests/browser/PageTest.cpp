@@ -53,10 +53,16 @@ protected:
 
     void logIn(const std::string& user = "joe", const std::string& password = "secret")
     {
-        browser.click("#session button");
+        browser.clickText("Log in", "#session");
         browser.type("dialog input[name=user]", user);
         browser.type("dialog input[name=password]", password);
         browser.press(key::enter);
+    }
+
+    void logInToChange()
+    {
+        logIn();
+        browser.awaitText("#session", "Logged in as joe");
     }
 
     void awaitHeading(const std::string& text) { browser.awaitText("h1", text); }
@@ -167,8 +173,7 @@ TEST_F(Page, RefusesAWrongPasswordAndTellsWhoMayNot)
     logIn("reader");
     browser.awaitText("#session", "reader may only read");
     browser.clickText("Log out");
-    logIn();
-    browser.awaitText("#session", "Logged in as joe");
+    logInToChange();
     EXPECT_THAT(browser.textOf("#session"), Not(HasSubstr("Read only")));
     // A new page knows nothing of it.
     browser.run("location.reload()");
@@ -246,8 +251,7 @@ TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
 
     browser.clickText("Log out");
     browser.await("document.querySelector('#session').innerText.includes('Not logged in')");
-    logIn();
-    browser.awaitText("#session", "Logged in as joe");
+    logInToChange();
     struct Case
     {
         const char* wwpn;
@@ -283,8 +287,7 @@ TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
 {
     serve();
     visit("methods/TVRHBA_SoftwareInstallationService/InstallFromByteStream");
-    logIn();
-    browser.awaitText("#session", "Logged in as joe");
+    logInToChange();
     struct Mistake
     {
         const char* field;
@@ -333,8 +336,7 @@ TEST_F(Page, ClearsALogWhenAsked)
 {
     serve();
     visit("logs");
-    logIn();
-    browser.awaitText("#session", "Logged in as joe");
+    logInToChange();
     browser.clickText("What is logged …");
     awaitHeading("Set the log params");
     browser.await("document.querySelector('[name=LogMode]')");
@@ -370,8 +372,7 @@ TEST_F(Page, RunsDiagnosticTestsToTheirEnds)
 {
     serve({"--scenario", TVR_SCENARIOS "/diagnostics.json"});
     visit("diagnostics");
-    logIn();
-    browser.awaitText("#session", "Logged in as joe");
+    logInToChange();
     struct Run
     {
         const char* test;

@@ -1,10 +1,10 @@
 // The tool's commands, command line and reports.
 #include "tests/unit/broker/FakeModule.h"
 
+#include "broker/host/ReadableText.h"
 #include "broker/tvrcim/Arguments.h"
 #include "broker/tvrcim/CommandLine.h"
 #include "broker/tvrcim/Printing.h"
-#include "broker/host/ReadableText.h"
 #include "broker/values/ValueMap.h"
 
 #include <gmock/gmock.h>
