@@ -5,7 +5,6 @@
 
 #include <malloc.h>
 #include <set>
-#include <thread>
 
 namespace metrics
 {
@@ -137,7 +136,7 @@ void Collector::readClass(std::size_t place)
 /// Only after a refresh: there may be thousands of units, and nobody reads them live.
 void Collector::readFabric()
 {
-    const auto before = settled();
+    const auto before = observeSettled(_broker);
     if (!mayAsk() || (before && before->refreshes == _fabricRead))
         return;
     Reaches reaches;
@@ -163,25 +162,14 @@ void Collector::readFabric()
     _fabricRead = before ? std::optional(before->refreshes) : std::nullopt;
 }
 
+/// Behind a refresh that may leave the cache incomplete, of which the end alone tells. What is read while it lasts
+/// would wait for it as well.
 bool Collector::mayAsk()
 {
-    const auto module = settled();
+    const auto module = observeSettled(_broker);
     if (!module || module->refreshes == 0)
         return true;
     return !module->refresh_running && (!module->refresh_pending || module->cache_age >= module->cache_timeout);
-}
-
-/// Behind a refresh that may leave the cache incomplete, of which the end alone tells. What is read while it lasts
-/// would wait for it as well.
-std::optional<Observation> Collector::settled()
-{
-    auto module = observe(_broker);
-    for (const auto start = Clock::now(); module && module->refresh_running && Clock::now() - start < 2s;)
-    {
-        std::this_thread::sleep_for(5ms);
-        module = observe(_broker);
-    }
-    return module;
 }
 
 } // namespace metrics

@@ -1,7 +1,7 @@
 // Collects what monitoring is told, asking the host no more often than it may be asked.
 #pragma once
 
-#include "broker/metrics/Observation.h"
+#include "broker/core/Observation.h"
 #include "broker/metrics/Series.h"
 
 #include <chrono>
@@ -43,7 +43,6 @@ private:
     void readClass(std::size_t place);
     void readFabric();
     bool mayAsk();
-    std::optional<Observation> settled();
 
     broker::Broker& _broker;
     const std::string _nameSpace;

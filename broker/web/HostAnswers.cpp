@@ -1,4 +1,5 @@
 // The host as a tree, what is wrong with it, and its ports as they are now.
+#include "broker/core/Observation.h"
 #include "broker/health/Health.h"
 #include "broker/host/HostGraph.h"
 #include "broker/host/HostReport.h"
@@ -141,9 +142,20 @@ Json problemsOf(const HostNode& root, const CountersByPort& counters)
     return problems;
 }
 
+/// As of one refresh of the provider's cache: one that ends meanwhile would have parts of the host without what led to
+/// them.
+HostReport reportOf(State& state)
+{
+    const auto before = observe(state.broker);
+    HostReport report(state.broker, state.nameSpace);
+    const auto after = observeSettled(state.broker);
+    const bool isOfOne = !before || !after || before->refreshes == 0 || before->refreshes == after->refreshes;
+    return isOfOne ? report : HostReport(state.broker, state.nameSpace);
+}
+
 std::string readHost(State& state)
 {
-    const HostReport report(state.broker, state.nameSpace);
+    const HostReport report = reportOf(state);
     std::vector<std::string> failures = report.failures();
     CountersByPort counters;
     try

@@ -35,14 +35,14 @@ constexpr const char* port = "1000027A51160210";
 constexpr const char* otherPort = "1000027A51320240";
 constexpr std::uint32_t linkDown = 6;
 
-metrics::Observation observed(Host& host)
+broker::Observation observed(Host& host)
 {
-    const auto found = metrics::observe(host.broker());
+    const auto found = broker::observe(host.broker());
     EXPECT_TRUE(found);
-    return found.value_or(metrics::Observation());
+    return found.value_or(broker::Observation());
 }
 
-std::uint64_t failures(const metrics::Observation& observation, const std::string& function)
+std::uint64_t failures(const broker::Observation& observation, const std::string& function)
 {
     for (const auto& [entryPoint, count] : observation.callFailures)
         if (entryPoint == function)
@@ -73,7 +73,7 @@ TEST(Metrics, TheModuleTellsOfItsCacheAndOfFailedCalls)
 {
     stopClock();
     Host host;
-    const metrics::Observation before = observed(host);
+    const broker::Observation before = observed(host);
     EXPECT_EQ(before.loaded, 0u);
     EXPECT_EQ(before.refreshes, 0u);
     EXPECT_EQ(before.cache_age, 0u);
@@ -83,7 +83,7 @@ TEST(Metrics, TheModuleTellsOfItsCacheAndOfFailedCalls)
     host.addFault(R"({"function": "HBA_OpenAdapter", "status": 0, "to": 1})");
     host.instancesOf("TVRHBA_Card");
     ASSERT_TRUE(host.awaitRefresh());
-    const metrics::Observation after = observed(host);
+    const broker::Observation after = observed(host);
     EXPECT_EQ(after.loaded, 1u);
     EXPECT_EQ(after.refreshes, 1u);
     EXPECT_EQ(after.refresh_running, 0u);

@@ -9,7 +9,7 @@
 #include <utility>
 #include <vector>
 
-namespace metrics
+namespace broker
 {
 
 struct Observation : tavrin_fc_observation
@@ -18,6 +18,8 @@ struct Observation : tavrin_fc_observation
 };
 
 /// Nothing of a module that tells nothing, or that is unloaded.
-std::optional<Observation> observe(broker::Broker& broker);
+std::optional<Observation> observe(Broker& broker);
+/// The same behind the end of a refresh that is running, for which it waits two seconds at the most.
+std::optional<Observation> observeSettled(Broker& broker);
 
-} // namespace metrics
+} // namespace broker

@@ -1,8 +1,10 @@
-#include "broker/metrics/Observation.h"
+#include "broker/core/Observation.h"
 
+#include <chrono>
 #include <new>
+#include <thread>
 
-namespace metrics
+namespace broker
 {
 
 namespace
@@ -22,7 +24,7 @@ void takeFailures(void* client, const char* entryPoint, std::uint64_t failures)
 
 } // namespace
 
-std::optional<Observation> observe(broker::Broker& broker)
+std::optional<Observation> observe(Broker& broker)
 {
     std::optional<Observation> found(std::in_place);
     found->version = TAVRIN_FC_OBSERVE_VERSION;
@@ -38,4 +40,17 @@ std::optional<Observation> observe(broker::Broker& broker)
     return found;
 }
 
-} // namespace metrics
+std::optional<Observation> observeSettled(Broker& broker)
+{
+    using namespace std::chrono_literals;
+    const auto end = std::chrono::steady_clock::now() + 2s;
+    auto module = observe(broker);
+    while (module && module->refresh_running && std::chrono::steady_clock::now() < end)
+    {
+        std::this_thread::sleep_for(5ms); // the module tells, and calls nobody
+        module = observe(broker);
+    }
+    return module;
+}
+
+} // namespace broker
