@@ -271,6 +271,30 @@ TEST(ServeJson, ErrorsThatGrowAreTold)
         << problems;
 }
 
+/// Behind a method that has the provider read everything anew, the next answer is of what was read then.
+TEST(ServeJson, FirmwareThatWaitsIsAProblemAtOnce)
+{
+    const Folder folder;
+    const Serving server({"--users", folder.makeUsers("joe", "secret")});
+    const Script joe(server, folder, "joe:secret");
+    EXPECT_EQ(joe.ask("host").json["problems"].size(), 1U);
+    const std::string image = "TVRSIM-FIRMWARE 1\nfamily: TV3202\nversion: 12.8.1.0\nchecksum: CBF43926\n\n123456789";
+    const Json installed = joe.call({{"path", joe.pathOf("TVRHBA_SoftwareInstallationService", "FCSoftware")},
+                                     {"method", "InstallFromByteStream"},
+                                     {"in",
+                                      {{"Target", joe.pathOf("TVRHBA_FCPort", "1000027A51320240")},
+                                       {"Image", std::vector<int>(image.begin(), image.end())},
+                                       {"InstallOptions", {32768}},
+                                       {"InstallOptionsValues", {"new.grp"}}}}})
+                               .json;
+    EXPECT_EQ(installed["returnValue"], 0) << installed;
+    const Json problems = joe.ask("host").json["problems"];
+    ASSERT_EQ(problems.size(), 2U) << problems;
+    EXPECT_EQ(problems[1]["text"], "FIRMWARE 12.8.1.0 WAITS FOR A RESET");
+    EXPECT_EQ(problems[1]["name"], "1000027A51320240");
+    EXPECT_EQ(problems[1]["severity"], "warning");
+}
+
 TEST(ServeJson, ATestOfAPortRunsToItsRecord)
 {
     const Folder folder;
