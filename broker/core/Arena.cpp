@@ -13,11 +13,8 @@ namespace broker
 namespace
 {
 
-std::vector<Frame*>& threadFrames()
-{
-    thread_local std::vector<Frame*> frames;
-    return frames;
-}
+/// Without a destructor, which a thread that has run out of memory could not even have registered.
+constinit thread_local Frame* innermost = nullptr;
 
 } // namespace
 
@@ -27,12 +24,19 @@ void Graveyard::accept(std::vector<std::unique_ptr<Tracked>>&& objects)
         object->bury();
     std::vector<std::unique_ptr<Tracked>> tooOld; // freed outside the lock
     const std::lock_guard lock(_mutex);
-    for (auto& object : objects)
-        _dead.push_back(std::move(object));
-    while (_dead.size() > _capacity)
+    try
     {
-        tooOld.push_back(std::move(_dead.front()));
-        _dead.pop_front();
+        for (auto& object : objects)
+            _dead.push_back(std::move(object));
+        while (_dead.size() > _capacity)
+        {
+            tooOld.push_back(std::move(_dead.front()));
+            _dead.pop_front();
+        }
+    }
+    catch (const std::bad_alloc&)
+    {
+        // Where there is no memory for the dead, they are freed at once.
     }
 }
 
@@ -89,8 +93,7 @@ int objectVersion(const Core& core)
 
 Frame* Frame::current()
 {
-    const std::vector<Frame*>& frames = threadFrames();
-    return frames.empty() ? nullptr : frames.back();
+    return innermost;
 }
 
 Frame* Frame::current(const Core& wanted)
@@ -101,15 +104,14 @@ Frame* Frame::current(const Core& wanted)
 
 void Frame::push()
 {
-    threadFrames().push_back(this);
+    _outer = std::exchange(innermost, this);
 }
 
 bool Frame::pop()
 {
-    std::vector<Frame*>& frames = threadFrames();
-    if (frames.empty() || frames.back() != this)
+    if (innermost != this)
         return false;
-    frames.pop_back();
+    innermost = _outer;
     return true;
 }
 

@@ -108,6 +108,7 @@ public:
 private:
     std::vector<std::unique_ptr<Tracked>> _objects;   ///< the first is the context
     std::vector<std::unique_ptr<std::size_t>> _marks; ///< how many objects there were
+    Frame* _outer = nullptr;                          ///< of the thread, while this one is within it
     std::size_t _results = 0;
     std::size_t _lasting = 0; ///< how many objects there were at the first result
 

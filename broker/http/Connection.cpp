@@ -182,7 +182,7 @@ bool Connection::awaitRequest()
 
 bool Connection::finishRequest()
 {
-    _held.reset();
+    _held.clear();
     _broken = _broken || !drain(true);
     return !_broken && !_over;
 }

@@ -47,7 +47,7 @@ public:
     /// There is no other request behind this one, whose body stays unread.
     void endBehindResponse() { _over = true; }
     /// Keeps something until the end of the request.
-    void keep(std::shared_ptr<void> held) { _held = std::move(held); }
+    void keep(std::shared_ptr<void> held) { _held.push_back(std::move(held)); }
 
     /// While it lives, what the client does not take at once is kept for later.
     class Hurry
@@ -94,7 +94,7 @@ private:
     int _lineEnds = 0;               ///< one behind the other; two end the head
     Time _receiving{0}, _sending{0}; ///< left of the client's time
     Spool _spool;
-    std::shared_ptr<void> _held;
+    std::vector<std::shared_ptr<void>> _held;
     bool _hurries = false;
     bool _over = false;   ///< nothing more is read
     bool _broken = false; ///< nor written

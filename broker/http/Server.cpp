@@ -26,6 +26,7 @@ namespace
 
 constexpr std::ptrdiff_t mostLarge = 4;      ///< larger bodies at once: read, they are many times as large
 constexpr std::size_t mostConnections = 256; ///< each has a thread while it is open
+constexpr std::ptrdiff_t mostAsking = 224;   ///< the rest tell clients so where a library of the hardware hangs
 constexpr int mostRequests = 100;            ///< of one connection
 constexpr int waitingConnections = 512;      ///< that are not accepted yet
 
@@ -37,8 +38,15 @@ void expectSafe(const ServerOptions& options)
         throw std::runtime_error("other hosts are served with users and TLS alone");
 }
 
-/// What was found of the request that this thread serves.
-thread_local Admitted found;
+/// The request that a thread serves.
+struct Served
+{
+    Admitted found = {};
+    bool isAnswered = false; ///< by its route, and not by the library
+};
+
+/// Of this thread. A pointer, for what has a destructor costs a thread memory that there may not be.
+constinit thread_local Served* served = nullptr;
 
 /// The library's server, of HTTP or HTTPS, on connections that are ours.
 template <class Base> class Listening : public Base
@@ -103,7 +111,8 @@ private:
         for (int left = mostRequests; goesOn && left > 0 && connection.awaitRequest(); left--)
         {
             bool closes = false;
-            found = {};
+            Served now;
+            served = &now;
             goesOn = this->process_request(connection, left == 1, closes, nullptr);
             goesOn = connection.finishRequest() && goesOn && !closes;
             giveBackMemory(connection.received());
@@ -145,14 +154,20 @@ void closeBehind(httplib::Response& response)
 void tell(httplib::Response& response, int status, const std::string& reason)
 {
     response.status = status;
-    response.set_content(broker::jsonText({{"error", {{"kind", "refused"}, {"text", reason}}}}), "application/json");
+    // No lists of JSON: they want memory even when they are freed, and there may be none.
+    response.set_content(R"({"error":{"kind":"refused","text":)" + broker::jsonText(reason) + "}}", "application/json");
 }
 
-/// What the library refuses by itself is not answered by a route.
+/// What the library refuses by itself: a head that it cannot read, or a body, of which the rest is still to come.
 void endBehindError(const httplib::Request&, httplib::Response& response)
 {
-    if (!found.route)
-        closeBehind(response);
+    if (served->isAnswered)
+        return;
+    constexpr int addressTooLong = 414;
+    if (response.body.empty())
+        tell(response, response.status,
+             response.status == addressTooLong ? "the address is too long" : "this is no request that is understood");
+    closeBehind(response);
 }
 
 void endBehindException(const httplib::Request&, httplib::Response& response, std::exception_ptr)
@@ -193,15 +208,20 @@ struct Server::Listener
                                          .ofThisHost = isOfThisHost(options.address),
                                          .changesWithoutUsers = options.changesWithoutUsers,
                                          .token = makeToken()},
+          patience(options.patience),
           server(makeServer(options, {options.patience, options.silence, largestBody + smallBody, ending}))
     {
         setUp(*server);
         server->set_pre_routing_handler([this](const httplib::Request& request, httplib::Response& response)
                                         { return receive(request, response); });
         const auto answer = [](const httplib::Request& request, httplib::Response& response)
-        { found.route->answer(request, response, found.caller); };
-        server->Get(".*", answer);
-        server->Post(".*", answer);
+        {
+            served->isAnswered = true;
+            served->found.route->answer(request, response, served->found.caller);
+        };
+        constexpr const char* anyPath = "[^]*"; // line ends too
+        server->Get(anyPath, answer);
+        server->Post(anyPath, answer);
         port = options.port == 0                                     ? server->bind_to_any_port(options.address)
                : server->bind_to_port(options.address, options.port) ? options.port
                                                                      : -1;
@@ -226,31 +246,46 @@ struct Server::Listener
     /// The head of a request.
     httplib::Server::HandlerResponse receive(const httplib::Request& request, httplib::Response& response)
     {
+        // Answers are given whole: the library would give as many parts as are asked for, each as large as the whole.
+        const_cast<httplib::Request&>(request).ranges.clear();
+        Admitted& found = served->found;
         found = admit(house, site, request);
-        if (found.status == 200 && (found.bodyBytes <= smallBody || takeSeat()))
+        const std::string isBusy = found.status == 200 ? takeSeats(found) : std::string();
+        if (found.status == 200 && isBusy.empty())
             return httplib::Server::HandlerResponse::Unhandled;
         if (found.challenges)
             response.set_header("WWW-Authenticate", "Basic realm=\"tvrcim\"");
         found.route = nullptr;
         if (found.status == 200)
-            tell(response, 503, "other large requests are being read");
+            tell(response, 503, isBusy);
         else
             tell(response, found.status, found.reason);
         closeBehind(response);
         return httplib::Server::HandlerResponse::Handled;
     }
 
-    bool takeSeat()
+    /// Until the request has its response. Tells who is in the way where there is no seat.
+    std::string takeSeats(const Admitted& found)
     {
-        if (!seats.try_acquire())
-            return false;
-        Connection::current().keep(std::shared_ptr<void>(this, [this](void*) { seats.release(); }));
-        return true;
+        if (found.bodyBytes > smallBody && !keep(large, large.try_acquire()))
+            return "other large requests are being read";
+        if (found.route->entrance != Entrance::open && !keep(asking, asking.try_acquire_for(patience / 2)))
+            return "too many others wait for the provider";
+        return {};
+    }
+
+    template <class Seats> static bool keep(Seats& seats, bool isTaken)
+    {
+        if (isTaken)
+            Connection::current().keep(std::shared_ptr<void>(&seats, [&seats](void*) { seats.release(); }));
+        return isTaken;
     }
 
     const Site site;
     const House house;
-    std::counting_semaphore<mostLarge> seats{mostLarge}; ///< for large bodies
+    const Connection::Time patience;
+    std::counting_semaphore<mostLarge> large{mostLarge};    ///< for large bodies
+    std::counting_semaphore<mostAsking> asking{mostAsking}; ///< for who asks the provider
     std::atomic<bool> ending = false;
     std::unique_ptr<httplib::Server> server;
     int port = -1;

@@ -75,7 +75,8 @@ ToldFailure tellCurrentException()
     }
     catch (const std::bad_alloc&)
     {
-        return told(503, "unready", "there is no memory for the answer");
+        // A list of JSON wants memory even when it is freed.
+        return {503, R"({"error":{"kind":"unready","text":"there is no memory for the answer"}})"};
     }
     catch (const std::exception& error)
     {

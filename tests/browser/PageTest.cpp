@@ -133,6 +133,18 @@ TEST_F(Page, PictureHasEachTargetOnceAndSaysWhatPortsAre)
     EXPECT_THAT(labelOf("2001027A51320240"), StartsWith("Virtual port"));
 }
 
+/// More bytes than a number of the browser counts.
+TEST_F(Page, ShowsAHostOfManyPebibytes)
+{
+    serveScenario(R"({"targets": [{"name": "t", "wwpn": "5006000000000001",
+        "units": [{"lun": 0, "blocks": 4294967295, "blockLength": 4194305}]}],
+        "adapters": [{"name": "Tavrin-A", "serialNumber": "1", "model": "M", "attributes": {"functionType": 0},
+                      "ports": [{"wwpn": "1000000000000001", "targets": ["t"]}]}]})");
+    visit();
+    browser.awaitText(".picture", "16.0 PiB");
+    expectPeace();
+}
+
 TEST_F(Page, FollowsAssociationsToAUnitAndBack)
 {
     serve();

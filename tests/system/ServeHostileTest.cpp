@@ -14,8 +14,11 @@
 #include <thread>
 #include <vector>
 
+#include <unistd.h>
+
 using namespace system_test;
 using namespace std::chrono_literals;
+using testing::AllOf;
 using testing::AnyOf;
 using testing::EndsWith;
 using testing::HasSubstr;
@@ -36,7 +39,8 @@ constexpr char lastChunk[] = "</CIM>\r\n0\r\n\r\n";
 class Port
 {
 public:
-    Port() : _tool({"--scenario", TVR_SCENARIOS "/large.json", "serve", "--listen", "127.0.0.1:0", "--patience", "1"})
+    explicit Port(const std::string& scenario = TVR_SCENARIOS "/large.json")
+        : _tool({"--scenario", scenario.c_str(), "serve", "--listen", "127.0.0.1:0", "--patience", "1"})
     {
         const std::string line = _tool.readLine();
         _port = std::atoi(line.substr(line.rfind(':') + 1).c_str());
@@ -161,6 +165,32 @@ TEST(ServeHostile, BodiesOfRefusedRequestsAreNotObeyed)
     port.expectService();
 }
 
+/// A body that the library gives up on half way is followed by no other request.
+TEST(ServeHostile, BehindABodyThatCannotBeReadNothingIsObeyed)
+{
+    const Port port;
+    const std::string next = "GET /metrics HTTP/1.1\r\nHost: localhost\r\n\r\n";
+    const std::string answer = port.answer("POST /cimom HTTP/1.1\r\nHost: localhost\r\nCIMOperation: MethodCall\r\n"
+                                           "Transfer-Encoding: chunked\r\n\r\n2\r\n{}\r\n0\r\n" +
+                                           next + next);
+    EXPECT_THAT(answer, StartsWith("HTTP/1.1 400"));
+    EXPECT_THAT(answer, HasSubstr("no request that is understood"));
+    EXPECT_THAT(answer, Not(HasSubstr("tavrin_fc_up")));
+}
+
+/// Many ranges of one answer would be many times the answer.
+TEST(ServeHostile, AnswersAreGivenOnceAndWhole)
+{
+    const Port port;
+    std::string ranges = "bytes=0-";
+    for (int i = 0; i < 1000; i++)
+        ranges += ",0-";
+    const std::string answer = port.answer(
+        httpHead("Range: " + ranges + "\r\n", "GET /metrics HTTP/1.1"));
+    EXPECT_THAT(answer, StartsWith("HTTP/1.1 200"));
+    EXPECT_LT(answer.size(), 200'000U);
+}
+
 TEST(ServeHostile, BodiesAreAsLongAsTheySay)
 {
     const Port port;
@@ -225,6 +255,26 @@ TEST(ServeHostile, TwoHundredAtOnceAreAnswered)
         EXPECT_TRUE(client.send(httpRequest(cimMessage("EnumerateInstanceNames", "TVRHBA_FCPort"))));
     for (const RawClient& client : clients)
         EXPECT_THAT(client.readAll(), EndsWith(lastChunk));
+}
+
+/// Requests that nobody answers do not take the whole port: the page is there, and who asks is told.
+TEST(ServeHostile, AHungLibraryLeavesThePortAlive)
+{
+    const std::string scenario = testing::TempDir() + "hung-" + std::to_string(getpid()) + ".json";
+    std::ofstream(scenario) << R"({"targets": [{"name": "t", "wwpn": "5006000000000001"}], "adapters": [{"name": "a",
+        "ports": [{"wwpn": "1000000000000001", "targets": ["t"]}]}],
+        "faults": [{"function": "HBA_GetFcpTargetMapping", "delayMs": 600000}]})";
+    const Port port(scenario);
+    std::filesystem::remove(scenario);
+    std::vector<RawClient> stuck;
+    for (int i = 0; i < 300; i++)
+    {
+        stuck.emplace_back(port.number());
+        stuck.back().send(httpHead("", "GET /api/classes/TVRHBA_StorageVolume/instances HTTP/1.1"));
+    }
+    EXPECT_THAT(port.answer(httpHead("", "GET / HTTP/1.1")), StartsWith("HTTP/1.1 200"));
+    EXPECT_THAT(port.answer(httpHead("", "GET /api/session HTTP/1.1")),
+                AllOf(StartsWith("HTTP/1.1 503"), HasSubstr("too many others")));
 }
 
 /// The class's provider works for one client at a time, so it must not wait for any.

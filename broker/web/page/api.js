@@ -51,16 +51,17 @@ function parse(text) {
 }
 
 async function answerTo(path, body, signal) {
-  let response;
+  let response, text;
   try {
     response = await fetch(path, {method: body === undefined ? "GET" : "POST", headers: headersOf(body), signal,
       body: body === undefined ? undefined : jsonText(body), credentials: "omit", cache: "no-store"});
+    text = await response.text();
   } catch (error) {
     if (error.name === "AbortError")
       throw error;
     throw new Refused(0, {kind: "unready", text: "the port does not answer"});
   }
-  const answer = parse(await response.text());
+  const answer = parse(text);
   if (!response.ok || answer === null)
     throw new Refused(response.status, answer?.error ?? {});
   return answer;

@@ -1,7 +1,7 @@
 // Fields for the parameters of methods, by their types, and what stands in them as JSON.
 
 import {make, replace} from "./dom.js";
-import {ask} from "./api.js";
+import {ask, jsonText} from "./api.js";
 import {classOf, shortName, spoken} from "./paths.js";
 
 const mostBytes = 4 << 20; // as numbers in JSON they are four times as many, and a request has an end
@@ -203,5 +203,5 @@ export class Field {
   }
 
   set(value) { this._input.value = value; }
-  text(value) { return this._editor.text?.() ?? (Array.isArray(value) ? value.join(", ") : typeof value === "object" ? JSON.stringify(value) : String(value)); }
+  text(value) { return this._editor.text?.() ?? (Array.isArray(value) ? value.join(", ") : typeof value === "object" ? jsonText(value) : String(value)); }
 }

@@ -1,7 +1,7 @@
 // The start: what is wrong with the host, and a picture of it.
 
 import {badge, button, link, make, replace} from "./dom.js";
-import {ask} from "./api.js";
+import {ask, jsonText} from "./api.js";
 import {hrefOfObject} from "./paths.js";
 import {failure, section} from "./visit.js";
 import {pictureOf} from "./topology.js";
@@ -66,7 +66,7 @@ export async function showHost(visit) {
     try {
       host = await ask("host", {}, visit.signal);
       replace(trouble);
-      const text = JSON.stringify(host);
+      const text = jsonText(host);
       if (text !== painted) // or a link would lose the focus
         paint(places, host);
       painted = text;

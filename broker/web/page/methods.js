@@ -1,7 +1,7 @@
 // The methods that can be called, and a form for each.
 
 import {button, link, make, replace, table, tell} from "./dom.js";
-import {ask, call, session} from "./api.js";
+import {ask, call, jsonText, session} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
 import {Field, Mistake} from "./form.js";
 import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken} from "./paths.js";
@@ -45,7 +45,7 @@ function isInput(parameter) {
 function meaningOf(parameter, value) {
   if (parameter?.type === "reference" && typeof value === "string")
     return link(hrefOfObject(value), shortName(value) + " (" + spoken(classOf(value)) + ")");
-  const text = value === null ? "none" : typeof value === "object" ? JSON.stringify(value) : String(value);
+  const text = value === null ? "none" : typeof value === "object" ? jsonText(value) : String(value);
   const name = parameter?.values?.[text];
   return name ? name + " (" + text + ")" : text;
 }

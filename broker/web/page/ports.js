@@ -144,10 +144,20 @@ function growingErrors(ports) {
       link(hrefOfObject(port.path), port.name))));
 }
 
+/** Of ports that are there no more. */
+function dropPanels(panels, present) {
+  for (const [path, panel] of panels)
+    if (!present.has(path)) {
+      panel.node.remove();
+      panels.delete(path);
+    }
+}
+
 export async function showPorts(visit) {
   const panels = new Map();
   const place = make("div", {});
   const trouble = make("div", {});
+  const empty = make("div", {});
   const errors = make("div", {id: "growing"});
   const read = async () => {
     try {
@@ -156,8 +166,8 @@ export async function showPorts(visit) {
       replace(trouble);
       const growing = growingErrors(ports);
       replace(errors, growing.length ? make("ul", {class: "problems"}, growing) : null);
-      if (ports.length === 0)
-        replace(place, make("p", {class: "notice"}, "There are no ports."));
+      replace(empty, ports.length ? null : make("p", {class: "notice"}, "There are no ports."));
+      dropPanels(panels, new Set(ports.map((port) => port.path)));
       for (const port of ports) {
         if (!panels.has(port.path)) {
           panels.set(port.path, new PortPanel(port));
@@ -179,6 +189,6 @@ export async function showPorts(visit) {
     intervals.map((each) => make("option", {value: each, selected: each === seconds}, each + " s")));
   place.id = "panels";
   visit.begin("Ports", make("div", {class: "toolbar"}, make("label", {}, "Read every ", choice), button("Read now", () => visit.hurry())),
-    trouble, errors, place);
+    trouble, errors, empty, place);
   await visit.repeat(read, () => seconds * 1000);
 }
