@@ -185,8 +185,7 @@ TEST(ServeHostile, AnswersAreGivenOnceAndWhole)
     std::string ranges = "bytes=0-";
     for (int i = 0; i < 1000; i++)
         ranges += ",0-";
-    const std::string answer = port.answer(
-        httpHead("Range: " + ranges + "\r\n", "GET /metrics HTTP/1.1"));
+    const std::string answer = port.answer(httpHead("Range: " + ranges + "\r\n", "GET /metrics HTTP/1.1"));
     EXPECT_THAT(answer, StartsWith("HTTP/1.1 200"));
     EXPECT_LT(answer.size(), 200'000U);
 }
