@@ -162,7 +162,8 @@ TEST(Metrics, OfAnotherHostOnlyUsersReadThem)
 std::string rulesOfDashboard()
 {
     std::string text = "groups:\n  - name: dashboard\n    rules:\n";
-    for (const Json& panel : Json::parse(textOf(TVR_FLEET "/dashboard.json"))["panels"])
+    const Json dashboard = Json::parse(textOf(TVR_FLEET "/dashboard.json"));
+    for (const Json& panel : dashboard.at("panels"))
         for (const Json& target : panel.value("targets", Json::array()))
         {
             std::string expression = target.at("expr");
