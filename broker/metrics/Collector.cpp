@@ -71,9 +71,10 @@ Collector::Collector(Broker& broker, std::string nameSpace, std::chrono::millise
 
 std::shared_ptr<const Families> Collector::collect()
 {
-    const std::unique_lock lock(_mutex, 5s);
-    if (!lock)
+    if (!_turn.try_acquire_for(5s))
         return nullptr;
+    const auto release = [this](void*) { _turn.release(); };
+    const std::unique_ptr<void, decltype(release)> turn(this, release);
     if (!_shared || Clock::now() - _collected >= _shares)
     {
         _shared = std::make_shared<const Families>(everything());
