@@ -5,6 +5,12 @@
 namespace broker
 {
 
+std::string textOf(const Object& object, const std::string& property)
+{
+    const Value& value = object.get(property);
+    return value.isNull() || value.type() != CMPI_string ? std::string() : value.asString();
+}
+
 std::optional<std::uint64_t> unsignedOf(const Object& object, const std::string& property)
 {
     const Value& value = object.get(property);
@@ -48,13 +54,6 @@ bool isClassified(const Object& software, Software classification)
 
 namespace
 {
-
-/// Empty for what has no such text.
-std::string textOf(const Object& object, const char* property)
-{
-    const Value& value = object.get(property);
-    return value.isNull() || value.type() != CMPI_string ? std::string() : value.asString();
-}
 
 std::string versionOf(std::span<const Object* const> software, std::string_view name)
 {

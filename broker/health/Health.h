@@ -12,6 +12,8 @@
 namespace broker
 {
 
+/// A text; empty for what is null or of another type.
+std::string textOf(const Object& object, const std::string& property);
 /// An integer that is no array; nothing for what is null or of another type.
 std::optional<std::uint64_t> unsignedOf(const Object& object, const std::string& property);
 /// An unsigned integer or a real.

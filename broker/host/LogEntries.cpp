@@ -1,5 +1,6 @@
 #include "broker/host/LogEntries.h"
 
+#include "broker/health/Health.h"
 #include "broker/host/ReadableText.h"
 
 #include <algorithm>
@@ -10,12 +11,6 @@ namespace broker
 
 namespace
 {
-
-std::string textOf(const Object& object, const char* property)
-{
-    const Value& value = object.get(property);
-    return value.isNull() || value.type() != CMPI_string ? std::string() : value.asString();
-}
 
 /// A timestamp in digits ("20261122183000.123456+000") as people write it.
 std::string timeText(const std::string& digits)

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "broker/core/Broker.h"
+#include "broker/health/Health.h"
 #include "broker/http/Site.h"
 #include "broker/values/Json.h"
 #include "broker/web/Api.h"
@@ -86,8 +87,6 @@ broker::Path pathNamed(const State& state, const char* name, const std::string& 
 std::string shortName(const broker::Path& path);
 /// Throws CimError where the class cannot be enumerated, but answers nothing for one that is not served.
 std::vector<broker::Object> instancesOf(const State& state, const std::string& className);
-/// A text property; empty for a null.
-std::string textOf(const broker::Object& object, const std::string& property);
 
 // --- answers: JSON as text
 

@@ -292,12 +292,6 @@ std::string readPorts(State& state)
 
 } // namespace
 
-std::string textOf(const Object& object, const std::string& property)
-{
-    const Value& value = object.get(property);
-    return value.isNull() || value.type() != CMPI_string ? std::string() : value.asString();
-}
-
 std::string host(const Question& question)
 {
     Query(question.request.params, {});

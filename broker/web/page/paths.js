@@ -2,7 +2,7 @@
 
 const keyPattern = /([A-Za-z_]\w*)=("(?:[^"\\]|\\.)*"|[^,]*)(?:,|$)/y;
 /** Keys that are the same for all instances of a class on a host. */
-export const givenByClass = new Set(["creationclassname", "systemcreationclassname", "systemname", "cscreationclassname", "csname"]);
+export const givenByClass = new Set(["creationclassname", "systemcreationclassname", "systemname"]);
 
 function unquoted(text) {
   if (!text.startsWith('"'))
