@@ -292,6 +292,16 @@ Call callOf(const State& state, const Json& body)
     return call;
 }
 
+/// As people read them.
+Json outTexts(const Call& call, const std::vector<Property>& out)
+{
+    Json texts = Json::object();
+    for (const Property& each : out)
+        texts[each.name] =
+            each.value.isNull() ? Json() : Json(shownText(&call.info, each.value, call.method.name, each.name));
+    return texts;
+}
+
 /// A line for the journal.
 void tell(const http::Caller& caller, const Call& call, const std::string& result)
 {
@@ -359,7 +369,8 @@ std::string call(const Question& question)
     const std::string_view meaning = valueName(valueNames(call.info, call.method.name), reply.returnValue);
     return jsonText({{"returnValue", toJson(reply.returnValue)},
                      {"returnText", meaning.empty() ? Json() : Json(meaning)},
-                     {"out", propertiesToJson(reply.out)}});
+                     {"out", propertiesToJson(reply.out)},
+                     {"outText", outTexts(call, reply.out)}});
 }
 
 } // namespace web

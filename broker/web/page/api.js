@@ -42,7 +42,8 @@ export function jsonText(value) {
   return JSON.stringify(value ?? null);
 }
 
-function parse(text) {
+/** What a text of JSON says; null where it is none. */
+export function parse(text) {
   try {
     return JSON.parse(text, reviveNumber);
   } catch {

@@ -7,10 +7,13 @@ import {failure} from "./visit.js";
 
 let dialogs = 0;
 
-/** Shows a dialog until `close(result)` is called or it is left; resolves to the result, null when it was left. */
+/**
+ * Shows a dialog until `close(result)` is called or it is left, as by going to another view; resolves to the result, null
+ * when it was left.
+ */
 function show(title, build) {
   const id = "dialog-title-" + ++dialogs;
-  const before = document.activeElement;
+  let before = document.activeElement;
   const dialog = make("dialog", {"aria-labelledby": id}, make("h2", {id}, title));
   return new Promise((resolve) => {
     let result = null;
@@ -19,7 +22,13 @@ function show(title, build) {
       dialog.close();
     };
     append(dialog, build(close));
+    const leave = () => {
+      before = null; // the other view takes the focus
+      dialog.close();
+    };
+    addEventListener("hashchange", leave, {capture: true}); // before the view, which could not take it
     dialog.addEventListener("close", () => {
+      removeEventListener("hashchange", leave, {capture: true});
       dialog.remove();
       if (before?.isConnected)
         before.focus();

@@ -1,7 +1,7 @@
 // Fields for the parameters of methods, by their types, and what stands in them as JSON.
 
-import {make, replace} from "./dom.js";
-import {ask, jsonText} from "./api.js";
+import {button, make, replace} from "./dom.js";
+import {ask, jsonText, parse} from "./api.js";
 import {classOf, shortName, spoken} from "./paths.js";
 
 const mostBytes = 4 << 20; // as numbers in JSON they are four times as many, and a request has an end
@@ -53,13 +53,18 @@ function plainField(parameter, attributes = {}) {
   return {node: input, read: () => input.value === "" ? undefined : scalarOf(input.value, parameter.type)};
 }
 
+function nameOf(values, value) {
+  const name = values?.[value];
+  return name ? name + " (" + value + ")" : String(value);
+}
+
 function choiceField(parameter) {
   const choices = choicesOf(parameter.values);
   const isOpen = choices.length < Object.keys(parameter.values).length;
   const other = plainField(parameter, {hidden: true, "aria-label": "Number of " + parameter.name});
   const select = make("select", {change: () => { other.node.hidden = select.value !== "other"; }},
     make("option", {value: ""}, "– none –"),
-    choices.map(([key, name]) => make("option", {value: key}, name + " (" + key + ")")),
+    choices.map(([key]) => make("option", {value: key}, nameOf(parameter.values, key))),
     isOpen ? make("option", {value: "other"}, "another number …") : null);
   const read = () => select.value === "other" ? other.read() : select.value === "" ? undefined : integerOf(select.value, parameter.type);
   return {node: isOpen ? make("span", {class: "pair"}, select, other.node) : select, labelled: select, read,
@@ -70,20 +75,6 @@ function booleanField() {
   const select = make("select", {}, [["", "– none –"], ["true", "yes"], ["false", "no"]]
     .map(([value, text]) => make("option", {value}, text)));
   return {node: select, read: () => select.value === "" ? undefined : select.value === "true"};
-}
-
-function bitsField(parameter) {
-  const boxes = Object.entries(parameter.bits).filter(([key]) => /^\d+$/.test(key)).map(([key, name]) => {
-    const box = make("input", {type: "checkbox", value: key});
-    return {box, node: make("label", {class: "check"}, box, " ", name)};
-  });
-  return {
-    node: make("div", {role: "group", "aria-label": parameter.name}, boxes.map((each) => each.node)),
-    read: () => {
-      const set = boxes.filter((each) => each.box.checked);
-      return set.length ? Number(set.reduce((sum, each) => sum | 1n << BigInt(each.box.value), 0n)) : undefined;
-    },
-  };
 }
 
 /** What methods mean by a reference to anything. */
@@ -129,26 +120,39 @@ function bytesField(parameter) {
 
 function listOf(text, type) {
   const element = type.replace("[]", "");
-  const isText = element === "string" || element === "reference" || element === "datetime";
-  const parts = isText ? text.split("\n") : text.split(/[\s,]+/);
-  return parts.filter((part) => part !== "").map((part) => scalarOf(part, element));
+  const parts = text.split(/[\s,]+/).filter((part) => part !== "");
+  return parts.map((part) => scalarOf(part, element));
 }
 
+/** A line each: an empty one is an empty text, for lists that have one value for each of another list. */
+function linesOf(text, type) {
+  const element = type.replace("[]", "");
+  return text.replace(/\n$/, "").split("\n").map((line) => scalarOf(line, element));
+}
+
+/** Values with names are offered; others can be written. */
 function arrayField(parameter) {
-  const isText = /^(string|reference|datetime)/.test(parameter.type);
-  const area = make("textarea", {rows: "3", spellcheck: "false", placeholder: isText ? "one in a line" : "numbers, with commas"});
-  return {node: area, read: () => area.value === "" ? undefined : listOf(area.value, parameter.type)};
+  const isLines = /^(string|reference|datetime)/.test(parameter.type);
+  const area = make("textarea", {rows: "3", spellcheck: "false", placeholder: isLines ? "one in a line" : "numbers, with commas"});
+  const add = (key) => {
+    area.value = [area.value.trim(), key].filter((part) => part !== "").join(", ");
+  };
+  const offered = choicesOf(parameter.values).map(([key]) => button("+ " + nameOf(parameter.values, key), () => add(key)));
+  return {
+    node: offered.length ? make("div", {}, area, make("div", {class: "buttons start"}, offered)) : area, labelled: area,
+    read: () => area.value === "" ? undefined : (isLines ? linesOf : listOf)(area.value, parameter.type),
+    text: (values) => values.map((value) => isLines ? JSON.stringify(value) : nameOf(parameter.values, value)).join(", "),
+  };
 }
 
 function instanceField(parameter) {
   const area = make("textarea", {rows: "4", spellcheck: "false",
     placeholder: '{"class": "' + (parameter.class ?? "…") + '", "properties": {}}'});
   const read = () => {
-    try {
-      return area.value === "" ? undefined : JSON.parse(area.value);
-    } catch {
+    const value = area.value === "" ? undefined : parse(area.value);
+    if (value === null)
       throw new Mistake("this is no JSON");
-    }
+    return value;
   };
   return {node: area, read};
 }
@@ -165,8 +169,8 @@ function editorOf(parameter) {
     return booleanField();
   if (type.startsWith("reference"))
     return referenceField(parameter);
-  if (parameter.bits)
-    return bitsField(parameter);
+  if (type === "datetime")
+    return plainField(parameter, {placeholder: "20260131120000.000000+000, or how long: 00000000001000.000000:000"});
   return choicesOf(parameter.values).length ? choiceField(parameter) : plainField(parameter);
 }
 
@@ -192,7 +196,10 @@ export class Field {
   async read() {
     replace(this._problem);
     try {
-      return await this._editor.read();
+      const value = await this._editor.read();
+      if (value === undefined && this.parameter.required)
+        throw new Mistake(this.parameter.name + " is missing");
+      return value;
     } catch (error) {
       if (!(error instanceof Mistake))
         throw error;
@@ -203,5 +210,5 @@ export class Field {
   }
 
   set(value) { this._input.value = value; }
-  text(value) { return this._editor.text?.() ?? (Array.isArray(value) ? value.join(", ") : typeof value === "object" ? jsonText(value) : String(value)); }
+  text(value) { return this._editor.text?.(value) ?? (typeof value === "object" ? jsonText(value) : String(value)); }
 }

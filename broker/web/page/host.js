@@ -22,7 +22,7 @@ function problemsOf(host) {
     : make("p", {class: "notice ok", id: "problems"}, "All ports are up and all values within their limits."));
 }
 
-function failuresOf(host) {
+export function failuresOf(host) {
   if (!host.failures?.length)
     return null;
   return section("Classes that do not answer", make("ul", {class: "problems"},

@@ -1,19 +1,19 @@
 // The methods that can be called, and a form for each.
 
 import {button, link, make, replace, table, tell} from "./dom.js";
-import {ask, call, jsonText, session} from "./api.js";
+import {ask, call, session} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
 import {Field, Mistake} from "./form.js";
+import {failuresOf} from "./host.js";
 import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken} from "./paths.js";
 import {section} from "./visit.js";
 
-function listOf(methods) {
-  const classes = grouped(methods);
-  if (classes.size === 0)
-    return make("p", {class: "notice"}, "There are no methods.");
-  return [...classes].map(([name, own]) => section(spoken(name),
+function listOf(answer) {
+  const classes = grouped(answer.methods);
+  const sections = [...classes].map(([name, own]) => section(spoken(name),
     table("Methods of " + name, ["Method", "What it does"],
       own.map((method) => [link(hrefOfMethod(name, method.method), method.method), method.description ?? ""]))));
+  return [sections.length ? sections : make("p", {class: "notice"}, "There are no methods."), failuresOf(answer)];
 }
 
 function grouped(methods) {
@@ -28,26 +28,55 @@ function deedOf(method) {
   const words = method.replace(/([a-z\d])([A-Z])/g, "$1 $2").replace(/([A-Z]+)([A-Z][a-z])/g, "$1 $2").split(" ");
   const [verb, ...rest] = words.map((word) => /^[A-Z]{2,}s?$/.test(word) ? word : word.toLowerCase());
   const deed = verb.charAt(0).toUpperCase() + verb.slice(1);
-  return rest.length === 0 ? deed : /^(from|to|of|on)$/.test(rest[0]) ? deed + " " + rest.join(" ") : deed + " the " + rest.join(" ");
+  return rest.length === 0 ? deed : /^(from|to|of|on|all)$/.test(rest[0]) ? deed + " " + rest.join(" ") : deed + " the " + rest.join(" ");
+}
+
+/**
+ * Of methods whose names do not say what happens: with the texts of what was chosen, of the object, and of the instance
+ * that is called.
+ */
+const questions = {
+  DeleteDump: ({object}) => `Delete all dump files of ${object}?`,
+  DisableAllPrioLaneLuns: ({InitiatorWWPN, TargetWWPN, Option}) =>
+    `Take away all priority lanes between ${InitiatorWWPN} and ${TargetWWPN}, ${Option}?`,
+  GetConfigTable: ({object, URI}) => `Write the table of tags of the adapter of ${object} to ${URI}?`,
+  InstallFromByteStream: ({object, Image}) => `Install the firmware (${Image}) on the adapter of ${object}?`,
+  InstallFromURI: ({object, URI}) => `Install the firmware ${URI} on the adapter of ${object}?`,
+  RequestStateChange: ({object, RequestedState}) => `Set ${object} to ${RequestedState}?`,
+  RunDiagnosticService: ({object, instance}) => `Run ${instance} on ${object}?`,
+  SetConfigTable: ({object, URI}) => `Give the adapter of ${object} the table of tags ${URI}?`,
+  SetDriverParameter: ({object, strParam, strValue, bGlobal, bPermanent}) =>
+    `Set ${strParam} of the driver at ${object} to ${strValue} (${bGlobal}; ${bPermanent})?`,
+  SetFECState: ({object, EnableFlag}) => `Set the error correction (FEC) of ${object} to ${EnableFlag}?`,
+  SetGlobalFlag: ({object, State}) => `Set the tagging of the adapter of ${object} to ${State}?`,
+  SetPortEnabled: ({object, PortEnabled}) => `Set ${object} to ${PortEnabled}?`,
+};
+const longestWord = 100; // of a question; all of it stands below
+
+function asWord(text) {
+  return text.length > longestWord ? text.slice(0, longestWord) + "…" : text;
 }
 
 /** What is done to what, as a question. */
 function questionOf(method, path, given) {
   const target = given.find(({field}) => field.parameter.type === "reference");
-  const object = target ? target.value : path;
-  return deedOf(method.name) + " of " + spoken(classOf(object)) + " " + shortName(object) + "?";
+  const objectPath = target ? target.value : path;
+  const object = spoken(classOf(objectPath)) + " " + asWord(shortName(objectPath));
+  if (!Object.hasOwn(questions, method.name))
+    return deedOf(method.name) + " of " + object + "?";
+  const chosen = method.parameters.map(({name}) => [name, "nothing"])
+    .concat(given.map(({field, value}) => [field.parameter.name, asWord(field.text(value))]));
+  return questions[method.name]({...Object.fromEntries(chosen), object, instance: asWord(shortName(path))});
 }
 
 function isInput(parameter) {
-  return parameter.qualifiers.includes("In") || !parameter.qualifiers.includes("Out");
+  return parameter.qualifiers.includes("In");
 }
 
-function meaningOf(parameter, value) {
+function meaningOf(parameter, value, text) {
   if (parameter?.type === "reference" && typeof value === "string")
     return link(hrefOfObject(value), shortName(value) + " (" + spoken(classOf(value)) + ")");
-  const text = value === null ? "none" : typeof value === "object" ? jsonText(value) : String(value);
-  const name = parameter?.values?.[text];
-  return name ? name + " (" + text + ")" : text;
+  return text ?? "none";
 }
 
 function resultOf(method, answer) {
@@ -58,7 +87,7 @@ function resultOf(method, answer) {
   return [make("p", {class: "notice " + (isGood ? "ok" : "critical"), role: "alert", id: "returned"},
     method.name + " returned ", make("strong", {}, said)),
   out.length ? table("What it gave", ["Parameter", "Value"], out.map(([name, value]) =>
-    [name, meaningOf(method.parameters.find((parameter) => parameter.name === name), value)])) : null];
+    [name, meaningOf(method.parameters.find((parameter) => parameter.name === name), value, answer.outText[name])])) : null];
 }
 
 /** What is filled in, in the order of the parameters. Throws Mistake. */
@@ -79,12 +108,12 @@ function detailsOf(method, path, given) {
 }
 
 class MethodForm {
-  constructor(visit, method, instances, chosen) {
+  constructor(visit, className, method, instances, chosen) {
     this._method = method;
     this._fields = method.parameters.filter(isInput).map((parameter) => new Field(parameter));
     this._result = make("div", {id: "result"});
     this._why = make("span", {class: "quiet"});
-    this._target = this._targetField(instances, chosen);
+    this._target = this._targetField(className, instances, chosen);
     this._send = button("Call …", null, {type: "submit", class: "main"});
     const submit = (event) => {
       event.preventDefault();
@@ -100,9 +129,9 @@ class MethodForm {
   _tellWhy() { replace(this._why, session.mayChange ? "" : session.whyNot); }
 
   /** The instance whose method is called: one of those that are known, or a path. */
-  _targetField(instances, chosen) {
+  _targetField(className, instances, chosen) {
     if (instances.length === 0 || (chosen && !instances.some((each) => each.path === chosen))) {
-      const field = new Field({name: "Instance", type: "reference", class: classOf(chosen), description: "Whose method is called."});
+      const field = new Field({name: "Instance", type: "reference", class: className, description: "Whose method is called.", required: true});
       field.set(chosen);
       return {node: field.node, read: () => field.read()};
     }
@@ -135,14 +164,15 @@ class MethodForm {
 }
 
 async function formOf(visit, className, name, path) {
-  const [info, methods] = await Promise.all([ask("classes/" + encodeURIComponent(className), {}, visit.signal),
+  const [info, {methods, failures}] = await Promise.all([ask("classes/" + encodeURIComponent(className), {}, visit.signal),
     ask("methods", {}, visit.signal)]);
   const method = info.methods.find((each) => each.name === name);
   if (!method)
     return make("p", {class: "notice critical"}, className + " has no method " + name + ".");
   const instances = methods.find((each) => each.class === className && each.method === name)?.instances ?? [];
   return [make("p", {}, method.description ?? "", " ", link(hrefOfClass(className), className)),
-    new MethodForm(visit, method, instances, path).node];
+    instances.length ? null : failuresOf({failures: failures.filter((text) => text.startsWith(className + ":"))}),
+    new MethodForm(visit, className, method, instances, path).node];
 }
 
 export async function showMethods(visit, className = "", name = "", path = "") {
