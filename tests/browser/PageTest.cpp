@@ -65,6 +65,13 @@ protected:
         browser.awaitText("#session", "Logged in as joe");
     }
 
+    /// The path of an instance that is offered for a reference.
+    std::string offered(const std::string& name)
+    {
+        return browser.await("[...document.querySelectorAll('datalist option')].find((each) => each.textContent === '" +
+                             name + "')?.value");
+    }
+
     void awaitHeading(const std::string& text) { browser.awaitText("h1", text); }
 
     /// Of a table, of which the last row is there within a second.
@@ -241,8 +248,7 @@ TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
 {
     serve();
     visit("methods/TVRHBA_FCHBAWWNService/ChangeWWN");
-    const std::string target = browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
-                                             "each.textContent === 'FC port 1000027A51160210')?.value");
+    const std::string target = offered("FC port 1000027A51160210");
     const auto ask = [&](const std::string& wwpn)
     {
         browser.type("[name=NewWWPN]", wwpn);
@@ -271,7 +277,7 @@ TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
         const char* picture = "name-refused";
     };
     for (const Case& each :
-         {Case{"0000000000000000", "(40005)"}, Case{"seven", "("}, Case{downPort, "A name is in use (91)"},
+         {Case{"0000000000000000", "(40005)"}, Case{"seven", "(40005)"}, Case{downPort, "A name is in use (91)"},
           Case{"1000027A51160299", "Completed (0)", "name-changed"}})
     {
         ask(each.wwpn);
@@ -327,20 +333,125 @@ TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
     // Only bytes as they are in the file have that sum.
     std::ofstream(_folder.file("image.grp"), std::ios::binary)
         << "TVRSIM-FIRMWARE 1\nfamily: TV3202\nversion: 12.8.1.0\nchecksum: CBF43926\n\n123456789";
+    const auto install = [&]
+    {
+        browser.clickText("Call …");
+        browser.awaitText("dialog h2",
+                          "Install the firmware (image.grp, 80 bytes) on the adapter of FC port 1000027A51320240?");
+        const std::string details = browser.textOf("dialog dl");
+        browser.clickText("Call InstallFromByteStream", "dialog");
+        browser.await("!document.querySelector('dialog')");
+        browser.awaitText("#returned", "Job Completed with No Error (0)");
+        return details;
+    };
     browser.choose("input[type=file]", _folder.file("image.grp"));
-    browser.type("[name=Target]", browser.await("[...document.querySelectorAll('datalist option')].find((each) => "
-                                                "each.textContent === 'FC port 1000027A51320240')?.value"));
+    browser.type("[name=Target]", offered("FC port 1000027A51320240"));
     browser.type("[name=InstallOptions]", "32768");
     browser.type("[name=InstallOptionsValues]", "new.grp");
-    browser.clickText("Call …");
-    browser.awaitText("dialog", "image.grp, 80 bytes");
-    browser.clickText("Call InstallFromByteStream", "dialog");
-    browser.awaitText("#returned", "Job Completed with No Error (0)");
+    install();
 
     // It runs after a reset, which the start of the page asks for.
     visit();
     browser.awaitText("#problems", "FIRMWARE 12.8.1.0 WAITS FOR A RESET FC port 1000027A51320240");
     EXPECT_THAT(browser.textOf(".picture .fc-port.warning"), HasSubstr("WAITS FOR A RESET"));
+
+    // The first option, which has no value, is that reset.
+    browser.run("history.back()");
+    awaitHeading("Install from byte stream");
+    browser.choose("input[type=file]", _folder.file("image.grp"));
+    browser.type("[name=Target]", offered("FC port 1000027A51320240"));
+    browser.clickText("+ Defer target/system reset (2)");
+    browser.clickText("+ File name (32768)");
+    browser.type("[name=InstallOptionsValues]", "\nnew.grp\n");
+    EXPECT_THAT(install(),
+                AllOf(HasSubstr("Defer target/system reset (2), File name (32768)"), HasSubstr(R"("", "new.grp")")));
+    visit();
+    browser.awaitText("#problems", "LINK DOWN");
+    EXPECT_THAT(browser.textOf("#problems"), Not(HasSubstr("FIRMWARE")));
+    expectPeace();
+}
+
+/// Of methods whose names say too little, and with values that browsers or people could take for others.
+TEST_F(Page, AsksInWordsAndTellsWhatCameByItsName)
+{
+    struct Question
+    {
+        const char* view;
+        std::vector<std::pair<const char*, const char*>> values; ///< by field; references as they are offered
+        const char* question;
+        const char* within; ///< of its details
+        const char* result; ///< null where the answer is no
+    };
+    serve();
+    visit();
+    logInToChange();
+    for (const Question& each :
+         {Question{"TVRHBA_SoftwareInstallationService/SetPortEnabled",
+                   {{"Target", "FC port 1000027A51160210"}, {"PortEnabled", "0"}},
+                   "Set FC port 1000027A51160210 to Disabled (0)?",
+                   "Disabled (0)",
+                   nullptr},
+          Question{"TVRHBA_FCHBADriverParamService/DisableAllPrioLaneLuns",
+                   {{"InitiatorWWPN", "1000027A51160210"}, {"TargetWWPN", "50063D200110000A"}, {"Option", "1"}},
+                   "Take away all priority lanes between 1000027A51160210 and 50063D200110000A, Those of the stored "
+                   "configuration (1)?",
+                   "",
+                   nullptr},
+          Question{"TVRHBA_FCHBADiagnosticTest/RunDiagnosticService",
+                   {{"ManagedElement", "Port controller 1000027A51160210"},
+                    {"DiagnosticSettings", R"({"class": "X", "properties": {"Size": 9007199254740993}})"}},
+                   "Run TVR:FCHBA Beacon Test on Port controller 1000027A51160210?",
+                   R"({"Size":9007199254740993})",
+                   nullptr},
+          Question{"TVRHBA_FCHBAWWNService/GetWWNCapability",
+                   {{"Target", "FC port 1000027A51160210"}},
+                   "Get the WWN capability of FC port 1000027A51160210?",
+                   "",
+                   "Volatile names can be changed, A change needs a reset of the adapter (8204)"}})
+    {
+        SCOPED_TRACE(each.view);
+        visit("methods/" + std::string(each.view));
+        for (const auto& [field, value] : each.values)
+        {
+            const bool isReference = std::string_view(value).find("ort ") != std::string_view::npos;
+            const std::string written = isReference ? offered(value) : value;
+            browser.await("document.querySelector('[name=" + std::string(field) + "]')");
+            browser.run("document.querySelector('[name=" + std::string(field) + "]').value = " + Json(written).dump());
+        }
+        browser.clickText("Call …");
+        browser.awaitText("dialog h2", each.question);
+        EXPECT_THAT(browser.textOf("dialog dl"), HasSubstr(each.within));
+        browser.clickText(each.result ? "Call " : "Cancel", "dialog");
+        browser.await("!document.querySelector('dialog')");
+        if (each.result)
+            browser.awaitText("#result", each.result);
+    }
+}
+
+/// A form of which no instance is known wants a path; a question ends with the view that asked it.
+TEST_F(Page, WantsAnInstanceAndLeavesNoQuestionBehind)
+{
+    serve();
+    visit("methods/CIM_RecordLog/ClearLog");
+    logInToChange();
+    browser.await("document.querySelector('[name=Instance]').placeholder === 'path of Record log'");
+    browser.clickText("Call …");
+    browser.awaitText(".mistake:not(:empty)", "Instance is missing");
+    EXPECT_FALSE(browser.run("return Boolean(document.querySelector('dialog'))").get<bool>());
+
+    visit("diagnostics");
+    browser.click("button[aria-label='Run Beacon Test on 1000027A51160210']");
+    browser.clickText("Other settings", "dialog");
+    awaitHeading("Run the diagnostic service");
+    browser.await("!document.querySelector('dialog')");
+    EXPECT_EQ(browser.run("return document.activeElement.tagName"), "H1");
+    browser.clickText("Log out");
+    browser.clickText("Log in");
+    browser.await("document.querySelector('dialog')");
+    browser.run("history.back()");
+    awaitHeading("Diagnostics");
+    browser.await("!document.querySelector('dialog')");
+    EXPECT_EQ(browser.run("return document.activeElement.tagName"), "H1");
     expectPeace();
 }
 
