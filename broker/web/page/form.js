@@ -77,13 +77,13 @@ function booleanField() {
   return {node: select, read: () => select.value === "" ? undefined : select.value === "true"};
 }
 
-/** What methods mean by a reference to anything. */
-const meant = new Map([["CIM_ManagedElement", ["TVRHBA_FCPort", "TVRHBA_PortController"]]]);
+/** What methods mean by a reference to anything, by the parameter. */
+const meant = {Target: "TVRHBA_FCPort", ManagedElement: "TVRHBA_PortController"};
 
-async function offer(place, className) {
-  const answers = await Promise.allSettled((meant.get(className) ?? [className]).map((name) =>
-    ask("classes/" + encodeURIComponent(name) + "/instances", {count: mostOffered})));
-  const rows = answers.flatMap((answer) => answer.value?.rows ?? []); // classes that nobody serves have none
+async function offer(place, parameter) {
+  const name = parameter.class === "CIM_ManagedElement" ? meant[parameter.name] : parameter.class;
+  const {rows} = await ask("classes/" + encodeURIComponent(name) + "/instances", {count: mostOffered})
+    .catch(() => ({rows: []})); // a path can be written all the same
   replace(place, rows.map((row) => make("option", {value: row.path}, spoken(classOf(row.path)) + " " + shortName(row.path))));
 }
 
@@ -91,8 +91,8 @@ async function offer(place, className) {
 function referenceField(parameter) {
   const id = "offered-" + ++fields;
   const offered = make("datalist", {id});
-  const field = plainField(parameter, {list: id, placeholder: "path of " + spoken(parameter.class ?? "an instance")});
-  offer(offered, parameter.class ?? "");
+  const field = plainField(parameter, {list: id, placeholder: "path of " + spoken(parameter.class)});
+  offer(offered, parameter);
   return {...field, node: make("span", {class: "pair"}, field.node, offered), labelled: field.node,
     text: () => shortName(field.node.value)};
 }
