@@ -81,7 +81,7 @@ function booleanField() {
 const meant = {Target: "TVRHBA_FCPort", ManagedElement: "TVRHBA_PortController"};
 
 async function offer(place, parameter) {
-  const name = parameter.class === "CIM_ManagedElement" ? meant[parameter.name] : parameter.class;
+  const name = (parameter.class === "CIM_ManagedElement" && meant[parameter.name]) || parameter.class;
   const {rows} = await ask("classes/" + encodeURIComponent(name) + "/instances", {count: mostOffered})
     .catch(() => ({rows: []})); // a path can be written all the same
   replace(place, rows.map((row) => make("option", {value: row.path}, spoken(classOf(row.path)) + " " + shortName(row.path))));
