@@ -80,8 +80,7 @@ function booleanField() {
 /** What methods mean by a reference to anything, by the parameter. */
 const meant = {Target: "TVRHBA_FCPort", ManagedElement: "TVRHBA_PortController"};
 
-async function offer(place, parameter) {
-  const name = (parameter.class === "CIM_ManagedElement" && meant[parameter.name]) || parameter.class;
+async function offer(place, name) {
   const {rows} = await ask("classes/" + encodeURIComponent(name) + "/instances", {count: mostOffered})
     .catch(() => ({rows: []})); // a path can be written all the same
   replace(place, rows.map((row) => make("option", {value: row.path}, spoken(classOf(row.path)) + " " + shortName(row.path))));
@@ -90,9 +89,10 @@ async function offer(place, parameter) {
 /** Paths of instances are offered; any other can be written. */
 function referenceField(parameter) {
   const id = "offered-" + ++fields;
+  const name = (parameter.class === "CIM_ManagedElement" && meant[parameter.name]) || parameter.class;
   const offered = make("datalist", {id});
-  const field = plainField(parameter, {list: id, placeholder: "path of " + spoken(parameter.class)});
-  offer(offered, parameter);
+  const field = plainField(parameter, {list: id, placeholder: "path of " + spoken(name)});
+  offer(offered, name);
   return {...field, node: make("span", {class: "pair"}, field.node, offered), labelled: field.node,
     text: () => shortName(field.node.value)};
 }

@@ -5,7 +5,7 @@ import {ask, call, session} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
 import {Field, Mistake} from "./form.js";
 import {failuresOf} from "./host.js";
-import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken} from "./paths.js";
+import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken, wordsOf} from "./paths.js";
 import {section} from "./visit.js";
 
 function listOf(answer) {
@@ -25,8 +25,7 @@ function grouped(methods) {
 
 /** "Change the WWN" of ChangeWWN; one word is about the object itself. */
 function deedOf(method) {
-  const words = method.replace(/([a-z\d])([A-Z])/g, "$1 $2").replace(/([A-Z]+)([A-Z][a-z])/g, "$1 $2").split(" ");
-  const [verb, ...rest] = words.map((word) => /^[A-Z]{2,}s?$/.test(word) ? word : word.toLowerCase());
+  const [verb, ...rest] = wordsOf(method).map((word) => /^[A-Z]{2,}s?$/.test(word) ? word : word.toLowerCase());
   const deed = verb.charAt(0).toUpperCase() + verb.slice(1);
   return rest.length === 0 ? deed : /^(from|to|of|on|all)$/.test(rest[0]) ? deed + " " + rest.join(" ") : deed + " the " + rest.join(" ");
 }

@@ -33,10 +33,14 @@ export function shortName(path) {
   return names.join(", ") || className;
 }
 
+/** The words of a name that has capitals in place of blanks. */
+export function wordsOf(name) {
+  return name.replace(/([a-z\d])([A-Z])/g, "$1 $2").replace(/([A-Z]+)([A-Z][a-z])/g, "$1 $2").split(" ");
+}
+
 /** A class's name as a person says it: "FC port" of TVRHBA_FCPort. */
 export function spoken(name) {
-  return name.replace(/^[A-Za-z]+_/, "").replace(/([a-z\d])([A-Z])/g, "$1 $2").replace(/([A-Z]+)([A-Z][a-z])/g, "$1 $2")
-    .split(" ").map((word, at) => /^[A-Z]{2,}/.test(word) || at === 0 ? word : word.toLowerCase()).join(" ");
+  return wordsOf(name.replace(/^[A-Za-z]+_/, "")).map((word, at) => /^[A-Z]{2,}/.test(word) || at === 0 ? word : word.toLowerCase()).join(" ");
 }
 
 export function hrefOfObject(path) {
