@@ -292,10 +292,10 @@ TEST(Metrics, TenThousandScrapesNeedNoMoreMemory)
 #if TVR_SANITIZED
     GTEST_SKIP() << "the sanitizers keep what was freed";
 #endif
-    Host host;
+    Host host(R"({"generate": {"adapters": 1, "targetsPerPort": 1, "unitsPerTarget": 1}})");
     host.write("/etc/tavrin_fc_provider.dmp", "2,5,0\n"); // without a log, which takes most of the time
     Collector collector(host.broker(), nameSpace, 0s);
-    constexpr int scrapes = 1'000;
+    constexpr int scrapes = 10'000;
     constexpr int first = 300; // the broker keeps dead objects for a while
     constexpr std::size_t anyThreads = 100;
     std::size_t before = 0;
@@ -414,6 +414,9 @@ TEST(Metrics, AlertsAndDashboardNameFamiliesThatThereAre)
         for (const std::string& name : used)
             EXPECT_TRUE(told.count(name)) << file << " has " << name;
     }
+    const std::set<std::string> alerting = namesIn(textOf(TVR_FLEET "/alerts.yml"));
+    for (const broker::CounterRow& row : broker::counterRows)
+        EXPECT_EQ(row.isError, alerting.count(row.family) == 1) << row.family;
 }
 
 } // namespace

@@ -182,9 +182,10 @@ TEST(Metrics, TheFilesForAFleetAreValid)
     const Folder folder;
     const std::string dashboard = folder.file("dashboard.yml");
     std::ofstream(dashboard) << rulesOfDashboard();
-    for (const std::string& check : {std::string("check rules " TVR_FLEET "/alerts.yml"), "test rules " TVR_ALERTS_TEST,
-                                     "check rules --lint=none " + dashboard,
-                                     std::string("check config --syntax-only " TVR_FLEET "/prometheus.yml")})
+    const std::vector<std::string> checks = {"check rules " TVR_FLEET "/alerts.yml", "test rules " TVR_ALERTS_TEST,
+                                             "check rules --lint=none " + dashboard,
+                                             "check config --syntax-only " TVR_FLEET "/prometheus.yml"};
+    for (const std::string& check : checks)
     {
         const Answer checked = runCommand("promtool " + check);
         EXPECT_EQ(checked.exitCode, 0) << checked.out << checked.err;
