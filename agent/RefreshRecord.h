@@ -38,8 +38,8 @@ public:
     /// the largest number: the agent takes its cache for too old then.
     std::uint64_t age() const
     {
+        const std::uint64_t end = _end; // before the clock is read: another one may end between
         const std::uint64_t now = Time::now();
-        const std::uint64_t end = _end;
         return now < end ? std::numeric_limits<std::uint64_t>::max() : now - end;
     }
 
