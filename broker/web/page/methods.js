@@ -4,16 +4,15 @@ import {button, link, make, replace, table, tell} from "./dom.js";
 import {ask, call, session} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
 import {Field, Mistake} from "./form.js";
-import {failuresOf} from "./host.js";
 import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken, wordsOf} from "./paths.js";
-import {section} from "./visit.js";
+import {section, silent} from "./visit.js";
 
 function listOf(answer) {
   const classes = grouped(answer.methods);
   const sections = [...classes].map(([name, own]) => section(spoken(name),
     table("Methods of " + name, ["Method", "What it does"],
       own.map((method) => [link(hrefOfMethod(name, method.method), method.method), method.description ?? ""]))));
-  return [sections.length ? sections : make("p", {class: "notice"}, "There are no methods."), failuresOf(answer)];
+  return [sections.length ? sections : make("p", {class: "notice"}, "There are no methods."), silent(answer.failures)];
 }
 
 function grouped(methods) {
@@ -113,14 +112,9 @@ class MethodForm {
     this._result = make("div", {id: "result"});
     this._why = make("span", {class: "quiet"});
     this._target = this._targetField(className, instances, chosen);
-    this._send = button("Call …", null, {type: "submit", class: "main"});
-    const submit = (event) => {
-      event.preventDefault();
-      this._ask();
-    };
-    this.node = make("form", {submit, class: "method"}, this._target.node, this._fields.map((field) => field.node),
-      make("div", {class: "buttons start"}, this._send,
-        this._why), this._result);
+    const send = button("Call …", () => this._ask(), {type: "submit", class: "main"}); // clicked by Enter in a field too
+    this.node = make("form", {submit: (event) => event.preventDefault(), class: "method"}, this._target.node,
+      this._fields.map((field) => field.node), make("div", {class: "buttons start"}, send, this._why), this._result);
     this._tellWhy();
     document.addEventListener("session", () => this._tellWhy(), {signal: visit.signal});
   }
@@ -153,10 +147,8 @@ class MethodForm {
     if (!await mayChange() || !await confirmed(questionOf(method, path, given), detailsOf(method, path, given), "Call " + method.name))
       return;
     replace(this._result, make("p", {class: "quiet", "aria-busy": "true"}, method.name + " is at work …"));
-    this._send.disabled = true;
     const parameters = Object.fromEntries(given.map(({field, value}) => [field.parameter.name, value]));
     const answer = await attempted(this._result, () => call(path, method.name, parameters));
-    this._send.disabled = false;
     if (answer)
       replace(this._result, resultOf(method, answer));
   }
@@ -170,7 +162,7 @@ async function formOf(visit, className, name, path) {
     return make("p", {class: "notice critical"}, className + " has no method " + name + ".");
   const instances = methods.find((each) => each.class === className && each.method === name)?.instances ?? [];
   return [make("p", {}, method.description ?? "", " ", link(hrefOfClass(className), className)),
-    instances.length ? null : failuresOf({failures: failures.filter((text) => text.startsWith(className + ":"))}),
+    instances.length ? null : silent(failures.filter((text) => text.startsWith(className + ":"))),
     new MethodForm(visit, className, method, instances, path).node];
 }
 
