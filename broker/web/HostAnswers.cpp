@@ -1,6 +1,7 @@
 // The host as a tree, what is wrong with it, and its ports as they are now.
 #include "broker/core/Observation.h"
 #include "broker/health/Health.h"
+#include "broker/health/PortCounters.h"
 #include "broker/host/HostGraph.h"
 #include "broker/host/HostReport.h"
 #include "broker/host/ReadableText.h"
@@ -8,7 +9,6 @@
 #include "broker/values/SchemaText.h"
 #include "broker/values/ValueText.h"
 #include "broker/web/Asking.h"
-#include "broker/web/PortCounters.h"
 
 #include <algorithm>
 #include <array>
