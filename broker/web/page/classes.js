@@ -75,7 +75,8 @@ async function showInstances(visit, name, wanted) {
   const choice = make("span", {});
   const trouble = make("div", {});
   const count = make("span", {class: "quiet", id: "count", role: "status"}, "Reading …");
-  const find = make("input", {type: "search", id: "find", spellcheck: "false", placeholder: "text of any property", value: wanted});
+  const find = make("input", {type: "search", id: "find", spellcheck: "false", placeholder: "text of any property",
+    value: wanted});
   const read = (from, rows, sort, descending) => ask("classes/" + encodeURIComponent(name) + "/instances",
     {from, count: rows, sort, descending: descending ? 1 : "", find: find.value, namespace}, visit.signal);
   const told = (answer, problem) => {

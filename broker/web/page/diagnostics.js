@@ -40,7 +40,8 @@ function hasEnded(job, records) {
 function cancelButton(job, place) {
   const cancel = async () => {
     const what = spokenTest(job.name) + " on port " + job.port;
-    if (!await mayChange() || !await confirmed("Cancel the " + what + "?", make("p", {}, "It leaves no result."), "Cancel the test"))
+    const details = make("p", {}, "It leaves no result.");
+    if (!await mayChange() || !await confirmed("Cancel the " + what + "?", details, "Cancel the test"))
       return;
     replace(place);
     const answer = await attempted(place, () => call(job.path, "RequestStateChange", {RequestedState: terminate}));
@@ -169,8 +170,8 @@ class Diagnostics {
 
 export async function showDiagnostics(visit) {
   const diagnostics = new Diagnostics(visit);
-  visit.begin("Diagnostics", diagnostics.trouble, diagnostics.unanswered, section("Tests", diagnostics.ports), section("Jobs", diagnostics.refusal, diagnostics.now),
-    section("Records", diagnostics.records));
+  visit.begin("Diagnostics", diagnostics.trouble, diagnostics.unanswered, section("Tests", diagnostics.ports),
+    section("Jobs", diagnostics.refusal, diagnostics.now), section("Records", diagnostics.records));
   replace(diagnostics.ports, make("p", {class: "quiet", "aria-busy": "true"}, "Reading …"));
   await visit.repeat(() => diagnostics.read(), () => interval);
 }

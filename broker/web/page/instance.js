@@ -16,7 +16,8 @@ function valueCell(property) {
     return "";
   const raw = typeof value === "number" || typeof value === "bigint" ? String(value) : null;
   const shown = text ?? raw ?? jsonText(value);
-  return raw === null || shown === raw || shown.startsWith(raw + " ") || shown.includes("(" + raw + ")") ? shown : [shown, " ", make("span", {class: "quiet"}, raw)];
+  const isSaid = raw === null || shown === raw || shown.startsWith(raw + " ") || shown.includes("(" + raw + ")");
+  return isSaid ? shown : [shown, " ", make("span", {class: "quiet"}, raw)];
 }
 
 function propertyRow(property) {

@@ -94,10 +94,11 @@ function enabling(log, text) {
 /** A log that is not enabled shows nothing new; the driver's is read when it is enabled, and then alone. */
 function stateOfLog(log) {
   if (!log.enabled)
-    return make("p", {class: "notice warning", id: "disabled"},
-      log.id === "driver" ? "The driver's log has not been read: that is done when it is enabled. " : "The log is not enabled: it shows nothing new. ",
-      enabling(log, "Enable it …"));
-  return log.id === "driver" ? make("p", {}, "The log is as it was when it was enabled last. ", enabling(log, "Have it read again …")) : null;
+    return make("p", {class: "notice warning", id: "disabled"}, log.id === "driver"
+      ? "The driver's log has not been read: that is done when it is enabled. "
+      : "The log is not enabled: it shows nothing new. ", enabling(log, "Enable it …"));
+  return log.id === "driver"
+    ? make("p", {}, "The log is as it was when it was enabled last. ", enabling(log, "Have it read again …")) : null;
 }
 
 export async function showLogs(visit, id = "provider") {

@@ -81,7 +81,8 @@ class CounterRow {
     const {rates} = history;
     renew(this.plot, plotOf(rates, Math.max(fewestPlotted, rates.length), (counter.label || counter.name) + " per second"));
     this.node.classList.toggle("grows", counter.grows);
-    renew(this.mark, counter.grows ? badge("warning", "grows" + (history.grown > 0 ? ", +" + numberText(history.grown) : "")) : null);
+    const grown = history.grown > 0 ? ", +" + numberText(history.grown) : "";
+    renew(this.mark, counter.grows ? badge("warning", "grows" + grown) : null);
   }
 }
 

@@ -72,7 +72,8 @@ function nameOf(target) {
 /** Lines of a target's box that lead somewhere themselves. */
 function unitLeads(target, areFew) {
   if (!areFew || target.children.length === 0)
-    return [{text: target.contents ?? "", href: hrefOfClass(unitClass, nameOf(target)), label: "Units of " + nameOf(target)}];
+    return [{text: target.contents ?? "no units", href: hrefOfClass(unitClass, nameOf(target)),
+      label: "Units of " + nameOf(target)}];
   return target.children.map((unit) => {
     const text = [unit.name, factText(unit, "capacity")].filter(Boolean).join(", ");
     return {text, href: hrefOfObject(unit.path), label: unit.kind + " " + text};
@@ -255,7 +256,8 @@ function drawText(box, row, content, style) {
 function drawLead(box, row, {text, href, label}) {
   return draw("a", {class: "lead", href, "aria-label": label},
     draw("title", {}, label),
-    draw("rect", {x: box.x + padding, y: box.y + padding + lineHeight * row, width: box.width - 2 * padding, height: lineHeight, rx: 3}),
+    draw("rect", {x: box.x + padding, y: box.y + padding + lineHeight * row, width: box.width - 2 * padding,
+      height: lineHeight, rx: 3}),
     drawText(box, row, text, "line"));
 }
 
