@@ -226,7 +226,7 @@ struct Server::Listener
                : server->bind_to_port(options.address, options.port) ? options.port
                                                                      : -1;
         if (port < 0)
-            throw std::runtime_error("cannot listen on " + options.address + ":" + std::to_string(options.port));
+            throw CannotListen("cannot listen on " + options.address + ":" + std::to_string(options.port));
         thread = std::thread(
             [this]
             {
