@@ -41,6 +41,31 @@ TEST(ServeSecurity, UsersGiveTheirPasswords)
     EXPECT_THAT(headers, HasSubstr("WWW-Authenticate: Basic realm="));
 }
 
+/// On standard error, which a service's journal keeps: whatever a name has in it, on one line.
+TEST(ServeSecurity, WhoChangesTheHostAndWhoIsNotLetInIsTold)
+{
+    const Folder folder;
+    const std::string setting =
+        "root/tavrin:TVRHBA_ProviderConfigSetting.InstanceID=\"Tavrin HBA Provider:sanrefresh\"";
+    testing::internal::CaptureStderr();
+    {
+        Serving server({"--users", folder.makeUsers("joe", "secret")});
+        server.introduce("joe:secret@", "");
+        server.wbemcli("ein", cards);
+        server.wbemcli("mi", "/" + setting, "current=1");
+        server.wbemcli("sp", "/" + setting, "current=1");
+        server.wbemcli("di", "/" + setting);
+        server.wbemcli("cm", "/root/tavrin:TVRHBA_RecordLog.InstanceID=\"none\"", "ClearLog");
+        runCommand("curl --noproxy '*' -s -u \"$(printf 'jim\\njoe'):x\" " + server.url() + "/api/host");
+        EXPECT_EQ(server.end(), 0);
+    }
+    EXPECT_EQ(testing::internal::GetCapturedStderr(),
+              "joe changed " + setting + ": done\n" + "joe changed current of " + setting + ": done\n" +
+                  "joe deleted " + setting + ": CIM_ERR_NOT_SUPPORTED\n" +
+                  "joe called TVRHBA_RecordLog.ClearLog on root/tavrin:TVRHBA_RecordLog.InstanceID=\"none\": 33068\n" +
+                  "login refused of 'jim\\njoe' from 127.0.0.1\n");
+}
+
 TEST(ServeSecurity, WhoMayOnlyReadChangesNothing)
 {
     const Folder folder;
