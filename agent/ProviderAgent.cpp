@@ -119,21 +119,14 @@ void ProviderAgent::releaseRefLocked()
 
 ProviderAgent::Readiness ProviderAgent::readiness()
 {
-    if (singletonMutex->try_lock() != 0)
-        return {};
-    const ProviderAgent* agent = singleton.load();
-    const Readiness found =
-        agent ? Readiness{agent->m_bLoaded, agent->m_bAdapterRefreshPending || agent->m_bSANRefreshPending,
-                          agent->m_cacheTimeout}
-              : Readiness{};
-    singletonMutex->unlock();
-    return found;
+    return {m_bLoaded, m_bAdapterRefreshPending || m_bSANRefreshPending, m_cacheTimeout};
 }
 
 // --- start ---------------------------------------------------------------------------------------------
 
 ProviderAgent::ProviderAgent() : m_process(getpid())
 {
+    m_bAdapterRefreshPending = true;
     try
     {
         start();
@@ -180,6 +173,9 @@ void ProviderAgent::readSettings()
 ProviderAgent::~ProviderAgent()
 {
     finish();
+    m_bAdapterRefreshPending = false;
+    m_bSANRefreshPending = false;
+    m_cacheTimeout = 0;
 }
 
 void ProviderAgent::finish()

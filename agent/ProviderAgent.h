@@ -68,7 +68,7 @@ public:
     /// The process ends, or has ended, what the agent stands on: data, maps and libraries.
     bool hasEnded() const { return m_bFinished; }
 
-    /// Of the agent as it is; nothing while there is none, or while it is being made or deleted. Never waits.
+    /// Of the agent as it is; nothing while there is none. Never waits.
     struct Readiness
     {
         bool loaded = false;
@@ -91,15 +91,15 @@ public:
     void clearAdapterMaps();
     void clearSANMaps();
 
-    // --- refresh requests and settings
-    std::atomic<bool> m_bAdapterRefreshPending{true};
+    // --- refresh requests and settings; static is what is told of the agent, also to who asks while it is deleted
+    static inline std::atomic<bool> m_bAdapterRefreshPending{false};
     std::atomic<bool> m_bAdapterRefresh{false};
-    std::atomic<bool> m_bSANRefreshPending{false};
+    static inline std::atomic<bool> m_bSANRefreshPending{false};
     std::atomic<bool> m_bSANRefresh{false};
-    std::atomic<std::uint32_t> m_cacheTimeout{0}; ///< minutes
+    static inline std::atomic<std::uint32_t> m_cacheTimeout{0}; ///< minutes
 
     // --- parts
-    std::atomic<bool> m_bLoaded{false}; ///< fully built, and the libraries are usable
+    static inline std::atomic<bool> m_bLoaded{false}; ///< fully built, and the libraries are usable
     std::unique_ptr<Data> m_pData;
     std::unique_ptr<TVR_MethodWrapper> m_pMethodWrapper;
     TVR_FileLogger m_fileLogger;

@@ -5,6 +5,7 @@
 
 #include <atomic>
 #include <cstdint>
+#include <limits>
 
 namespace cimple
 {
@@ -23,7 +24,7 @@ public:
     void end()
     {
         const std::uint64_t now = Time::now();
-        _length = elapsed(_begin, now);
+        _length = now < _begin ? 0 : now - _begin;
         _end = now;
         ++_ended;
         _running = false;
@@ -33,13 +34,16 @@ public:
     std::uint64_t ended() const { return _ended; }
     /// Microseconds that the last one took.
     std::uint64_t length() const { return _length; }
-    /// Microseconds since the last one ended; since 1970 where none has.
-    std::uint64_t age() const { return elapsed(_end, Time::now()); }
+    /// Microseconds since the last one ended; since 1970 where none has. Behind the step of a clock that went backwards
+    /// the largest number: the agent takes its cache for too old then.
+    std::uint64_t age() const
+    {
+        const std::uint64_t end = _end; // before the clock is read: another one may end between
+        const std::uint64_t now = Time::now();
+        return now < end ? std::numeric_limits<std::uint64_t>::max() : now - end;
+    }
 
 private:
-    /// A clock that stepped backwards has no time gone by.
-    static std::uint64_t elapsed(std::uint64_t from, std::uint64_t to) { return to < from ? 0 : to - from; }
-
     std::atomic<std::uint64_t> _begin{0}, _end{0}, _length{0}, _ended{0};
     std::atomic<bool> _running{false};
 };

@@ -32,7 +32,7 @@ extern "C"
         /* Refreshes that have ended since the process began. */
         uint64_t refreshes;
         /* Microseconds since the last one ended, which is the age of the cache, and those it took. Nothing before the
-         * first. */
+         * first. The largest number as the age where the clock was set back since: an enumeration starts a refresh. */
         uint64_t cache_age;
         uint64_t refresh_length;
         /* Microseconds from which age on an enumeration starts a refresh; 0 where no provider is loaded. */

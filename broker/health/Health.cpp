@@ -1,5 +1,7 @@
 #include "broker/health/Health.h"
 
+#include "broker/values/ValueText.h"
+
 #include <algorithm>
 
 namespace broker
@@ -23,7 +25,7 @@ std::optional<double> numberOf(const Object& object, const std::string& property
 {
     const Value& value = object.get(property);
     if (!value.isNull() && (value.type() == CMPI_real32 || value.type() == CMPI_real64))
-        return value.asReal();
+        return decimalOf(value);
     const auto whole = unsignedOf(object, property);
     return whole ? std::optional<double>(static_cast<double>(*whole)) : std::nullopt;
 }
@@ -105,12 +107,17 @@ const PortState* portState(const Object& port)
 
 std::optional<Limits> limitsOf(const Object& object, const Measure& measure)
 {
-    const auto limit = [&](const char* property) { return property ? numberOf(object, property).value_or(0) : 0; };
-    const Limits limits{limit(measure.highAlarm), limit(measure.highWarning), limit(measure.lowWarning),
+    const auto limit = [&](const char* property) { return property ? numberOf(object, property) : std::nullopt; };
+    const auto high = [&](const char* property)
+    {
+        const auto found = limit(property);
+        return found == 0 ? std::nullopt : found;
+    };
+    const Limits limits{high(measure.highAlarm), high(measure.highWarning), limit(measure.lowWarning),
                         limit(measure.lowAlarm)};
-    const bool none =
-        limits.highAlarm == 0 && limits.highWarning == 0 && limits.lowWarning == 0 && limits.lowAlarm == 0;
-    return none ? std::nullopt : std::optional(limits);
+    const bool any = limits.highAlarm || limits.highWarning || limits.lowWarning.value_or(0) != 0 ||
+                     limits.lowAlarm.value_or(0) != 0;
+    return any ? std::optional(limits) : std::nullopt;
 }
 
 std::optional<Excess> excessOf(const Object& object, const Measure& measure)
@@ -119,13 +126,13 @@ std::optional<Excess> excessOf(const Object& object, const Measure& measure)
     const auto limits = limitsOf(object, measure);
     if (!value || !limits)
         return std::nullopt;
-    if (limits->highAlarm != 0 && *value >= limits->highAlarm)
+    if (limits->highAlarm && *value >= *limits->highAlarm)
         return Excess::aboveAlarm;
-    if (limits->highWarning != 0 && *value >= limits->highWarning)
+    if (limits->highWarning && *value >= *limits->highWarning)
         return Excess::aboveWarning;
-    if (measure.lowAlarm && *value <= limits->lowAlarm)
+    if (limits->lowAlarm && *value <= *limits->lowAlarm)
         return Excess::belowAlarm;
-    return measure.lowWarning && *value <= limits->lowWarning ? Excess::belowWarning : Excess::none;
+    return limits->lowWarning && *value <= *limits->lowWarning ? Excess::belowWarning : Excess::none;
 }
 
 } // namespace broker

@@ -72,10 +72,10 @@ inline constexpr Measure transceiverMeasures[] = {
     {"receive power", "RxPower", "RxPowerHighAlarm", "RxPowerHighWarning", "RxPowerLowWarning", "RxPowerLowAlarm"},
 };
 
-/// 0 where there is none.
+/// Nothing where there is none. A low limit may be 0; a high one of 0 is none.
 struct Limits
 {
-    double highAlarm, highWarning, lowWarning, lowAlarm;
+    std::optional<double> highAlarm, highWarning, lowWarning, lowAlarm;
 };
 /// Nothing where all of them are 0, as those of an element that has none.
 std::optional<Limits> limitsOf(const Object& object, const Measure& measure);

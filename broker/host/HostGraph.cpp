@@ -92,6 +92,8 @@ void HostGraph::take(std::span<const std::string_view> wanted)
     for (const EdgeRow& row : edges())
         if (isWanted(row.whole) && isWanted(row.part) && asked.insert(row.association).second)
             takeParts(row.association);
+    if (_firstFailure && !_anyAnswered)
+        throw *_firstFailure;
 }
 
 /// Whether the broker answered; notes the failure where it did not.
@@ -100,8 +102,8 @@ bool HostGraph::answered(const std::string& className, const Outcome& outcome)
     if (outcome.ok())
         return _anyAnswered = true;
     const CimError error(outcome);
-    if (!_anyAnswered)
-        throw error;
+    if (!_firstFailure)
+        _firstFailure = error;
     _failures.push_back(className + ": " + error.what());
     return false;
 }
@@ -180,7 +182,9 @@ Element& HostGraph::targetOf(Element& initiator, const char* association, const 
     Element*& target = _targets[{&initiator, port}];
     if (!target)
     {
-        target = &_elements.emplace_back(Element{&kindNamed(targetKind), {{}, {{"Name", Value::string(port)}}}});
+        target = &_elements.emplace_back(Element{&kindNamed(targetKind), {endpoint, {{"Name", Value::string(port)}}}});
+        if (target->object.path.nameSpace.empty())
+            target->object.path.nameSpace = _nameSpace;
         initiator.parts.push_back({association, target});
     }
     return *target;

@@ -7,6 +7,7 @@
 
 #include <deque>
 #include <map>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -58,6 +59,7 @@ private:
     void join(const EdgeRow& row, const Path& association);
     Element* find(const Path& path) const;
     /// The target behind an initiator that an endpoint is of, new or existing.
+    /// The endpoint stands for it, as the first of those of its units.
     Element& targetOf(Element& initiator, const char* association, const Path& endpoint);
     void nameHost(const Path& path);
     void findChassis();
@@ -69,6 +71,7 @@ private:
     std::unordered_map<std::string, Element*> _byPath;
     std::map<std::pair<const Element*, std::string>, Element*> _targets; ///< by initiator and WWPN
     std::vector<std::string> _failures;
+    std::optional<CimError> _firstFailure;
     bool _anyAnswered = false;
 };
 

@@ -131,10 +131,12 @@ bool isLost(const PortState& state)
 std::vector<Problem> portProblems(const Object& port)
 {
     const PortState* row = portState(port);
+    if (!row)
+        return {{"STATE UNKNOWN"}};
     std::vector<Problem> problems;
-    if (row && *row->problem)
+    if (*row->problem)
         problems.push_back({row->problem, isLost(*row)});
-    if (row && row->needsReset)
+    if (row->needsReset)
         problems.push_back({"NEEDS RESET"});
     return problems;
 }

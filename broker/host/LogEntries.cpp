@@ -41,7 +41,7 @@ LogLine providerLine(const Object& entry)
         text = text.substr(1, text.size() - 1 - text.ends_with(']'));
     if (text.ends_with('\n'))
         text.pop_back();
-    return {timeText(stampOf(entry)), isKnown ? levels[level[0] - '0'] : oneLine(level), oneLine(text)};
+    return {creationTime(entry), isKnown ? levels[level[0] - '0'] : oneLine(level), oneLine(text)};
 }
 
 /// The line of the system log has a time of its own.
@@ -51,6 +51,11 @@ LogLine driverLine(const Object& entry)
 }
 
 } // namespace
+
+std::string creationTime(const Object& entry)
+{
+    return timeText(stampOf(entry));
+}
 
 const LogKind providerLogKind{.id = "provider",
                               .name = "Provider log",

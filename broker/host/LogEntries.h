@@ -18,6 +18,9 @@ struct LogLine
     std::string text;
 };
 
+/// The CreationTimeStamp of an entry or a record, as in LogLine; empty where it has none.
+std::string creationTime(const Object& entry);
+
 struct LogKind
 {
     const char* id;

@@ -3,6 +3,7 @@
 #include "broker/metrics/HostFamilies.h"
 #include "broker/values/ValueText.h"
 
+#include <algorithm>
 #include <malloc.h>
 #include <set>
 
@@ -23,6 +24,8 @@ constexpr FamilyName toolInfo{"tavrin_fc_tool_info", gauge, "The tool that answe
 constexpr FamilyName cards{"tavrin_fc_cards", gauge, "Cards of the host."};
 constexpr FamilyName targets{"tavrin_fc_port_targets", gauge, "Target ports that the port, or virtual port, sees."};
 constexpr FamilyName units{"tavrin_fc_port_units", gauge, "Logical units that the port, or virtual port, sees."};
+constexpr FamilyName valuesAge{"tavrin_fc_values_age_seconds", gauge,
+                               "Time since the oldest of what is told of the host was read."};
 constexpr FamilyName librariesLoaded{"tavrin_fc_libraries_loaded", gauge,
                                      "Whether the libraries of the hardware are in use."};
 constexpr FamilyName cacheAge{"tavrin_fc_cache_age_seconds", gauge, "Time since the cache was refreshed."};
@@ -59,49 +62,82 @@ void tell(Series& series, const Observation& module)
 
 constexpr std::string_view cardClass = "TVRHBA_Card";
 constexpr std::string_view portClass = "TVRHBA_FCPort";
+constexpr const char* settingClass = "TVRHBA_ProviderConfigSetting";
 
 /// Each unit of a target has an endpoint, named after the initiator, the target and the unit.
 constexpr const char* endpointClasses[] = {"TVRHBA_SCSIProtocolEndpoint", "TVRHBA_VirtualSCSIProtocolTargetEndpoint"};
 
 } // namespace
 
-Collector::Collector(Broker& broker, std::string nameSpace, std::chrono::milliseconds shares)
-    : _broker(broker), _nameSpace(std::move(nameSpace)), _shares(shares), _host(hostSources().size())
+Collector::Collector(Broker& broker, std::string nameSpace, std::chrono::milliseconds shares,
+                     std::chrono::milliseconds patience)
+    : _broker(broker), _nameSpace(std::move(nameSpace)), _shares(shares), _patience(patience),
+      _host(hostSources().size())
 {}
 
-std::shared_ptr<const Families> Collector::collect()
+std::optional<Families> Collector::collect()
 {
-    if (!_turn.try_acquire_for(5s))
-        return nullptr;
-    const auto release = [this](void*) { _turn.release(); };
-    const std::unique_ptr<void, decltype(release)> turn(this, release);
-    if (!_shared || Clock::now() - _collected >= _shares)
+    if (_turn.try_acquire_for(_patience))
     {
-        _shared = std::make_shared<const Families>(everything());
-        _collected = Clock::now();
+        const auto release = [this](void*) { _turn.release(); };
+        const std::unique_ptr<void, decltype(release)> turn(this, release);
+        if (!_collected || Clock::now() - *_collected >= _shares)
+        {
+            share(everything());
+            _collected = Clock::now();
+        }
     }
-    return _shared;
+    const std::shared_ptr<const Known> host = known();
+    if (!host)
+        return std::nullopt;
+    Series series;
+    series.add(toolInfo, {{"version", TVRCIM_VERSION}}, 1);
+    if (const auto module = observe(_broker))
+        tell(series, *module);
+    if (host->oldest)
+        series.add(valuesAge, {}, std::chrono::duration<double>(Clock::now() - *host->oldest).count());
+    Families families = series.families();
+    families.insert(families.end(), host->families.begin(), host->families.end());
+    return families;
 }
 
-Families Collector::everything()
+std::shared_ptr<const Collector::Known> Collector::known()
+{
+    const std::lock_guard lock(_knownMutex);
+    return _known;
+}
+
+void Collector::share(Known known)
+{
+    auto shared = std::make_shared<const Known>(std::move(known));
+    const std::lock_guard lock(_knownMutex);
+    _known.swap(shared);
+}
+
+/// What was never read is left out: to monitoring a 0 would be a loss of what it knows from before.
+Collector::Known Collector::everything()
 {
     readHost();
     Series series;
     series.add(up, {}, !_failed);
-    series.add(toolInfo, {{"version", TVRCIM_VERSION}}, 1);
-    if (const auto module = observe(_broker))
-        tell(series, *module);
-    series.add(cards, {}, static_cast<double>(_cards));
-    for (const std::string& port : _ports)
-        _reaches.try_emplace(port);
-    for (const auto& [port, reach] : _reaches)
+    if (_cards)
+        series.add(cards, {}, static_cast<double>(*_cards));
+    if (_reaches)
+        for (const std::string& port : _ports)
+            _reaches->try_emplace(port);
+    for (const auto& [port, reach] : _reaches.value_or(Reaches()))
     {
         series.add(targets, {{"port", port}}, static_cast<double>(reach.targets));
         series.add(units, {{"port", port}}, static_cast<double>(reach.units));
     }
-    for (const Series& read : _host)
-        series.append(read);
-    return series.families();
+    Known all{series.families(), std::nullopt};
+    for (const ClassReading& reading : _host)
+    {
+        all.families.insert(all.families.end(), reading.families.begin(), reading.families.end());
+        if (reading.time)
+            all.oldest = std::min(*reading.time, all.oldest.value_or(*reading.time));
+    }
+    return all;
 }
 
 /// One class after the other for as long as that is allowed. The next time goes on where this one ended.
@@ -122,9 +158,15 @@ void Collector::readClass(std::size_t place)
 {
     const SourceRow& source = hostSources()[place];
     const Reply reply = _broker.enumerateInstances(_nameSpace, source.className);
-    _failed = _failed || !reply.ok();
-    _host[place] = {};
-    read(_host[place], source, reply.objects);
+    Series series;
+    read(series, source, reply.objects);
+    _host[place].families = series.families();
+    if (!reply.ok())
+    {
+        _failed = true;
+        return;
+    }
+    _host[place].time = Clock::now();
     if (source.className == cardClass)
         _cards = reply.objects.size();
     if (source.className != portClass)
@@ -140,6 +182,30 @@ void Collector::readFabric()
     const auto before = observeSettled(_broker);
     if (!mayAsk() || (before && before->refreshes == _fabricRead))
         return;
+    std::optional<Reaches> counted;
+    if (isFabricCached())
+    {
+        counted = countUnits();
+        malloc_trim(0); // what thousands of names took
+        _failed = _failed || !counted;
+        if (!counted)
+            return; // what was counted before stands
+    }
+    _reaches = std::move(counted);
+    _fabricRead = before ? std::optional(before->refreshes) : std::nullopt;
+}
+
+/// Whether a refresh reads the fabric, or only who asks for it has it read.
+bool Collector::isFabricCached()
+{
+    const Reply setting = _broker.getInstance(
+        {_nameSpace, settingClass, {{"InstanceID", Value::string("Tavrin HBA Provider:sanrefresh")}}});
+    return !setting.ok() || setting.objects.empty() || unsignedOf(setting.objects.front(), "current") != 0;
+}
+
+/// Nothing where an enumeration fails, though it may have begun well.
+std::optional<Collector::Reaches> Collector::countUnits()
+{
     Reaches reaches;
     std::set<std::string, std::less<>> seen; // initiators with their targets
     const auto count = [&](Path&& endpoint)
@@ -157,10 +223,9 @@ void Collector::readFabric()
         return true;
     };
     for (const char* className : endpointClasses)
-        _failed = !_broker.enumerateInstanceNames(_nameSpace, className, {count, true}).ok() || _failed;
-    _reaches = std::move(reaches);
-    malloc_trim(0); // what thousands of names took
-    _fabricRead = before ? std::optional(before->refreshes) : std::nullopt;
+        if (!_broker.enumerateInstanceNames(_nameSpace, className, {count, true}).ok())
+            return std::nullopt;
+    return reaches;
 }
 
 /// Behind a refresh that may leave the cache incomplete, of which the end alone tells. What is read while it lasts

@@ -1,5 +1,6 @@
 #include "broker/metrics/HostFamilies.h"
 
+#include "broker/health/PortCounters.h"
 #include "broker/values/ValueText.h"
 
 #include <algorithm>
@@ -102,6 +103,15 @@ void isUp(Series& series, const FamilyRow& row, const Object& object, const Labe
 {
     const PortState* state = portState(object);
     series.add(row, labels, state && state->up);
+}
+
+/// 0 is the speed of no link, and the one of a link of which the adapter does not tell it.
+void linkSpeed(Series& series, const FamilyRow& row, const Object& object, const Labels& labels)
+{
+    const PortState* state = portState(object);
+    const auto value = quantity(object, row, row.property);
+    if (value && (*value > 0 || !(state && state->up)))
+        series.add(row, labels, *value);
 }
 
 void needsReset(Series& series, const FamilyRow& row, const Object& object, const Labels& labels)
@@ -221,11 +231,6 @@ void waiting(Series& series, const std::vector<Object>& objects)
 constexpr double bitsPerByte = 8;
 constexpr double thousandths = 1000;
 
-constexpr FamilyRow counts(const char* name, const char* property, const char* help)
-{
-    return {{name, counter, help}, number, property};
-}
-
 constexpr FamilyRow numbers(const char* name, const char* property, double divisor, const char* help)
 {
     return {{name, gauge, help}, number, property, divisor};
@@ -241,71 +246,25 @@ constexpr FamilyRow portFamilies[] = {
     {{"tavrin_fc_port_up", gauge, "Whether the port has a link."}, isUp},
     {{"tavrin_fc_port_state", gauge, "1 for the state that the port is in, 0 for all others."}, states},
     {{"tavrin_fc_port_reset_needed", gauge, "Whether the adapter waits for a reset."}, needsReset},
-    numbers("tavrin_fc_port_speed_bytes_per_second", "Speed", bitsPerByte, "Speed of the link; 0 without one."),
+    {{"tavrin_fc_port_speed_bytes_per_second", gauge, "Speed of the link, where it is known; 0 without a link."},
+     linkSpeed,
+     "Speed",
+     bitsPerByte},
     numbers("tavrin_fc_port_max_speed_bytes_per_second", "MaxSpeed", bitsPerByte, "The fastest speed of the port."),
     numbers("tavrin_fc_port_discovered_ports", "NumberOfDiscoveredPorts", 1,
             "Other ports that the port has found in the fabric."),
     {{"tavrin_fc_port_info", gauge, "What a port is and where it is."}, portInfo},
 };
 
-constexpr FamilyRow statisticsFamilies[] = {
-    counts("tavrin_fc_port_transmitted_bytes_total", "BytesTransmitted", "Bytes that the port sent."),
-    counts("tavrin_fc_port_received_bytes_total", "BytesReceived", "Bytes that the port received."),
-    counts("tavrin_fc_port_transmitted_frames_total", "PacketsTransmitted", "Frames that the port sent."),
-    counts("tavrin_fc_port_received_frames_total", "PacketsReceived", "Frames that the port received."),
-    counts("tavrin_fc_port_loop_initializations_total", "LIPCount",
-           "Loop initialization primitives (LIP) on the link."),
-    counts("tavrin_fc_port_not_operational_sequences_total", "NOSCount",
-           "Not operational sequences (NOS) on the link."),
-    counts("tavrin_fc_port_error_frames_total", "ErrorFrames", "Frames received with an error."),
-    counts("tavrin_fc_port_dumped_frames_total", "DumpedFrames", "Frames dropped for want of buffers of the host."),
-    counts("tavrin_fc_port_link_failures_total", "LinkFailures", "Failures of the link."),
-    counts("tavrin_fc_port_signal_losses_total", "LossOfSignalCounter", "Losses of the signal."),
-    counts("tavrin_fc_port_synchronization_losses_total", "LossOfSyncCounter", "Losses of synchronization."),
-    counts("tavrin_fc_port_primitive_sequence_errors_total", "PrimitiveSeqProtocolErrCount",
-           "Errors of the primitive sequence protocol."),
-    counts("tavrin_fc_port_crc_errors_total", "CRCErrors", "Frames with a wrong checksum."),
-    counts("tavrin_fc_port_invalid_transmission_words_total", "InvalidTransmissionWords",
-           "Invalid transmission words received."),
-    counts("tavrin_fc_port_short_frames_total", "FramesTooShort", "Frames below the smallest size."),
-    counts("tavrin_fc_port_long_frames_total", "FramesTooLong", "Frames above the largest size."),
-    counts("tavrin_fc_port_address_errors_total", "AddressErrors", "Frames with an address that is unknown here."),
-    counts("tavrin_fc_port_credits_not_provided_total", "BufferCreditNotProvided",
-           "Times at which the port provided no buffer credit."),
-    counts("tavrin_fc_port_credits_not_received_total", "BufferCreditNotReceived",
-           "Times at which the port received no buffer credit."),
-    counts("tavrin_fc_port_delimiter_errors_total", "DelimiterErrors", "Frames with a wrong delimiter."),
-    counts("tavrin_fc_port_disparity_errors_total", "EncodingDisparityErrors", "Errors of the running disparity."),
-    counts("tavrin_fc_port_link_resets_received_total", "LinkResetsReceived", "Link resets received."),
-    counts("tavrin_fc_port_link_resets_transmitted_total", "LinkResetsTransmitted", "Link resets sent."),
-    counts("tavrin_fc_port_multicast_frames_received_total", "MulticastFramesReceived", "Multicast frames received."),
-    counts("tavrin_fc_port_multicast_frames_transmitted_total", "MulticastFramesTransmitted", "Multicast frames sent."),
-    counts("tavrin_fc_port_fabric_busy_frames_total", "FBSYFrames", "Frames answered by a busy fabric."),
-    counts("tavrin_fc_port_port_busy_frames_total", "PBSYFrames", "Frames answered by a busy port."),
-    counts("tavrin_fc_port_fabric_reject_frames_total", "FRJTFrames", "Frames rejected by the fabric."),
-    counts("tavrin_fc_port_port_reject_frames_total", "PRJTFrames", "Frames rejected by a port."),
-    counts("tavrin_fc_port_class1_frames_received_total", "RXClass1Frames", "Frames of class 1 received."),
-    counts("tavrin_fc_port_class1_frames_transmitted_total", "TXClass1Frames", "Frames of class 1 sent."),
-    counts("tavrin_fc_port_class1_fabric_busy_frames_total", "Class1FBSY",
-           "Frames of class 1 answered by a busy fabric."),
-    counts("tavrin_fc_port_class1_port_busy_frames_total", "Class1PBSY", "Frames of class 1 answered by a busy port."),
-    counts("tavrin_fc_port_class1_fabric_reject_frames_total", "Class1FRJT",
-           "Frames of class 1 rejected by the fabric."),
-    counts("tavrin_fc_port_class1_port_reject_frames_total", "Class1PRJT", "Frames of class 1 rejected by a port."),
-    counts("tavrin_fc_port_class2_frames_received_total", "RXClass2Frames", "Frames of class 2 received."),
-    counts("tavrin_fc_port_class2_frames_transmitted_total", "TXClass2Frames", "Frames of class 2 sent."),
-    counts("tavrin_fc_port_class2_fabric_busy_frames_total", "Class2FBSY",
-           "Frames of class 2 answered by a busy fabric."),
-    counts("tavrin_fc_port_class2_port_busy_frames_total", "Class2PBSY", "Frames of class 2 answered by a busy port."),
-    counts("tavrin_fc_port_class2_fabric_reject_frames_total", "Class2FRJT",
-           "Frames of class 2 rejected by the fabric."),
-    counts("tavrin_fc_port_class2_port_reject_frames_total", "Class2PRJT", "Frames of class 2 rejected by a port."),
-    counts("tavrin_fc_port_class3_frames_received_total", "RXClass3Frames", "Frames of class 3 received."),
-    counts("tavrin_fc_port_class3_frames_transmitted_total", "TXClass3Frames", "Frames of class 3 sent."),
-    counts("tavrin_fc_port_class3_discarded_frames_total", "Class3FramesDiscarded", "Frames of class 3 dropped."),
-    counts("tavrin_fc_port_broadcast_frames_received_total", "RXBroadcastFrames", "Broadcast frames received."),
-    counts("tavrin_fc_port_broadcast_frames_transmitted_total", "TXBroadcastFrames", "Broadcast frames sent."),
-};
+constexpr auto statisticsFamilies = []
+{
+    std::array<FamilyRow, std::size(counterRows)> rows{};
+    std::ranges::transform(counterRows, rows.begin(),
+                           [](const CounterRow& row) -> FamilyRow {
+                               return {{row.family, counter, row.help}, number, row.property};
+                           });
+    return rows;
+}();
 
 constexpr FamilyRow cardFamilies[] = {
     {{"tavrin_fc_card_info", gauge, "What a card is."}, cardInfo},

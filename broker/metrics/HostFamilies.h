@@ -16,7 +16,7 @@ struct FamilyRow : FamilyName
     /// Adds the row's samples of one instance to the series. `labels` tell the instance.
     using Read = void (*)(Series& series, const FamilyRow& row, const broker::Object& object, const Labels& labels);
 
-    Read read;
+    Read read = nullptr;
     const char* property = "";
     double divisor = 1; ///< from the property's unit to the family's
     const broker::Measure* measure = nullptr;

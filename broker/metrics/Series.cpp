@@ -59,14 +59,4 @@ void Series::add(const FamilyName& family, const Labels& labels, double value)
     _families[place].metric.push_back(std::move(sample));
 }
 
-void Series::append(const Series& others)
-{
-    for (const prometheus::MetricFamily& family : others._families)
-    {
-        _places.try_emplace(family.name, _families.size());
-        _families.push_back(family);
-        _seen.emplace_back();
-    }
-}
-
 } // namespace metrics

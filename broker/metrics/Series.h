@@ -34,8 +34,6 @@ public:
     /// Values that are no finite numbers are left out, and so are a sample whose labels the family has already, for
     /// devices may claim to be one another, and the samples of a family beyond a great many.
     void add(const FamilyName& family, const Labels& labels, double value);
-    /// Families of their own stand behind those that are there.
-    void append(const Series& others);
     const Families& families() const { return _families; }
 
 private:

@@ -16,7 +16,7 @@ http::Site site(broker::Broker& broker, const std::string& nameSpace)
                  if (!families)
                  {
                      response.status = 503;
-                     response.set_content("the provider does not answer another scrape yet\n", "text/plain");
+                     response.set_content("the provider has not answered yet\n", "text/plain");
                      return;
                  }
                  const Format format = formatFor(request.get_header_value("Accept"));

@@ -93,7 +93,7 @@ Json toJson(const Value& value)
         return value.asBoolean();
     case CMPI_real32:
     case CMPI_real64:
-        return std::isfinite(value.asReal()) ? Json(value.asReal()) : Json(nullptr);
+        return std::isfinite(value.asReal()) ? Json(decimalOf(value)) : Json(nullptr);
     case CMPI_instance:
         return {{"class", value.asObject().path.className},
                 {"properties", propertiesToJson(value.asObject().properties)}};

@@ -129,6 +129,14 @@ std::string typeText(CMPIType type)
     return name ? std::string(name) + (type & CMPI_ARRAY ? "[]" : "") : "type " + std::to_string(type);
 }
 
+double decimalOf(const Value& real)
+{
+    const std::string text = realText(real);
+    double number = real.asReal(); // as it is where it is no number
+    std::from_chars(text.data(), text.data() + text.size(), number);
+    return number;
+}
+
 std::string valueText(const Value& value)
 {
     if (value.isNull())

@@ -15,6 +15,9 @@ std::string typeText(CMPIType type);
 /// Plain form for tables: strings as they are, arrays as "[a, b]", null as "null", references as paths.
 std::string valueText(const Value& value);
 
+/// The number that the text of a real says: of one of 32 bits without the digits that only its bits add.
+double decimalOf(const Value& real);
+
 /// As an initialiser in MOF.
 std::string mofValue(const Value& value);
 

@@ -100,6 +100,19 @@ std::vector<Object> instancesOf(const State& state, const std::string& className
     return checked(reply).objects;
 }
 
+std::vector<Object> instancesOf(const State& state, const std::string& className, std::vector<std::string>& failures)
+{
+    try
+    {
+        return instancesOf(state, className);
+    }
+    catch (const CimError& error)
+    {
+        failures.push_back(className + ": " + error.what());
+        return {};
+    }
+}
+
 std::string session(const Question& question)
 {
     Query(question.request.params, {});

@@ -87,6 +87,9 @@ broker::Path pathNamed(const State& state, const char* name, const std::string& 
 std::string shortName(const broker::Path& path);
 /// Throws CimError where the class cannot be enumerated, but answers nothing for one that is not served.
 std::vector<broker::Object> instancesOf(const State& state, const std::string& className);
+/// None of a class that cannot be enumerated, which is told: it does not hide the others.
+std::vector<broker::Object> instancesOf(const State& state, const std::string& className,
+                                        std::vector<std::string>& failures);
 
 // --- answers: JSON as text
 

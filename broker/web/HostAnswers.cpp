@@ -1,6 +1,7 @@
 // The host as a tree, what is wrong with it, and its ports as they are now.
 #include "broker/core/Observation.h"
 #include "broker/health/Health.h"
+#include "broker/health/PortCounters.h"
 #include "broker/host/HostGraph.h"
 #include "broker/host/HostReport.h"
 #include "broker/host/ReadableText.h"
@@ -8,11 +9,11 @@
 #include "broker/values/SchemaText.h"
 #include "broker/values/ValueText.h"
 #include "broker/web/Asking.h"
-#include "broker/web/PortCounters.h"
 
 #include <algorithm>
 #include <array>
 #include <map>
+#include <optional>
 
 namespace web
 {
@@ -63,7 +64,8 @@ Json treeOf(const HostNode& node)
               {"facts", std::move(facts)},
               {"problems", std::move(problems)},
               {"units", node.units},
-              {"bytes", node.bytes}};
+              {"bytes", node.bytes},
+              {"contents", node.units > 0 ? Json(unitsText(node)) : Json()}};
     if (node.kind == targetKind)
         json["wwpn"] = node.name;
     if (const auto targets = std::ranges::count(node.children, targetKind, &HostNode::kind); targets > 0)
@@ -85,10 +87,10 @@ struct Counter
 /// By WWPN, in which the key of a port's statistics ends.
 using CountersByPort = std::map<std::string, std::vector<Counter>>;
 
-CountersByPort readCounters(State& state)
+CountersByPort readCounters(State& state, std::vector<std::string>& failures)
 {
     CountersByPort ports;
-    for (const Object& statistics : instancesOf(state, "TVRHBA_FCPortStatistics"))
+    for (const Object& statistics : instancesOf(state, "TVRHBA_FCPortStatistics", failures))
     {
         const std::string id = textOf(statistics, "InstanceID");
         const std::string port = id.substr(id.rfind(':') + 1);
@@ -157,15 +159,7 @@ std::string readHost(State& state)
 {
     const HostReport report = reportOf(state);
     std::vector<std::string> failures = report.failures();
-    CountersByPort counters;
-    try
-    {
-        counters = readCounters(state);
-    }
-    catch (const CimError& error)
-    {
-        failures.push_back(std::string("TVRHBA_FCPortStatistics: ") + error.what());
-    }
+    const CountersByPort counters = readCounters(state, failures);
     return jsonText({{"problems", problemsOf(report.root(), counters)},
                      {"failures", std::move(failures)},
                      {"root", treeOf(report.root())}});
@@ -192,9 +186,18 @@ const Element* wholeOf(const Wholes& wholes, const Element* element, std::string
     return nullptr;
 }
 
-Json limitOf(double limit)
+template <class T> Json orNull(const std::optional<T>& value)
 {
-    return limit == 0 ? Json() : Json(limit);
+    return value ? Json(*value) : Json();
+}
+
+/// As bad as the worst of what the port's state means.
+const char* severityOf(const Element& port)
+{
+    const std::vector<Problem> problems = port.kind->problems(port.object);
+    if (problems.empty())
+        return "ok";
+    return severity(std::ranges::any_of(problems, &Problem::critical));
 }
 
 const char* stateOf(const Object& object, const Measure& measure)
@@ -225,10 +228,10 @@ void addMeasures(Json& measures, const State& state, const Element& element, std
         measures.push_back({{"label", inSentence(element.kind->name) + " " + row.name},
                             {"value", *value},
                             {"unit", unitText(unitOf(*info, row.value))},
-                            {"lowAlarm", limitOf(limits.lowAlarm)},
-                            {"lowWarning", limitOf(limits.lowWarning)},
-                            {"highWarning", limitOf(limits.highWarning)},
-                            {"highAlarm", limitOf(limits.highAlarm)},
+                            {"lowAlarm", orNull(limits.lowAlarm)},
+                            {"lowWarning", orNull(limits.lowWarning)},
+                            {"highWarning", orNull(limits.highWarning)},
+                            {"highAlarm", orNull(limits.highAlarm)},
                             {"state", stateOf(element.object, row)}});
     }
 }
@@ -263,8 +266,9 @@ Json countersJson(const std::vector<Counter>& counters)
 
 std::string readPorts(State& state)
 {
-    CountersByPort counters = readCounters(state);
     HostGraph graph(state.broker, state.nameSpace, portParts);
+    std::vector<std::string> failures = graph.failures();
+    CountersByPort counters = readCounters(state, failures);
     Wholes wholes;
     for (const Element& element : graph.elements())
         for (const Part& part : element.parts)
@@ -277,17 +281,19 @@ std::string readPorts(State& state)
         const Element* card = wholeOf(wholes, &element, "Card");
         const PortState* known = portState(element.object);
         const std::string name = oneLine(textOf(element.object, "DeviceID"));
-        const auto speed = unsignedOf(element.object, "Speed");
+        const std::uint64_t speed = unsignedOf(element.object, "Speed").value_or(0);
         list.push_back({{"path", pathJson(element.object.path)},
                         {"name", name},
                         {"card", card ? Json(oneLine(textOf(card->object, card->kind->nameProperty))) : Json()},
                         {"state", known ? known->text : "state unknown"},
                         {"up", known && known->up},
-                        {"speed", speed.value_or(0) == 0 ? Json() : Json(*speed)},
+                        {"severity", severityOf(element)},
+                        {"speed", speed == 0 ? Json() : Json(speed)},
+                        {"speedText", speed == 0 ? Json() : Json(speedText(speed))},
                         {"counters", countersJson(counters[textOf(element.object, "DeviceID")])},
                         {"measures", measuresOf(state, element, card)}});
     }
-    return jsonText(list);
+    return jsonText({{"ports", std::move(list)}, {"failures", std::move(failures)}});
 }
 
 } // namespace

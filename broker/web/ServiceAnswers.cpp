@@ -20,6 +20,8 @@ using namespace broker;
 namespace
 {
 
+using Failures = std::vector<std::string>;
+
 Json orNull(const std::string& text)
 {
     return text.empty() ? Json() : Json(text);
@@ -83,10 +85,10 @@ Json portJson(const Path& port)
 }
 
 /// The text of the help service of the test's name.
-std::map<std::string, std::string> helpTexts(const State& state)
+std::map<std::string, std::string> helpTexts(const State& state, Failures& failures)
 {
     std::map<std::string, std::string> helps;
-    for (const Object& help : instancesOf(state, "TVRHBA_HelpService"))
+    for (const Object& help : instancesOf(state, "TVRHBA_HelpService", failures))
     {
         const Value& texts = help.get("DocumentDescriptions");
         if (texts.type() == CMPI_stringA && !texts.isNull() && !texts.asList().empty())
@@ -95,19 +97,19 @@ std::map<std::string, std::string> helpTexts(const State& state)
     return helps;
 }
 
-Json testsJson(const State& state)
+Json testsJson(const State& state, Failures& failures)
 {
     std::map<std::string, Json> ports; // by test
-    for (const Object& available : instancesOf(state, "TVRHBA_AvailableDiagnosticService"))
+    for (const Object& available : instancesOf(state, "TVRHBA_AvailableDiagnosticService", failures))
     {
         const Path* test = endOf(available, "ServiceProvided");
         const Path* port = endOf(available, "UserOfService");
         if (test && port)
             ports[keyText(*test, "Name")].push_back(portJson(*port));
     }
-    const std::map<std::string, std::string> helps = helpTexts(state);
+    const std::map<std::string, std::string> helps = helpTexts(state, failures);
     Json tests = Json::array();
-    for (const Object& test : instancesOf(state, "TVRHBA_FCHBADiagnosticTest"))
+    for (const Object& test : instancesOf(state, "TVRHBA_FCHBADiagnosticTest", failures))
     {
         const std::string name = textOf(test, "Name");
         const auto help = helps.find(name);
@@ -121,10 +123,12 @@ Json testsJson(const State& state)
 }
 
 /// The ports on which tests run or ran, by the name of the job.
-std::map<std::string, std::string> portsOfJobs(const State& state)
+using PortsByJob = std::map<std::string, std::string>;
+
+PortsByJob portsOfJobs(const State& state, Failures& failures)
 {
-    std::map<std::string, std::string> ports;
-    for (const Object& affected : instancesOf(state, "TVRHBA_AffectedJobElement"))
+    PortsByJob ports;
+    for (const Object& affected : instancesOf(state, "TVRHBA_AffectedJobElement", failures))
     {
         const Path* job = endOf(affected, "AffectingElement");
         const Path* port = endOf(affected, "AffectedElement");
@@ -134,16 +138,16 @@ std::map<std::string, std::string> portsOfJobs(const State& state)
     return ports;
 }
 
-Json portOf(const std::map<std::string, std::string>& ports, const Object& jobOrRecord)
+Json portOf(const PortsByJob& ports, const Object& jobOrRecord)
 {
     const auto port = ports.find(textOf(jobOrRecord, "InstanceID"));
     return port == ports.end() ? Json() : Json(port->second);
 }
 
-Json jobsJson(const State& state, const std::map<std::string, std::string>& ports)
+Json jobsJson(const State& state, const PortsByJob& ports, Failures& failures)
 {
     Json jobs = Json::array();
-    for (const Object& job : instancesOf(state, "TVRHBA_ConcreteJob"))
+    for (const Object& job : instancesOf(state, "TVRHBA_ConcreteJob", failures))
         jobs.push_back({{"path", fullPathText(job.path)},
                         {"id", oneLine(textOf(job, "InstanceID"))},
                         {"name", oneLine(textOf(job, "Name"))},
@@ -155,20 +159,17 @@ Json jobsJson(const State& state, const std::map<std::string, std::string>& port
 }
 
 /// The verdicts: a run has ended when there is one with the name of its job.
-Json recordsJson(const State& state, const std::map<std::string, std::string>& ports)
+Json recordsJson(const State& state, const PortsByJob& ports, Failures& failures)
 {
     Json records = Json::array();
-    for (const Object& record : instancesOf(state, "TVRHBA_DiagnosticCompletionRecord"))
-    {
-        const Value& time = record.get("CreationTimeStamp");
+    for (const Object& record : instancesOf(state, "TVRHBA_DiagnosticCompletionRecord", failures))
         records.push_back({{"path", fullPathText(record.path)},
                            {"id", oneLine(textOf(record, "InstanceID"))},
-                           {"time", time.isNull() ? Json() : Json(valueText(time))},
+                           {"time", orNull(creationTime(record))},
                            {"test", oneLine(textOf(record, "ServiceName"))},
                            {"port", portOf(ports, record)},
                            {"state", nameOfValue(state, record, "CompletionState")},
                            {"text", oneLine(withSingleBlanks(textOf(record, "RecordData")))}});
-    }
     return records;
 }
 
@@ -222,15 +223,12 @@ void addMethods(Json& list, const ClassInfo& info, const std::vector<Object>& ob
 std::string readMethods(const State& state)
 {
     Json list = Json::array();
+    Failures failures;
     for (const std::string& name : state.broker.servedClasses())
-    {
-        const ClassInfo& info = classNamed(state, name);
-        if (!state.broker.serves(name, Kind::method) || !hasMethods(info))
-            continue;
-        // A class that fails does not hide the others.
-        addMethods(list, info, state.broker.enumerateInstances(nameSpaceOf(state, name), name).objects);
-    }
-    return jsonText(list);
+        if (const ClassInfo& info = classNamed(state, name);
+            state.broker.serves(name, Kind::method) && hasMethods(info))
+            addMethods(list, info, instancesOf(state, name, failures));
+    return jsonText({{"methods", std::move(list)}, {"failures", std::move(failures)}});
 }
 
 /// A call as it was asked for.
@@ -326,9 +324,15 @@ std::string diagnostics(const Question& question)
 {
     Query(question.request.params, {});
     const State& state = question.state;
-    const std::map<std::string, std::string> ports = portsOfJobs(state);
-    return jsonText(
-        {{"tests", testsJson(state)}, {"jobs", jobsJson(state, ports)}, {"records", recordsJson(state, ports)}});
+    Failures failures;
+    const PortsByJob ports = portsOfJobs(state, failures);
+    Json tests = testsJson(state, failures);
+    Json jobs = jobsJson(state, ports, failures);
+    Json records = recordsJson(state, ports, failures);
+    return jsonText({{"tests", std::move(tests)},
+                     {"jobs", std::move(jobs)},
+                     {"records", std::move(records)},
+                     {"failures", std::move(failures)}});
 }
 
 std::string methods(const Question& question)

@@ -93,6 +93,7 @@ std::string configurationOf(const Folder& folder, const Serving& server)
     std::string text = textOf(TVR_FLEET "/prometheus.yml");
     std::ofstream(folder.file("password")) << "secret";
     replaceBehind(text, "scrape_interval: ", "1s");
+    replaceBehind(text, "scrape_timeout: ", "1s");
     replaceBehind(text, "password_file: ", folder.file("password"));
     replaceBehind(text, "ca_file: ", folder.file("own.pem"));
     replaceBehind(text, "targets: ", "[\"127.0.0.1:" + server.port() + "\"]");
@@ -181,9 +182,10 @@ TEST(Metrics, TheFilesForAFleetAreValid)
     const Folder folder;
     const std::string dashboard = folder.file("dashboard.yml");
     std::ofstream(dashboard) << rulesOfDashboard();
-    for (const std::string& check :
-         {std::string("check rules " TVR_FLEET "/alerts.yml"), "check rules --lint=none " + dashboard,
-          std::string("check config --syntax-only " TVR_FLEET "/prometheus.yml")})
+    const std::vector<std::string> checks = {"check rules " TVR_FLEET "/alerts.yml", "test rules " TVR_ALERTS_TEST,
+                                             "check rules --lint=none " + dashboard,
+                                             "check config --syntax-only " TVR_FLEET "/prometheus.yml"};
+    for (const std::string& check : checks)
     {
         const Answer checked = runCommand("promtool " + check);
         EXPECT_EQ(checked.exitCode, 0) << checked.out << checked.err;

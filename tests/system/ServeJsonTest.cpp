@@ -144,11 +144,19 @@ TEST(ServeJson, ShowsTheHostWithWhatIsWrongFirst)
     const Script::Told port = script.askOf("instance", problem["path"]);
     EXPECT_EQ(port.status, 200);
     EXPECT_EQ(port.json["class"], "TVRHBA_FCPort");
-    const Json ports = script.ask("ports").json;
+    const Json answer = script.ask("ports").json;
+    EXPECT_TRUE(answer["failures"].empty());
+    const Json& ports = answer["ports"];
     ASSERT_EQ(ports.size(), 4U);
     EXPECT_EQ(ports[0]["card"], "TVR FCHBA:TV1602:TV16A02417");
     EXPECT_EQ(ports[0]["speed"], 8'000'000'000);
+    EXPECT_EQ(ports[0]["speedText"], "8 Gbit/s");
+    EXPECT_EQ(ports[0]["severity"], "ok");
     EXPECT_EQ(ports[1]["up"], false);
+    EXPECT_EQ(ports[1]["severity"], "critical");
+    EXPECT_TRUE(ports[1]["speedText"].is_null());
+    const Json& voltage = ports[0]["measures"][1];
+    EXPECT_EQ(voltage["value"].dump() + " " + voltage["lowAlarm"].dump(), "3.295 2.9") << "as few digits as it has";
     const Json& temperature = ports[0]["measures"][0];
     EXPECT_EQ(temperature["value"], 38.5);
     EXPECT_EQ(temperature["unit"], "°C");
@@ -254,7 +262,8 @@ TEST(ServeJson, ErrorsThatGrowAreTold)
     const auto errors = [&]
     {
         std::vector<std::string> texts;
-        for (const Json& port : script.ask("ports").json)
+        const Json answer = script.ask("ports").json;
+        for (const Json& port : answer["ports"])
             for (const Json& counter : port["counters"])
                 if (counter["grows"] == true)
                     texts.push_back(port["name"].get<std::string>() + " " + counter["label"].get<std::string>());

@@ -63,7 +63,7 @@ function methodLinks(methods) {
 
 /** What the class is, beside its instances, which do not wait for it. */
 async function describe(visit, name, place, choice, changed) {
-  const [info, methods] = await Promise.all([ask("classes/" + encodeURIComponent(name), {}, visit.signal),
+  const [info, {methods}] = await Promise.all([ask("classes/" + encodeURIComponent(name), {}, visit.signal),
     ask("methods", {}, visit.signal)]);
   replace(place, make("p", {}, info.description), methodLinks(methods.filter((method) => method.class === info.name)));
   replace(choice, namespaceChoice(info.namespaces, changed));

@@ -75,7 +75,7 @@ class Associations {
 }
 
 async function methodsOf(visit, path) {
-  const methods = await ask("methods", {}, visit.signal);
+  const {methods} = await ask("methods", {}, visit.signal);
   const own = methods.filter((method) => method.instances.some((instance) => instance.path === path));
   if (own.length === 0)
     return make("p", {class: "quiet"}, "None.");

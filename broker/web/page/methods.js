@@ -135,7 +135,7 @@ class MethodForm {
 }
 
 async function formOf(visit, className, name, path) {
-  const [info, methods] = await Promise.all([ask("classes/" + encodeURIComponent(className), {}, visit.signal),
+  const [info, {methods}] = await Promise.all([ask("classes/" + encodeURIComponent(className), {}, visit.signal),
     ask("methods", {}, visit.signal)]);
   const method = info.methods.find((each) => each.name === name);
   if (!method)
@@ -149,7 +149,7 @@ export async function showMethods(visit, className = "", name = "", path = "") {
   const place = make("div", {});
   if (!name) {
     visit.begin("Methods", place);
-    return visit.fill(place, async () => listOf(await ask("methods", {}, visit.signal)));
+    return visit.fill(place, async () => listOf((await ask("methods", {}, visit.signal)).methods));
   }
   visit.begin(deedOf(name), make("p", {class: "quiet"}, className + "." + name), place);
   return visit.fill(place, () => formOf(visit, className, name, path));

@@ -161,7 +161,7 @@ export async function showPorts(visit) {
   const errors = make("div", {id: "growing"});
   const read = async () => {
     try {
-      const ports = await ask("ports", {}, visit.signal);
+      const {ports} = await ask("ports", {}, visit.signal);
       remember(ports, performance.now());
       replace(trouble);
       const growing = growingErrors(ports);

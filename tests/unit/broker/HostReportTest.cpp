@@ -61,6 +61,13 @@ TEST(HostKinds, WhatIsWrongHasAWord)
                            {"RxPowerLowWarning", Value::real32(0.03F)},
                            {"RxPowerLowAlarm", Value::real32(0.02F)}});
     };
+    const auto cold = [](float temperature)
+    {
+        return objectWith({{"Temperature", Value::real32(temperature)},
+                           {"TemperatureHighAlarm", Value::real32(70)},
+                           {"TemperatureHighWarning", Value::real32(0)},
+                           {"TemperatureLowWarning", Value::real32(0)}});
+    };
     const struct
     {
         const char* kind;
@@ -72,8 +79,9 @@ TEST(HostKinds, WhatIsWrongHasAWord)
         {"FC port", status(10), {"OFFLINE"}},
         {"FC port", status(32788), {"NEEDS RESET"}},
         {"Virtual port", status(32789), {"LINK DOWN", "NEEDS RESET"}},
-        {"FC port", objectWith({}), {}},
-        {"FC port", objectWith({{"OperationalStatus", Value::array(CMPI_uint16, {})}}), {}},
+        {"FC port", status(0), {"STATE UNKNOWN"}},
+        {"FC port", objectWith({}), {"STATE UNKNOWN"}},
+        {"FC port", objectWith({{"OperationalStatus", Value::array(CMPI_uint16, {})}}), {"STATE UNKNOWN"}},
         {"Chip", chip(84, 85, 95), {}},
         {"Chip", chip(85, 85, 95), {"TEMPERATURE ABOVE WARNING"}},
         {"Chip", chip(95, 85, 95), {"TEMPERATURE ABOVE CRITICAL"}},
@@ -83,6 +91,8 @@ TEST(HostKinds, WhatIsWrongHasAWord)
         {"Transceiver", power(1.2F), {"RECEIVE POWER ABOVE WARNING"}},
         {"Transceiver", power(0.025F), {"RECEIVE POWER BELOW WARNING"}},
         {"Transceiver", power(0), {"RECEIVE POWER BELOW CRITICAL"}},
+        {"Transceiver", cold(0.5F), {}},
+        {"Transceiver", cold(0), {"TEMPERATURE BELOW WARNING"}},
     };
     for (const auto& row : rows)
     {
