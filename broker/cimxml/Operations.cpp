@@ -3,6 +3,8 @@
 #include "broker/cimxml/Encode.h"
 #include "broker/cimxml/Qualifiers.h"
 #include "broker/cimxml/Request.h"
+#include "broker/http/Journal.h"
+#include "broker/values/ValueText.h"
 
 #include <algorithm>
 #include <exception>
@@ -105,8 +107,8 @@ void expect(const Outcome& outcome)
 class Operation
 {
 public:
-    Operation(Broker& target, Pulls& kept, const Request& request, ResponseText& response)
-        : broker(target), pulls(kept), xml(response.xml()), _request(request), _response(response),
+    Operation(Broker& target, Pulls& kept, const Request& request, ResponseText& response, const http::Caller& caller)
+        : broker(target), pulls(kept), xml(response.xml()), _request(request), _response(response), _caller(caller),
           _decoder(target.classes(), request.nameSpace)
     {}
 
@@ -120,6 +122,14 @@ public:
     const ClassInfo* classOf(const Object& object) const { return broker.classes().find(object.path.className); }
     /// See ResponseText.
     bool passOn() { return _response.passOn(); }
+    bool mayChange() const { return _caller.mayChange; }
+    /// Tells the journal of a change, and expects that it went well.
+    void expectChange(const std::string& verb, const Path& path, const Outcome& outcome,
+                      const std::string& result = "done") const
+    {
+        http::tellChange(_caller, verb, path, outcome.ok() ? result : statusName(outcome.status));
+        expect(outcome);
+    }
 
     xml_node required(const char* name) const
     {
@@ -188,6 +198,7 @@ public:
 private:
     const Request& _request;
     ResponseText& _response;
+    const http::Caller& _caller;
     Decoder _decoder;
 };
 
@@ -308,8 +319,9 @@ void createInstance(Operation& operation)
 {
     const xml_node instance = operation.required("NewInstance");
     operation.expectClassOf(instance);
-    const NamesReply reply = operation.broker.createInstance(operation.decoder().instance(instance));
-    expect(reply);
+    const Object object = operation.decoder().instance(instance);
+    const NamesReply reply = operation.broker.createInstance(object);
+    operation.expectChange("created", reply.paths.empty() ? object.path : reply.paths.front(), reply);
     for (const Path& path : reply.paths)
         writeInstanceName(operation.xml, path);
 }
@@ -318,12 +330,14 @@ void modifyInstance(Operation& operation)
 {
     const xml_node named = operation.required("ModifiedInstance");
     operation.expectClassOf(childOf(named, "INSTANCE"));
-    expect(operation.broker.modifyInstance(operation.decoder().namedInstance(named), operation.properties()));
+    const Object object = operation.decoder().namedInstance(named);
+    operation.expectChange("changed", object.path, operation.broker.modifyInstance(object, operation.properties()));
 }
 
 void deleteInstance(Operation& operation)
 {
-    expect(operation.broker.deleteInstance(operation.decoder().path(operation.required("InstanceName"))));
+    const Path path = operation.decoder().path(operation.required("InstanceName"));
+    operation.expectChange("deleted", path, operation.broker.deleteInstance(path));
 }
 
 // --- classes
@@ -404,7 +418,9 @@ void setProperty(Operation& operation)
     const FeatureInfo& property = namedProperty(operation, path);
     const Target target(operation.broker.classes(), operation.nameSpace(), property);
     const Value value = operation.decoder().value(operation.request().parameter("NewValue"), target);
-    expect(operation.broker.modifyInstance({path, {{property.name, value}}}, std::vector{property.name}));
+    operation.expectChange(
+        "changed " + property.name + " of", path,
+        operation.broker.modifyInstance({path, {{property.name, value}}}, std::vector{property.name}));
 }
 
 void getQualifier(Operation& operation)
@@ -539,20 +555,21 @@ constexpr Row rows[] = {
     {"CloseEnumeration", closeEnumeration, false},
 };
 
-void expectRight(bool mayChange)
+void expectRight(const Operation& operation)
 {
-    if (!mayChange)
+    if (!operation.mayChange())
         throw CimFailure{CMPI_RC_ERR_ACCESS_DENIED, "who asks may only read"};
 }
 
-void carryOutIntrinsic(Operation& operation, bool mayChange)
+void carryOutIntrinsic(Operation& operation)
 {
     const auto* row =
         std::ranges::find_if(rows, [&](const Row& known) { return sameName(known.name, operation.request().name); });
     if (row == std::end(rows))
         throw CimFailure{CMPI_RC_ERR_NOT_SUPPORTED,
                          "the operation '" + operation.request().name + "' is not supported"};
-    expectRight(mayChange || !row->changes);
+    if (row->changes)
+        expectRight(operation);
     std::optional<XmlElement> result;
     if (row->hasResult)
         result.emplace(operation.xml, "IRETURNVALUE");
@@ -593,9 +610,9 @@ void writeReply(XmlText& xml, const MethodReply& reply)
         }
 }
 
-void carryOutExtrinsic(Operation& operation, bool mayChange)
+void carryOutExtrinsic(Operation& operation)
 {
-    expectRight(mayChange);
+    expectRight(operation);
     const Request& request = operation.request();
     const Path path = operation.decoder().path(firstElement(request.call));
     expect(operation.broker.findClass(path.nameSpace, path.className));
@@ -604,21 +621,22 @@ void carryOutExtrinsic(Operation& operation, bool mayChange)
     if (!method)
         throw CimFailure{CMPI_RC_ERR_METHOD_NOT_FOUND, info->name + " has no method '" + request.name + "'"};
     const MethodReply reply = operation.broker.invokeMethod(path, method->name, argumentsOf(operation, *method));
-    expect(reply);
+    operation.expectChange("called " + info->name + "." + method->name + " on", path, reply,
+                           valueText(reply.returnValue));
     writeReply(operation.xml, reply);
 }
 
 } // namespace
 
-bool answer(Broker& broker, Pulls& pulls, const Message& message, const Output& output, bool mayChange)
+bool answer(Broker& broker, Pulls& pulls, const Message& message, const Output& output, const http::Caller& caller)
 {
     const Request& request = message.request;
     ResponseText response(request, output);
     try
     {
-        Operation operation(broker, pulls, request, response);
+        Operation operation(broker, pulls, request, response, caller);
         expect(broker.findNameSpace(request.nameSpace));
-        request.extrinsic ? carryOutExtrinsic(operation, mayChange) : carryOutIntrinsic(operation, mayChange);
+        request.extrinsic ? carryOutExtrinsic(operation) : carryOutIntrinsic(operation);
         return response.finish();
     }
     catch (const CimFailure& error)

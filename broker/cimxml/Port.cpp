@@ -16,7 +16,8 @@ namespace
 
 /// The response, from within the operation. A client of HTTP 1.1 misses the last chunk of one that broke off, any other
 /// the end of the document.
-bool deliver(broker::Broker& broker, Pulls& pulls, const Message& message, bool mayChange, httplib::DataSink& sink)
+bool deliver(broker::Broker& broker, Pulls& pulls, const Message& message, const http::Caller& caller,
+             httplib::DataSink& sink)
 {
     try
     {
@@ -29,7 +30,7 @@ bool deliver(broker::Broker& broker, Pulls& pulls, const Message& message, bool 
         bool whole = false;
         {
             const http::Connection::Hurry hurry;
-            whole = answer(broker, pulls, message, give, mayChange);
+            whole = answer(broker, pulls, message, give, caller);
         }
         http::giveBackMemory(given);
         if (whole)
@@ -43,14 +44,14 @@ bool deliver(broker::Broker& broker, Pulls& pulls, const Message& message, bool 
 }
 
 void answerTo(broker::Broker& broker, Pulls& pulls, const httplib::Request& request, httplib::Response& response,
-              bool mayChange)
+              const http::Caller& caller)
 {
     constexpr char type[] = "application/xml; charset=\"utf-8\"";
     try
     {
         const auto message = std::make_shared<const Message>(request.body);
-        const auto provide = [&broker, &pulls, message, mayChange](std::size_t, httplib::DataSink& sink)
-        { return deliver(broker, pulls, *message, mayChange, sink); };
+        const auto provide = [&broker, &pulls, message, caller](std::size_t, httplib::DataSink& sink)
+        { return deliver(broker, pulls, *message, caller, sink); };
         response.set_header("CIMOperation", "MethodResponse");
         if (request.version == "HTTP/1.0")
         {
@@ -74,7 +75,7 @@ http::Site site(broker::Broker& broker)
     const auto pulls = std::make_shared<Pulls>();
     return {{"POST", "*", http::Entrance::program,
              [&broker, pulls](const httplib::Request& request, httplib::Response& response, const http::Caller& caller)
-             { answerTo(broker, *pulls, request, response, caller.mayChange); }}};
+             { answerTo(broker, *pulls, request, response, caller); }}};
 }
 
 } // namespace cimxml

@@ -2,6 +2,7 @@
 
 #include "broker/http/Admission.h"
 #include "broker/http/Connection.h"
+#include "broker/http/Journal.h"
 #include "broker/http/Memory.h"
 #include "broker/http/Workers.h"
 #include "broker/values/Json.h"
@@ -226,7 +227,7 @@ struct Server::Listener
                : server->bind_to_port(options.address, options.port) ? options.port
                                                                      : -1;
         if (port < 0)
-            throw std::runtime_error("cannot listen on " + options.address + ":" + std::to_string(options.port));
+            throw CannotListen("cannot listen on " + options.address + ":" + std::to_string(options.port));
         thread = std::thread(
             [this]
             {
@@ -250,6 +251,8 @@ struct Server::Listener
         const_cast<httplib::Request&>(request).ranges.clear();
         Admitted& found = served->found;
         found = admit(house, site, request);
+        if (const std::string login = request.get_header_value("Authorization"); found.status == 401 && !login.empty())
+            refusedLogins.tell(request.remote_addr, Users::nameIn(login));
         const std::string isBusy = found.status == 200 ? takeSeats(found) : std::string();
         if (found.status == 200 && isBusy.empty())
             return httplib::Server::HandlerResponse::Unhandled;
@@ -284,6 +287,7 @@ struct Server::Listener
     const Site site;
     const House house;
     const Connection::Time patience;
+    RefusedLogins refusedLogins;
     std::counting_semaphore<mostLarge> large{mostLarge};    ///< for large bodies
     std::counting_semaphore<mostAsking> asking{mostAsking}; ///< for who asks the provider
     std::atomic<bool> ending = false;

@@ -6,6 +6,7 @@
 
 #include <chrono>
 #include <memory>
+#include <stdexcept>
 #include <string>
 
 namespace http
@@ -23,11 +24,19 @@ struct ServerOptions
     std::chrono::milliseconds silence = std::chrono::seconds(5);   ///< between two requests of a connection
 };
 
+/// The address is not one of this host now, or somebody else listens there.
+class CannotListen : public std::runtime_error
+{
+public:
+    using std::runtime_error::runtime_error;
+};
+
 /// Answers from the time it is made, on threads of its own, until it is destroyed.
 class Server
 {
 public:
-    /// Throws std::runtime_error where it cannot listen, or would do so for other hosts without users and TLS.
+    /// Throws CannotListen, and std::runtime_error for what it cannot use, or where it would listen for other hosts
+    /// without users and TLS.
     Server(Site site, const ServerOptions& options);
     ~Server();
     Server(const Server&) = delete;

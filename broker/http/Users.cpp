@@ -4,6 +4,8 @@
 
 #include <algorithm>
 #include <fstream>
+#include <memory>
+#include <semaphore>
 #include <stdexcept>
 
 #include <crypt.h>
@@ -32,8 +34,39 @@ std::optional<std::string> fromBase64(std::string_view text)
     return bytes;
 }
 
+struct Credentials
+{
+    std::string name, password;
+};
+
+std::optional<Credentials> credentialsIn(std::string_view authorization)
+{
+    constexpr std::string_view scheme = "Basic ";
+    if (authorization.size() < scheme.size() || !broker::sameName(authorization.substr(0, scheme.size()), scheme))
+        return std::nullopt;
+    const std::optional<std::string> pair = fromBase64(authorization.substr(scheme.size()));
+    const std::size_t mark = pair ? pair->find(':') : std::string::npos;
+    if (mark == std::string::npos || pair->find('\0') != pair->npos)
+        return std::nullopt;
+    return Credentials{pair->substr(0, mark), pair->substr(mark + 1)};
+}
+
+/// The hosts that are managed here have other work than to check the passwords of those who try many.
+constexpr std::ptrdiff_t mostChecks = 4;
+std::counting_semaphore<mostChecks> checks{mostChecks};
+
+/// Whether a password can have it; "!" and its like lock a user out.
+bool isHash(const std::string& text)
+{
+    crypt_data room{};
+    const char* some = crypt_r("", text.c_str(), &room);
+    return some && *some != '*';
+}
+
 bool isHashOf(const std::string& password, const std::string& hash)
 {
+    checks.acquire();
+    const std::unique_ptr<void, void (*)(void*)> seat(&checks, [](void*) { checks.release(); });
     crypt_data room{};
     const char* same = crypt_r(password.c_str(), hash.c_str(), &room);
     return same && *same != '*' && hash.size() == std::string_view(same).size() &&
@@ -69,24 +102,28 @@ Users::Users(const std::string& file)
     }
     if (_entries.empty())
         throw std::runtime_error("there is no user in '" + file + "'");
+    const auto like = std::ranges::find_if(_entries, [](const auto& entry) { return isHash(entry.second.hash); });
+    if (like != _entries.end())
+        _likeness = like->second.hash;
 }
 
 std::optional<User> Users::admit(std::string_view authorization) const
 {
-    constexpr std::string_view scheme = "Basic ";
-    if (authorization.size() < scheme.size() || !broker::sameName(authorization.substr(0, scheme.size()), scheme))
+    const std::optional<Credentials> given = credentialsIn(authorization);
+    if (!given)
         return std::nullopt;
-    const std::optional<std::string> pair = fromBase64(authorization.substr(scheme.size()));
-    const std::size_t mark = pair ? pair->find(':') : std::string::npos;
-    if (mark == std::string::npos || pair->find('\0') != pair->npos)
-        return std::nullopt;
-    // A name that nobody has takes as long as one that somebody has.
-    static const std::string nobody = "$6$nobody$";
-    const auto known = _entries.find(std::string_view(*pair).substr(0, mark));
-    const bool same = isHashOf(pair->substr(mark + 1), known == _entries.end() ? nobody : known->second.hash);
+    // A name that nobody has takes as long as one that somebody has, by whatever method the hashes are made.
+    const auto known = _entries.find(given->name);
+    const bool same = isHashOf(given->password, known == _entries.end() ? _likeness : known->second.hash);
     if (!same || known == _entries.end())
         return std::nullopt;
     return User{known->first, known->second.mayChange};
+}
+
+std::string Users::nameIn(std::string_view authorization)
+{
+    const std::optional<Credentials> given = credentialsIn(authorization);
+    return given ? given->name : std::string();
 }
 
 } // namespace http

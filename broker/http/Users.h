@@ -28,8 +28,11 @@ public:
     bool empty() const { return _entries.empty(); }
     /// Whether others can try passwords on the hashes, since they may read the file.
     bool readByOthers() const { return _readByOthers; }
-    /// The one whom an Authorization header names with his password (RFC 7617).
+    /// The one whom an Authorization header names with his password (RFC 7617). A few passwords are checked at a time,
+    /// since that is made to take long; the others wait.
     std::optional<User> admit(std::string_view authorization) const;
+    /// The name in the header, of whoever it may be; empty where there is none.
+    static std::string nameIn(std::string_view authorization);
 
 private:
     struct Entry
@@ -38,6 +41,7 @@ private:
         bool mayChange;
     };
     std::map<std::string, Entry, std::less<>> _entries;
+    std::string _likeness; ///< a hash that a password can have, of any entry
     bool _readByOthers = false;
 };
 

@@ -33,8 +33,9 @@ inline constexpr int exitUsage = 2;
 inline constexpr int exitViolation = 3;
 inline constexpr int exitRefusal = 4; ///< of a method, by its return value
 inline constexpr int exitTestFailed = 5;
-inline constexpr int exitOutputLost = 6; ///< of a command that went well otherwise
-inline constexpr int exitIncomplete = 7; ///< something that the provider needs is missing
+inline constexpr int exitOutputLost = 6;  ///< of a command that went well otherwise
+inline constexpr int exitIncomplete = 7;  ///< something that the provider needs is missing
+inline constexpr int exitUnavailable = 8; ///< an address to listen on, or memory: a later start may have it
 
 /// Help goes to standard output, errors to standard error with exit code 2.
 CommandLine parseCommandLine(int argc, const char* const* argv);

@@ -44,6 +44,13 @@ public:
     using std::runtime_error::runtime_error;
 };
 
+/// What the command needs is not there now, and may be later.
+class Unavailable : public std::runtime_error
+{
+public:
+    using std::runtime_error::runtime_error;
+};
+
 /// One command with its arguments; what a command does not use stays empty.
 struct Command
 {

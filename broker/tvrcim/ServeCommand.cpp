@@ -68,6 +68,18 @@ http::Site sitesOf(Session& session)
     return site;
 }
 
+http::Server listen(Session& session, const http::ServerOptions& options)
+{
+    try
+    {
+        return http::Server(sitesOf(session), options);
+    }
+    catch (const http::CannotListen& error)
+    {
+        throw Unavailable(error.what());
+    }
+}
+
 } // namespace
 
 void serve(Session& session, const Command& command)
@@ -76,7 +88,7 @@ void serve(Session& session, const Command& command)
     const http::ServerOptions options = optionsOf(session, command);
     cimxml::describePort(session.broker);
     const Interruptible interruptible(session.signals);
-    const http::Server server(sitesOf(session), options);
+    const http::Server server = listen(session, options);
     const bool bracketed = options.address.find(':') != std::string::npos;
     session.out << "listening on " << (options.certificate.empty() ? "http" : "https") << "://"
                 << (bracketed ? "[" + options.address + "]" : options.address) << ':' << server.port() << std::endl;

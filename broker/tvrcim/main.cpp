@@ -8,8 +8,10 @@
 #include <cstdlib>
 #include <exception>
 #include <iostream>
+#include <new>
 #include <optional>
 #include <string_view>
+#include <system_error>
 
 #include <unistd.h>
 
@@ -114,6 +116,14 @@ int run(const Settings& settings)
     return exitCode;
 }
 
+/// Whether a later start may do better.
+bool mayPass(const std::exception& error)
+{
+    const auto* ofSystem = dynamic_cast<const std::system_error*>(&error); // a thread that cannot be started
+    return dynamic_cast<const Unavailable*>(&error) || dynamic_cast<const std::bad_alloc*>(&error) ||
+           (ofSystem && ofSystem->code() == std::errc::resource_unavailable_try_again);
+}
+
 int parseAndRun(int argc, char** argv)
 {
     const CommandLine line = parseCommandLine(argc, argv);
@@ -125,7 +135,7 @@ int parseAndRun(int argc, char** argv)
     }
     catch (const std::exception& error)
     {
-        return report(error.what(), exitUsage);
+        return report(error.what(), mayPass(error) ? exitUnavailable : exitUsage);
     }
 }
 

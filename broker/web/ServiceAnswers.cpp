@@ -1,6 +1,7 @@
 // Logs, diagnostic tests, and methods that are called.
 #include "broker/host/LogEntries.h"
 #include "broker/host/ReadableText.h"
+#include "broker/http/Journal.h"
 #include "broker/values/PathText.h"
 #include "broker/values/SchemaText.h"
 #include "broker/values/ValueMap.h"
@@ -9,7 +10,6 @@
 #include "broker/web/Body.h"
 
 #include <algorithm>
-#include <iostream>
 #include <map>
 
 namespace web
@@ -300,15 +300,6 @@ Json outTexts(const Call& call, const std::vector<Property>& out)
     return texts;
 }
 
-/// A line for the journal.
-void tell(const http::Caller& caller, const Call& call, const std::string& result)
-{
-    constexpr std::size_t longestPath = 500;
-    std::cerr << oneLine(caller.user + " called " + call.info.name + "." + call.method.name + " on " +
-                         fullPathText(call.path).substr(0, longestPath) + ": " + result) +
-                     "\n";
-}
-
 } // namespace
 
 std::string logs(const Question& question)
@@ -368,7 +359,8 @@ std::string call(const Question& question)
     const Call call = callOf(state, parseBody(question.request.body));
     const MethodReply reply = state.broker.invokeMethod(call.path, call.method.name, call.in);
     state.dropKept();
-    tell(question.caller, call, reply.ok() ? valueText(reply.returnValue) : statusName(reply.status));
+    http::tellChange(question.caller, "called " + call.info.name + "." + call.method.name + " on", call.path,
+                     reply.ok() ? valueText(reply.returnValue) : statusName(reply.status));
     checked(static_cast<const Outcome&>(reply));
     const std::string_view meaning = valueName(valueNames(call.info, call.method.name), reply.returnValue);
     return jsonText({{"returnValue", toJson(reply.returnValue)},

@@ -115,22 +115,62 @@ TEST(Installation, HasAllFilesAndRuns)
     EXPECT_EQ(pages.out, "");
 }
 
-/// Of a service that is exposed less than most (systemd-analyze(1) calls 5 medium), in words that systemd knows.
+const std::string unit = "lib/systemd/system/tavrin-fc-serve.service";
+
+/// Installed below the folder, as the administrator of a host does without a package.
+std::string installBelow(const Folder& root)
+{
+    const Answer install =
+        runCommand("(" TVR_CMAKE " --install " TVR_BUILD " --prefix " + root / "usr/local" + " 2>&1)");
+    EXPECT_EQ(install.exitCode, 0) << install.out;
+    return root / "usr/local/" + unit;
+}
+
+/// Of a service that is exposed less than most (systemd-analyze(1) calls 5 medium), in words that systemd knows, with a
+/// program that is there.
 TEST(Installation, ServiceIsKnownAndHardened)
 {
     const Folder root;
-    ASSERT_EQ(
-        runCommand("(DESTDIR=" + root.path() + " " TVR_CMAKE " --install " TVR_BUILD " --prefix /usr 2>&1)").exitCode,
-        0);
-    const std::string unit = root / "usr/lib/systemd/system/tavrin-fc-serve.service";
-    // The program is looked for on the machine.
-    ASSERT_EQ(runCommand("sed -i 's#=/usr/bin/tvrcim#=" + root / "usr/bin/tvrcim" + "#' " + unit).exitCode, 0);
-    const Answer verified = runCommand("systemd-analyze verify --man=no --recursive-errors=no " + unit + " 2>&1");
+    const std::string file = installBelow(root);
+    const Answer verified = runCommand("systemd-analyze verify --man=no --recursive-errors=no " + file + " 2>&1");
     EXPECT_EQ(verified.exitCode, 0) << verified.out;
     EXPECT_EQ(verified.out, "");
     const Answer judged =
-        runCommand("systemd-analyze security --offline=yes --no-pager --threshold=40 " + unit + " 2>&1");
+        runCommand("systemd-analyze security --offline=yes --no-pager --threshold=40 " + file + " 2>&1");
     EXPECT_EQ(judged.exitCode, 0) << judged.out;
+}
+
+/// The mounts that the unit asks for, made by a shell: what of these folders the service could write. The module takes
+/// a root that is read-only for a host without a disk.
+TEST(Installation, ServiceWritesNoMoreThanItNeedsOnARootThatIsWritable)
+{
+    const Folder root;
+    const std::string file = installBelow(root);
+    root.write("mounts", R"sh(
+set -e
+setting() { sed -n "s/^$1=//p" "$unit" | tr ' ' '\n' | sed 's/^-//; s#^%S/#/var/lib/#'; }
+remount() { while read -r path; do
+    [ -e "$path" ] || continue
+    [ "$path" = / ] || mount --rbind "$path" "$path"
+    mount -o "remount,bind,$1" "$path"
+done; }
+mount -t tmpfs none /var
+mkdir -p /var/lib/tavrin-fc-provider/serve /var/log
+case $(setting ProtectSystem) in
+strict) fixed=/ ;;
+full) fixed='/usr /boot /efi /etc' ;;
+esac
+{ printf '%s\n' $fixed; setting ReadOnlyPaths; } | remount ro
+setting ReadWritePaths | remount rw
+for path in / /etc /usr /opt /srv /run /var /var/lib /var/lib/tavrin-fc-provider/serve /var/log /tmp; do
+    echo "$path $(findmnt -n -o VFS-OPTIONS -T "$path" | tail -n 1 | cut -c 1-2)"
+done
+)sh");
+    const Answer seen =
+        runCommand("own=; [ $(id -u) = 0 ] || own=-r; unit=" + file + " unshare -m $own sh " + root / "mounts");
+    EXPECT_EQ(seen.exitCode, 0) << seen.err;
+    EXPECT_EQ(seen.out, "/ rw\n/etc ro\n/usr ro\n/opt ro\n/srv ro\n/run ro\n/var ro\n/var/lib ro\n"
+                        "/var/lib/tavrin-fc-provider/serve rw\n/var/log rw\n/tmp rw\n");
 }
 
 TEST(Package, DebHasAllFilesAndRuns)
@@ -148,6 +188,7 @@ TEST(Package, DebHasAllFilesAndRuns)
     const Answer control = runCommand("dpkg-deb -f " + package);
     EXPECT_THAT(control.out,
                 AllOf(HasSubstr("Package: tavrin-fc-provider\n"), HasSubstr("Version: " TVR_VERSION "\n")));
+    EXPECT_THAT(textOf(root / "usr/" + unit), HasSubstr("\nExecStart=/usr/bin/tvrcim "));
     // Not the libraries that the simulator stands in for.
     EXPECT_THAT(control.out, AllOf(HasSubstr("Depends: libc6"), Not(HasSubstr("hbaapi"))));
     EXPECT_THAT(runCommand("dpkg-deb -e " + package + " " + root / "control && ls " + root / "control").out,
@@ -163,12 +204,15 @@ TEST(Package, RpmHasAllFilesAndClaimsNoForeignLibrary)
     EXPECT_EQ(filesBelow(root.path()), expectedFiles("usr/lib64/cmpi"));
     expectToolRuns(root.path(), "usr/lib64/cmpi");
 
+    EXPECT_THAT(textOf(root / "usr/" + unit), HasSubstr("\nExecStart=/usr/bin/tvrcim "));
+
     const std::string query = "rpm --dbpath " + root / "db" + " -qp ";
     EXPECT_THAT(runCommand(query + "--provides --requires " + package).out,
                 AllOf(HasSubstr("tavrin-fc-provider = " TVR_VERSION), HasSubstr("libc.so.6"), Not(HasSubstr("HBAAPI")),
                       Not(HasSubstr("rmapi")), Not(HasSubstr("tvrsim"))));
     EXPECT_THAT(runCommand(query + "--scripts " + package).out,
-                AllOf(HasSubstr("postinstall scriptlet"), HasSubstr("preuninstall scriptlet")));
+                AllOf(HasSubstr("postinstall scriptlet"), HasSubstr("preuninstall scriptlet"),
+                      HasSubstr("postuninstall scriptlet")));
 }
 
 } // namespace

@@ -1,4 +1,6 @@
 // The port as wbemcli sees it, beside what the tool prints of the same host in its own process.
+#include "tests/support/Eventually.h"
+#include "tests/support/Semaphores.h"
 #include "tests/system/Serving.h"
 
 #include <gmock/gmock.h>
@@ -6,6 +8,8 @@
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
+#include <fstream>
+#include <future>
 #include <map>
 #include <regex>
 #include <sstream>
@@ -394,5 +398,28 @@ TEST_P(Serve, NamespacesAreWhatTheyAre)
 
 INSTANTIATE_TEST_SUITE_P(Over, Serve, testing::Values(!overTls, overTls),
                          [](const auto& tested) { return tested.param == overTls ? "Tls" : "Http"; });
+
+/// A library that works on an adapter is not left in the midst of it, and whoever asked for that is told how it went.
+TEST(ServeEnd, TheCallThatRunsIsAnsweredFirst)
+{
+    const Folder folder;
+    Json slow = Json::parse(textOf(TVR_SCENARIOS "/lanes.json"));
+    slow["faults"] = {{{"function", "LRM_ResetHBA"}, {"delayMs", 3000}}}; // longer than any other end takes
+    std::ofstream(folder.file("slow.json")) << slow;
+    Serving server({"--scenario", folder.file("slow.json")});
+    const std::string names = ofTool(host + "enum TVRHBA_SoftwareInstallationService --names");
+    const std::string service = "/" + names.substr(0, names.find('\n'));
+    auto reset = std::async(
+        std::launch::async,
+        [&]
+        {
+            return server.wbemcli(
+                "cm", service, "'ResetHBA.Target=localhost/root/tavrin:TVRHBA_FCPort.DeviceID=\"1000027A51320E00\"'");
+        });
+    // Nobody else has the module asked for anything.
+    ASSERT_TRUE(test_support::eventually([&] { return test_support::semaphoresOf(server.process()) > 0; }));
+    EXPECT_EQ(server.end(), 0);
+    EXPECT_THAT(reset.get().out, EndsWith(" ResetHBA: 0\n"));
+}
 
 } // namespace

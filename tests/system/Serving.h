@@ -47,6 +47,7 @@ public:
     /// A path that the server gave, without its host.
     static std::string withoutHost(const std::string& line) { return line.substr(line.find('/')); }
     long memory() const { return _tool.memory(); } ///< KiB
+    pid_t process() const { return _tool.process(); }
     int end();
 
 private:

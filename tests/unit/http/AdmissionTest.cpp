@@ -1,13 +1,17 @@
 // Who is let in where, by the head of a request alone.
 #include "broker/http/Admission.h"
+#include "broker/http/Journal.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <ctime>
 #include <filesystem>
 #include <fstream>
 #include <set>
 
+#include <crypt.h>
 #include <unistd.h>
 
 using namespace http;
@@ -28,17 +32,22 @@ const std::pair<std::string, std::string> json{"Content-Type", "application/json
 const std::pair<std::string, std::string> length{"Content-Length", "2"};
 const std::pair<std::string, std::string> cim{"CIMOperation", "MethodCall"};
 
-Users someUsers()
+Users usersOf(const std::string& lines)
 {
     const std::string file = testing::TempDir() + "admission-users-" + std::to_string(getpid());
-    std::ofstream(file)
-        << "joe:$6$salt$egUxKNxDs8kPfh8iPMNcosMhb2eWah6d3R44JDm5Rj/j/XWR5E33QPd0YmHXoDHOIDR6kL5D3JcQcz0O8FHE00\n"
-        << "rea:$6$salt$egUxKNxDs8kPfh8iPMNcosMhb2eWah6d3R44JDm5Rj/j/"
-           "XWR5E33QPd0YmHXoDHOIDR6kL5D3JcQcz0O8FHE00:reader\n";
+    std::ofstream(file) << lines;
     fs::permissions(file, fs::perms::owner_read | fs::perms::owner_write);
     const Users users(file);
     fs::remove(file);
     return users;
+}
+
+Users someUsers()
+{
+    return usersOf(
+        "joe:$6$salt$egUxKNxDs8kPfh8iPMNcosMhb2eWah6d3R44JDm5Rj/j/XWR5E33QPd0YmHXoDHOIDR6kL5D3JcQcz0O8FHE00\n"
+        "rea:$6$salt$egUxKNxDs8kPfh8iPMNcosMhb2eWah6d3R44JDm5Rj/j/"
+        "XWR5E33QPd0YmHXoDHOIDR6kL5D3JcQcz0O8FHE00:reader\n");
 }
 
 const Site site = {
@@ -221,6 +230,41 @@ TEST(Admission, KnowsTheAddressesOfThisHost)
     for (const char* address :
          {"", "0.0.0.0", "128.0.0.1", "::", "127.0.0.1.", "127.1", "LOCALHOST.evil", "10.0.0.127"})
         EXPECT_FALSE(isOfThisHost(address)) << address;
+}
+
+/// Whoever measures how long a refusal takes learns no names, whatever the passwords' hashes cost.
+TEST(Admission, ANameThatNobodyHasTakesAsLong)
+{
+    crypt_data room{};
+    const std::string costly = crypt_r("secret", "$6$rounds=200000$salt$", &room);
+    const Users users = usersOf("a:!locked\njoe:" + costly + "\n");
+    const auto timeOf = [&](const std::string& header)
+    {
+        const std::clock_t begin = std::clock(); // of the processor
+        EXPECT_FALSE(users.admit(header));
+        return std::clock() - begin;
+    };
+    const std::clock_t known = timeOf(wrong.second);
+    EXPECT_GT(timeOf("Basic amltOnNlY3JldA=="), known / 2);
+}
+
+TEST(Admission, WhoTriesManyPasswordsDoesNotFillTheJournal)
+{
+    RefusedLogins logins;
+    const RefusedLogins::Clock::time_point begin = RefusedLogins::Clock::now();
+    const auto linesOfTen = [&](int seconds)
+    {
+        testing::internal::CaptureStderr();
+        for (int i = 0; i < 10; i++)
+            logins.tell("192.0.2.1", std::string(100000, 'x'), begin + std::chrono::seconds(seconds));
+        const std::string lines = testing::internal::GetCapturedStderr();
+        EXPECT_LT(lines.size(), 2000U);
+        return std::ranges::count(lines, '\n');
+    };
+    EXPECT_EQ(linesOfTen(0), 10);
+    EXPECT_EQ(linesOfTen(59), 0);
+    EXPECT_EQ(linesOfTen(61), 1 + 10) << "with how many there were";
+    EXPECT_EQ(linesOfTen(200), 10);
 }
 
 } // namespace
