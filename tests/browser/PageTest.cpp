@@ -65,6 +65,36 @@ protected:
         browser.awaitText("#session", "Logged in as joe");
     }
 
+    /// Has the page see other answers of /api/`path` than come: `change` is the body of a function of `answer`.
+    void changeAnswers(const std::string& path, const std::string& change)
+    {
+        browser.runBeforePages("const asked = window.fetch; window.fetch = async (url, options) => {"
+                               "const response = await asked(url, options);"
+                               "if (url !== '/api/" +
+                               path + "') return response; const answer = await response.json();" + change +
+                               "; return new Response(JSON.stringify(answer)); };");
+    }
+
+    /// Calls a method of the provider's log as joe, with the page's own means.
+    void callOfLog(const std::string& method, const std::string& in)
+    {
+        browser.run("return (async () => { const {ask, call, logIn} = await import('./api.js');"
+                    "await logIn('joe', 'secret');"
+                    "const {path} = (await ask('logs')).find((log) => log.id === 'provider');"
+                    "await call(path, '" +
+                    method + "', " + in + "); })()");
+    }
+
+    /// Twice, before anything can come of the first.
+    void clickTwice(const std::string& text)
+    {
+        const std::string button =
+            "[...document.querySelectorAll('main button')].find((each) => each.textContent.startsWith('" + text + "'))";
+        browser.await(button);
+        browser.run("const button = " + button + "; button.click(); button.click()");
+        browser.await("!" + button + "?.hasAttribute('aria-disabled')");
+    }
+
     void awaitHeading(const std::string& text) { browser.awaitText("h1", text); }
 
     /// Of a table, of which the last row is there within a second.
@@ -129,8 +159,93 @@ TEST_F(Page, PictureHasEachTargetOnceAndSaysWhatPortsAre)
     };
     EXPECT_THAT(labelOf(upPort), AllOf(HasSubstr("up, 8 Gbit/s"), HasSubstr("fabric 1000063D2000A001")));
     EXPECT_THAT(labelOf(downPort), HasSubstr("LINK DOWN"));
-    EXPECT_THAT(labelOf("50063D200110000A"), HasSubstr("units, "));
     EXPECT_THAT(labelOf("2001027A51320240"), StartsWith("Virtual port"));
+
+    // Targets and units lead on.
+    EXPECT_EQ(browser.run("return document.querySelectorAll('.picture .lead').length"), 7);
+    browser.click("[aria-label='Volume Storage Volume: 1, 500 GiB']");
+    awaitHeading("Storage volume");
+    browser.run("history.back()");
+    browser.click(".picture a.target .title");
+    awaitHeading("SCSI protocol endpoint");
+    browser.awaitText("h1", "50063D200110000A");
+    expectPeace();
+}
+
+// Ports that no card holds, and one target of which they see different units, too many to list.
+constexpr const char* withoutCards = R"js(
+    const node = (kind, name, more) => ({kind, name, path: kind + '.Name="' + name + '"', facts: [], problems: [], units: 0,
+      bytes: 0, contents: null, children: [], ...more});
+    const target = (units) => node("Target", "50063D200110000A", {wwpn: "50063D200110000A", units, contents: units + " units"});
+    answer.problems = [];
+    answer.failures = ["TVRHBA_Card: CIM_ERR_FAILED"];
+    answer.root = node("Computer system", "h", {children: [node("FC port", "A", {children: [target(2)]}),
+      node("FC port", "B", {children: [target(64)]}), node("Virtual port", "V", {})]});)js";
+
+TEST_F(Page, DoesNotSayThatAllIsWellOfWhatItCannotSee)
+{
+    serve({"--scenario", TVR_SCENARIOS "/empty.json"});
+    visit();
+    browser.awaitText("#problems", "knows no port");
+    EXPECT_FALSE(browser.run("return Boolean(document.querySelector('.notice.ok'))").get<bool>());
+
+    changeAnswers("host", withoutCards);
+    browser.run("location.reload()");
+    browser.awaitText(".failures", "TVRHBA_Card: CIM_ERR_FAILED");
+    EXPECT_THAT(browser.textOf("#problems"), HasSubstr("Not all of the host could be read"));
+    EXPECT_FALSE(browser.run("return Boolean(document.querySelector('.notice.ok'))").get<bool>());
+    for (const int width : {1280, 360})
+    {
+        browser.resize(width, 800);
+        browser.await("Math.abs(document.querySelector('.picture svg').clientWidth - document.querySelector('.picture')"
+                      ".clientWidth) < 2");
+        EXPECT_EQ(
+            browser.run("return [...document.querySelectorAll('.picture .title')].map((each) => each.textContent)"),
+            Json({"A", "B", "V", "50063D200110000A"}))
+            << width;
+    }
+    browser.click(".picture .lead");
+    awaitHeading("CIM_StorageExtent");
+    browser.await("document.querySelector('#find').value === '50063D200110000A'");
+    browser.awaitText("#count", "0 instances");
+}
+
+TEST_F(Page, KeepsFocusAndFoldsWhenItLooksAgain)
+{
+    serve();
+    changeAnswers(
+        "host",
+        "window.looks = (window.looks ?? 0) + 1; answer.root.facts.push({label: 'looks', text: String(looks)}); "
+        "answer.problems.push({severity: 'warning', text: 'LOOK ' + looks, kind: 'x', name: 'x', path: null})");
+    visit();
+    browser.awaitText("#problems", "LOOK 1");
+    browser.run("document.querySelector('main summary').click()");
+    for (const char* place : {"#problems a", "main details a", ".picture a.card", "main summary"})
+    {
+        const std::string query = "document.querySelector('" + std::string(place) + "')";
+        const int looks = browser.run(query + ".focus(); return looks");
+        browser.run(
+            "[...document.querySelectorAll('main button')].find((each) => each.textContent === 'Read again').click()");
+        browser.awaitText("#problems", "LOOK " + std::to_string(looks + 1));
+        EXPECT_TRUE(browser.run("return document.activeElement === " + query).get<bool>()) << place;
+        EXPECT_TRUE(browser.run("return document.querySelector('main details').open").get<bool>()) << place;
+    }
+}
+
+/// A page that is opened where nobody looks, and looks again only when it must.
+TEST_F(Page, ReadsAtOnceWhenSomebodyLooks)
+{
+    serve();
+    browser.runBeforePages(
+        "let away = true; Object.defineProperty(document, 'hidden', {get: () => away});"
+        "window.arrive = () => { away = false; document.dispatchEvent(new Event('visibilitychange')); };"
+        "const later = window.setTimeout;"
+        "window.setTimeout = (act, time) => time < 10000 ? later(act, time) : 0;");
+    visit();
+    browser.awaitText("#session", "Not logged in");
+    EXPECT_EQ(browser.run("return performance.getEntriesByName(location.origin + '/api/host').length"), 0);
+    browser.run("arrive()");
+    browser.awaitText("#problems", "LINK DOWN");
 }
 
 /// More bytes than a number of the browser counts.
@@ -141,7 +256,7 @@ TEST_F(Page, ShowsAHostOfManyPebibytes)
         "adapters": [{"name": "Tavrin-A", "serialNumber": "1", "model": "M", "attributes": {"functionType": 0},
                       "ports": [{"wwpn": "1000000000000001", "targets": ["t"]}]}]})");
     visit();
-    browser.awaitText(".picture", "16.0 PiB");
+    browser.awaitText(".picture", "16 PiB");
     expectPeace();
 }
 
@@ -162,6 +277,7 @@ TEST_F(Page, FollowsAssociationsToAUnitAndBack)
     follow("SCSI protocol initiator endpoint");
     follow("Storage volume");
     browser.awaitText("main", "100 GiB");
+    EXPECT_THAT(browser.textOf("main"), Not(HasSubstr("512 bytes 512")));
     browser.keepPicture("unit");
     follow("SCSI protocol initiator endpoint");
     browser.run("history.go(-3)");
@@ -222,6 +338,9 @@ TEST_F(Page, PlotsCountersAndMarksErrorsThatGrow)
     ASSERT_EQ(errors.size(), 2U);
     EXPECT_THAT(errors[0].get<std::string>(), Not(HasSubstr("grows")));
     EXPECT_THAT(errors[1].get<std::string>(), HasSubstr("grows, +"));
+    EXPECT_FALSE(
+        browser.run("return Boolean(document.querySelector('#panels .critical, #growing .critical'))").get<bool>())
+        << "as bad as the start of the page says";
     EXPECT_THAT(browser.textOf("#growing"), HasSubstr("CRC errors of 1000027A51320D01"));
     EXPECT_GE(browser.run("return document.querySelector('[data-counter=BytesReceived] polyline').points.length"), 3);
     EXPECT_THAT(browser.textOf("[data-counter=BytesReceived]"), HasSubstr("B/s"));
@@ -293,6 +412,15 @@ TEST_F(Page, ChangesNamesOfAPortForThoseWhoMay)
     browser.await("!document.querySelector('dialog')");
     EXPECT_EQ(browser.textOf(":focus"), "Call …");
     EXPECT_THAT(browser.textOf("#returned"), HasSubstr("Completed (0)"));
+
+    // A form outlives a refusal and another login.
+    ask("0000000000000000");
+    browser.clickText("Call ChangeWWN", "dialog");
+    browser.awaitText("#returned", "(40005)");
+    browser.clickText("Log out");
+    browser.awaitText("#session", "Not logged in");
+    logInToChange();
+    EXPECT_EQ(browser.run("return document.querySelector('[name=NewWWPN]')?.value"), "0000000000000000");
 }
 
 TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
@@ -367,6 +495,9 @@ TEST_F(Page, ClearsALogWhenAsked)
 
     browser.clickText("Logs");
     browser.awaitText("#entries", "FC Record Logs enabled");
+    clickTwice("Read again");
+    EXPECT_EQ(browser.run("return document.querySelector('#count').innerText.split(' ')[0]"),
+              browser.run("return String(document.querySelector('#entries').children.length)"));
     browser.clickText("Clear …");
     browser.awaitText("dialog", "Clear the log of the provider?");
     browser.clickText("Cancel", "dialog");
@@ -377,6 +508,12 @@ TEST_F(Page, ClearsALogWhenAsked)
     browser.awaitText("#entries", "Cleared all the logs");
     browser.keepPicture("log-cleared");
     EXPECT_THAT(browser.textOf("#entries"), Not(HasSubstr("FC Record Logs enabled")));
+
+    browser.clickText("Driver");
+    browser.awaitText("#disabled", "has not been read");
+    browser.clickText("Enable it …");
+    awaitHeading("Request the state change");
+    browser.awaitText("main", "Driver Record Log");
     expectPeace();
 }
 
@@ -407,6 +544,18 @@ TEST_F(Page, RunsDiagnosticTestsToTheirEnds)
     browser.awaitText("#records", "Resulted with Success");
     browser.run("document.querySelector('#records').scrollIntoView({block: 'end'})");
     browser.keepPicture("records");
+
+    // The test of a link goes on after its call, and says too early that it has ended.
+    browser.click("button[aria-label='Run D-Port Test on 1000027A51320603']");
+    browser.clickText("Run", "dialog");
+    browser.awaitText("[data-port='1000027A51320603']", "D-Port Test goes on");
+    browser.awaitText("#jobs", "no result yet");
+    browser.click("button[aria-label='Cancel D-Port Test on 1000027A51320603']");
+    browser.awaitText("dialog h2", "Cancel the D-Port Test on port 1000027A51320603?");
+    browser.clickText("Cancel the test", "dialog");
+    browser.awaitText("#jobs", "Terminated");
+    browser.await("!document.querySelector('[aria-label^=\"Cancel D-Port\"]')");
+
     browser.click("#records a");
     browser.awaitText("main", "CompletionState");
     expectPeace();
@@ -435,9 +584,7 @@ TEST_F(Page, ShowsHostileNamesAsTexts)
     awaitHeading("<script>hit()</script>");
     browser.awaitText("main", "<iframe src=javascript:hit()>");
     browser.await("document.querySelectorAll('#associations a').length > 0");
-    for (const char* view : {"ports", "classes/TVRHBA_Product", "classes/TVRHBA_SoftwareIdentity",
-                             "classes/TVRHBA_StorageVolume", "object/TVRHBA_Card.Tag=%3Cimg%20src=x%20onerror=hit()%3E",
-                             "classes/%3Cimg%20src=x%20onerror=hit()%3E", "methods/%22%3E%3Cb%3E/x", "%3Cb%3E"})
+    const auto look = [&](const char* view)
     {
         visit(view);
         browser.await("document.querySelector('h1') && !document.querySelector('[aria-busy]')");
@@ -446,7 +593,23 @@ TEST_F(Page, ShowsHostileNamesAsTexts)
         EXPECT_EQ(browser.run(foreign), 0) << view;
         EXPECT_EQ(browser.run("return hits"), 0) << view;
         EXPECT_EQ(browser.run("return violations"), Json::array()) << view;
-    }
+    };
+    // Addresses of what there is not.
+    for (const char* view :
+         {"object/TVRHBA_Card.Tag=%3Cimg%20src=x%20onerror=hit()%3E", "classes/%3Cimg%20src=x%20onerror=hit()%3E",
+          "methods/%22%3E%3Cb%3E/x", "%3Cb%3E", "classes/%E2%80%AEdrac"})
+        look(view);
+    EXPECT_THAT(browser.run("return document.title").get<std::string>(), StartsWith("\\u202edrac"));
+    EXPECT_THAT(browser.complaints(), Each(HasSubstr("responded with a status of 40")));
+
+    // What the log was told last stands in it.
+    for (int times = 0; times < 2; times++)
+        callOfLog("SetLogParams", R"js({LogLevel: 5, LogMode: 1, TracePath: "<img src=x onerror=hit()>\u202e"})js");
+    visit("logs");
+    browser.awaitText("#entries", "<img src=x onerror=hit()>");
+    for (const char* view : {"ports", "logs", "diagnostics", "methods", "classes/TVRHBA_Product",
+                             "classes/TVRHBA_SoftwareIdentity", "classes/TVRHBA_StorageVolume"})
+        look(view);
     visit("classes/TVRHBA_Product");
     browser.awaitText(".grid", "\\u202edeppilf");
     browser.awaitText(".grid", "\\x07bell");
@@ -456,6 +619,7 @@ TEST_F(Page, ShowsHostileNamesAsTexts)
     awaitHeading("Software identity");
     browser.awaitText("main", "VersionString");
     browser.await("!document.querySelector('[aria-busy], .notice')");
+    expectPeace();
 }
 
 TEST_F(Page, WorksWithKeysAlone)
@@ -519,6 +683,11 @@ TEST_F(Page, ScrollsSortsAndSearchesThousandsOfUnits)
     browser.await(column + ".every((name) => name.includes('31'))");
     browser.type("#find", "nothing is called so");
     browser.awaitText("#count", "0 of ");
+
+    visit("classes/TVRHBA_SCSIProtocolInitiatorEndpoint");
+    browser.click(".grid a");
+    clickTwice("Show more (100 of");
+    EXPECT_EQ(browser.run("return document.querySelectorAll('#associations li').length"), 200);
     expectPeace();
 }
 
@@ -572,34 +741,61 @@ TEST_F(Page, FitsNarrowAndDarkScreens)
     expectPeace();
 }
 
-/// Milliseconds from the address to the first text; the best of some, since other work may be going on.
-double firstPaint(Browser& browser, const std::string& url, double wanted)
+double medianOf(std::vector<double> times)
 {
-    double best = 1e9;
-    for (int tries = 0; tries < 10 && best >= wanted; tries++)
-    {
-        browser.open("about:blank");
-        browser.open(url);
-        const char* painted = "performance.getEntriesByName('first-contentful-paint')[0]?.startTime";
-        best = std::min(best, browser.await(painted).get<double>());
-    }
-    return best;
+    std::ranges::nth_element(times, times.begin() + static_cast<std::ptrdiff_t>(times.size() / 2));
+    return times[times.size() / 2];
 }
 
-TEST_F(Page, PaintsAtOnceAndFillsItselfAsAnswersCome)
+class Painting : public Page
+{
+protected:
+    /// Opens the page as one who comes to it: the port has kept nothing for him. The medians of some tries.
+    void look()
+    {
+        browser.runBeforePages("const look = () => { if (document.querySelector('.picture .node')) window.drawn = "
+                               "performance.now(); else requestAnimationFrame(look); }; look();");
+        std::vector<double> texts;
+        std::vector<double> pictures;
+        browser.open(_serving->url());
+        for (int tries = 0; tries < 7; tries++)
+        {
+            browser.await("window.drawn");
+            callOfLog("RequestStateChange", "{RequestedState: 2}"); // what was kept is dropped
+            browser.open("about:blank");
+            browser.open(_serving->url());
+            pictures.push_back(browser.await("window.drawn").get<double>());
+            texts.push_back(browser.run("return performance.getEntriesByName('first-contentful-paint')[0].startTime"));
+        }
+        firstText = medianOf(texts);
+        picture = medianOf(pictures);
+    }
+
+    double firstText = 0; ///< milliseconds from the address on
+    double picture = 0;
+};
+
+// What is promised is that the page itself is there at once; its frame comes first, without an answer of the port. The
+// picture has to wait for that answer, which is a few milliseconds of the provider's here, and about a second of 16,384
+// units. Its bounds leave room for a machine that does other work.
+TEST_F(Painting, DrawsTheHostAtOnce)
 {
     serve();
-    EXPECT_LT(firstPaint(browser, _serving->url(), 200), 200);
+    look();
+    EXPECT_LT(firstText, 200);
+    EXPECT_LT(picture, 500);
     browser.awaitText("#problems", "LINK DOWN");
 }
 
-TEST_F(Page, PaintsAtOnceWithSixteenThousandUnits)
+TEST_F(Painting, DrawsSixteenThousandUnits)
 {
     serveScenario(R"({"generate": {"seed": 3, "adapters": 4, "portsPerAdapter": 2, "targetsPerPort": 16,
                                    "unitsPerTarget": 64}})");
-    EXPECT_LT(firstPaint(browser, _serving->url(), 1000), 1000);
+    look();
+    EXPECT_LT(firstText, 1000);
+    EXPECT_LT(picture, 3000);
     browser.await("document.querySelectorAll('.picture .targets').length === 4");
-    EXPECT_THAT(browser.textOf("main"), HasSubstr("27 more targets\n1728 units"));
+    EXPECT_THAT(browser.textOf("main"), HasSubstr("27 more targets\n2048 units, "));
     browser.keepPicture("large");
     visit("classes/TVRHBA_StorageVolume");
     browser.awaitText("#count", "16384 instances");

@@ -39,9 +39,9 @@ function listOf(classes) {
       body))];
 }
 
-export async function showClasses(visit, name = "") {
+export async function showClasses(visit, name = "", wanted = "") {
   if (name)
-    return showInstances(visit, name);
+    return showInstances(visit, name, wanted);
   const place = make("div", {});
   visit.begin("Classes", place);
   return visit.fill(place, async () => listOf(await ask("classes", {}, visit.signal)));
@@ -69,13 +69,14 @@ async function describe(visit, name, place, choice, changed) {
   replace(choice, namespaceChoice(info.namespaces, changed));
 }
 
-async function showInstances(visit, name) {
+async function showInstances(visit, name, wanted) {
   let namespace = "";
   const about = make("div", {});
   const choice = make("span", {});
   const trouble = make("div", {});
   const count = make("span", {class: "quiet", id: "count", role: "status"}, "Reading …");
-  const find = make("input", {type: "search", id: "find", spellcheck: "false", placeholder: "text of any property"});
+  const find = make("input", {type: "search", id: "find", spellcheck: "false", placeholder: "text of any property",
+    value: wanted});
   const read = (from, rows, sort, descending) => ask("classes/" + encodeURIComponent(name) + "/instances",
     {from, count: rows, sort, descending: descending ? 1 : "", find: find.value, namespace}, visit.signal);
   const told = (answer, problem) => {

@@ -1,12 +1,14 @@
 // The diagnostic tests: what each port can run, what runs, and what came of it.
 
-import {badge, button, link, make, replace, tell} from "./dom.js";
+import {badge, button, link, make, renew, replace, tell} from "./dom.js";
 import {ask, call} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
 import {hrefOfMethod, hrefOfObject, parsePath} from "./paths.js";
-import {failure, section} from "./visit.js";
+import {section, silent, unread} from "./visit.js";
 
 const interval = 2000; // milliseconds
+const linkTest = "TVR:FCHBA D-Port Test"; // the only one that ends later than its call, and can be cancelled
+const terminate = 4; // a state that a job can be asked for
 
 function spokenTest(name) {
   return name.replace(/^TVR:FCHBA /, "");
@@ -29,22 +31,40 @@ function stateOf(name) {
     : /complet|ok/i.test(name) ? "ok" : "quiet";
 }
 
-function jobItem(job) {
+/** A job may say at its beginning that it has ended: a record, an error or a state that only the end brings tell it. */
+function hasEnded(job, records) {
+  return records.some((record) => record.id === job.id) || job.error !== null || /^(terminated|failed)/i.test(job.state);
+}
+
+/** Why a job could not be cancelled is told in `place`. */
+function cancelButton(job, place) {
+  const cancel = async () => {
+    const what = spokenTest(job.name) + " on port " + job.port;
+    const details = make("p", {}, "It leaves no result.");
+    if (!await mayChange() || !await confirmed("Cancel the " + what + "?", details, "Cancel the test"))
+      return;
+    replace(place);
+    const answer = await attempted(place, () => call(job.path, "RequestStateChange", {RequestedState: terminate}));
+    if (answer)
+      tell("The " + what + (Number(answer.returnValue) === 0 ? " is being cancelled"
+        : " cannot be cancelled: " + (answer.returnText ?? answer.returnValue)));
+  };
+  return button("Cancel …", cancel, {"aria-label": "Cancel " + spokenTest(job.name) + " on " + job.port});
+}
+
+function jobItem(job, isOver, place) {
+  const state = isOver || /^running$/i.test(job.state) ? job.state : "no result yet";
   const percent = Number(job.percent);
   const known = Number.isFinite(percent) && job.percent !== null;
   return make("tr", {}, make("th", {scope: "row"}, link(hrefOfObject(job.path), job.name || job.id)),
-    make("td", {}, job.port ?? ""), make("td", {}, badge(stateOf(job.state), job.state)),
+    make("td", {}, job.port ?? ""), make("td", {}, badge(stateOf(state), state)),
     make("td", {}, make("progress", {max: 100, value: known ? percent : null, "aria-label": "Progress of " + job.name}),
-      known ? " " + percent + " %" : ""));
-}
-
-/** A datetime of CIM as people write it. */
-function timeText(time) {
-  return (time ?? "").replace(/^(\d{4})(\d\d)(\d\d)(\d\d)(\d\d)(\d\d)\.\d{6}[+-]\d{3}$/, "$1-$2-$3 $4:$5:$6");
+      known ? " " + percent + " %" : ""),
+    make("td", {}, !isOver && job.name === linkTest ? cancelButton(job, place) : null));
 }
 
 function recordItem(record) {
-  return make("tr", {}, make("td", {class: "time"}, timeText(record.time)),
+  return make("tr", {}, make("td", {class: "time"}, record.time ?? ""),
     make("td", {}, link(hrefOfObject(record.path), spokenTest(record.test || record.id))),
     make("td", {}, record.port ?? ""), make("td", {}, badge(stateOf(record.state), record.state)),
     make("td", {class: "text"}, record.text));
@@ -58,31 +78,34 @@ function tableOf(heads, rows) {
 class Diagnostics {
   constructor(visit) {
     this._visit = visit;
-    this._running = new Map(); // by test and port: what waits for its answer
     this.ports = make("div", {});
     this.now = make("div", {id: "jobs"});
+    this.refusal = make("div", {});
     this.records = make("div", {id: "records"});
     this.trouble = make("div", {});
+    this.unanswered = make("div", {});
     this._offered = "";
   }
 
-  /** The records, or none where they cannot be read. */
   async read() {
     try {
-      const answer = await ask("diagnostics", {}, this._visit.signal);
+      this._show(await ask("diagnostics", {}, this._visit.signal));
       replace(this.trouble);
-      this._offer(answer.tests);
-      replace(this.now, answer.jobs.length ? tableOf(["Job", "Port", "State", "Progress"], answer.jobs.map(jobItem))
-        : make("p", {class: "quiet"}, "No job is known."));
-      replace(this.records, answer.records.length
-        ? tableOf(["Time", "Test", "Port", "Result", "What it came to"], answer.records.map(recordItem))
-        : make("p", {class: "quiet"}, "No test has left a record."));
-      return answer.records;
     } catch (error) {
       if (!this._visit.over)
-        replace(this.trouble, failure(error));
-      return [];
+        replace(this.trouble, unread(error));
     }
+  }
+
+  _show({tests, jobs, records, failures}) {
+    renew(this.unanswered, silent(failures));
+    this._offer(tests);
+    renew(this.now, jobs.length
+      ? tableOf(["Job", "Port", "State", "Progress", ""], jobs.map((job) => jobItem(job, hasEnded(job, records), this.refusal)))
+      : make("p", {class: "quiet"}, "No job is known."));
+    renew(this.records, records.length
+      ? tableOf(["Time", "Test", "Port", "Result", "What it came to"], records.map(recordItem))
+      : make("p", {class: "quiet"}, "No test has left a record."));
   }
 
   /** The buttons stay as they are while the tests do: one of them may have the focus. */
@@ -123,23 +146,32 @@ class Diagnostics {
     tell(name + " " + text);
   }
 
-  /** How bad it is and what there is to say; a test of a link goes on after the call. */
+  /** How bad it is and what there is to say, also when the view was left; a test of a link goes on after the call. */
   async _outcome(answer) {
-    const records = await this.read();
     if (Number(answer.returnValue) !== 0)
       return ["critical", "did not run: " + (answer.returnText ?? answer.returnValue)];
     if (!answer.out.Job)
       return ["critical", "made no job: it cannot run on the port as it is"];
     const id = new Map(parsePath(answer.out.Job).keys).get("InstanceID");
-    const record = records.find((each) => each.id === id);
-    return record ? [stateOf(record.state), "has ended: " + record.state] : ["quiet", "goes on"];
+    let found;
+    try {
+      found = await ask("diagnostics");
+    } catch (error) {
+      return ["warning", "ran, but its result could not be read: " + error.message];
+    }
+    this._show(found);
+    const record = found.records.find((each) => each.id === id);
+    if (record)
+      return [stateOf(record.state), "has ended: " + record.state];
+    const job = found.jobs.find((each) => each.id === id);
+    return job && !hasEnded(job, found.records) ? ["quiet", "goes on"] : ["warning", "has ended without a result"];
   }
 }
 
 export async function showDiagnostics(visit) {
   const diagnostics = new Diagnostics(visit);
-  visit.begin("Diagnostics", diagnostics.trouble, section("Tests", diagnostics.ports), section("Jobs", diagnostics.now),
-    section("Records", diagnostics.records));
+  visit.begin("Diagnostics", diagnostics.trouble, diagnostics.unanswered, section("Tests", diagnostics.ports),
+    section("Jobs", diagnostics.refusal, diagnostics.now), section("Records", diagnostics.records));
   replace(diagnostics.ports, make("p", {class: "quiet", "aria-busy": "true"}, "Reading …"));
   await visit.repeat(() => diagnostics.read(), () => interval);
 }

@@ -11,7 +11,7 @@ const attributeNames = new Set(["autocomplete", "class", "colspan", "d", "domina
 const unseen = /[\u0000-\u001f\u007f-\u009f\u00ad\u061c\u200b-\u200f\u2028-\u202e\u2060-\u2069\ufeff\ufff9-\ufffb]/g;
 
 /** A text as people can see it: what has no shape is written as its number. */
-function visible(text) {
+export function visible(text) {
   return String(text).replace(unseen, (c) => "\\u" + c.charCodeAt(0).toString(16).padStart(4, "0"));
 }
 
@@ -60,12 +60,43 @@ export function replace(node, ...children) {
   return append(node, ...children);
 }
 
+/** What tells a link or a button from others of its place, also when it is made anew. */
+function identityOf(node) {
+  return node.getAttribute("href") ?? node.getAttribute("aria-label") ?? node.textContent;
+}
+
+/** As replace(), of a place that is shown anew now and again: what is equal stays, with what is selected in it; the focus
+ *  goes to the link or button that it was on, and what was unfolded stays so. */
+export function renew(place, ...children) {
+  const fresh = append(place.cloneNode(false), ...children);
+  for (const details of fresh.querySelectorAll("details"))
+    details.open = place.querySelector("details")?.open ?? false;
+  if (fresh.isEqualNode(place))
+    return;
+  const focused = place.contains(document.activeElement) ? identityOf(document.activeElement) : null;
+  place.replaceChildren(...fresh.childNodes);
+  if (focused !== null)
+    [...place.querySelectorAll("a, button, summary")].find((each) => identityOf(each) === focused)?.focus({preventScroll: true});
+}
+
 export function link(href, ...children) {
   return make("a", {href}, ...children);
 }
 
+/** Takes no second click until what the first one began has ended. It is not disabled meanwhile: it would lose the focus. */
 export function button(text, click, attributes = {}) {
-  return make("button", {type: "button", click, ...attributes}, text);
+  const node = make("button", {type: "button", ...attributes}, text);
+  node.addEventListener("click", async (event) => {
+    if (!click || node.hasAttribute("aria-disabled"))
+      return;
+    node.setAttribute("aria-disabled", "true");
+    try {
+      await click(event);
+    } finally {
+      node.removeAttribute("aria-disabled");
+    }
+  });
+  return node;
 }
 
 /** A word with the colour of how bad it is: "ok", "warning", "critical" or "quiet". */

@@ -2,7 +2,7 @@
 
 import {append, link, make, replace} from "./dom.js";
 import {givenByClass} from "./paths.js";
-import {failure} from "./visit.js";
+import {unread} from "./visit.js";
 
 const rowHeight = 30; // pixels, as in the style
 const pageRows = 100;
@@ -49,7 +49,7 @@ export class Grid {
       if (error.name === "AbortError" || series !== this._series)
         return;
       this._pages.delete(page);
-      this._told(null, failure(error));
+      this._told(null, unread(error));
     }
     this.node.removeAttribute("aria-busy");
   }

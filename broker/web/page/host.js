@@ -1,10 +1,10 @@
 // The start: what is wrong with the host, and a picture of it.
 
-import {badge, button, link, make, replace} from "./dom.js";
-import {ask, jsonText} from "./api.js";
+import {badge, button, link, make, renew, replace} from "./dom.js";
+import {ask} from "./api.js";
 import {hrefOfObject} from "./paths.js";
-import {failure, section} from "./visit.js";
-import {pictureOf} from "./topology.js";
+import {section, silent, unread} from "./visit.js";
+import {descendants, pictureOf} from "./topology.js";
 
 const interval = 10000; // milliseconds between two looks at the host
 
@@ -14,19 +14,19 @@ function problemItem(problem) {
     problem.path ? link(hrefOfObject(problem.path), what) : make("span", {}, what));
 }
 
-function problemsOf(host) {
-  const title = host.problems.length === 0 ? "Nothing is wrong"
-    : host.problems.length === 1 ? "1 problem" : host.problems.length + " problems";
-  return section(title, host.problems.length
-    ? make("ul", {class: "problems", id: "problems"}, host.problems.map(problemItem))
-    : make("p", {class: "notice ok", id: "problems"}, "All ports are up and all values within their limits."));
+function noProblem(host) {
+  const notice = (title, style, text) => section(title, make("p", {class: "notice " + style, id: "problems"}, text));
+  if (host.failures.length > 0)
+    return notice("No problem is known", "warning", "Not all of the host could be read.");
+  if (descendants(host.root, "FC port").length === 0)
+    return notice("No ports", "quiet", "The provider knows no port of this host.");
+  return notice("Nothing is wrong", "ok", "All ports are up and all values within their limits.");
 }
 
-function failuresOf(host) {
-  if (!host.failures?.length)
-    return null;
-  return section("Classes that do not answer", make("ul", {class: "problems"},
-    host.failures.map((text) => make("li", {}, badge("warning", "warning"), " ", text))));
+function problemsOf(host) {
+  const {problems} = host;
+  return problems.length === 0 ? noProblem(host) : section(problems.length === 1 ? "1 problem" : problems.length + " problems",
+    make("ul", {class: "problems", id: "problems"}, problems.map(problemItem)));
 }
 
 function factsOf(facts) {
@@ -49,11 +49,11 @@ function hasCards(node) {
 
 /** Fills the places with a host; the picture is made for the width that there is. */
 function paint(places, host) {
-  replace(places.problems, problemsOf(host));
-  replace(places.failures, failuresOf(host));
+  renew(places.problems, problemsOf(host));
+  renew(places.failures, silent(host.failures));
   const name = host.root.name || "This host";
-  replace(places.facts, section(name, factsOf(host.root.facts), partsOf(host.root)));
-  replace(places.picture, pictureOf(host, places.picture.clientWidth));
+  renew(places.facts, section(name, factsOf(host.root.facts), partsOf(host.root)));
+  renew(places.picture, pictureOf(host, places.picture.clientWidth));
 }
 
 export async function showHost(visit) {
@@ -61,28 +61,24 @@ export async function showHost(visit) {
     picture: make("div", {class: "picture"})};
   const trouble = make("div", {});
   let host = null;
-  let painted = "";
   const read = async () => {
     try {
       host = await ask("host", {}, visit.signal);
       replace(trouble);
-      const text = jsonText(host);
-      if (text !== painted) // or a link would lose the focus
-        paint(places, host);
-      painted = text;
+      paint(places, host);
     } catch (error) {
       if (!visit.over)
-        replace(trouble, failure(error));
+        replace(trouble, unread(error));
     }
   };
-  visit.begin("Host", trouble, places.problems,
-    section("Topology", places.picture), places.failures, places.facts,
+  visit.begin("Host", trouble, places.problems, places.failures,
+    section("Topology", places.picture), places.facts,
     make("p", {}, button("Read again", () => visit.hurry())));
   replace(places.problems, section("Looking for problems", make("p", {class: "quiet", "aria-busy": "true"}, "Reading the host …")));
   let width = places.picture.clientWidth;
   const resized = new ResizeObserver(() => {
     if (host && places.picture.clientWidth !== width)
-      replace(places.picture, pictureOf(host, width = places.picture.clientWidth));
+      renew(places.picture, pictureOf(host, width = places.picture.clientWidth));
   });
   resized.observe(places.picture);
   visit.signal.addEventListener("abort", () => resized.disconnect());

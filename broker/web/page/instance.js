@@ -3,7 +3,7 @@
 import {append, badge, button, link, make, replace, table} from "./dom.js";
 import {ask, jsonText} from "./api.js";
 import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken} from "./paths.js";
-import {section} from "./visit.js";
+import {section, silent, unread} from "./visit.js";
 
 const pageSize = 100;
 
@@ -16,7 +16,8 @@ function valueCell(property) {
     return "";
   const raw = typeof value === "number" || typeof value === "bigint" ? String(value) : null;
   const shown = text ?? raw ?? jsonText(value);
-  return raw === null || shown === raw || shown.includes("(" + raw + ")") ? shown : [shown, " ", make("span", {class: "quiet"}, raw)];
+  const isSaid = raw === null || shown === raw || shown.startsWith(raw + " ") || shown.includes("(" + raw + ")");
+  return isSaid ? shown : [shown, " ", make("span", {class: "quiet"}, raw)];
 }
 
 function propertyRow(property) {
@@ -51,7 +52,11 @@ class Associations {
     this._shown = 0;
     this._lists = new Map();
     this._groups = make("div", {class: "groups", id: "associations"});
-    this._more = button("Show more", () => this.next());
+    this._problem = make("div", {});
+    this._more = button("Show more", () => this.next().then(() => replace(this._problem), (error) => {
+      if (!visit.over)
+        replace(this._problem, unread(error));
+    }));
   }
 
   async next() {
@@ -61,7 +66,7 @@ class Associations {
     this._shown += answer.items.length;
     this._more.hidden = answer.items.length === 0 || this._shown >= answer.total;
     replace(this._more, "Show more (" + this._shown + " of " + answer.total + ")");
-    return answer.total ? [this._groups, this._more] : make("p", {class: "quiet"}, "Nothing is joined to it.");
+    return answer.total ? [this._groups, this._problem, this._more] : make("p", {class: "quiet"}, "Nothing is joined to it.");
   }
 
   _listOf(association) {
@@ -75,10 +80,11 @@ class Associations {
 }
 
 async function methodsOf(visit, path) {
-  const {methods} = await ask("methods", {}, visit.signal);
+  const {methods, failures} = await ask("methods", {}, visit.signal);
   const own = methods.filter((method) => method.instances.some((instance) => instance.path === path));
+  const unanswered = failures.filter((text) => text.startsWith(classOf(path) + ":"));
   if (own.length === 0)
-    return make("p", {class: "quiet"}, "None.");
+    return silent(unanswered) ?? make("p", {class: "quiet"}, "None.");
   return table("Methods", ["Method", "What it does"],
     own.map((method) => [link(hrefOfMethod(method.class, method.method, path), method.method), method.description ?? ""]));
 }

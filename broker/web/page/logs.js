@@ -4,7 +4,7 @@ import {badge, button, link, make, replace, tell} from "./dom.js";
 import {ask, call} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
 import {hrefOfMethod} from "./paths.js";
-import {failure} from "./visit.js";
+import {unread} from "./visit.js";
 
 const pageSize = 200;
 
@@ -25,22 +25,28 @@ class Entries {
     this._id = id;
     this._body = make("tbody", {id: "entries"});
     this._count = make("p", {class: "quiet", role: "status", id: "count"});
-    this._older = button("Older entries", () => this._add());
+    this._older = button("Older entries", () => this._add(this._body.children.length));
+    this._older.hidden = true;
     this._problem = make("div", {});
     this.node = make("div", {}, this._count, this._problem, make("div", {class: "scroll"}, make("table", {class: "log"},
       make("thead", {}, make("tr", {}, ["Time", "Severity", "Text"].map((head) => make("th", {scope: "col"}, head)))),
       this._body)), this._older);
   }
 
-  async read() {
-    replace(this._body);
-    await this._add();
+  /** The newest, in place of what is shown; older ones that are on their way belong to that. */
+  read() {
+    this._series = {};
+    return this._add(0);
   }
 
-  async _add() {
-    const from = this._body.children.length;
+  async _add(from) {
+    const series = this._series;
     try {
       const answer = await ask("logs/" + this._id, {from, count: pageSize}, this._visit.signal);
+      if (series !== this._series)
+        return;
+      if (from === 0)
+        replace(this._body);
       this._body.append(...answer.entries.map(entryRow));
       const shown = this._body.children.length;
       replace(this._problem);
@@ -48,7 +54,7 @@ class Entries {
       this._older.hidden = shown >= answer.total || answer.entries.length === 0;
     } catch (error) {
       if (!this._visit.over)
-        replace(this._problem, failure(error));
+        replace(this._problem, unread(error));
     }
   }
 }
@@ -80,6 +86,21 @@ function tabs(logs, current) {
   })));
 }
 
+/** The form that enables a log. */
+function enabling(log, text) {
+  return link(hrefOfMethod("TVRHBA_RecordLog", "RequestStateChange", log.path), text);
+}
+
+/** A log that is not enabled shows nothing new; the driver's is read when it is enabled, and then alone. */
+function stateOfLog(log) {
+  if (!log.enabled)
+    return make("p", {class: "notice warning", id: "disabled"}, log.id === "driver"
+      ? "The driver's log has not been read: that is done when it is enabled. "
+      : "The log is not enabled: it shows nothing new. ", enabling(log, "Enable it …"));
+  return log.id === "driver"
+    ? make("p", {}, "The log is as it was when it was enabled last. ", enabling(log, "Have it read again …")) : null;
+}
+
 export async function showLogs(visit, id = "provider") {
   const place = make("div", {});
   visit.begin("Logs", place);
@@ -95,6 +116,6 @@ export async function showLogs(visit, id = "provider") {
     const settings = log.id === "provider" && log.path ? link(hrefOfMethod("TVRHBA_RecordLog", "SetLogParams", log.path), "What is logged …") : null;
     entries.read();
     return [tabs(logs, log), make("div", {class: "toolbar"}, button("Read again", () => entries.read()), clearButton, settings),
-      problem, entries.node];
+      stateOfLog(log), problem, entries.node];
   });
 }

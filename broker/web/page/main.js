@@ -3,7 +3,7 @@
 import {button, make, replace, tell} from "./dom.js";
 import {logOut, renewSession, session} from "./api.js";
 import {askToLogIn} from "./dialogs.js";
-import {failure, Visit} from "./visit.js";
+import {unread, Visit} from "./visit.js";
 import {showHost} from "./host.js";
 
 // A view's module is loaded when it is first looked at; the host's comes with the page.
@@ -61,13 +61,13 @@ async function showCurrent() {
     await shown;
   } catch (error) {
     if (!current.over)
-      main.append(failure(error));
+      main.append(unread(error));
   }
 }
 
 /** What could not be read before is read now; a form keeps what stands in it. */
 async function enter() {
-  if (await askToLogIn() && main.querySelector(".notice.critical"))
+  if (await askToLogIn() && main.querySelector(".unread"))
     await showCurrent();
 }
 

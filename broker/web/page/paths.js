@@ -43,8 +43,9 @@ export function hrefOfObject(path) {
   return "#/object/" + encodeURIComponent(path);
 }
 
-export function hrefOfClass(name) {
-  return "#/classes/" + encodeURIComponent(name);
+/** The class's instances, or those of them that have the text `find` somewhere. */
+export function hrefOfClass(name, find = "") {
+  return "#/classes/" + encodeURIComponent(name) + (find ? "/" + encodeURIComponent(find) : "");
 }
 
 export function hrefOfMethod(className, method, path = "") {

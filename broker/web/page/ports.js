@@ -1,9 +1,9 @@
 // The ports as they are now, and how their counters go on.
 
-import {append, badge, button, link, make, replace} from "./dom.js";
+import {append, badge, button, link, make, renew, replace} from "./dom.js";
 import {ask} from "./api.js";
 import {hrefOfObject} from "./paths.js";
-import {failure, section} from "./visit.js";
+import {section, silent, unread} from "./visit.js";
 import {barOf, plotOf} from "./plot.js";
 
 const intervals = [1, 5, 15, 60]; // seconds
@@ -64,10 +64,6 @@ function rateText(history, unit) {
   return rate === undefined ? "–" : amountText(rate, unit).trimEnd() + "/s";
 }
 
-function speedText(speed) {
-  return speed ? Number(speed) / 1e9 + " Gbit/s" : "";
-}
-
 /** A row of a counter, changed in place while it is looked at. */
 class CounterRow {
   constructor(port, counter) {
@@ -80,12 +76,13 @@ class CounterRow {
   }
 
   show(counter, history) {
-    replace(this.value, numberText(counter.value));
-    replace(this.rate, rateText(history, counter.unit));
+    renew(this.value, numberText(counter.value));
+    renew(this.rate, rateText(history, counter.unit));
     const {rates} = history;
-    replace(this.plot, plotOf(rates, Math.max(fewestPlotted, rates.length), (counter.label || counter.name) + " per second"));
+    renew(this.plot, plotOf(rates, Math.max(fewestPlotted, rates.length), (counter.label || counter.name) + " per second"));
     this.node.classList.toggle("grows", counter.grows);
-    replace(this.mark, counter.grows ? badge("critical", "grows" + (history.grown > 0 ? ", +" + numberText(history.grown) : "")) : null);
+    const grown = history.grown > 0 ? ", +" + numberText(history.grown) : "";
+    renew(this.mark, counter.grows ? badge("warning", "grows" + grown) : null);
   }
 }
 
@@ -117,8 +114,7 @@ class PortPanel {
   }
 
   show(port) {
-    replace(this.facts, badge(port.up ? "ok" : "critical", port.state), " ",
-      [speedText(port.speed), port.card].filter(Boolean).join(", "));
+    renew(this.facts, badge(port.severity, port.state), " ", [port.speedText, port.card].filter(Boolean).join(", "));
     for (const counter of port.counters) {
       if (!this.rows.has(counter.name)) {
         this.rows.set(counter.name, new CounterRow(port, counter));
@@ -126,7 +122,7 @@ class PortPanel {
       }
       this.rows.get(counter.name).show(counter, historyOf(port, counter));
     }
-    replace(this.measures, port.measures.length ? make("div", {class: "scroll"}, make("table", {class: "measures"},
+    renew(this.measures, port.measures.length ? make("div", {class: "scroll"}, make("table", {class: "measures"},
       make("caption", {}, "Measures of " + port.name), make("tbody", {}, port.measures.map(measureRow)))) : null);
   }
 }
@@ -140,7 +136,7 @@ function remember(ports, time) {
 function growingErrors(ports) {
   return ports.flatMap((port) => port.counters
     .filter((counter) => counter.grows)
-    .map((counter) => make("li", {}, badge("critical", "grows"), " ", counter.label || counter.name, " of ",
+    .map((counter) => make("li", {}, badge("warning", "grows"), " ", counter.label || counter.name, " of ",
       link(hrefOfObject(port.path), port.name))));
 }
 
@@ -159,14 +155,16 @@ export async function showPorts(visit) {
   const trouble = make("div", {});
   const empty = make("div", {});
   const errors = make("div", {id: "growing"});
+  const unanswered = make("div", {});
   const read = async () => {
     try {
-      const {ports} = await ask("ports", {}, visit.signal);
+      const {ports, failures} = await ask("ports", {}, visit.signal);
       remember(ports, performance.now());
       replace(trouble);
       const growing = growingErrors(ports);
-      replace(errors, growing.length ? make("ul", {class: "problems"}, growing) : null);
-      replace(empty, ports.length ? null : make("p", {class: "notice"}, "There are no ports."));
+      renew(unanswered, silent(failures));
+      renew(errors, growing.length ? make("ul", {class: "problems"}, growing) : null);
+      renew(empty, ports.length + failures.length ? null : make("p", {class: "notice"}, "There are no ports."));
       dropPanels(panels, new Set(ports.map((port) => port.path)));
       for (const port of ports) {
         if (!panels.has(port.path)) {
@@ -178,7 +176,7 @@ export async function showPorts(visit) {
       place.dataset.reads = Number(place.dataset.reads ?? 0) + 1;
     } catch (error) {
       if (!visit.over)
-        replace(trouble, failure(error));
+        replace(trouble, unread(error));
     }
   };
   const choose = (event) => {
@@ -189,6 +187,6 @@ export async function showPorts(visit) {
     intervals.map((each) => make("option", {value: each, selected: each === seconds}, each + " s")));
   place.id = "panels";
   visit.begin("Ports", make("div", {class: "toolbar"}, make("label", {}, "Read every ", choice), button("Read now", () => visit.hurry())),
-    trouble, errors, empty, place);
+    trouble, errors, unanswered, empty, place);
   await visit.repeat(read, () => seconds * 1000);
 }

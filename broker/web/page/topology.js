@@ -1,8 +1,8 @@
-// A picture of the host: cards, their ports, and the targets that these reach. Side by side where there is room, below
-// one another where there is not.
+// A picture of the host: cards, their ports, and the targets that these reach with their units. Side by side where there is
+// room, below one another where there is not.
 
 import {draw, make} from "./dom.js";
-import {hrefOfObject} from "./paths.js";
+import {hrefOfClass, hrefOfObject} from "./paths.js";
 
 const lineHeight = 18;
 const padding = 8;
@@ -11,8 +11,11 @@ const characterWidth = 7.4; // of the font of the picture, at the most
 const wideEnough = 760;
 const mostTargets = 40; // of all ports together; what a port has beyond its part of them is one box
 const fewestTargets = 3; // of a port
+const mostUnits = 40; // of all targets together; of more than these a target has a line that leads to their table
+const unitClass = "CIM_StorageExtent"; // which all that have a capacity are
 
-function descendants(node, kind, found = []) {
+/** The nodes of that kind below a node, and none below these. */
+export function descendants(node, kind, found = []) {
   for (const child of node.children)
     if (child.kind === kind)
       found.push(child);
@@ -25,21 +28,8 @@ function factText(node, label) {
   return node.facts.find((fact) => fact.label === label)?.text ?? "";
 }
 
-function sizeText(bytes) {
-  const units = ["bytes", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"];
-  let amount = Number(bytes);
-  let unit = 0;
-  for (; amount >= 1024 && unit < units.length - 1; unit++)
-    amount /= 1024;
-  return (Number.isInteger(amount) ? amount : amount.toFixed(1)) + " " + units[unit];
-}
-
 function countText(count, word) {
   return count + " " + word + (Number(count) === 1 ? "" : "s");
-}
-
-function unitsText(node) {
-  return countText(node.units, "unit") + (Number(node.bytes) > 0 ? ", " + sizeText(node.bytes) : "");
 }
 
 const boxed = new Set(["Card", "FC port", "Virtual port", "Target"]);
@@ -60,7 +50,7 @@ function boxOf(node, title, lines, kind, found = []) {
   const said = problems.map((text) => text.toLowerCase());
   const rest = lines.filter((line) => line && !said.includes(line.toLowerCase()));
   return {node, kind, title, lines: rest, problems, state: stateOf(found), path: node.path,
-    links: [], parts: [], whole: null};
+    leads: [], links: [], parts: [], whole: null};
 }
 
 function cardBox(card) {
@@ -79,14 +69,34 @@ function nameOf(target) {
   return target.wwpn ?? target.name;
 }
 
-function targetBox(target) {
-  return boxOf(target, nameOf(target), [unitsText(target)], "Target", problemsOf(target));
+/** Lines of a target's box that lead somewhere themselves. */
+function unitLeads(target, areFew) {
+  if (!areFew || target.children.length === 0)
+    return [{text: target.contents ?? "no units", href: hrefOfClass(unitClass, nameOf(target)),
+      label: "Units of " + nameOf(target)}];
+  return target.children.map((unit) => {
+    const text = [unit.name, factText(unit, "capacity")].filter(Boolean).join(", ");
+    return {text, href: hrefOfObject(unit.path), label: unit.kind + " " + text};
+  });
 }
 
-function restBox(targets, port) {
-  const sum = targets.reduce((all, target) => ({units: all.units + Number(target.units), bytes: all.bytes + Number(target.bytes)}),
-    {units: 0, bytes: 0});
-  return boxOf(port, countText(targets.length, "more target"), [unitsText(sum)], "Targets");
+function targetBox(target, areFew) {
+  return {...boxOf(target, nameOf(target), [], "Target", problemsOf(target)), leads: unitLeads(target, areFew)};
+}
+
+function contentsOf(port) {
+  return port.contents ? port.contents + " behind the port" : "";
+}
+
+/** Of each WWPN the node with the most units, since ports may see different ones. */
+function fullestOf(targets) {
+  const nodes = new Map();
+  for (const target of targets) {
+    const known = nodes.get(nameOf(target));
+    if (!known || known.units < target.units)
+      nodes.set(nameOf(target), target);
+  }
+  return nodes;
 }
 
 /** The boxes of targets, one for each WWPN, with the ports that reach them. */
@@ -94,8 +104,11 @@ class Targets {
   boxes = [];
   _known = new Map();
 
-  constructor(ports) {
-    this._most = Math.max(fewestTargets, Math.floor(mostTargets / ports));
+  constructor(root) {
+    this._most = Math.max(fewestTargets, Math.floor(mostTargets / descendants(root, "FC port").length));
+    this._nodes = fullestOf(descendants(root, "Target"));
+    const units = [...this._nodes.values()].reduce((sum, target) => sum + Number(target.units), 0);
+    this._areFewUnits = units <= mostUnits;
   }
 
   /** Joins the port with the box of that name, which is made where there is none yet. */
@@ -117,14 +130,15 @@ class Targets {
 
   _reach(port, targets) {
     for (const target of targets.slice(0, this._most))
-      this._join(port, nameOf(target), () => targetBox(target));
+      this._join(port, nameOf(target), () => targetBox(this._nodes.get(nameOf(target)), this._areFewUnits));
     const rest = targets.slice(this._most);
     if (rest.length > 0)
-      this._join(port, rest.map(nameOf).join(), () => restBox(rest, port.node));
+      this._join(port, rest.map(nameOf).join(),
+        () => boxOf(port.node, countText(rest.length, "more target"), [contentsOf(port.node)], "Targets"));
   }
 
   _count(port, {targets, ...node}) {
-    this._join(port, node.name, () => boxOf(node, countText(targets, "target"), [unitsText(node)], "Targets"));
+    this._join(port, node.name, () => boxOf(node, countText(targets, "target"), [contentsOf(node)], "Targets"));
   }
 }
 
@@ -136,26 +150,26 @@ function ownTargets(port) {
 function columnsOf({root, problems}) {
   const cards = [];
   const ports = [];
-  const targets = new Targets(descendants(root, "FC port").length);
-  for (const card of descendants(root, "Card")) {
-    const cardPlace = cardBox(card);
-    cards.push(cardPlace);
-    for (const port of descendants(card, "FC port")) {
-      const portPlace = portBox(port, problems);
-      cardPlace.links.push(portPlace);
-      portPlace.parts = descendants(port, "Virtual port").map((each) => portBox(each, problems));
-      for (const place of [portPlace, ...portPlace.parts]) {
-        place.whole = place === portPlace ? null : portPlace;
-        ports.push(place);
-        targets.seenBy(place);
-      }
-    }
-  }
+  const targets = new Targets(root);
+  const drawn = new Set();
+  const addPort = (port, whole = null) => {
+    const place = {...portBox(port, problems), whole};
+    ports.push(place);
+    drawn.add(port);
+    targets.seenBy(place);
+    place.parts = descendants(port, "Virtual port").map((each) => addPort(each, place));
+    return place;
+  };
+  for (const card of descendants(root, "Card"))
+    cards.push({...cardBox(card), links: descendants(card, "FC port").map((port) => addPort(port))});
+  for (const port of [...descendants(root, "FC port"), ...descendants(root, "Virtual port")])
+    if (!drawn.has(port)) // what holds it could not be read
+      addPort(port);
   return [cards, ports, targets.boxes];
 }
 
 function heightOf(box) {
-  return 2 * padding + lineHeight * (1 + box.lines.length + box.problems.length);
+  return 2 * padding + lineHeight * (1 + box.lines.length + box.problems.length + box.leads.length);
 }
 
 /** Sets x, y, width and height of boxes one below the other; gives the height of all. */
@@ -195,27 +209,30 @@ function layWide(columns, width) {
 }
 
 /** A target stands below the first port that reaches it; the others say so in words. */
-function inOrderOf(cards) {
+function inOrderOf([cards, ports]) {
   const inOrder = [];
   const placed = new Set();
+  const placePort = (port) => {
+    inOrder.push([port, port.whole ? 2 : 1]);
+    const above = port.links.filter((target) => placed.has(target));
+    port.lines.push(...above.map((target) => "and " + target.title + " above"));
+    port.links = port.links.filter((target) => !placed.has(target));
+    for (const box of [port, ...port.links])
+      placed.add(box);
+    inOrder.push(...port.links.map((target) => [target, 3]));
+    port.parts.forEach(placePort);
+  };
   for (const card of cards) {
     inOrder.push([card, 0]);
-    for (const port of card.links.flatMap((each) => [each, ...each.parts])) {
-      inOrder.push([port, port.whole ? 2 : 1]);
-      const above = port.links.filter((target) => placed.has(target));
-      port.lines.push(...above.map((target) => "and " + target.title + " above"));
-      port.links = port.links.filter((target) => !placed.has(target));
-      for (const target of port.links)
-        inOrder.push([target, 3]);
-      port.links.forEach((target) => placed.add(target));
-    }
+    card.links.forEach(placePort);
   }
+  ports.filter((port) => !port.whole && !placed.has(port)).forEach(placePort);
   return inOrder;
 }
 
 function layNarrow(columns, width) {
   const step = 14;
-  const inOrder = inOrderOf(columns[0]);
+  const inOrder = inOrderOf(columns);
   let y = 1;
   for (const [box, depth] of inOrder) {
     const x = 1 + depth * step;
@@ -230,10 +247,22 @@ function cut(text, width) {
   return text.length > room ? text.slice(0, Math.max(1, room - 1)) + "…" : text;
 }
 
-function drawBox(box) {
-  const text = (content, row, style) => draw("text",
+function drawText(box, row, content, style) {
+  return draw("text",
     {x: box.x + padding + 4, y: box.y + padding + lineHeight * (row + 0.5), class: style, "dominant-baseline": "middle"},
     cut(content, box.width - 4));
+}
+
+function drawLead(box, row, {text, href, label}) {
+  return draw("a", {class: "lead", href, "aria-label": label},
+    draw("title", {}, label),
+    draw("rect", {x: box.x + padding, y: box.y + padding + lineHeight * row, width: box.width - 2 * padding,
+      height: lineHeight, rx: 3}),
+    drawText(box, row, text, "line"));
+}
+
+/** A box, and above it the lines that are links themselves. */
+function drawBox(box) {
   const rows = [[box.title, "title"], ...box.problems.map((problem) => [problem, "problem"]),
     ...box.lines.map((line) => [line, "line"])];
   const label = [box.kind, box.title, ...box.problems, ...box.lines].join(", ");
@@ -241,12 +270,13 @@ function drawBox(box) {
     draw("title", {}, label),
     draw("rect", {class: "box", x: box.x, y: box.y, width: box.width, height: box.height, rx: 5}),
     draw("rect", {class: "edge", x: box.x, y: box.y, width: 4, height: box.height, rx: 2}),
-    rows.map(([content, style], row) => text(content, row, style)),
+    rows.map(([content, style], row) => drawText(box, row, content, style)),
   ];
   const style = "node " + box.kind.toLowerCase().replace(" ", "-") + " " + box.state;
-  return box.path
+  const drawn = box.path
     ? draw("a", {class: style, href: hrefOfObject(box.path), "aria-label": label}, shapes)
     : draw("g", {class: style}, shapes);
+  return [drawn, ...box.leads.map((lead, at) => drawLead(box, rows.length + at, lead))];
 }
 
 function drawLine(from, to, isWide) {
@@ -266,7 +296,7 @@ export function pictureOf(host, width) {
   const columns = columnsOf(host);
   const boxes = columns.flat();
   if (boxes.length === 0)
-    return make("p", {class: "notice"}, "There are no adapters.");
+    return make("p", {class: "notice"}, "No adapter is known.");
   const isWide = width >= wideEnough;
   const height = Math.ceil((isWide ? layWide : layNarrow)(columns, width));
   const lines = boxes.flatMap((from) => [...from.links.map((to) => drawLine(from, to, isWide)),

@@ -1,6 +1,6 @@
 // A view while it is looked at: what it started ends with it.
 
-import {make, replace, append, button} from "./dom.js";
+import {append, badge, button, make, replace, visible} from "./dom.js";
 import {Refused} from "./api.js";
 
 export class Visit {
@@ -19,12 +19,14 @@ export class Visit {
 
   /** Empties the place and writes the heading, which is where keys go on from. */
   begin(title, ...children) {
-    document.title = title + " – Fibre Channel adapters";
+    document.title = visible(title) + " – Fibre Channel adapters";
     replace(this.main, make("h1", {tabindex: "-1"}, title), children);
   }
 
-  /** Does `work` now and again when `delay()` milliseconds have passed since it ended; nothing while nobody looks. */
+  /** Does `work` now and again when `delay()` milliseconds have passed since it ended; nothing while nobody looks, and at
+   *  once when somebody looks again. */
   async repeat(work, delay) {
+    document.addEventListener("visibilitychange", () => this.hurry(), {signal: this.signal});
     while (!this.over) {
       if (!document.hidden)
         await work();
@@ -54,7 +56,7 @@ export class Visit {
       if (this.over)
         return;
       const again = button("Try again", () => this.fill(place, work, waiting));
-      replace(place, failure(error), make("p", {}, again));
+      replace(place, unread(error), make("p", {}, again));
     }
   }
 }
@@ -65,6 +67,19 @@ export function failure(error) {
     console.error(error);
   const status = error.status ? error.status + ": " : "";
   return make("p", {class: "notice critical", role: "alert"}, status + error.message);
+}
+
+/** The same of what could not be read: who logs in may be let to. */
+export function unread(error) {
+  const node = failure(error);
+  node.classList.add("unread");
+  return node;
+}
+
+/** The classes that did not answer, where the rest is shown. */
+export function silent(failures) {
+  return failures.length === 0 ? null : section("Classes that do not answer", make("ul", {class: "problems failures"},
+    failures.map((text) => make("li", {}, badge("warning", "warning"), " ", text))));
 }
 
 /** A section with a heading. */
