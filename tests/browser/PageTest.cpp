@@ -461,11 +461,12 @@ TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
     // Only bytes as they are in the file have that sum.
     std::ofstream(_folder.file("image.grp"), std::ios::binary)
         << "TVRSIM-FIRMWARE 1\nfamily: TV3202\nversion: 12.8.1.0\nchecksum: CBF43926\n\n123456789";
-    const auto install = [&]
+    const auto install = [&](const std::string& andReset = "")
     {
         browser.clickText("Call …");
         browser.awaitText("dialog h2",
-                          "Install the firmware (image.grp, 80 bytes) on the adapter of FC port 1000027A51320240?");
+                          "Install the firmware (image.grp, 80 bytes) on the adapter of FC port 1000027A51320240" +
+                              andReset + "?");
         const std::string details = browser.textOf("dialog dl");
         browser.clickText("Call InstallFromByteStream", "dialog");
         browser.await("!document.querySelector('dialog')");
@@ -491,7 +492,7 @@ TEST_F(Page, ReadsFilesAndListsAndTellsMistakesBesideTheirFields)
     browser.clickText("+ Defer target/system reset (2)");
     browser.clickText("+ File name (32768)");
     browser.type("[name=InstallOptionsValues]", "\nnew.grp\n");
-    EXPECT_THAT(install(),
+    EXPECT_THAT(install(" and reset it"),
                 AllOf(HasSubstr("Defer target/system reset (2), File name (32768)"), HasSubstr(R"("", "new.grp")")));
     visit();
     browser.awaitText("#problems", "LINK DOWN");

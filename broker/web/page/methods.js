@@ -29,17 +29,24 @@ function deedOf(method) {
   return rest.length === 0 ? deed : /^(from|to|of|on|all)$/.test(rest[0]) ? deed + " " + rest.join(" ") : deed + " the " + rest.join(" ");
 }
 
+/** One of the options of an installation has this effect, which its name does not say. */
+function andReset(options) {
+  return options?.includes(2) ? " and reset it" : "";
+}
+
 /**
- * Of methods whose names do not say what happens: with the texts of what was chosen, of the object, and of the instance
- * that is called.
+ * Of methods whose names do not say what happens: of the texts of what was chosen, of the object and of the instance that
+ * is called, and of the chosen values.
  */
 const questions = {
   DeleteDump: ({object}) => `Delete all dump files of ${object}?`,
   DisableAllPrioLaneLuns: ({InitiatorWWPN, TargetWWPN, Option}) =>
     `Take away all priority lanes between ${InitiatorWWPN} and ${TargetWWPN}, ${Option}?`,
   GetConfigTable: ({object, URI}) => `Write the table of tags of the adapter of ${object} to ${URI}?`,
-  InstallFromByteStream: ({object, Image}) => `Install the firmware (${Image}) on the adapter of ${object}?`,
-  InstallFromURI: ({object, URI}) => `Install the firmware ${URI} on the adapter of ${object}?`,
+  InstallFromByteStream: ({object, Image}, {InstallOptions}) =>
+    `Install the firmware (${Image}) on the adapter of ${object}${andReset(InstallOptions)}?`,
+  InstallFromURI: ({object, URI}, {InstallOptions}) =>
+    `Install the firmware ${URI} on the adapter of ${object}${andReset(InstallOptions)}?`,
   RequestStateChange: ({object, RequestedState}) => `Set ${object} to ${RequestedState}?`,
   RunDiagnosticService: ({object, instance}) => `Run ${instance} on ${object}?`,
   SetConfigTable: ({object, URI}) => `Give the adapter of ${object} the table of tags ${URI}?`,
@@ -55,6 +62,10 @@ function asWord(text) {
   return text.length > longestWord ? text.slice(0, longestWord) + "…" : text;
 }
 
+function valuesOf(given) {
+  return Object.fromEntries(given.map(({field, value}) => [field.parameter.name, value]));
+}
+
 /** What is done to what, as a question. */
 function questionOf(method, path, given) {
   const target = given.find(({field}) => field.parameter.type === "reference");
@@ -62,9 +73,9 @@ function questionOf(method, path, given) {
   const object = spoken(classOf(objectPath)) + " " + asWord(shortName(objectPath));
   if (!Object.hasOwn(questions, method.name))
     return deedOf(method.name) + " of " + object + "?";
-  const chosen = method.parameters.map(({name}) => [name, "nothing"])
+  const texts = method.parameters.map(({name}) => [name, "nothing"])
     .concat(given.map(({field, value}) => [field.parameter.name, asWord(field.text(value))]));
-  return questions[method.name]({...Object.fromEntries(chosen), object, instance: asWord(shortName(path))});
+  return questions[method.name]({...Object.fromEntries(texts), object, instance: asWord(shortName(path))}, valuesOf(given));
 }
 
 function isInput(parameter) {
@@ -147,8 +158,7 @@ class MethodForm {
     if (!await mayChange() || !await confirmed(questionOf(method, path, given), detailsOf(method, path, given), "Call " + method.name))
       return;
     replace(this._result, make("p", {class: "quiet", "aria-busy": "true"}, method.name + " is at work …"));
-    const parameters = Object.fromEntries(given.map(({field, value}) => [field.parameter.name, value]));
-    const answer = await attempted(this._result, () => call(path, method.name, parameters));
+    const answer = await attempted(this._result, () => call(path, method.name, valuesOf(given)));
     if (answer)
       replace(this._result, resultOf(method, answer));
   }
