@@ -61,7 +61,11 @@ Value realFromJson(const Target& target, const Json& json)
     if (!json.is_number())
         refuse(json, target.type);
     const double number = json.get<double>();
-    return target.type == CMPI_real32 ? Value::real32(static_cast<float>(number)) : Value::real64(number);
+    if (target.type != CMPI_real32)
+        return Value::real64(number);
+    if (std::abs(number) > std::numeric_limits<float>::max())
+        refuse(json, target.type);
+    return Value::real32(static_cast<float>(number));
 }
 
 } // namespace

@@ -69,6 +69,30 @@ struct Browser::Driver
     Driver() : folder(std::filesystem::path(testing::TempDir()) / ("browser-" + std::to_string(getpid())))
     {
         std::filesystem::create_directories(folder);
+        constexpr int tries = 5; // it takes a free port of IPv6, which may be in use with IPv4
+        int port = 0;
+        for (int i = 0; i < tries && port == 0; i++)
+        {
+            end();
+            begin();
+            port = awaitPort();
+        }
+        if (port == 0)
+            throw std::runtime_error("chromedriver did not start");
+        client = std::make_unique<httplib::Client>("127.0.0.1", port);
+        client->set_read_timeout(std::chrono::milliseconds(longestWait) + std::chrono::seconds(30));
+        client->set_keep_alive(true);
+    }
+
+    ~Driver()
+    {
+        end();
+        std::error_code ignored; // the browser's last process may still write
+        std::filesystem::remove_all(folder, ignored);
+    }
+
+    void begin()
+    {
         int ends[2];
         if (pipe2(ends, O_CLOEXEC) != 0)
             throw std::runtime_error("no pipe");
@@ -83,29 +107,26 @@ struct Browser::Driver
             _exit(127);
         }
         close(ends[1]);
-        client = std::make_unique<httplib::Client>("127.0.0.1", awaitPort());
-        client->set_read_timeout(std::chrono::milliseconds(longestWait) + std::chrono::seconds(30));
-        client->set_keep_alive(true);
     }
 
-    ~Driver()
+    void end()
     {
-        if (process > 0)
-        {
-            kill(-process, SIGKILL);
-            waitpid(process, nullptr, 0);
-        }
+        if (process <= 0)
+            return;
+        kill(-process, SIGKILL);
+        kill(process, SIGKILL); // which may not be in its group yet
+        waitpid(process, nullptr, 0);
         close(output);
-        std::error_code ignored; // the browser's last process may still write
-        std::filesystem::remove_all(folder, ignored);
+        process = -1;
     }
 
+    /// 0 where it has ended instead.
     int awaitPort() const
     {
         for (std::string line = readLine(output); !line.empty(); line = readLine(output))
             if (const std::size_t mark = line.find("successfully on port "); mark != std::string::npos)
                 return std::stoi(line.substr(mark + std::string("successfully on port ").size()));
-        throw std::runtime_error("chromedriver did not start");
+        return 0;
     }
 
     std::filesystem::path folder;

@@ -246,7 +246,7 @@ TEST(UpcallChannel, RefreshesAndAssociatorsShareIt)
     for (std::thread& client : clients)
         client.join();
     EXPECT_EQ(failures, 0u) << "an up-call waited for one that waited for the refresh, which waited for it";
-    EXPECT_GT(host.logged(begun), rounds / 4);
+    EXPECT_GT(host.logged(begun), rounds / 12) << "many refreshes, however the threads take turns";
     host.unload();
 }
 
