@@ -124,11 +124,15 @@ public:
     bool passOn() { return _response.passOn(); }
     bool mayChange() const { return _caller.mayChange; }
     /// Tells the journal of a change, and expects that it went well.
-    void expectChange(const std::string& verb, const Path& path, const Outcome& outcome,
-                      const std::string& result = "done") const
+    void expectChange(const std::string& verb, const Path& path, const Outcome& outcome) const
     {
-        http::tellChange(_caller, verb, path, outcome.ok() ? result : statusName(outcome.status));
+        http::tellChange(_caller, verb, path, outcome.ok() ? "done" : statusName(outcome.status));
         expect(outcome);
+    }
+    void expectCall(const std::string& method, const Path& path, const MethodReply& reply) const
+    {
+        http::tellCall(_caller, method, path, reply);
+        expect(reply);
     }
 
     xml_node required(const char* name) const
@@ -621,8 +625,7 @@ void carryOutExtrinsic(Operation& operation)
     if (!method)
         throw CimFailure{CMPI_RC_ERR_METHOD_NOT_FOUND, info->name + " has no method '" + request.name + "'"};
     const MethodReply reply = operation.broker.invokeMethod(path, method->name, argumentsOf(operation, *method));
-    operation.expectChange("called " + info->name + "." + method->name + " on", path, reply,
-                           valueText(reply.returnValue));
+    operation.expectCall(info->name + "." + method->name, path, reply);
     writeReply(operation.xml, reply);
 }
 

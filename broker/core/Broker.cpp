@@ -39,6 +39,11 @@ CimError::CimError(const Outcome& outcome)
       _status(outcome.status)
 {}
 
+std::string failureText(const std::string& className, const CimError& error)
+{
+    return className + ": " + error.what();
+}
+
 std::string statusName(CMPIrc status)
 {
     static constexpr std::array names{"CIM_ERR_OK",

@@ -108,6 +108,9 @@ private:
     CMPIrc _status;
 };
 
+/// For lists of what failed where the rest is shown: "Class: text".
+std::string failureText(const std::string& className, const CimError& error);
+
 /// The answer itself; throws CimError where it is a failure.
 template <class Answer> Answer checked(Answer answer)
 {

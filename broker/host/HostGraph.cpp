@@ -104,7 +104,7 @@ bool HostGraph::answered(const std::string& className, const Outcome& outcome)
     const CimError error(outcome);
     if (!_firstFailure)
         _firstFailure = error;
-    _failures.push_back(className + ": " + error.what());
+    _failures.push_back(failureText(className, error));
     return false;
 }
 

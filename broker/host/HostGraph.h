@@ -59,7 +59,7 @@ private:
     void join(const EdgeRow& row, const Path& association);
     Element* find(const Path& path) const;
     /// The target behind an initiator that an endpoint is of, new or existing.
-    /// The endpoint stands for it, as the first of those of its units.
+    /// A new one has the path of this endpoint, which is of one of its units.
     Element& targetOf(Element& initiator, const char* association, const Path& endpoint);
     void nameHost(const Path& path);
     void findChassis();

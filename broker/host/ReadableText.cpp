@@ -1,6 +1,5 @@
 #include "broker/host/ReadableText.h"
 
-#include "broker/values/Utf8.h"
 #include "broker/values/ValueMap.h"
 #include "broker/values/ValueText.h"
 
@@ -95,17 +94,6 @@ bool isNumber(CMPIType type)
     return isInteger(element) || element == CMPI_real32 || element == CMPI_real64;
 }
 
-/// Length of the character of several bytes at the head; 0 if there is none, or one that controls terminals.
-std::size_t printableCharacter(std::string_view text)
-{
-    constexpr unsigned char controlLead = 0xC2;
-    constexpr unsigned char firstPrintable = 0xA0;
-    const std::size_t length = longCharacter(text);
-    const bool isControl = length == 2 && static_cast<unsigned char>(text[0]) == controlLead &&
-                           static_cast<unsigned char>(text[1]) < firstPrintable;
-    return isControl ? 0 : length;
-}
-
 } // namespace
 
 std::string sizeText(std::uint64_t bytes)
@@ -196,25 +184,6 @@ std::string padded(const std::string& text, std::size_t width)
 {
     const std::size_t shown = displayWidth(text);
     return shown < width ? text + std::string(width - shown, ' ') : text;
-}
-
-std::string oneLine(const std::string& text)
-{
-    std::string result;
-    for (std::string_view rest = text; !rest.empty();)
-    {
-        const auto c = static_cast<unsigned char>(rest.front());
-        const std::size_t length = c >= ' ' && c < 0x7f ? 1 : printableCharacter(rest);
-        if (length == 0)
-        {
-            std::array<char, 8> escape{};
-            std::snprintf(escape.data(), escape.size(), "\\x%02x", static_cast<unsigned>(c));
-            result += c == '\n' ? "\\n" : c == '\t' ? "\\t" : escape.data();
-        }
-        result += rest.substr(0, length);
-        rest.remove_prefix(std::max<std::size_t>(length, 1));
-    }
-    return result;
 }
 
 std::string shortened(const std::string& text, std::size_t characters)

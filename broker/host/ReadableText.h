@@ -2,6 +2,7 @@
 #pragma once
 
 #include "broker/values/ClassInfo.h"
+#include "broker/values/OneLine.h"
 
 #include <cstdint>
 #include <string>
@@ -36,9 +37,6 @@ std::string withSingleBlanks(const std::string& text);
 std::size_t displayWidth(const std::string& text);
 /// The text filled up with blanks on the right.
 std::string padded(const std::string& text, std::size_t width);
-/// Line breaks and other control characters as escapes, so that a value stays on its line and does nothing to the
-/// terminal; bytes that are no UTF-8 too.
-std::string oneLine(const std::string& text);
 /// The text, or its head with an ellipsis where it shows more characters than that.
 std::string shortened(const std::string& text, std::size_t characters);
 

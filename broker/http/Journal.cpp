@@ -1,16 +1,43 @@
 #include "broker/http/Journal.h"
 
-#include "broker/host/ReadableText.h"
+#include "broker/values/OneLine.h"
 #include "broker/values/PathText.h"
+#include "broker/values/ValueText.h"
 
+#include <cctype>
 #include <iostream>
 #include <new>
+#include <string_view>
 
 namespace http
 {
 
 namespace
 {
+
+/// A name of the schema; what else a client calls something could be read as another line.
+std::string nameText(std::string name)
+{
+    for (char& c : name)
+        if (!std::isalnum(static_cast<unsigned char>(c)) && std::string_view("_/.-").find(c) == std::string_view::npos)
+            c = '?';
+    return name;
+}
+
+/// Of references among the keys the classes alone: their texts double with each level that they are nested.
+std::string objectText(broker::Path path)
+{
+    constexpr std::size_t longest = 500;
+    path.nameSpace = nameText(path.nameSpace);
+    path.className = nameText(path.className);
+    for (broker::Property& key : path.keys)
+    {
+        key.name = nameText(key.name);
+        if (key.value.type() == CMPI_ref && !key.value.isNull())
+            key.value = broker::Value::string(key.value.asPath().className);
+    }
+    return broker::fullPathText(path).substr(0, longest);
+}
 
 /// In one piece, so that lines of other threads stand before or behind it.
 void write(const std::string& text)
@@ -24,9 +51,19 @@ void tellChange(const Caller& caller, const std::string& verb, const broker::Pat
                 const std::string& result) noexcept
 try
 {
-    constexpr std::size_t longestPath = 500, longestResult = 100;
-    write((caller.user.empty() ? "somebody" : caller.user) + " " + verb + " " +
-          broker::fullPathText(path).substr(0, longestPath) + ": " + result.substr(0, longestResult));
+    constexpr std::size_t longestResult = 100;
+    write((caller.user.empty() ? "somebody" : caller.user) + " " + verb + " " + objectText(path) + ": " +
+          result.substr(0, longestResult));
+}
+catch (const std::bad_alloc&)
+{}
+
+void tellCall(const Caller& caller, const std::string& method, const broker::Path& path,
+              const broker::MethodReply& reply) noexcept
+try
+{
+    tellChange(caller, "called " + method + " on", path,
+               reply.ok() ? broker::valueText(reply.returnValue) : broker::statusName(reply.status));
 }
 catch (const std::bad_alloc&)
 {}
@@ -51,7 +88,7 @@ try
         return;
     }
     _told++;
-    write("login refused of '" + name.substr(0, longestName) + "' from " + address);
+    write("login refused from " + address + " of " + broker::quoteText(name.substr(0, longestName)));
 }
 catch (const std::bad_alloc&)
 {}

@@ -58,9 +58,8 @@ std::counting_semaphore<mostChecks> checks{mostChecks};
 /// Whether a password can have it; "!" and its like lock a user out.
 bool isHash(const std::string& text)
 {
-    crypt_data room{};
-    const char* some = crypt_r("", text.c_str(), &room);
-    return some && *some != '*';
+    const int judged = crypt_checksalt(text.c_str());
+    return judged != CRYPT_SALT_INVALID && judged != CRYPT_SALT_METHOD_DISABLED;
 }
 
 bool isHashOf(const std::string& password, const std::string& hash)
@@ -98,13 +97,15 @@ Users::Users(const std::string& file)
         if (name == 0 || name == line.npos || name + 1 == hash || !(mark.empty() || mark == ":reader"))
             throw std::runtime_error(file + ":" + std::to_string(number) +
                                      ": a line is written name:hash or name:hash:reader");
-        _entries[line.substr(0, name)] = {line.substr(name + 1, hash - name - 1), mark.empty()};
+        std::string own = line.substr(name + 1, hash - name - 1);
+        if (!isHash(own))
+            own.clear();
+        else if (_likeness.empty())
+            _likeness = own;
+        _entries[line.substr(0, name)] = {std::move(own), mark.empty()};
     }
     if (_entries.empty())
         throw std::runtime_error("there is no user in '" + file + "'");
-    const auto like = std::ranges::find_if(_entries, [](const auto& entry) { return isHash(entry.second.hash); });
-    if (like != _entries.end())
-        _likeness = like->second.hash;
 }
 
 std::optional<User> Users::admit(std::string_view authorization) const
@@ -112,10 +113,11 @@ std::optional<User> Users::admit(std::string_view authorization) const
     const std::optional<Credentials> given = credentialsIn(authorization);
     if (!given)
         return std::nullopt;
-    // A name that nobody has takes as long as one that somebody has, by whatever method the hashes are made.
+    // A name that nobody has, or may use, takes as long as others do, where all hashes are made by one method.
     const auto known = _entries.find(given->name);
-    const bool same = isHashOf(given->password, known == _entries.end() ? _likeness : known->second.hash);
-    if (!same || known == _entries.end())
+    const bool isUsable = known != _entries.end() && !known->second.hash.empty();
+    const bool same = isHashOf(given->password, isUsable ? known->second.hash : _likeness);
+    if (!same || !isUsable)
         return std::nullopt;
     return User{known->first, known->second.mayChange};
 }

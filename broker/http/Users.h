@@ -37,7 +37,7 @@ public:
 private:
     struct Entry
     {
-        std::string hash;
+        std::string hash; ///< empty for one who is locked out
         bool mayChange;
     };
     std::map<std::string, Entry, std::less<>> _entries;

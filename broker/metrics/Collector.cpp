@@ -158,15 +158,14 @@ void Collector::readClass(std::size_t place)
 {
     const SourceRow& source = hostSources()[place];
     const Reply reply = _broker.enumerateInstances(_nameSpace, source.className);
-    Series series;
-    read(series, source, reply.objects);
-    _host[place].families = series.families();
     if (!reply.ok())
     {
         _failed = true;
-        return;
+        return; // what was read before stands
     }
-    _host[place].time = Clock::now();
+    Series series;
+    read(series, source, reply.objects);
+    _host[place] = {series.families(), Clock::now()};
     if (source.className == cardClass)
         _cards = reply.objects.size();
     if (source.className != portClass)

@@ -166,19 +166,14 @@ void measured(Series& series, const FamilyRow& row, const Object& object, const 
 
 void thresholds(Series& series, const FamilyRow& row, const Object& object, const Labels& labels)
 {
-    const struct
-    {
-        const char* name;
-        const char* property;
-    } limits[] = {{"high alarm", row.measure->highAlarm},
-                  {"high warning", row.measure->highWarning},
-                  {"low warning", row.measure->lowWarning},
-                  {"low alarm", row.measure->lowAlarm}};
-    if (!limitsOf(object, *row.measure))
-        return;
-    for (const auto& limit : limits)
-        if (const auto value = limit.property ? quantity(object, row, limit.property) : std::nullopt)
-            series.add(row, with(labels, {{"threshold", limit.name}}), *value);
+    const Limits limits = limitsOf(object, *row.measure).value_or(Limits{});
+    const std::pair<const char*, std::optional<double>> named[] = {{"high alarm", limits.highAlarm},
+                                                                   {"high warning", limits.highWarning},
+                                                                   {"low warning", limits.lowWarning},
+                                                                   {"low alarm", limits.lowAlarm}};
+    for (const auto& [name, limit] : named)
+        if (limit)
+            series.add(row, with(labels, {{"threshold", name}}), decimal(*limit / row.divisor));
 }
 
 /// A value beyond the limit of the alarm is beyond that of the warning as well.

@@ -108,7 +108,7 @@ std::vector<Object> instancesOf(const State& state, const std::string& className
     }
     catch (const CimError& error)
     {
-        failures.push_back(className + ": " + error.what());
+        failures.push_back(failureText(className, error));
         return {};
     }
 }
@@ -116,7 +116,6 @@ std::vector<Object> instancesOf(const State& state, const std::string& className
 std::string session(const Question& question)
 {
     Query(question.request.params, {});
-    const auto orNull = [](const std::string& text) { return text.empty() ? Json() : Json(text); };
     const http::Caller& caller = question.caller;
     return jsonText({{"user", orNull(caller.user)},
                      {"mayChange", caller.mayChange},

@@ -14,6 +14,7 @@
 
 #include <nlohmann/json.hpp>
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -73,6 +74,16 @@ struct Question
     const http::Caller& caller;
     std::string rest = {}; ///< of the path, behind that of the route
 };
+
+inline broker::Json orNull(const std::string& text)
+{
+    return text.empty() ? broker::Json() : broker::Json(text);
+}
+
+template <class T> broker::Json orNull(const std::optional<T>& value)
+{
+    return value ? broker::Json(*value) : broker::Json();
+}
 
 constexpr std::chrono::seconds keptFor{10};
 constexpr std::chrono::seconds liveFor{1}; ///< what is asked for again and again to see it change

@@ -13,7 +13,6 @@
 #include <algorithm>
 #include <array>
 #include <map>
-#include <optional>
 
 namespace web
 {
@@ -184,11 +183,6 @@ const Element* wholeOf(const Wholes& wholes, const Element* element, std::string
         if (isOfKind(*found->second, kind))
             return found->second;
     return nullptr;
-}
-
-template <class T> Json orNull(const std::optional<T>& value)
-{
-    return value ? Json(*value) : Json();
 }
 
 /// As bad as the worst of what the port's state means.

@@ -22,11 +22,6 @@ namespace
 
 using Failures = std::vector<std::string>;
 
-Json orNull(const std::string& text)
-{
-    return text.empty() ? Json() : Json(text);
-}
-
 /// The name that the schema gives to a property's value, or the value where it has none.
 std::string nameOfValue(const State& state, const Object& object, const char* property)
 {
@@ -359,8 +354,7 @@ std::string call(const Question& question)
     const Call call = callOf(state, parseBody(question.request.body));
     const MethodReply reply = state.broker.invokeMethod(call.path, call.method.name, call.in);
     state.dropKept();
-    http::tellChange(question.caller, "called " + call.info.name + "." + call.method.name + " on", call.path,
-                     reply.ok() ? valueText(reply.returnValue) : statusName(reply.status));
+    http::tellCall(question.caller, call.info.name + "." + call.method.name, call.path, reply);
     checked(static_cast<const Outcome&>(reply));
     const std::string_view meaning = valueName(valueNames(call.info, call.method.name), reply.returnValue);
     return jsonText({{"returnValue", toJson(reply.returnValue)},

@@ -78,7 +78,10 @@ struct Browser::Driver
             port = awaitPort();
         }
         if (port == 0)
+        {
+            end();
             throw std::runtime_error("chromedriver did not start");
+        }
         client = std::make_unique<httplib::Client>("127.0.0.1", port);
         client->set_read_timeout(std::chrono::milliseconds(longestWait) + std::chrono::seconds(30));
         client->set_keep_alive(true);

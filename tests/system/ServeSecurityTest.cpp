@@ -63,7 +63,7 @@ TEST(ServeSecurity, WhoChangesTheHostAndWhoIsNotLetInIsTold)
               "joe changed " + setting + ": done\n" + "joe changed current of " + setting + ": done\n" +
                   "joe deleted " + setting + ": CIM_ERR_NOT_SUPPORTED\n" +
                   "joe called TVRHBA_RecordLog.ClearLog on root/tavrin:TVRHBA_RecordLog.InstanceID=\"none\": 33068\n" +
-                  "login refused of 'jim\\njoe' from 127.0.0.1\n");
+                  "login refused from 127.0.0.1 of \"jim\\njoe\"\n");
 }
 
 TEST(ServeSecurity, WhoMayOnlyReadChangesNothing)

@@ -98,14 +98,17 @@ class Diagnostics {
   }
 
   _show({tests, jobs, records, failures}) {
+    const none = (text) => failures.length ? null : make("p", {class: "quiet"}, text);
     renew(this.unanswered, silent(failures));
-    this._offer(tests);
-    renew(this.now, jobs.length
-      ? tableOf(["Job", "Port", "State", "Progress", ""], jobs.map((job) => jobItem(job, hasEnded(job, records), this.refusal)))
-      : make("p", {class: "quiet"}, "No job is known."));
+    if (failures.length === 0 || !this._offered)
+      this._offer(tests);
+    if (!this.now.querySelector("[aria-disabled]")) // a job is being cancelled
+      renew(this.now, jobs.length
+        ? tableOf(["Job", "Port", "State", "Progress", ""], jobs.map((job) => jobItem(job, hasEnded(job, records), this.refusal)))
+        : none("No job is known."));
     renew(this.records, records.length
       ? tableOf(["Time", "Test", "Port", "Result", "What it came to"], records.map(recordItem))
-      : make("p", {class: "quiet"}, "No test has left a record."));
+      : none("No test has left a record."));
   }
 
   /** The buttons stay as they are while the tests do: one of them may have the focus. */
@@ -153,16 +156,19 @@ class Diagnostics {
     if (!answer.out.Job)
       return ["critical", "made no job: it cannot run on the port as it is"];
     const id = new Map(parsePath(answer.out.Job).keys).get("InstanceID");
+    const unreadable = (why) => ["warning", "ran, but its result could not be read: " + why];
     let found;
     try {
       found = await ask("diagnostics");
     } catch (error) {
-      return ["warning", "ran, but its result could not be read: " + error.message];
+      return unreadable(error.message);
     }
     this._show(found);
     const record = found.records.find((each) => each.id === id);
     if (record)
       return [stateOf(record.state), "has ended: " + record.state];
+    if (found.failures.length > 0)
+      return unreadable(found.failures[0]);
     const job = found.jobs.find((each) => each.id === id);
     return job && !hasEnded(job, found.records) ? ["quiet", "goes on"] : ["warning", "has ended without a result"];
   }

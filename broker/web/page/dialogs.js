@@ -62,10 +62,9 @@ export async function askToLogIn(reason = "") {
     const [user, userField] = field("User", {name: "user", autocomplete: "username"});
     const [password, passwordField] = field("Password", {name: "password", type: "password", autocomplete: "current-password"});
     const problem = make("div", {});
-    const send = button("Log in", null, {type: "submit", class: "main"});
-    const submit = async (event) => {
-      event.preventDefault();
-      send.disabled = true;
+    const send = async () => {
+      if (!user.form.reportValidity())
+        return;
       try {
         await logIn(user.value, password.value);
         tell("Logged in as " + session.user);
@@ -74,13 +73,11 @@ export async function askToLogIn(reason = "") {
         replace(problem, failure(error));
         password.value = "";
         password.focus();
-      } finally {
-        send.disabled = false;
       }
     };
-    return make("form", {submit}, reason ? make("p", {}, reason) : null, userField, passwordField, problem,
+    return make("form", {submit: (event) => event.preventDefault()}, reason ? make("p", {}, reason) : null, userField, passwordField, problem,
       make("p", {class: "quiet"}, "Name and password stay in the memory of this page until it is left."),
-      make("div", {class: "buttons"}, button("Cancel", () => close(false)), send));
+      make("div", {class: "buttons"}, button("Cancel", () => close(false)), button("Log in", send, {type: "submit", class: "main"})));
   });
   return answer === true;
 }

@@ -60,23 +60,27 @@ export function replace(node, ...children) {
   return append(node, ...children);
 }
 
-/** What tells a link or a button from others of its place, also when it is made anew. */
-function identityOf(node) {
-  return node.getAttribute("href") ?? node.getAttribute("aria-label") ?? node.textContent;
+/** What tells a link or a button from others of its place, also when it is made anew; the last where its text has changed. */
+function identitiesOf(node) {
+  const own = node.getAttribute("href") ?? "";
+  const label = node.getAttribute("aria-label") ?? node.textContent;
+  return [own + " " + label, own || label];
 }
 
 /** As replace(), of a place that is shown anew now and again: what is equal stays, with what is selected in it; the focus
  *  goes to the link or button that it was on, and what was unfolded stays so. */
 export function renew(place, ...children) {
   const fresh = append(place.cloneNode(false), ...children);
-  for (const details of fresh.querySelectorAll("details"))
-    details.open = place.querySelector("details")?.open ?? false;
+  const unfolded = new Set([...place.querySelectorAll("details[open] > summary")].map((each) => each.textContent));
+  for (const summary of fresh.querySelectorAll("details > summary"))
+    summary.parentNode.open = unfolded.has(summary.textContent);
   if (fresh.isEqualNode(place))
     return;
-  const focused = place.contains(document.activeElement) ? identityOf(document.activeElement) : null;
+  const focused = place.contains(document.activeElement) ? identitiesOf(document.activeElement) : [];
   place.replaceChildren(...fresh.childNodes);
-  if (focused !== null)
-    [...place.querySelectorAll("a, button, summary")].find((each) => identityOf(each) === focused)?.focus({preventScroll: true});
+  const all = [...place.querySelectorAll("a, button, summary")];
+  const [same] = focused.flatMap((identity, at) => all.filter((each) => identitiesOf(each)[at] === identity));
+  same?.focus({preventScroll: true});
 }
 
 export function link(href, ...children) {

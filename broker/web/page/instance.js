@@ -3,7 +3,7 @@
 import {append, badge, button, link, make, replace, table} from "./dom.js";
 import {ask, jsonText} from "./api.js";
 import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken} from "./paths.js";
-import {section, silent, unread} from "./visit.js";
+import {section, silentOf, unread} from "./visit.js";
 
 const pageSize = 100;
 
@@ -82,9 +82,8 @@ class Associations {
 async function methodsOf(visit, path) {
   const {methods, failures} = await ask("methods", {}, visit.signal);
   const own = methods.filter((method) => method.instances.some((instance) => instance.path === path));
-  const unanswered = failures.filter((text) => text.startsWith(classOf(path) + ":"));
   if (own.length === 0)
-    return silent(unanswered) ?? make("p", {class: "quiet"}, "None.");
+    return silentOf(classOf(path), failures) ?? make("p", {class: "quiet"}, "None.");
   return table("Methods", ["Method", "What it does"],
     own.map((method) => [link(hrefOfMethod(method.class, method.method, path), method.method), method.description ?? ""]));
 }

@@ -21,7 +21,7 @@ const main = document.getElementById("main");
 let visit = null;
 let navigated = false;
 
-function wordsOf(hash) {
+function partsOf(hash) {
   try {
     return hash.replace(/^#\/?/, "").split("/").map(decodeURIComponent);
   } catch {
@@ -40,7 +40,7 @@ function markCurrent(name) {
 }
 
 async function showCurrent() {
-  const [name, ...words] = wordsOf(location.hash);
+  const [name, ...words] = partsOf(location.hash);
   visit?.end();
   const current = visit = new Visit(main);
   markCurrent(name);

@@ -5,14 +5,15 @@ import {ask, call, session} from "./api.js";
 import {attempted, confirmed, mayChange} from "./dialogs.js";
 import {Field, Mistake} from "./form.js";
 import {classOf, hrefOfClass, hrefOfMethod, hrefOfObject, shortName, spoken, wordsOf} from "./paths.js";
-import {section, silent} from "./visit.js";
+import {section, silent, silentOf} from "./visit.js";
 
 function listOf(answer) {
   const classes = grouped(answer.methods);
   const sections = [...classes].map(([name, own]) => section(spoken(name),
     table("Methods of " + name, ["Method", "What it does"],
       own.map((method) => [link(hrefOfMethod(name, method.method), method.method), method.description ?? ""]))));
-  return [sections.length ? sections : make("p", {class: "notice"}, "There are no methods."), silent(answer.failures)];
+  return [sections.length + answer.failures.length ? sections : make("p", {class: "notice"}, "There are no methods."),
+    silent(answer.failures)];
 }
 
 function grouped(methods) {
@@ -118,6 +119,7 @@ function detailsOf(method, path, given) {
 
 class MethodForm {
   constructor(visit, className, method, instances, chosen) {
+    this._visit = visit;
     this._method = method;
     this._fields = method.parameters.filter(isInput).map((parameter) => new Field(parameter));
     this._result = make("div", {id: "result"});
@@ -155,7 +157,7 @@ class MethodForm {
         return;
       throw error;
     }
-    if (!await mayChange() || !await confirmed(questionOf(method, path, given), detailsOf(method, path, given), "Call " + method.name))
+    if (this._visit.over || !await mayChange() || !await confirmed(questionOf(method, path, given), detailsOf(method, path, given), "Call " + method.name))
       return;
     replace(this._result, make("p", {class: "quiet", "aria-busy": "true"}, method.name + " is at work …"));
     const answer = await attempted(this._result, () => call(path, method.name, valuesOf(given)));
@@ -172,7 +174,7 @@ async function formOf(visit, className, name, path) {
     return make("p", {class: "notice critical"}, className + " has no method " + name + ".");
   const instances = methods.find((each) => each.class === className && each.method === name)?.instances ?? [];
   return [make("p", {}, method.description ?? "", " ", link(hrefOfClass(className), className)),
-    instances.length ? null : silent(failures.filter((text) => text.startsWith(className + ":"))),
+    instances.length ? null : silentOf(className, failures),
     new MethodForm(visit, className, method, instances, path).node];
 }
 

@@ -12,7 +12,7 @@ const wideEnough = 760;
 const mostTargets = 40; // of all ports together; what a port has beyond its part of them is one box
 const fewestTargets = 3; // of a port
 const mostUnits = 40; // of all targets together; of more than these a target has a line that leads to their table
-const unitClass = "CIM_StorageExtent"; // which all that have a capacity are
+const unitClass = "CIM_LogicalDevice"; // which all units are, of whatever sort
 
 /** The nodes of that kind below a node, and none below these. */
 export function descendants(node, kind, found = []) {
@@ -84,10 +84,6 @@ function targetBox(target, areFew) {
   return {...boxOf(target, nameOf(target), [], "Target", problemsOf(target)), leads: unitLeads(target, areFew)};
 }
 
-function contentsOf(port) {
-  return port.contents ? port.contents + " behind the port" : "";
-}
-
 /** Of each WWPN the node with the most units, since ports may see different ones. */
 function fullestOf(targets) {
   const nodes = new Map();
@@ -134,11 +130,11 @@ class Targets {
     const rest = targets.slice(this._most);
     if (rest.length > 0)
       this._join(port, rest.map(nameOf).join(),
-        () => boxOf(port.node, countText(rest.length, "more target"), [contentsOf(port.node)], "Targets"));
+        () => boxOf(port.node, countText(rest.length, "more target"), [], "Targets"));
   }
 
   _count(port, {targets, ...node}) {
-    this._join(port, node.name, () => boxOf(node, countText(targets, "target"), [contentsOf(node)], "Targets"));
+    this._join(port, node.name, () => boxOf(node, countText(targets, "target"), [node.contents && node.contents + " behind the port"], "Targets"));
   }
 }
 

@@ -82,6 +82,11 @@ export function silent(failures) {
     failures.map((text) => make("li", {}, badge("warning", "warning"), " ", text))));
 }
 
+/** Of one class. */
+export function silentOf(className, failures) {
+  return silent(failures.filter((text) => text.startsWith(className + ":")));
+}
+
 /** A section with a heading. */
 export function section(title, ...children) {
   return append(make("section", {}, make("h2", {}, title)), children);

@@ -334,6 +334,7 @@ TEST(Printing, ControlCharactersStayOnTheirLine)
 {
     EXPECT_EQ(oneLine("a\tb\nc\x1b[0m\x7f"), "a\\tb\\nc\\x1b[0m\\x7f");
     EXPECT_EQ(oneLine("\xc2\x9b 5 \xc2\xb0 \xff"), "\\xc2\\x9b 5 \xc2\xb0 \\xff");
+    EXPECT_EQ(oneLine("a\xe2\x80\xae\xc2\xad日本\xf0\x9f\x98\x80"), "a\\xe2\\x80\\xae\\xc2\\xad日本\xf0\x9f\x98\x80");
     EXPECT_EQ(displayWidth("──é"), 3U);
     std::ostringstream out;
     printJson(out, Json("\xff"));

@@ -267,4 +267,21 @@ TEST(Admission, WhoTriesManyPasswordsDoesNotFillTheJournal)
     EXPECT_EQ(linesOfTen(200), 10);
 }
 
+/// Whatever clients call things: a reference in a reference would double its text with each level.
+TEST(Journal, ALineIsShortAndReadsAsNoOther)
+{
+    broker::Path path{"root/x", "TST_End", {{"Tag", broker::Value::string(std::string(1000, '\\'))}}};
+    for (int depth = 0; depth < 64; depth++)
+        path = {"root/x", "TST_Joined", {{"End", broker::Value::reference(path)}}};
+    const broker::Path other{"", "X: done\njoe deleted Y", {{"a=1,b", broker::Value::uint8(1)}}};
+    testing::internal::CaptureStderr();
+    tellChange({.user = "joe"}, "deleted", path, "done");
+    tellChange({}, "deleted", other, "CIM_ERR_NOT_FOUND");
+    RefusedLogins().tell("192.0.2.1", "\" from 192.0.2.9");
+    EXPECT_EQ(testing::internal::GetCapturedStderr(),
+              "joe deleted root/x:TST_Joined.End=\"TST_Joined\": done\n"
+              "somebody deleted X??done?joe?deleted?Y.a?1?b=1: CIM_ERR_NOT_FOUND\n"
+              "login refused from 192.0.2.1 of \"\\\" from 192.0.2.9\"\n");
+}
+
 } // namespace
