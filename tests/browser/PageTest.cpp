@@ -726,7 +726,7 @@ TEST_F(Page, ShowsHostileNamesAsTexts)
                              "classes/TVRHBA_SoftwareIdentity", "classes/TVRHBA_StorageVolume"})
         look(view);
     visit("classes/TVRHBA_Product");
-    browser.awaitText(".grid", "\\u202edeppilf");
+    browser.awaitText(".grid", "\\xe2\\x80\\xaedeppilf");
     browser.awaitText(".grid", "\\x07bell");
     visit("classes/TVRHBA_SoftwareIdentity");
     browser.awaitText(".grid", "<b\\xff\\xfe>");
