@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <limits>
 #include <map>
 
 namespace metrics
@@ -31,25 +32,24 @@ std::string textOf(const Object& object, const char* property)
     return textOf(object.get(property));
 }
 
-/// The digits that a real of 32 bits has: further ones are of no meaning.
-double decimal(double real)
+/// A number in the family's unit, without the last digits of a double, in which a division errs.
+double inUnitOf(const FamilyRow& row, double number)
 {
-    constexpr int digits = 7;
+    if (row.divisor == 1)
+        return number;
+    double quotient = number / row.divisor;
     std::array<char, 32> text{};
-    const auto end =
-        std::to_chars(text.data(), text.data() + text.size(), real, std::chars_format::general, digits).ptr;
-    std::from_chars(text.data(), end, real);
-    return real;
+    const auto end = std::to_chars(text.data(), text.data() + text.size(), quotient, std::chars_format::general,
+                                   std::numeric_limits<double>::digits10)
+                         .ptr;
+    std::from_chars(text.data(), end, quotient);
+    return quotient;
 }
 
-/// The property's value in the family's unit.
 std::optional<double> quantity(const Object& object, const FamilyRow& row, const char* property)
 {
     const auto found = numberOf(object, property);
-    if (!found)
-        return std::nullopt;
-    const bool isShort = object.get(property).type() == CMPI_real32;
-    return isShort ? decimal(*found / row.divisor) : *found / row.divisor;
+    return found ? std::optional(inUnitOf(row, *found)) : std::nullopt;
 }
 
 /// The one of OtherIdentifyingInfo that a description stands for.
@@ -173,7 +173,7 @@ void thresholds(Series& series, const FamilyRow& row, const Object& object, cons
                                                                    {"low alarm", limits.lowAlarm}};
     for (const auto& [name, limit] : named)
         if (limit)
-            series.add(row, with(labels, {{"threshold", name}}), decimal(*limit / row.divisor));
+            series.add(row, with(labels, {{"threshold", name}}), inUnitOf(row, *limit));
 }
 
 /// A value beyond the limit of the alarm is beyond that of the warning as well.

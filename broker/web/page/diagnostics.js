@@ -102,10 +102,9 @@ class Diagnostics {
     renew(this.unanswered, silent(failures));
     if (failures.length === 0 || !this._offered)
       this._offer(tests);
-    if (!this.now.querySelector("[aria-disabled]")) // a job is being cancelled
-      renew(this.now, jobs.length
-        ? tableOf(["Job", "Port", "State", "Progress", ""], jobs.map((job) => jobItem(job, hasEnded(job, records), this.refusal)))
-        : none("No job is known."));
+    renew(this.now, jobs.length
+      ? tableOf(["Job", "Port", "State", "Progress", ""], jobs.map((job) => jobItem(job, hasEnded(job, records), this.refusal)))
+      : none("No job is known."));
     renew(this.records, records.length
       ? tableOf(["Time", "Test", "Port", "Result", "What it came to"], records.map(recordItem))
       : none("No test has left a record."));

@@ -68,13 +68,13 @@ function identitiesOf(node) {
 }
 
 /** As replace(), of a place that is shown anew now and again: what is equal stays, with what is selected in it; the focus
- *  goes to the link or button that it was on, and what was unfolded stays so. */
+ *  goes to the link or button that it was on, and what was unfolded stays so. All stays while a button in it is at work. */
 export function renew(place, ...children) {
   const fresh = append(place.cloneNode(false), ...children);
   const unfolded = new Set([...place.querySelectorAll("details[open] > summary")].map((each) => each.textContent));
   for (const summary of fresh.querySelectorAll("details > summary"))
     summary.parentNode.open = unfolded.has(summary.textContent);
-  if (fresh.isEqualNode(place))
+  if (fresh.isEqualNode(place) || place.querySelector("button[aria-disabled]"))
     return;
   const focused = place.contains(document.activeElement) ? identitiesOf(document.activeElement) : [];
   place.replaceChildren(...fresh.childNodes);
