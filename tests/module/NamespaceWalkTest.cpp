@@ -229,7 +229,7 @@ TEST(UpcallChannel, RefreshesAndAssociatorsShareIt)
     const Path card = host.instancesOf("TVRHBA_Card").at(0).path;
     ASSERT_TRUE(host.awaitRefresh());
 
-    constexpr unsigned rounds = 60;
+    constexpr unsigned rounds = 240; // of which many meet in one refresh
     std::atomic<unsigned> failures{0};
     std::vector<std::thread> clients;
     for (unsigned client = 0; client < 4; client++)
@@ -246,7 +246,7 @@ TEST(UpcallChannel, RefreshesAndAssociatorsShareIt)
     for (std::thread& client : clients)
         client.join();
     EXPECT_EQ(failures, 0u) << "an up-call waited for one that waited for the refresh, which waited for it";
-    EXPECT_GT(host.logged(begun), rounds / 12) << "many refreshes, however the threads take turns";
+    EXPECT_GT(host.logged(begun), 15u);
     host.unload();
 }
 
